@@ -1,0 +1,54 @@
+// The broker behind its public class.
+#pragma once
+
+#include "Classes.h"
+#include "Hooks.h"
+#include "Hosting.h"
+#include "Objects.h"
+
+#include <array>
+#include <atomic>
+#include <functional>
+#include <shared_mutex>
+
+namespace oxahv {
+
+extern const CMPIBrokerFT requestTable;
+extern const CMPIBrokerEncFT encapsulationTable;
+extern const CMPIBrokerExtFT systemTable;
+extern const CMPIBrokerMemFT memoryTable;
+
+class EmbeddedBroker::Impl {
+public:
+    void countObject(Kind kind, int change) {
+        counts_[static_cast<std::size_t>(kind)].fetch_add(change, std::memory_order_relaxed);
+    }
+    LiveObjects liveObjects() const;
+
+    // Passes a provider's message on to the program.
+    void tell(const BrokerMessage& message) const;
+    void setMessageHandler(std::function<void(const BrokerMessage&)> handler);
+
+private:
+    std::array<std::atomic<int>, kindCount>
+        counts_{}; // before the owner, whose objects are counted to the last
+    mutable std::shared_mutex handlerMutex_;
+    std::function<void(const BrokerMessage&)> handler_;
+
+public:
+    CMPIBroker record = {this, &requestTable, &encapsulationTable, &systemTable, &memoryTable};
+    Owner owner{*this};
+    Classes classes;
+    Hooks hooks;
+    Hosting hosting{*this};
+    std::atomic<KeyMode> keyMode{KeyMode::exact};
+};
+
+// The broker of a handle; null for a null handle and for another broker's.
+inline Core* coreOf(const CMPIBroker* handle) {
+    return handle != nullptr && handle->bft == &requestTable
+               ? static_cast<Core*>(const_cast<void*>(handle->hdl))
+               : nullptr;
+}
+
+} // namespace oxahv

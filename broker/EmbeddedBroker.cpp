@@ -1,0 +1,115 @@
+#include "EmbeddedBroker.h"
+
+#include "Core.h"
+
+namespace oxahv {
+
+BrokerError::BrokerError(const std::string& message) : std::runtime_error(message) {}
+BrokerError::~BrokerError() = default;
+
+LiveObjects EmbeddedBroker::Impl::liveObjects() const {
+    const auto count = [this](Kind kind) {
+        return static_cast<std::size_t>(
+            counts_[static_cast<std::size_t>(kind)].load(std::memory_order_relaxed));
+    };
+    LiveObjects live;
+    live.instances = count(Kind::instance);
+    live.objectPaths = count(Kind::objectPath);
+    live.arguments = count(Kind::arguments);
+    live.strings = count(Kind::string);
+    live.arrays = count(Kind::array);
+    live.dateTimes = count(Kind::dateTime);
+    live.enumerations = count(Kind::enumeration);
+    live.contexts = count(Kind::context);
+    live.results = count(Kind::result);
+    live.others = count(Kind::other);
+    return live;
+}
+
+void EmbeddedBroker::Impl::tell(const BrokerMessage& message) const {
+    const std::shared_lock<std::shared_mutex> lock(handlerMutex_);
+    if (handler_) {
+        handler_(message);
+    }
+}
+
+void EmbeddedBroker::Impl::setMessageHandler(std::function<void(const BrokerMessage&)> handler) {
+    const std::unique_lock<std::shared_mutex> lock(handlerMutex_);
+    handler_.swap(handler);
+}
+
+EmbeddedBroker::EmbeddedBroker() : impl_(std::make_unique<Impl>()) {}
+EmbeddedBroker::~EmbeddedBroker() = default;
+
+const CMPIBroker* EmbeddedBroker::handle() const {
+    return &impl_->record;
+}
+
+void EmbeddedBroker::declare(const ClassDeclaration& declaration) {
+    impl_->classes.declare(declaration);
+}
+
+bool EmbeddedBroker::hasDeclarations() const {
+    return impl_->classes.any();
+}
+
+bool EmbeddedBroker::isDeclared(const std::string& className) const {
+    return impl_->classes.find(className) != nullptr;
+}
+
+std::vector<PropertyDeclaration> EmbeddedBroker::propertiesOf(const std::string& className) const {
+    const auto declared = impl_->classes.find(className);
+    return declared != nullptr ? declared->properties : std::vector<PropertyDeclaration>();
+}
+
+bool EmbeddedBroker::isA(const std::string& className, const std::string& ancestor) const {
+    return impl_->classes.isA(className, ancestor);
+}
+
+void EmbeddedBroker::host(const std::string& name, const ProviderFactories& factories,
+                          std::vector<std::string> classes) {
+    impl_->hosting.host(name, factories, std::move(classes));
+}
+
+void EmbeddedBroker::load(const std::string& file, const std::string& name,
+                          std::vector<std::string> classes) {
+    impl_->hosting.load(file, name, std::move(classes));
+}
+
+void EmbeddedBroker::unload(const std::string& name) {
+    impl_->hosting.unload(name);
+}
+
+void EmbeddedBroker::setKeyMode(KeyMode mode) {
+    impl_->keyMode.store(mode, std::memory_order_relaxed);
+}
+
+void EmbeddedBroker::injectFault(const std::string& slot, const Fault& fault) {
+    impl_->hooks.inject(slot, fault);
+}
+
+void EmbeddedBroker::clearFaults() {
+    impl_->hooks.clearFaults();
+}
+
+std::vector<std::string> EmbeddedBroker::slotNames() {
+    return std::vector<std::string>(std::begin(slots), std::end(slots));
+}
+
+void EmbeddedBroker::startRecording() {
+    impl_->hooks.startRecording();
+}
+
+std::vector<Call> EmbeddedBroker::stopRecording() {
+    return impl_->hooks.stopRecording();
+}
+
+LiveObjects EmbeddedBroker::liveObjects() const {
+    return impl_->liveObjects();
+}
+
+void EmbeddedBroker::setMessageHandler(std::function<void(const BrokerMessage&)> handler) {
+    impl_->setMessageHandler(std::move(handler));
+}
+
+} // namespace oxahv

@@ -1,0 +1,369 @@
+/**
+ * @file
+ * A CIM server's CMPI broker inside one process: for unit tests of providers, for demonstrations, and for
+ * trying a provider by hand.
+ *
+ * A test needs three objects: an oxahv::EmbeddedBroker, a provider hosted in it, and an oxahv::Request per
+ * request that a client would make.
+ *
+ * @code
+ * oxahv::EmbeddedBroker broker;
+ * broker.declare(oxahv::ClassDeclaration("Demo_Port").key("Name", CMPI_string).property("Speed",
+ * CMPI_uint64)); broker.load("./libDemoPort.so", "DemoPort");
+ *
+ * oxahv::Request request(broker);
+ * oxahv::Reply reply = request.enumerateInstances(request.objectPath("root/cimv2", "Demo_Port"));
+ * for (CMPIInstance* port : reply.instances) { ... }
+ * @endcode
+ *
+ * **Threads.** Setting a broker up (declare, host, load, unload) and putting faults or modes on it may be
+ * done from any thread, also while requests run. A Request belongs to the thread that made it. Requests on
+ * different threads run at the same time.
+ *
+ * **Ownership.** Every CMPI object that the broker makes belongs to the request that is current on the
+ * calling thread, the innermost Request alive there; without one, to the broker itself. It dies with its
+ * owner, unless the caller released it before. What a `clone` slot returned belongs to its caller, who
+ * releases it with its `release` slot; what is left then dies with the broker. An object may be used after
+ * its release by nobody.
+ *
+ * **Encoding.** All texts are UTF-8; a CMPIString keeps its bytes as they came.
+ *
+ * **Conduct.** All slots of all function tables are filled. A slot that gets a null handle or one that is not
+ * of its kind answers `CMPI_RC_ERR_INVALID_HANDLE`; what a broker without a repository cannot do answers
+ * `CMPI_RC_ERR_NOT_SUPPORTED`. No slot throws.
+ */
+#pragma once
+
+#ifndef CMPI_PLATFORM_LINUX_GENERIC_GNU
+#define CMPI_PLATFORM_LINUX_GENERIC_GNU
+#endif
+#include <cmpidt.h>
+#include <cmpift.h>
+#include <cmpimacs.h>
+
+#include "TKExport.h"
+
+#include <cstddef>
+#include <functional>
+#include <memory>
+#include <stdexcept>
+#include <string>
+#include <thread>
+#include <vector>
+
+namespace oxahv {
+
+/** What hosting, loading, class declarations and path texts throw; `what()` is one line for a person. */
+class TK_EXPORT BrokerError : public std::runtime_error {
+public:
+    explicit BrokerError(const std::string& message);
+    BrokerError(const BrokerError&) = default;
+    BrokerError& operator=(const BrokerError&) = default;
+    ~BrokerError() override;
+};
+
+/** One property of a class: its name as declared, its CMPI type (with `CMPI_ARRAY` for arrays) and whether it
+ * is a key. */
+struct PropertyDeclaration {
+    std::string name;
+    CMPIType type = CMPI_null;
+    bool isKey = false;
+};
+
+/**
+ * The declaration of one CIM class, built in one expression. Names compare ignoring the case of ASCII
+ * letters.
+ *
+ * @code
+ * ClassDeclaration("Demo_Port").superclass("CIM_NetworkPort").key("Name", CMPI_string).property("Speed",
+ * CMPI_uint64)
+ * @endcode
+ */
+class TK_EXPORT ClassDeclaration {
+public:
+    /** @param name the class's name; not empty. */
+    explicit ClassDeclaration(std::string name);
+
+    /** Names the superclass, which must be declared before this class is. */
+    ClassDeclaration& superclass(std::string name);
+    /** Adds a key property. */
+    ClassDeclaration& key(std::string name, CMPIType type);
+    /** Adds a property that is no key. */
+    ClassDeclaration& property(std::string name, CMPIType type);
+
+    const std::string& name() const { return name_; }
+    const std::string& superclass() const { return superclass_; }
+    /** The class's own properties, in the order in which they were added. */
+    const std::vector<PropertyDeclaration>& properties() const { return properties_; }
+
+private:
+    std::string name_;
+    std::string superclass_;
+    std::vector<PropertyDeclaration> properties_;
+};
+
+/** How the keys of a request's object path reach the provider. CIM servers differ in it. */
+enum class KeyMode {
+    exact,   ///< with the type that they were given or that their class declares
+    untyped, ///< unsigned integers as `CMPI_uint64`, signed ones as `CMPI_sint64`
+    chars    ///< texts as `CMPI_chars` instead of `CMPI_string`
+};
+
+/** What goes wrong at a slot. The parts can be combined. */
+struct Fault {
+    /** The status that the call reports instead of doing its work; `CMPI_RC_OK` leaves it to the real call.
+     */
+    CMPIrc code = CMPI_RC_ERR_FAILED;
+    /** With `code` `CMPI_RC_OK`: the call yields a null object, string or handle with an OK status. */
+    bool yieldsNull = false;
+    /** Added to the state of the CMPIData that the call returns. */
+    CMPIValueState stateBits = 0;
+    /** The first call that it strikes, 1 being the next one. */
+    unsigned int firstCall = 1;
+    /** How many calls it strikes from there on; 0 means all. */
+    unsigned int calls = 1;
+};
+
+/** One call of a slot, as it was recorded. */
+struct Call {
+    std::string slot;             ///< table and member, for example "CMPIInstanceFT.setProperty"
+    const void* object = nullptr; ///< the handle that the slot was called on
+    std::string name;             ///< the first text argument, mostly the name of something; empty if none
+    std::string secondName;       ///< the second text argument; empty if none
+    CMPICount index = 0;          ///< the index or size argument
+    CMPIType type = CMPI_null;    ///< the type argument
+    CMPIValue value = {};         ///< the value argument; of `CMPI_chars` the caller's own pointer
+    bool hasStatus = false;       ///< whether the caller passed a status, or the slot returns one
+    CMPIStatus entryStatus = {CMPI_RC_OK,
+                              nullptr}; ///< the status that the caller passed, as it was before the call
+    CMPIrc code = CMPI_RC_OK;           ///< the code that the call reported
+    std::thread::id thread;             ///< the calling thread
+};
+
+/** How many objects of each kind are alive in a broker. */
+struct LiveObjects {
+    std::size_t instances = 0;
+    std::size_t objectPaths = 0;
+    std::size_t arguments = 0;
+    std::size_t strings = 0;
+    std::size_t arrays = 0;
+    std::size_t dateTimes = 0;
+    std::size_t enumerations = 0;
+    std::size_t contexts = 0;
+    std::size_t results = 0;
+    std::size_t others = 0; ///< errors, property lists, filters, select expressions
+
+    std::size_t total() const {
+        return instances + objectPaths + arguments + strings + arrays + dateTimes + enumerations + contexts +
+               results + others;
+    }
+};
+
+/** The MI factory functions of a provider that is linked into the program; a kind that it lacks stays null.
+ */
+struct ProviderFactories {
+    CMPIInstanceMI* (*instance)(const CMPIBroker*, const CMPIContext*, CMPIStatus*) = nullptr;
+    CMPIAssociationMI* (*association)(const CMPIBroker*, const CMPIContext*, CMPIStatus*) = nullptr;
+    CMPIMethodMI* (*method)(const CMPIBroker*, const CMPIContext*, CMPIStatus*) = nullptr;
+};
+
+/** A broker message or trace that a provider wrote through the broker's `logMessage` and `trace` slots. */
+struct BrokerMessage {
+    bool isTrace = false;
+    int severityOrLevel = 0;
+    std::string component; ///< the id or component argument
+    std::string text;
+};
+
+class Request;
+
+/** The broker. See the top of this file for how to use it. */
+class TK_EXPORT EmbeddedBroker {
+public:
+    EmbeddedBroker();
+    /** Calls `cleanup` of every hosted provider, unloads the loaded ones, and frees every object that is
+     * left. */
+    ~EmbeddedBroker();
+    EmbeddedBroker(const EmbeddedBroker&) = delete;
+    EmbeddedBroker& operator=(const EmbeddedBroker&) = delete;
+
+    /** The CMPI handle; valid as long as this object. */
+    const CMPIBroker* handle() const;
+
+    /** @name Classes */
+    /** @{ */
+    /**
+     * Declares a class. As soon as one class is declared, classes, properties, keys and their types are
+     * checked against the declarations; without any the broker takes what comes.
+     * @throws BrokerError when the superclass is not declared, the class already is, or a property is
+     * redeclared with another type.
+     */
+    void declare(const ClassDeclaration& declaration);
+    /** Whether any class is declared. */
+    bool hasDeclarations() const;
+    /** Whether the class is declared. */
+    bool isDeclared(const std::string& className) const;
+    /** All properties of a declared class, inherited ones first; empty for one that is not declared. */
+    std::vector<PropertyDeclaration> propertiesOf(const std::string& className) const;
+    /** Whether `className` is `ancestor` or derives from it, by the declarations. */
+    bool isA(const std::string& className, const std::string& ancestor) const;
+    /** @} */
+
+    /** @name Providers */
+    /** @{ */
+    /**
+     * Hosts a provider that is linked into the program: calls its factories at once.
+     * @param name the MI name, unique in this broker.
+     * @param classes the classes that it serves, with the classes derived from them; empty: all.
+     * @throws BrokerError when the name is taken, no factory is given, or a factory fails (with its CMPI
+     * code's name).
+     */
+    void host(const std::string& name, const ProviderFactories& factories,
+              std::vector<std::string> classes = {});
+    /**
+     * Loads a provider library and hosts the provider `name` in it, by the factory functions
+     * `NAME_Create_InstanceMI`, `NAME_Create_AssociationMI` and `NAME_Create_MethodMI`, or the
+     * `_Generic_Create_…` ones.
+     * @param file path of the library, as `dlopen` takes it.
+     * @throws BrokerError when the library cannot be loaded, has none of the factories, or a factory fails.
+     */
+    void load(const std::string& file, const std::string& name, std::vector<std::string> classes = {});
+    /**
+     * Calls the provider's `cleanup`, waits for requests that are inside it, and unloads its library.
+     * @throws BrokerError when no such provider is hosted.
+     */
+    void unload(const std::string& name);
+    /** @} */
+
+    /** @name Tests: modes, faults, records */
+    /** @{ */
+    /** How the keys of request paths reach providers from now on. */
+    void setKeyMode(KeyMode mode);
+    /**
+     * Makes a slot fail. Several faults at one slot count the same calls.
+     * @param slot table and member, as "CMPIObjectPathFT.getKeyAt", or the member alone where only one table
+     * has it.
+     * @throws BrokerError when there is no such slot, or the member alone is in several tables.
+     */
+    void injectFault(const std::string& slot, const Fault& fault);
+    /** Takes all faults away and sets the calls' counts back. */
+    void clearFaults();
+    /** The names of all slots that faults can be injected into, as "Table.member". */
+    static std::vector<std::string> slotNames();
+    /** Starts a fresh record of calls. Recording is off at first. */
+    void startRecording();
+    /** Ends recording and returns the calls in order. */
+    std::vector<Call> stopRecording();
+    /** Counts of the objects that are alive now. */
+    LiveObjects liveObjects() const;
+    /** Receives what providers write through the `logMessage` and `trace` slots; null: dropped. Called on
+     * their thread. */
+    void setMessageHandler(std::function<void(const BrokerMessage&)> handler);
+    /** @} */
+
+    /** The implementation; named here for its own sources only. */
+    class Impl;
+    Impl& impl() { return *impl_; }
+
+private:
+    std::unique_ptr<Impl> impl_;
+};
+
+/** What a request yielded: its status, and what the provider returned, in order. All of it dies with the
+ * request. */
+struct Reply {
+    CMPIrc code = CMPI_RC_OK;                 ///< the status's code
+    std::string message;                      ///< the status's text, empty if none
+    std::vector<CMPIInstance*> instances;     ///< returned by returnInstance
+    std::vector<CMPIObjectPath*> objectPaths; ///< returned by returnObjectPath
+    std::vector<CMPIData> data;               ///< returned by returnData; a method's return value
+    CMPIArgs* out = nullptr;                  ///< a method's output arguments
+    bool done = false;                        ///< whether the provider called returnDone
+    bool ok() const { return code == CMPI_RC_OK; }
+};
+
+/** Filters of an association request; an empty text is no filter. */
+struct AssociationFilter {
+    std::string associationClass;
+    std::string resultClass;
+    std::string role;
+    std::string resultRole;
+};
+
+/**
+ * A client's request, with its CMPI context. While it lives, it owns what the broker makes on this thread.
+ * Requests nest: an upcall of a provider runs in the request that it serves.
+ *
+ * The operations find the provider by the class of the path, call its MI function, and collect what it
+ * returns. Keys of the path are delivered as the broker's KeyMode says. With declarations, an unknown class
+ * answers `CMPI_RC_ERR_INVALID_CLASS`; a class that no provider serves answers `CMPI_RC_ERR_NOT_SUPPORTED`.
+ * None of them throws, but for `std::bad_alloc`.
+ */
+class TK_EXPORT Request {
+public:
+    explicit Request(EmbeddedBroker& broker);
+    ~Request();
+    Request(const Request&) = delete;
+    Request& operator=(const Request&) = delete;
+
+    /** The request's context, as provider functions receive it. */
+    const CMPIContext* context() const;
+
+    /** A new object path, made through the broker's own slot; null when that refuses. */
+    CMPIObjectPath* objectPath(const std::string& nameSpace, const std::string& className);
+    /**
+     * The object path of a text: `Class.Key="text",Number=3`, a namespace and a colon may stand before it,
+     * `\"` and `\\` inside quotes. Numbers get their declared type; without declaration unsigned ones are
+     * `CMPI_uint64`, ones with a sign `CMPI_sint64`; `TRUE` and `FALSE` are booleans.
+     * @param nameSpace the namespace of a text that names none.
+     * @throws BrokerError naming the column (from 1) and what is wrong there.
+     */
+    CMPIObjectPath* objectPathFromText(const std::string& text, const std::string& nameSpace);
+    /** A copy of the path as a client's request would bring it to a provider: its keys as the broker's
+     * KeyMode says. */
+    CMPIObjectPath* deliver(const CMPIObjectPath* path);
+
+    /** @param properties the property list; null is none. */
+    Reply enumerateInstances(const CMPIObjectPath* classPath,
+                             const std::vector<std::string>* properties = nullptr);
+    Reply enumerateInstanceNames(const CMPIObjectPath* classPath);
+    Reply getInstance(const CMPIObjectPath* path, const std::vector<std::string>* properties = nullptr);
+    Reply createInstance(const CMPIObjectPath* classPath, const CMPIInstance* instance);
+    Reply modifyInstance(const CMPIObjectPath* path, const CMPIInstance* instance,
+                         const std::vector<std::string>* properties = nullptr);
+    Reply deleteInstance(const CMPIObjectPath* path);
+    Reply execQuery(const CMPIObjectPath* classPath, const std::string& query, const std::string& language);
+    Reply associators(const CMPIObjectPath* path, const AssociationFilter& filter = {},
+                      const std::vector<std::string>* properties = nullptr);
+    Reply associatorNames(const CMPIObjectPath* path, const AssociationFilter& filter = {});
+    Reply references(const CMPIObjectPath* path, const AssociationFilter& filter = {},
+                     const std::vector<std::string>* properties = nullptr);
+    Reply referenceNames(const CMPIObjectPath* path, const AssociationFilter& filter = {});
+    Reply invokeMethod(const CMPIObjectPath* path, const std::string& method, const CMPIArgs* in);
+
+private:
+    class Impl;
+    TK_HIDDEN EmbeddedBroker::Impl& core();
+    std::unique_ptr<Impl> impl_;
+};
+
+/** @name Texts */
+/** @{ */
+/** The name of a CMPI return code, as "CMPI_RC_ERR_NOT_FOUND"; "CMPI_RC_<number>" for one that has none.
+ * Thread-safe. */
+TK_EXPORT std::string codeName(CMPIrc code);
+/** The return code of a name, with or without "CMPI_RC_", or of a decimal number. @throws BrokerError for any
+ * other name. */
+TK_EXPORT CMPIrc codeFromName(const std::string& name);
+/** The CIM name of a CMPI type, as "uint32", "string" or "datetime"; that of an array's elements for an
+ * array. */
+TK_EXPORT std::string typeName(CMPIType type);
+/** A value as MOF writes it: numbers, `TRUE`, texts and date/times in quotes, arrays in braces, paths as
+ * texts, `NULL`. */
+TK_EXPORT std::string valueText(const CMPIData& data);
+/** The path as text, `namespace:Class.Key="text",Number=3`: what objectPathFromText reads. Empty for a
+ * foreign handle. */
+TK_EXPORT std::string pathText(const CMPIObjectPath* path);
+/** @} */
+
+} // namespace oxahv

@@ -1,0 +1,483 @@
+#include "Hosting.h"
+
+#include "Core.h"
+
+#include <algorithm>
+#include <dlfcn.h>
+#include <future>
+
+namespace oxahv {
+
+// A provider with its MIs. It dies with its last user, which may be a request that is inside it.
+class HostedProvider {
+public:
+    HostedProvider(Core& core, std::string name, std::vector<std::string> classes, void* library)
+        : core_(core), name_(std::move(name)), classes_(std::move(classes)), library_(library) {}
+    ~HostedProvider();
+    HostedProvider(const HostedProvider&) = delete;
+    HostedProvider& operator=(const HostedProvider&) = delete;
+
+    const std::string& name() const { return name_; }
+    std::future<void> gone() { return gone_.get_future(); }
+
+    // Makes the MIs; throws BrokerError when a factory fails.
+    void create(const ProviderFactories& factories);
+    // The same from the library's factory functions.
+    void createFromLibrary(const std::string& file);
+
+    bool serves(const Classes& declared, std::string_view className) const;
+    bool servesAll() const { return classes_.empty(); }
+
+    template <class MI>
+    MI* mi() const {
+        if constexpr (std::is_same_v<MI, CMPIInstanceMI>) {
+            return instance_;
+        } else if constexpr (std::is_same_v<MI, CMPIAssociationMI>) {
+            return association_;
+        } else {
+            return method_;
+        }
+    }
+
+private:
+    template <class MI>
+    MI* createFromLibrary(const char* kind, bool& found);
+    void* function(const std::string& symbol) const;
+    template <class MI>
+    void require(MI* mi, const CMPIStatus& status) const;
+
+    Core& core_;
+    std::string name_;
+    std::vector<std::string> classes_;
+    void* library_;
+    CMPIInstanceMI* instance_ = nullptr;
+    CMPIAssociationMI* association_ = nullptr;
+    CMPIMethodMI* method_ = nullptr;
+    std::promise<void> gone_;
+};
+
+namespace {
+
+template <class MI>
+void cleanUp(MI* mi, const CMPIContext* context) {
+    if (mi != nullptr && mi->ft != nullptr && mi->ft->cleanup != nullptr) {
+        try {
+            mi->ft->cleanup(mi, context, 1);
+        } catch (...) { // NOLINT(bugprone-empty-catch): a provider that fails to end has ended all the same
+        }
+    }
+}
+
+std::string messageOf(const CMPIStatus& status) {
+    const String* const text = String::of(status.msg);
+    return text != nullptr ? text->text : "";
+}
+
+// A status as words for a person.
+std::string wordsOf(const CMPIStatus& status) {
+    const std::string message = messageOf(status);
+    return codeName(status.rc) + (message.empty() ? "" : ": " + message);
+}
+
+const char* orNull(const std::string& text) {
+    return text.empty() ? nullptr : text.c_str();
+}
+
+// Runs a provider's function. What it throws becomes a status: a provider must not take its server along.
+template <class Function>
+CMPIStatus guarded(const Function& function, std::string& message) {
+    try {
+        const CMPIStatus status = function();
+        message = messageOf(status);
+        return status;
+    } catch (const std::exception& exception) {
+        message = std::string("exception: ") + exception.what();
+    } catch (...) {
+        message = "exception of an unknown kind";
+    }
+    return {CMPI_RC_ERR_FAILED, nullptr};
+}
+
+// A signed integer is widened with its sign, any other with zeros.
+Value widest(const Value& value) {
+    const CMPIData data = value.data();
+    CMPIValue wide = {};
+    CMPIType type = CMPI_uint64;
+    switch (data.type) {
+    case CMPI_uint8:
+        wide.uint64 = data.value.uint8;
+        break;
+    case CMPI_uint16:
+        wide.uint64 = data.value.uint16;
+        break;
+    case CMPI_uint32:
+        wide.uint64 = data.value.uint32;
+        break;
+    case CMPI_sint8:
+        wide.sint64 = data.value.sint8;
+        type = CMPI_sint64;
+        break;
+    case CMPI_sint16:
+        wide.sint64 = data.value.sint16;
+        type = CMPI_sint64;
+        break;
+    case CMPI_sint32:
+        wide.sint64 = data.value.sint32;
+        type = CMPI_sint64;
+        break;
+    default:
+        return value;
+    }
+    return Value::number(wide, type);
+}
+
+void applyKeyMode(ObjectPath& path, KeyMode mode) {
+    for (NamedValue& key : path.keys) {
+        if (key.value.isNull()) {
+            continue;
+        }
+        if (key.value.type() == CMPI_ref) {
+            applyKeyMode(*ObjectPath::of(key.value.data().value.ref), mode);
+        } else if (mode == KeyMode::untyped) {
+            key.value = widest(key.value);
+        } else if (key.value.type() == CMPI_string) {
+            key.value.retype(CMPI_chars);
+        }
+    }
+}
+
+} // namespace
+
+PropertyArray::PropertyArray(const std::vector<std::string>* names) {
+    if (names != nullptr) {
+        for (const std::string& name : *names) {
+            pointers_.push_back(name.c_str());
+        }
+        pointers_.push_back(nullptr);
+    }
+}
+
+HostedProvider::~HostedProvider() {
+    Owner own(core_); // what the provider makes while it ends
+    own.enter();
+    const CMPIContext* const context = handOut(std::make_unique<Context>(core_));
+    cleanUp(instance_, context);
+    cleanUp(association_, context);
+    cleanUp(method_, context);
+    own.leave();
+    if (library_ != nullptr) {
+        dlclose(library_);
+    }
+    gone_.set_value();
+}
+
+template <class MI>
+void HostedProvider::require(MI* mi, const CMPIStatus& status) const {
+    if (status.rc != CMPI_RC_OK || mi == nullptr) {
+        throw BrokerError("provider " + name_ + ": its factory answered " + wordsOf(status));
+    }
+}
+
+void HostedProvider::create(const ProviderFactories& factories) {
+    Owner own(core_);
+    own.enter();
+    const auto make = [&](auto factory, auto*& mi) {
+        if (factory != nullptr) {
+            CMPIStatus status = {CMPI_RC_OK, nullptr};
+            mi = factory(&core_.record, handOut(std::make_unique<Context>(core_)), &status);
+            require(mi, status);
+        }
+    };
+    try {
+        make(factories.instance, instance_);
+        make(factories.association, association_);
+        make(factories.method, method_);
+    } catch (...) {
+        own.leave();
+        throw;
+    }
+    own.leave();
+}
+
+void* HostedProvider::function(const std::string& symbol) const {
+    return dlsym(library_, symbol.c_str());
+}
+
+template <class MI>
+MI* HostedProvider::createFromLibrary(const char* kind, bool& found) {
+    using Factory = MI* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
+    using GenericFactory = MI* (*)(const CMPIBroker*, const CMPIContext*, const char*, CMPIStatus*);
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    MI* mi = nullptr;
+    const CMPIContext* const context = handOut(std::make_unique<Context>(core_));
+    if (void* const own = function(name_ + "_Create_" + kind)) {
+        mi = reinterpret_cast<Factory>(own)(&core_.record, context, &status);
+    } else if (void* const generic = function(std::string("_Generic_Create_") + kind)) {
+        mi = reinterpret_cast<GenericFactory>(generic)(&core_.record, context, name_.c_str(), &status);
+    } else {
+        return nullptr;
+    }
+    found = true;
+    require(mi, status);
+    return mi;
+}
+
+void HostedProvider::createFromLibrary(const std::string& file) {
+    Owner own(core_);
+    own.enter();
+    bool found = false;
+    try {
+        instance_ = createFromLibrary<CMPIInstanceMI>("InstanceMI", found);
+        association_ = createFromLibrary<CMPIAssociationMI>("AssociationMI", found);
+        method_ = createFromLibrary<CMPIMethodMI>("MethodMI", found);
+    } catch (...) {
+        own.leave();
+        throw;
+    }
+    own.leave();
+    if (!found) {
+        throw BrokerError("library " + file + " has no factory for a provider " + name_ + ", such as " +
+                          name_ + "_Create_InstanceMI");
+    }
+}
+
+bool HostedProvider::serves(const Classes& declared, std::string_view className) const {
+    return std::any_of(classes_.begin(), classes_.end(),
+                       [&](const std::string& served) { return declared.isA(className, served); });
+}
+
+Hosting::~Hosting() {
+    // In the order in which they came; each may still send requests to those after it.
+    while (!providers_.empty()) {
+        providers_.erase(providers_.begin());
+    }
+}
+
+void Hosting::requireFreeName(const std::string& name) const {
+    const std::shared_lock<std::shared_mutex> lock(mutex_);
+    for (const std::shared_ptr<HostedProvider>& provider : providers_) {
+        if (provider->name() == name) {
+            throw BrokerError("a provider " + name + " is hosted already");
+        }
+    }
+}
+
+void Hosting::add(std::shared_ptr<HostedProvider> provider) {
+    const std::unique_lock<std::shared_mutex> lock(mutex_);
+    providers_.push_back(std::move(provider));
+}
+
+void Hosting::host(const std::string& name, const ProviderFactories& factories,
+                   std::vector<std::string> classes) {
+    requireFreeName(name);
+    if (factories.instance == nullptr && factories.association == nullptr && factories.method == nullptr) {
+        throw BrokerError("provider " + name + " has no factory");
+    }
+    auto provider = std::make_shared<HostedProvider>(core_, name, std::move(classes), nullptr);
+    provider->create(factories);
+    add(std::move(provider));
+}
+
+void Hosting::load(const std::string& file, const std::string& name, std::vector<std::string> classes) {
+    requireFreeName(name);
+    void* const library = dlopen(file.c_str(), RTLD_NOW | RTLD_LOCAL);
+    if (library == nullptr) {
+        throw BrokerError(std::string("cannot load provider library: ") + dlerror());
+    }
+    auto provider = std::make_shared<HostedProvider>(core_, name, std::move(classes), library);
+    provider->createFromLibrary(file);
+    add(std::move(provider));
+}
+
+void Hosting::unload(const std::string& name) {
+    std::future<void> gone;
+    {
+        const std::unique_lock<std::shared_mutex> lock(mutex_);
+        const auto found = std::find_if(providers_.begin(), providers_.end(),
+                                        [&](const auto& provider) { return provider->name() == name; });
+        if (found == providers_.end()) {
+            throw BrokerError("no provider " + name + " is hosted");
+        }
+        gone = (*found)->gone();
+        const std::shared_ptr<HostedProvider> last = std::move(*found);
+        providers_.erase(found);
+    }
+    gone.wait();
+}
+
+template <class MI>
+std::shared_ptr<HostedProvider> Hosting::find(const ObjectPath& path,
+                                              std::string_view associationClass) const {
+    const std::shared_lock<std::shared_mutex> lock(mutex_);
+    const auto first = [&](const auto& matches) {
+        const auto found = std::find_if(providers_.begin(), providers_.end(), [&](const auto& provider) {
+            return provider->template mi<MI>() != nullptr && matches(*provider);
+        });
+        return found != providers_.end() ? *found : nullptr;
+    };
+    const std::string_view wanted = associationClass.empty() ? path.className : associationClass;
+    auto provider = first([&](const HostedProvider& p) { return p.serves(core_.classes, wanted); });
+    if (provider == nullptr && std::is_same_v<MI, CMPIAssociationMI> && associationClass.empty()) {
+        provider = first(
+            [](const HostedProvider&) { return true; }); // an association lists its own class, not its ends'
+    }
+    return provider != nullptr ? provider : first([](const HostedProvider& p) { return p.servesAll(); });
+}
+
+CMPIObjectPath* Hosting::deliver(const CMPIObjectPath* handle) const {
+    const ObjectPath* const path = ObjectPath::of(handle);
+    if (path == nullptr) {
+        return nullptr;
+    }
+    std::unique_ptr<ObjectPath> copy = path->copy();
+    const KeyMode mode = core_.keyMode.load(std::memory_order_relaxed);
+    if (mode != KeyMode::exact) {
+        applyKeyMode(*copy, mode);
+    }
+    return handOut(std::move(copy));
+}
+
+template <class MI, class Function>
+Reply Hosting::request(const CMPIObjectPath* handle, const Function& function,
+                       std::string_view associationClass) {
+    Reply reply;
+    const ObjectPath* const path = ObjectPath::of(handle);
+    if (path == nullptr) {
+        reply.code = CMPI_RC_ERR_INVALID_HANDLE;
+        return reply;
+    }
+    if (core_.classes.any() && core_.classes.find(path->className) == nullptr) {
+        reply.code = CMPI_RC_ERR_INVALID_CLASS;
+        reply.message = "class " + path->className + " is not declared";
+        return reply;
+    }
+    const std::shared_ptr<HostedProvider> provider = find<MI>(*path, associationClass);
+    if (provider == nullptr) {
+        reply.code = CMPI_RC_ERR_NOT_SUPPORTED;
+        reply.message = "no provider serves this for class " + path->className;
+        return reply;
+    }
+    Result* const result = handOut(std::make_unique<Result>(core_));
+    const CMPIObjectPath* const delivered = deliver(handle);
+    std::string message;
+    const CMPIStatus status =
+        guarded([&] { return function(provider->mi<MI>(), result, delivered); }, message);
+    if (status.rc != CMPI_RC_OK) { // else an error that the provider returned as a result stands
+        result->reply.code = status.rc;
+        result->reply.message = message;
+    }
+    return result->reply;
+}
+
+Reply Hosting::enumerateInstances(const CMPIContext* context, const CMPIObjectPath* path,
+                                  const char** properties) {
+    return request<CMPIInstanceMI>(
+        path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+            return mi->ft->enumerateInstances(mi, context, result, delivered, properties);
+        });
+}
+
+Reply Hosting::enumerateInstanceNames(const CMPIContext* context, const CMPIObjectPath* path) {
+    return request<CMPIInstanceMI>(path,
+                                   [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+                                       return mi->ft->enumerateInstanceNames(mi, context, result, delivered);
+                                   });
+}
+
+Reply Hosting::getInstance(const CMPIContext* context, const CMPIObjectPath* path, const char** properties) {
+    return request<CMPIInstanceMI>(path,
+                                   [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+                                       return mi->ft->getInstance(mi, context, result, delivered, properties);
+                                   });
+}
+
+Reply Hosting::createInstance(const CMPIContext* context, const CMPIObjectPath* path,
+                              const CMPIInstance* instance) {
+    return request<CMPIInstanceMI>(
+        path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+            return mi->ft->createInstance(mi, context, result, delivered, instance);
+        });
+}
+
+Reply Hosting::modifyInstance(const CMPIContext* context, const CMPIObjectPath* path,
+                              const CMPIInstance* instance, const char** properties) {
+    return request<CMPIInstanceMI>(
+        path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+            return mi->ft->modifyInstance(mi, context, result, delivered, instance, properties);
+        });
+}
+
+Reply Hosting::deleteInstance(const CMPIContext* context, const CMPIObjectPath* path) {
+    return request<CMPIInstanceMI>(path,
+                                   [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+                                       return mi->ft->deleteInstance(mi, context, result, delivered);
+                                   });
+}
+
+Reply Hosting::execQuery(const CMPIContext* context, const CMPIObjectPath* path, const char* query,
+                         const char* language) {
+    return request<CMPIInstanceMI>(
+        path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+            return mi->ft->execQuery(mi, context, result, delivered, query, language);
+        });
+}
+
+Reply Hosting::associators(const CMPIContext* context, const CMPIObjectPath* path,
+                           const AssociationFilter& filter, const char** properties) {
+    return request<CMPIAssociationMI>(
+        path,
+        [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+            return mi->ft->associators(mi, context, result, delivered, orNull(filter.associationClass),
+                                       orNull(filter.resultClass), orNull(filter.role),
+                                       orNull(filter.resultRole), properties);
+        },
+        filter.associationClass);
+}
+
+Reply Hosting::associatorNames(const CMPIContext* context, const CMPIObjectPath* path,
+                               const AssociationFilter& filter) {
+    return request<CMPIAssociationMI>(
+        path,
+        [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+            return mi->ft->associatorNames(mi, context, result, delivered, orNull(filter.associationClass),
+                                           orNull(filter.resultClass), orNull(filter.role),
+                                           orNull(filter.resultRole));
+        },
+        filter.associationClass);
+}
+
+Reply Hosting::references(const CMPIContext* context, const CMPIObjectPath* path,
+                          const AssociationFilter& filter, const char** properties) {
+    return request<CMPIAssociationMI>(
+        path,
+        [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+            return mi->ft->references(mi, context, result, delivered, orNull(filter.resultClass),
+                                      orNull(filter.role), properties);
+        },
+        filter.resultClass);
+}
+
+Reply Hosting::referenceNames(const CMPIContext* context, const CMPIObjectPath* path,
+                              const AssociationFilter& filter) {
+    return request<CMPIAssociationMI>(
+        path,
+        [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+            return mi->ft->referenceNames(mi, context, result, delivered, orNull(filter.resultClass),
+                                          orNull(filter.role));
+        },
+        filter.resultClass);
+}
+
+Reply Hosting::invokeMethod(const CMPIContext* context, const CMPIObjectPath* path, const char* method,
+                            const CMPIArgs* in) {
+    const CMPIArgs* const given = in != nullptr ? in : handOut(std::make_unique<Arguments>(core_));
+    CMPIArgs* const out = handOut(std::make_unique<Arguments>(core_));
+    Reply reply =
+        request<CMPIMethodMI>(path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+            return mi->ft->invokeMethod(mi, context, result, delivered, method, given, out);
+        });
+    reply.out = out;
+    return reply;
+}
+
+} // namespace oxahv

@@ -1,0 +1,225 @@
+// The function tables of object paths and instances.
+
+#include "Slots.h"
+
+#include <algorithm>
+
+namespace oxahv {
+
+namespace {
+
+// Object paths
+
+CMPIString* getNameSpace(const ObjectPath& path) {
+    return newText(path.core(), path.nameSpace);
+}
+CMPIString* getHostname(const ObjectPath& path) {
+    return newText(path.core(), path.hostName);
+}
+CMPIString* getClassName(const ObjectPath& path) {
+    return newText(path.core(), path.className);
+}
+
+void setNameSpace(ObjectPath& path, const char* nameSpace) {
+    path.nameSpace = required(nameSpace);
+}
+void setHostname(ObjectPath& path, const char* hostName) {
+    path.hostName = required(hostName);
+}
+void setClassName(ObjectPath& path, const char* className) {
+    path.className = required(className);
+}
+
+// The value of a key or a property, checked against the class's declaration where there is one.
+Value declaredValue(Core& core, const DeclaredClass* declared, const char* name, const CMPIValue* value,
+                    CMPIType type) {
+    if (declared == nullptr) {
+        return Value::from(core, value, type);
+    }
+    const PropertyDeclaration* const property = declared->find(name);
+    if (property == nullptr) {
+        throw Failure{CMPI_RC_ERR_NO_SUCH_PROPERTY};
+    }
+    return checkedValue(core, value, type, property->type);
+}
+
+void addKey(ObjectPath& path, const char* name, const CMPIValue* value, CMPIType type) {
+    const auto declared = path.core().classes.find(path.className);
+    path.keys.set(required(name), declaredValue(path.core(), declared.get(), name, value, type));
+}
+
+CMPIData getKey(const ObjectPath& path, const char* name) {
+    const NamedValue* const key = path.keys.find(required(name));
+    if (key == nullptr) {
+        throw Failure{CMPI_RC_ERR_NOT_FOUND};
+    }
+    return key->value.data(CMPI_keyValue);
+}
+
+CMPIData getKeyAt(const ObjectPath& path, CMPICount index, CMPIString** name) {
+    const NamedValue& key = path.keys.at(index);
+    if (name != nullptr) {
+        *name = newText(path.core(), key.name);
+    }
+    return key.value.data(CMPI_keyValue);
+}
+
+CMPICount getKeyCount(const ObjectPath& path) {
+    return static_cast<CMPICount>(path.keys.size());
+}
+
+const ObjectPath& pathOf(const CMPIObjectPath* handle) {
+    const ObjectPath* const path = ObjectPath::of(handle);
+    if (path == nullptr) {
+        throw Failure{CMPI_RC_ERR_INVALID_HANDLE};
+    }
+    return *path;
+}
+
+void setNameSpaceFrom(ObjectPath& path, const CMPIObjectPath* source) {
+    path.nameSpace = pathOf(source).nameSpace;
+}
+
+void setHostAndNameSpaceFrom(ObjectPath& path, const CMPIObjectPath* source) {
+    path.hostName = pathOf(source).hostName;
+    path.nameSpace = pathOf(source).nameSpace;
+}
+
+// There is no repository of qualifiers.
+CMPIData getClassQualifier(const ObjectPath& /*path*/, const char* /*qualifier*/) {
+    throw Failure{CMPI_RC_ERR_NOT_SUPPORTED};
+}
+CMPIData getQualifierOf(const ObjectPath& /*path*/, const char* /*element*/, const char* /*qualifier*/) {
+    throw Failure{CMPI_RC_ERR_NOT_SUPPORTED};
+}
+CMPIData getParameterQualifier(const ObjectPath& /*path*/, const char* /*method*/, const char* /*parameter*/,
+                               const char* /*qualifier*/) {
+    throw Failure{CMPI_RC_ERR_NOT_SUPPORTED};
+}
+
+CMPIString* toString(const ObjectPath& path) {
+    return newText(path.core(), pathText(&path));
+}
+
+// Instances
+
+CMPIData getProperty(const Instance& instance, const char* name) {
+    const NamedValue* const property = instance.properties.find(required(name));
+    if (property == nullptr) {
+        throw Failure{CMPI_RC_ERR_NO_SUCH_PROPERTY};
+    }
+    return property->value.data();
+}
+
+CMPIData getPropertyAt(const Instance& instance, CMPICount index, CMPIString** name) {
+    if (index >= instance.properties.size()) {
+        throw Failure{CMPI_RC_ERR_NO_SUCH_PROPERTY};
+    }
+    const NamedValue& property = instance.properties.at(index);
+    if (name != nullptr) {
+        *name = newText(instance.core(), property.name);
+    }
+    return property.value.data();
+}
+
+CMPICount getPropertyCount(const Instance& instance) {
+    return static_cast<CMPICount>(instance.properties.size());
+}
+
+bool isKey(const Instance& instance, const DeclaredClass* declared, std::string_view name) {
+    const PropertyDeclaration* const property = declared != nullptr ? declared->find(name) : nullptr;
+    return property != nullptr ? property->isKey : instance.path->keys.find(name) != nullptr;
+}
+
+bool passesFilter(const Instance& instance, const DeclaredClass* declared, std::string_view name) {
+    return !instance.isFiltered || isKey(instance, declared, name) ||
+           std::any_of(instance.filter.begin(), instance.filter.end(),
+                       [&](const std::string& wanted) { return sameName(wanted, name); });
+}
+
+void setProperty(Instance& instance, const char* name, const CMPIValue* value, CMPIType type) {
+    const auto declared = instance.core().classes.find(instance.path->className);
+    Value checked = declaredValue(instance.core(), declared.get(), required(name), value, type);
+    if (passesFilter(instance, declared.get(), name)) {
+        instance.properties.set(name, std::move(checked));
+    }
+}
+
+void setPropertyWithOrigin(Instance& instance, const char* name, const CMPIValue* value, CMPIType type,
+                           const char* /*origin*/) {
+    setProperty(instance, name, value, type);
+}
+
+// The path that the instance was made for, with what has been set of its keys since.
+CMPIObjectPath* getObjectPath(const Instance& instance) {
+    const auto declared = instance.core().classes.find(instance.path->className);
+    std::unique_ptr<ObjectPath> path = instance.path->copy();
+    for (const NamedValue& property : instance.properties) {
+        if (!property.value.isNull() && isKey(instance, declared.get(), property.name)) {
+            path->keys.set(property.name, property.value);
+        }
+    }
+    return handOut(std::move(path));
+}
+
+void setObjectPath(Instance& instance, const CMPIObjectPath* path) {
+    instance.path = pathOf(path).copy();
+}
+
+// From here on only keys and the properties of the list can be set; what is there of others goes.
+void setPropertyFilter(Instance& instance, const char** properties, const char** /*keys*/) {
+    instance.isFiltered = properties != nullptr;
+    instance.filter.clear();
+    for (const char** name = properties; instance.isFiltered && *name != nullptr; ++name) {
+        instance.filter.emplace_back(*name);
+    }
+    const auto declared = instance.core().classes.find(instance.path->className);
+    NamedValues passing;
+    for (NamedValue& property : instance.properties) {
+        if (passesFilter(instance, declared.get(), property.name)) {
+            passing.set(property.name, std::move(property.value));
+        }
+    }
+    instance.properties = std::move(passing);
+}
+
+} // namespace
+
+const CMPIObjectPathFT ObjectPath::table = {
+    CMPICurrentVersion,
+    SLOT(CMPIObjectPathFT, release, releaseObject<ObjectPath>),
+    SLOT(CMPIObjectPathFT, clone, cloneObject<ObjectPath>),
+    SLOT(CMPIObjectPathFT, setNameSpace, setNameSpace),
+    SLOT(CMPIObjectPathFT, getNameSpace, getNameSpace),
+    SLOT(CMPIObjectPathFT, setHostname, setHostname),
+    SLOT(CMPIObjectPathFT, getHostname, getHostname),
+    SLOT(CMPIObjectPathFT, setClassName, setClassName),
+    SLOT(CMPIObjectPathFT, getClassName, getClassName),
+    SLOT(CMPIObjectPathFT, addKey, addKey),
+    SLOT(CMPIObjectPathFT, getKey, getKey),
+    SLOT(CMPIObjectPathFT, getKeyAt, getKeyAt),
+    SLOT(CMPIObjectPathFT, getKeyCount, getKeyCount),
+    SLOT(CMPIObjectPathFT, setNameSpaceFromObjectPath, setNameSpaceFrom),
+    SLOT(CMPIObjectPathFT, setHostAndNameSpaceFromObjectPath, setHostAndNameSpaceFrom),
+    SLOT(CMPIObjectPathFT, getClassQualifier, getClassQualifier),
+    SLOT(CMPIObjectPathFT, getPropertyQualifier, getQualifierOf),
+    SLOT(CMPIObjectPathFT, getMethodQualifier, getQualifierOf),
+    SLOT(CMPIObjectPathFT, getParameterQualifier, getParameterQualifier),
+    SLOT(CMPIObjectPathFT, toString, toString),
+};
+
+const CMPIInstanceFT Instance::table = {
+    CMPICurrentVersion,
+    SLOT(CMPIInstanceFT, release, releaseObject<Instance>),
+    SLOT(CMPIInstanceFT, clone, cloneObject<Instance>),
+    SLOT(CMPIInstanceFT, getProperty, getProperty),
+    SLOT(CMPIInstanceFT, getPropertyAt, getPropertyAt),
+    SLOT(CMPIInstanceFT, getPropertyCount, getPropertyCount),
+    SLOT(CMPIInstanceFT, setProperty, setProperty),
+    SLOT(CMPIInstanceFT, getObjectPath, getObjectPath),
+    SLOT(CMPIInstanceFT, setPropertyFilter, setPropertyFilter),
+    SLOT(CMPIInstanceFT, setObjectPath, setObjectPath),
+    SLOT(CMPIInstanceFT, setPropertyWithOrigin, setPropertyWithOrigin),
+};
+
+} // namespace oxahv

@@ -1,0 +1,222 @@
+// Reads object paths from texts.
+
+#include "Core.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <cstdlib>
+#include <limits>
+
+namespace oxahv {
+
+namespace {
+
+bool isNameCharacter(char c) {
+    return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') || c == '_' ||
+           static_cast<unsigned char>(c) >= 0x80;
+}
+
+// An integer type's range, as far as a text can leave it.
+struct IntegerType {
+    CMPIType type;
+    bool isSigned;
+    unsigned int bits;
+};
+constexpr IntegerType integerTypes[] = {
+    {CMPI_uint8, false, 8}, {CMPI_uint16, false, 16}, {CMPI_uint32, false, 32}, {CMPI_uint64, false, 64},
+    {CMPI_sint8, true, 8},  {CMPI_sint16, true, 16},  {CMPI_sint32, true, 32},  {CMPI_sint64, true, 64},
+};
+
+class PathReader {
+public:
+    PathReader(Core& core, const std::string& text) : core_(core), text_(text) {}
+
+    std::unique_ptr<ObjectPath> read(const std::string& defaultNameSpace) {
+        const std::string nameSpace = readNameSpace(defaultNameSpace);
+        auto path = std::make_unique<ObjectPath>(core_, nameSpace, readName("a class name"));
+        declared_ = core_.classes.find(path->className);
+        if (position_ < text_.size()) {
+            expect('.');
+            readKey(*path);
+            while (position_ < text_.size()) {
+                expect(',');
+                readKey(*path);
+            }
+        }
+        return path;
+    }
+
+private:
+    [[noreturn]] void fail(std::size_t position, const std::string& what) const {
+        throw BrokerError("object path, column " + std::to_string(position + 1) + ": " + what);
+    }
+
+    char next() const { return position_ < text_.size() ? text_[position_] : '\0'; }
+
+    void expect(char c) {
+        if (next() != c) {
+            fail(position_, std::string("expected '") + c + '\'');
+        }
+        ++position_;
+    }
+
+    // What stands before a colon, when that comes before any key.
+    std::string readNameSpace(const std::string& defaultNameSpace) {
+        const std::size_t end = text_.find_first_of(":.\"=");
+        if (end == std::string::npos || text_[end] != ':') {
+            return defaultNameSpace;
+        }
+        position_ = end + 1;
+        return text_.substr(0, end);
+    }
+
+    std::string readName(const char* what) {
+        const std::size_t start = position_;
+        while (isNameCharacter(next())) {
+            ++position_;
+        }
+        if (position_ == start) {
+            fail(start, std::string("expected ") + what);
+        }
+        return text_.substr(start, position_ - start);
+    }
+
+    void readKey(ObjectPath& path) {
+        const std::size_t start = position_;
+        const std::string name = readName("a key name");
+        const PropertyDeclaration* const property = declared_ != nullptr ? declared_->find(name) : nullptr;
+        if (declared_ != nullptr && (property == nullptr || !property->isKey)) {
+            fail(start, "class " + declared_->name + " has no key " + name);
+        }
+        if (path.keys.find(name) != nullptr) {
+            fail(start, "key " + name + " stands twice");
+        }
+        expect('=');
+        path.keys.set(name,
+                      readValue(property != nullptr ? property->type : static_cast<CMPIType>(CMPI_null)));
+    }
+
+    Value readValue(CMPIType wanted) {
+        const std::size_t start = position_;
+        if (next() == '"') {
+            return textValue(start, readQuoted(), wanted);
+        }
+        if (next() == '-' || next() == '+' || (next() >= '0' && next() <= '9')) {
+            return readNumber(wanted);
+        }
+        const std::string word = readName("a value");
+        const bool isTrue = sameName(word, "true");
+        if (!isTrue && !sameName(word, "false")) {
+            fail(start, "expected a value: a number, a text in quotes, TRUE or FALSE");
+        }
+        if (wanted != CMPI_null && wanted != CMPI_boolean) {
+            fail(start, "expected a " + typeName(wanted));
+        }
+        CMPIValue value = {};
+        value.boolean = isTrue ? 1 : 0;
+        return Value::number(value, CMPI_boolean);
+    }
+
+    std::string readQuoted() {
+        const std::size_t start = position_++;
+        std::string value;
+        while (next() != '"') {
+            if (next() == '\\') {
+                ++position_;
+                value += unescaped();
+            } else if (position_ < text_.size()) {
+                value += next();
+            } else {
+                fail(start, "the quote is not closed");
+            }
+            ++position_;
+        }
+        ++position_;
+        return value;
+    }
+
+    char unescaped() const {
+        switch (next()) {
+        case '"':
+        case '\\':
+            return next();
+        case 'n':
+            return '\n';
+        case 'r':
+            return '\r';
+        case 't':
+            return '\t';
+        default:
+            fail(position_, "expected \", \\, n, r or t after a backslash");
+        }
+    }
+
+    Value textValue(std::size_t start, const std::string& text, CMPIType wanted) {
+        switch (wanted) {
+        case CMPI_null:
+        case CMPI_string:
+            return Value::text(core_, text);
+        case CMPI_ref: {
+            CMPIValue value = {};
+            const std::unique_ptr<ObjectPath> path = PathReader(core_, text).read("");
+            value.ref = path.get();
+            return Value::from(core_, &value, CMPI_ref);
+        }
+        case CMPI_dateTime: {
+            CMPIStatus status = {CMPI_RC_OK, nullptr};
+            CMPIValue value = {};
+            value.dateTime = CMNewDateTimeFromChars(&core_.record, text.c_str(), &status);
+            if (status.rc != CMPI_RC_OK) {
+                fail(start, "expected a datetime");
+            }
+            return Value::from(core_, &value, CMPI_dateTime);
+        }
+        default:
+            fail(start, "expected a " + typeName(wanted));
+        }
+    }
+
+    // Without a declaration a number gets the widest type.
+    Value readNumber(CMPIType wanted) {
+        const std::size_t start = position_;
+        const bool hasSign = next() == '-' || next() == '+';
+        position_ += hasSign ? 1 : 0;
+        const std::string digits = readName("digits");
+        if (digits.find_first_not_of("0123456789") != std::string::npos) {
+            fail(start, "expected a number");
+        }
+        const CMPIType type =
+            wanted != CMPI_null ? wanted : static_cast<CMPIType>(hasSign ? CMPI_sint64 : CMPI_uint64);
+        const auto* const integer =
+            std::find_if(std::begin(integerTypes), std::end(integerTypes),
+                         [&](const IntegerType& entry) { return entry.type == type; });
+        if (integer == std::end(integerTypes)) {
+            fail(start, "expected a " + typeName(type));
+        }
+        errno = 0;
+        const unsigned long long magnitude = std::strtoull(digits.c_str(), nullptr, 10);
+        const bool isNegative = text_[start] == '-' && magnitude != 0;
+        const unsigned long long highest = std::numeric_limits<unsigned long long>::max() >>
+                                           (64U - integer->bits + (integer->isSigned ? 1U : 0U));
+        if (errno == ERANGE || (isNegative && !integer->isSigned) ||
+            magnitude > highest + (isNegative ? 1U : 0U)) {
+            fail(start, text_.substr(start, position_ - start) + " does not fit into " + typeName(type));
+        }
+        CMPIValue value = {};
+        value.uint64 = isNegative ? 0 - magnitude : magnitude; // the narrower members share its low bytes
+        return Value::number(value, type);
+    }
+
+    Core& core_;
+    const std::string& text_;
+    std::size_t position_ = 0;
+    std::shared_ptr<const DeclaredClass> declared_;
+};
+
+} // namespace
+
+CMPIObjectPath* Request::objectPathFromText(const std::string& text, const std::string& nameSpace) {
+    return handOut(PathReader(core(), text).read(nameSpace));
+}
+
+} // namespace oxahv

@@ -1,0 +1,245 @@
+// CMPIBrokerFT: a provider's threads, and its requests to other providers, which run in the request that it
+// serves.
+
+#include "Slots.h"
+
+#include <memory>
+
+namespace oxahv {
+
+namespace {
+
+// Threads. The objects that an attached thread makes die when it is detached.
+
+thread_local std::vector<std::unique_ptr<Owner>> attachments;
+
+// The new thread's context; it outlives the request that the provider is in.
+CMPIContext* prepareAttachThread(Core& core, const CMPIContext* handle) {
+    const Context* const context = Context::of(handle);
+    if (context == nullptr) {
+        throw Failure{CMPI_RC_ERR_INVALID_HANDLE};
+    }
+    auto copy = std::make_unique<Context>(core);
+    copy->values = context->values;
+    Context* const prepared = copy.get();
+    core.owner.adopt(std::move(copy));
+    return prepared;
+}
+
+void requireContext(const CMPIContext* handle) {
+    if (Context::of(handle) == nullptr) {
+        throw Failure{CMPI_RC_ERR_INVALID_HANDLE};
+    }
+}
+
+void attachThread(Core& core, const CMPIContext* context) {
+    requireContext(context);
+    attachments.push_back(std::make_unique<Owner>(core));
+    attachments.back()->enter();
+}
+
+void detachThread(Core& core, const CMPIContext* context) {
+    requireContext(context);
+    if (attachments.empty() || &attachments.back()->core() != &core) {
+        throw Failure{CMPI_RC_ERR_FAILED};
+    }
+    attachments.back()->leave();
+    attachments.pop_back();
+}
+
+// There is nobody to deliver to.
+void deliverIndication(Core& /*core*/, const CMPIContext* /*context*/, const char* /*nameSpace*/,
+                       const CMPIInstance* /*indication*/) {
+    throw Failure{CMPI_RC_ERR_NOT_SUPPORTED};
+}
+
+// What a request yielded, or its failure.
+
+const Reply& succeeded(const Reply& reply) {
+    if (!reply.ok()) {
+        throw Failure{reply.code};
+    }
+    return reply;
+}
+
+CMPIEnumeration* enumerationOf(Core& core, const Reply& reply, CMPIType type) {
+    succeeded(reply);
+    auto enumeration = std::make_unique<Enumeration>(core, type);
+    CMPIValue value = {};
+    for (CMPIInstance* const instance : reply.instances) {
+        value.inst = instance;
+        enumeration->elements.push_back(Value::from(core, &value, CMPI_instance));
+    }
+    for (CMPIObjectPath* const path : reply.objectPaths) {
+        value.ref = path;
+        enumeration->elements.push_back(Value::from(core, &value, CMPI_ref));
+    }
+    return handOut(std::move(enumeration));
+}
+
+template <class Handle>
+Handle* onlyOne(const Reply& reply, const std::vector<Handle*>& handles) {
+    succeeded(reply);
+    if (handles.empty()) {
+        throw Failure{CMPI_RC_ERR_NOT_FOUND};
+    }
+    return handles.front();
+}
+
+const char* orEmpty(const char* text) {
+    return text != nullptr ? text : "";
+}
+
+CMPIEnumeration* enumerateInstanceNames(Core& core, const CMPIContext* context, const CMPIObjectPath* path) {
+    return enumerationOf(core, core.hosting.enumerateInstanceNames(context, path), CMPI_ref);
+}
+
+CMPIEnumeration* enumerateInstances(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
+                                    const char** properties) {
+    return enumerationOf(core, core.hosting.enumerateInstances(context, path, properties), CMPI_instance);
+}
+
+CMPIInstance* getInstance(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
+                          const char** properties) {
+    const Reply reply = core.hosting.getInstance(context, path, properties);
+    return onlyOne(reply, reply.instances);
+}
+
+CMPIObjectPath* createInstance(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
+                               const CMPIInstance* instance) {
+    const Reply reply = core.hosting.createInstance(context, path, instance);
+    return onlyOne(reply, reply.objectPaths);
+}
+
+void modifyInstance(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
+                    const CMPIInstance* instance, const char** properties) {
+    succeeded(core.hosting.modifyInstance(context, path, instance, properties));
+}
+
+void deleteInstance(Core& core, const CMPIContext* context, const CMPIObjectPath* path) {
+    succeeded(core.hosting.deleteInstance(context, path));
+}
+
+CMPIEnumeration* execQuery(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
+                           const char* query, const char* language) {
+    return enumerationOf(core, core.hosting.execQuery(context, path, query, language), CMPI_instance);
+}
+
+CMPIEnumeration* associators(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
+                             const char* associationClass, const char* resultClass, const char* role,
+                             const char* resultRole, const char** properties) {
+    const AssociationFilter filter = {orEmpty(associationClass), orEmpty(resultClass), orEmpty(role),
+                                      orEmpty(resultRole)};
+    return enumerationOf(core, core.hosting.associators(context, path, filter, properties), CMPI_instance);
+}
+
+CMPIEnumeration* associatorNames(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
+                                 const char* associationClass, const char* resultClass, const char* role,
+                                 const char* resultRole) {
+    const AssociationFilter filter = {orEmpty(associationClass), orEmpty(resultClass), orEmpty(role),
+                                      orEmpty(resultRole)};
+    return enumerationOf(core, core.hosting.associatorNames(context, path, filter), CMPI_ref);
+}
+
+CMPIEnumeration* references(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
+                            const char* resultClass, const char* role, const char** properties) {
+    const AssociationFilter filter = {"", orEmpty(resultClass), orEmpty(role), ""};
+    return enumerationOf(core, core.hosting.references(context, path, filter, properties), CMPI_instance);
+}
+
+CMPIEnumeration* referenceNames(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
+                                const char* resultClass, const char* role) {
+    const AssociationFilter filter = {"", orEmpty(resultClass), orEmpty(role), ""};
+    return enumerationOf(core, core.hosting.referenceNames(context, path, filter), CMPI_ref);
+}
+
+CMPIData invokeMethod(Core& core, const CMPIContext* context, const CMPIObjectPath* path, const char* method,
+                      const CMPIArgs* in, CMPIArgs* out) {
+    const Reply reply = succeeded(core.hosting.invokeMethod(context, path, required(method), in));
+    Arguments* const wanted = Arguments::of(out);
+    if (wanted != nullptr) {
+        wanted->values = Arguments::of(reply.out)->values;
+    }
+    return reply.data.empty() ? Value().data() : reply.data.front();
+}
+
+// A property of an instance that a provider serves.
+
+CMPIData getProperty(Core& core, const CMPIContext* context, const CMPIObjectPath* path, const char* name) {
+    const char* properties[] = {required(name), nullptr};
+    CMPIInstance* const instance = getInstance(core, context, path, properties);
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    const CMPIData data = CMGetProperty(instance, name, &status);
+    if (status.rc != CMPI_RC_OK) {
+        throw Failure{status.rc};
+    }
+    return data;
+}
+
+void setProperty(Core& core, const CMPIContext* context, const CMPIObjectPath* path, const char* name,
+                 const CMPIValue* value, CMPIType type) {
+    const char* properties[] = {required(name), nullptr};
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    CMPIInstance* const instance = CMNewInstance(&core.record, path, &status);
+    if (status.rc == CMPI_RC_OK) {
+        status = CMSetProperty(instance, name, value, type);
+    }
+    if (status.rc != CMPI_RC_OK) {
+        throw Failure{status.rc};
+    }
+    modifyInstance(core, context, path, instance, properties);
+}
+
+// There is no query language.
+
+CMPIEnumeration* enumerateFiltered(Core& /*core*/, const CMPIContext* /*context*/,
+                                   const CMPIObjectPath* /*path*/, const char** /*properties*/,
+                                   const char* /*language*/, const char* /*query*/) {
+    throw Failure{CMPI_RC_ERR_NOT_SUPPORTED};
+}
+
+CMPIEnumeration* associatorsFiltered(Core& /*core*/, const CMPIContext* /*context*/,
+                                     const CMPIObjectPath* /*path*/, const char* /*associationClass*/,
+                                     const char* /*resultClass*/, const char* /*role*/,
+                                     const char* /*resultRole*/, const char** /*properties*/,
+                                     const char* /*language*/, const char* /*query*/) {
+    throw Failure{CMPI_RC_ERR_NOT_SUPPORTED};
+}
+
+CMPIEnumeration* referencesFiltered(Core& /*core*/, const CMPIContext* /*context*/,
+                                    const CMPIObjectPath* /*path*/, const char* /*resultClass*/,
+                                    const char* /*role*/, const char** /*properties*/,
+                                    const char* /*language*/, const char* /*query*/) {
+    throw Failure{CMPI_RC_ERR_NOT_SUPPORTED};
+}
+
+} // namespace
+
+const CMPIBrokerFT requestTable = {
+    0,
+    CMPICurrentVersion,
+    "oxahvbroker",
+    SLOT(CMPIBrokerFT, prepareAttachThread, prepareAttachThread),
+    SLOT(CMPIBrokerFT, attachThread, attachThread),
+    SLOT(CMPIBrokerFT, detachThread, detachThread),
+    SLOT(CMPIBrokerFT, deliverIndication, deliverIndication),
+    SLOT(CMPIBrokerFT, enumerateInstanceNames, enumerateInstanceNames),
+    SLOT(CMPIBrokerFT, getInstance, getInstance),
+    SLOT(CMPIBrokerFT, createInstance, createInstance),
+    SLOT(CMPIBrokerFT, modifyInstance, modifyInstance),
+    SLOT(CMPIBrokerFT, deleteInstance, deleteInstance),
+    SLOT(CMPIBrokerFT, execQuery, execQuery),
+    SLOT(CMPIBrokerFT, enumerateInstances, enumerateInstances),
+    SLOT(CMPIBrokerFT, associators, associators),
+    SLOT(CMPIBrokerFT, associatorNames, associatorNames),
+    SLOT(CMPIBrokerFT, references, references),
+    SLOT(CMPIBrokerFT, referenceNames, referenceNames),
+    SLOT(CMPIBrokerFT, invokeMethod, invokeMethod),
+    SLOT(CMPIBrokerFT, setProperty, setProperty),
+    SLOT(CMPIBrokerFT, getProperty, getProperty),
+    SLOT(CMPIBrokerFT, enumerateInstancesFiltered, enumerateFiltered),
+    SLOT(CMPIBrokerFT, associatorsFiltered, associatorsFiltered),
+    SLOT(CMPIBrokerFT, referencesFiltered, referencesFiltered),
+};
+
+} // namespace oxahv

@@ -1,0 +1,61 @@
+# What every target of this project is built with.
+
+set(CMAKE_CXX_STANDARD 17)
+set(CMAKE_CXX_STANDARD_REQUIRED ON)
+set(CMAKE_CXX_EXTENSIONS OFF)
+set(CMAKE_C_STANDARD 11)
+set(CMAKE_C_EXTENSIONS OFF)
+set(CMAKE_POSITION_INDEPENDENT_CODE ON)
+
+# Not set for a project that embeds this one: its compiler may know warnings that nobody has seen here.
+if(PROJECT_IS_TOP_LEVEL)
+    if(NOT CMAKE_BUILD_TYPE AND NOT CMAKE_CONFIGURATION_TYPES)
+        set(CMAKE_BUILD_TYPE RelWithDebInfo CACHE STRING "Kind of build" FORCE)
+    endif()
+    if(NOT DEFINED CMAKE_COMPILE_WARNING_AS_ERROR)
+        set(CMAKE_COMPILE_WARNING_AS_ERROR ON)
+    endif()
+endif()
+
+set(OXAHV_SANITIZE "" CACHE STRING "Sanitizers to build with, for example address,undefined")
+
+set(oxahv_warnings -Wall -Wextra -Wpedantic -Wconversion -Wshadow)
+set(oxahv_hardening
+    -fstack-protector-strong
+    -fstack-clash-protection
+    $<$<IN_LIST:${CMAKE_SYSTEM_PROCESSOR},x86_64;i686>:-fcf-protection>
+    # Fortified libc calls need the optimizer, and sanitizers bring checks of their own.
+    $<$<AND:$<NOT:$<CONFIG:Debug>>,$<STREQUAL:${OXAHV_SANITIZE},>>:-D_FORTIFY_SOURCE=2>)
+
+# Warnings, hidden symbols, hardening and sanitizers for one target.
+function(oxahv_target_defaults target)
+    set_target_properties(${target} PROPERTIES
+        C_VISIBILITY_PRESET hidden
+        CXX_VISIBILITY_PRESET hidden
+        VISIBILITY_INLINES_HIDDEN ON)
+    target_compile_options(${target} PRIVATE
+        ${oxahv_warnings}
+        ${oxahv_hardening}
+        # Source names in traces and assertions do not depend on where the tree lies.
+        -fmacro-prefix-map=${PROJECT_SOURCE_DIR}/=)
+    target_link_options(${target} PRIVATE -Wl,-z,relro,-z,now,-z,noexecstack)
+    if(OXAHV_SANITIZE)
+        target_compile_options(${target} PRIVATE -fsanitize=${OXAHV_SANITIZE} -fno-sanitize-recover=all -fno-omit-frame-pointer)
+        target_link_options(${target} PRIVATE -fsanitize=${OXAHV_SANITIZE})
+    else()
+        # Sanitizer runtimes are found at run time, so only a plain build can insist on this.
+        target_link_options(${target} PRIVATE -Wl,--no-undefined)
+    endif()
+endfunction()
+
+# An installed shared library `name` with the alias `oxahv::alias`; sources follow.
+function(oxahv_add_shared_library name alias)
+    add_library(${name} SHARED ${ARGN})
+    add_library(oxahv::${alias} ALIAS ${name})
+    set_target_properties(${name} PROPERTIES
+        EXPORT_NAME ${alias}
+        VERSION ${PROJECT_VERSION}
+        SOVERSION ${PROJECT_VERSION_MAJOR})
+    target_compile_features(${name} PUBLIC cxx_std_17)
+    oxahv_target_defaults(${name})
+endfunction()

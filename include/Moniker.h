@@ -1,0 +1,174 @@
+/**
+ * @file
+ * TK::Moniker, a typed list of keys that names one managed object without any CMPI type, and the library's
+ * exception.
+ *
+ * A provider fills a moniker from a request's object path
+ * (TK::ProviderUtilities::transformObjectPathToMoniker) or key by key, and reads it through a cursor, the
+ * selected key:
+ *
+ * @code
+ * for (unsigned int i = 0; moniker.selectKey(i); ++i) {
+ *     std::string name;
+ *     moniker.getName(name);
+ *     unsigned short type = 0;
+ *     moniker.getType(type);
+ *     if (type == TK::Moniker::COMPONENT_STRING) {
+ *         std::string value;
+ *         moniker.getValue(value);
+ *     }
+ * }
+ * @endcode
+ *
+ * **Threads.** One moniker is used by one thread at a time: the selection is part of it. Different monikers
+ * share nothing.
+ *
+ * **Encoding and ownership.** Names and texts are bytes that the moniker copies and never examines;
+ * everything that it hands out is a copy that belongs to the caller.
+ */
+#pragma once
+
+#include "TKExport.h"
+
+#include <cstdint>
+#include <exception>
+#include <string>
+#include <vector>
+
+namespace TK {
+
+/**
+ * The library's one exception: a fixed English message. Thrown by value; nothing in the library catches it.
+ *
+ * Copying allocates, so it may throw `std::bad_alloc`. One object is used by one thread at a time.
+ */
+class TK_EXPORT FrameworkException : public std::exception {
+public:
+    /**
+     * @param text the message, NUL-terminated; copied. A null pointer counts as the empty text.
+     * @throws std::bad_alloc
+     */
+    explicit FrameworkException(const char* text);
+    /** Copies the message. @throws std::bad_alloc */
+    FrameworkException(const FrameworkException& other);
+    /** Copies the message. @throws std::bad_alloc */
+    FrameworkException& operator=(const FrameworkException& other);
+    ~FrameworkException() noexcept override;
+
+    /** The message; it belongs to the exception and is valid while that lives. */
+    const char* what() const noexcept override;
+
+private:
+    std::string message;
+};
+
+/**
+ * An ordered list of typed keys, and the selection of one of them.
+ *
+ * Keys are only ever appended. Nothing makes names unique: two keys of one name are two components. The
+ * getters read the selected component, change nothing, and write their output only when they succeed.
+ */
+class TK_EXPORT Moniker {
+public:
+    /** The type of a component, as getType reports it. Callers may compare with the numbers; they never
+     * change. */
+    enum ComponentType : std::uint32_t {
+        COMPONENT_UINT8 = 0,  ///< `unsigned char`
+        COMPONENT_UINT16 = 1, ///< `unsigned short`
+        COMPONENT_UINT32 = 2, ///< `unsigned int`
+        COMPONENT_UINT64 = 3, ///< `unsigned long long`
+        COMPONENT_STRING = 4  ///< `std::string`
+    };
+
+    /** One key. */
+    struct KeyComponent {
+        ComponentType type; ///< the type that the key was added with
+        std::string name;   ///< the name as it was given; may be empty
+        /** Decimal digits; of a `COMPONENT_UINT8` the one byte itself, NUL included; of a `COMPONENT_STRING`
+         * the text. */
+        std::string value;
+    };
+
+    /** An empty moniker with nothing selected. */
+    Moniker();
+    /** A copy with the same components and the same selection, independent from then on. @throws
+     * std::bad_alloc */
+    Moniker(const Moniker& other);
+    /** Copies components and selection; when memory runs out, this moniker is as it was. @throws
+     * std::bad_alloc */
+    Moniker& operator=(const Moniker& other);
+    ~Moniker();
+
+    /** @return the number of components. Never throws. */
+    unsigned int getKeyCount() const;
+
+    /**
+     * Selects a component.
+     * @param index its position, from 0.
+     * @return true when it exists; otherwise false, and nothing is selected any more. Never throws.
+     */
+    bool selectKey(unsigned int index);
+
+    /**
+     * The selected component's type.
+     * @param[out] type one of the ComponentType numbers.
+     * @throws FrameworkException "Key is not selected." when nothing is selected.
+     */
+    void getType(unsigned short& type) const;
+
+    /**
+     * The selected component's name.
+     * @param[out] name replaced by the name.
+     * @throws FrameworkException "Key is not selected." when nothing is selected.
+     * @throws std::bad_alloc
+     */
+    void getName(std::string& name) const;
+
+    /** @name The selected component's value
+     * The type has to be the one that the key was added with: nothing is widened. When one of these throws,
+     * `value` is as it was. A `COMPONENT_UINT8` that holds a white-space character (9 to 13 and 32 in the
+     * classic locale) reads back as nothing at all: the call returns and leaves `value` as it was, so set it
+     * before.
+     *
+     * @param[out] value replaced by the value.
+     * @throws FrameworkException "Either the Key is not selected or the value is not compatible with the
+     * requested data type." when nothing is selected or the selected component has another type.
+     * @throws std::bad_alloc
+     */
+    /** @{ */
+    void getValue(std::string& value) const;
+    void getValue(unsigned char& value) const;
+    void getValue(unsigned short& value) const;
+    void getValue(unsigned int& value) const;
+    void getValue(unsigned long long& value) const;
+    /** @} */
+
+    /** @name Adding a key
+     * Appends a component and selects it. When memory runs out, the moniker is as it was.
+     *
+     * Numbers are kept as text in the form of the global C++ locale.
+     *
+     * @param name the key property's name; any text.
+     * @param value the key's value; a text is copied and not examined.
+     * @return the new component's position, modulo 65,536; the selection is set to that number too.
+     * @throws std::bad_alloc
+     */
+    /** @{ */
+    unsigned short addKey(std::string name, const std::string& value);
+    unsigned short addKey(std::string name, unsigned char value);
+    unsigned short addKey(std::string name, unsigned short value);
+    unsigned short addKey(std::string name, unsigned int value);
+    unsigned short addKey(std::string name, unsigned long long value);
+    /** @} */
+
+private:
+    TK_HIDDEN const KeyComponent& selected(const char* complaint) const;
+    TK_HIDDEN const KeyComponent& selected(ComponentType type) const;
+    TK_HIDDEN unsigned short append(ComponentType type, std::string&& name, std::string&& value);
+
+    bool keySelected;
+    std::uint32_t selectedKey; // below keys.size() while keySelected is true
+    std::vector<KeyComponent> keys;
+};
+
+} // namespace TK

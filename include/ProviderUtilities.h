@@ -1,0 +1,245 @@
+/**
+ * @file
+ * TK::ProviderUtilities: what a CIM provider does with CMPI objects, without building CMPI's records by hand.
+ *
+ * - reading a request: its class (getClassId), its keys (transformObjectPathToMoniker, getKeyProperty), a
+ * method's arguments (getProperty);
+ * - writing a reply: createObjectPath, transformMonikerToObjectPath, createInstance, setProperty;
+ * - asking the CIM server: areClassesRelated.
+ *
+ * **Threads.** Every operation may run on any number of threads at once, as far as CMPI lets the objects
+ * passed in be used there. None takes a lock, keeps a state or waits.
+ *
+ * **Ownership.** Nothing here releases a CMPI object. What the broker makes or hands out belongs to the
+ * request, as CMPI defines; texts, monikers and vectors belong to the caller. No pointer that is passed in is
+ * kept.
+ *
+ * **Encoding.** Names and narrow texts are handed to the broker, and taken from it, byte by byte.
+ *
+ * **Arguments.** Handles, names and output pointers have to be valid: a null one is not looked for unless an
+ * operation says so.
+ *
+ * **Failures.** Setters report nothing: the broker's status is dropped. Getters return false and leave their
+ * output as it was. What else an operation does is said with it. `std::bad_alloc` passes through everywhere,
+ * and so does what a trace's logger throws.
+ *
+ * **Traces.** Where an operation traces, it does so under the category "Hovara.ProviderUtilities". An
+ * operation that throws emits no EXITING trace.
+ */
+#pragma once
+
+#include "Moniker.h"
+#include "TKExport.h"
+
+// Some CIM servers' CMPI headers use pthread types and `__cdecl` without bringing either.
+#include <pthread.h>
+#ifndef __cdecl
+#define __cdecl // NOLINT(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
+#endif
+#ifndef CMPI_PLATFORM_LINUX_GENERIC_GNU
+#define CMPI_PLATFORM_LINUX_GENERIC_GNU
+#endif
+#include <cmpidt.h>
+#include <cmpift.h>
+
+#include <string>
+#include <vector>
+
+namespace TK {
+
+/** A family of static operations; see the top of this file. */
+class TK_EXPORT ProviderUtilities {
+public:
+    ProviderUtilities() = delete;
+
+    /** @name Instances and the texts of an object path
+     * None of these traces.
+     */
+    /** @{ */
+    /**
+     * Creates an instance, which carries the path's keys.
+     * @return the instance, which belongs to the request; null when the broker refuses.
+     */
+    static CMPIInstance* createInstance(const CMPIBroker* broker, CMPIObjectPath* objectPath);
+
+    /** @return the class's name; empty when the broker cannot tell it. @throws std::bad_alloc */
+    static std::string getClassName(const CMPIObjectPath* objectPath);
+
+    /** @return the namespace; empty when the broker cannot tell it. @throws std::bad_alloc */
+    static std::string getNamespace(const CMPIObjectPath* objectPath);
+
+    /**
+     * The characters of a CMPI string.
+     * @param str may be null, which counts as unreadable.
+     * @throws FrameworkException "String Conversion Failed !!" when they cannot be read.
+     * @throws std::bad_alloc
+     */
+    static std::string convertToString(const CMPIString* str);
+    /** @} */
+
+    /** @name Keys of an object path
+     * Each adds the key, or what the broker does with one that is there already, with the CMPI type that
+     * belongs to the value's: `CMPI_uint8` to `CMPI_uint64`, `CMPI_string`, `CMPI_ref`; `CMPI_chars` for both
+     * forms of text. The broker's status is dropped. None of these traces or throws.
+     *
+     * @param name the key property's name.
+     * @param value the value; a text needs to live during the call only.
+     */
+    /** @{ */
+    static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, unsigned char value);
+    static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, unsigned short value);
+    static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, unsigned int value);
+    static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, unsigned long long value);
+    static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, const char* value);
+    static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, CMPIString* value);
+    static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, const std::string& value);
+    static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, CMPIObjectPath* value);
+    /** @} */
+
+    /** @name Properties of an instance
+     * Each sets the property with the CMPI type that belongs to the value's: `CMPI_boolean`, `CMPI_uint8` to
+     * `CMPI_uint64`, `CMPI_sint16`, `CMPI_real32`, `CMPI_real64`, `CMPI_string`, `CMPI_ref`; `CMPI_chars` for
+     * both forms of text. The broker's status is dropped, also when the class knows no such property or
+     * declares another type. None of these traces or throws.
+     *
+     * @param name the property's name.
+     * @param value the value; a text needs to live during the call only and is not changed.
+     */
+    /** @{ */
+    static void setProperty(CMPIInstance* instance, const char* name, CMPIObjectPath* value);
+    static void setProperty(CMPIInstance* instance, const char* name, unsigned char value);
+    static void setProperty(CMPIInstance* instance, const char* name, unsigned short value);
+    static void setProperty(CMPIInstance* instance, const char* name, unsigned int value);
+    static void setProperty(CMPIInstance* instance, const char* name, unsigned long long value);
+    static void setProperty(CMPIInstance* instance, const char* name, short value);
+    static void setProperty(CMPIInstance* instance, const char* name, float value);
+    static void setProperty(CMPIInstance* instance, const char* name, double value);
+    static void setProperty(CMPIInstance* instance, const char* name, const char* value);
+    static void setProperty(CMPIInstance* instance, const char* name, CMPIString* value);
+    static void setProperty(CMPIInstance* instance, const char* name, std::string& value);
+    static void setProperty(CMPIInstance* instance, const char* name, bool value);
+    /** @} */
+
+    /** @name Reading a key, a property or a method's argument
+     * The value is taken from the place of the requested kind, whatever type the broker reports: ask for the
+     * kind and width that the class declares. None of these traces.
+     *
+     * @param name the name of the key, property or argument.
+     * @param[out] out the value. A handle is the broker's own and lives as long as the request.
+     * @return true when `out` was written; false when the broker reports an error, the value is NULL, or a
+     * text's characters cannot be read.
+     * @throws std::bad_alloc from the form for `std::string`
+     */
+    /** @{ */
+    static bool getKeyProperty(const CMPIObjectPath* objectPath, const char* name, CMPIString** out);
+    static bool getKeyProperty(const CMPIObjectPath* objectPath, const char* name, CMPIObjectPath** out);
+    static bool getKeyProperty(const CMPIObjectPath* objectPath, const char* name, std::string& out);
+
+    static bool getProperty(const CMPIInstance* instance, const char* name, unsigned short& out);
+    static bool getProperty(const CMPIInstance* instance, const char* name, unsigned int& out);
+    static bool getProperty(const CMPIInstance* instance, const char* name, bool& out);
+    static bool getProperty(const CMPIInstance* instance, const char* name, CMPIString** out);
+
+    static bool getProperty(const CMPIArgs* args, const char* name, unsigned short& out);
+    static bool getProperty(const CMPIArgs* args, const char* name, unsigned int& out);
+    static bool getProperty(const CMPIArgs* args, const char* name, bool& out);
+    /** @} */
+
+    /** @name Object paths and monikers
+     * Only keys travel: namespace, host and class do not. These trace.
+     */
+    /** @{ */
+    /**
+     * Counts the keys that can be read and are not NULL, among the first 65,535 at most: the broker's count
+     * is taken modulo 65,536.
+     * @throws FrameworkException "Could not Extract Keys from Object Path." when the broker cannot tell how
+     * many there are.
+     */
+    static unsigned short getKeyCount(const CMPIObjectPath* objectPath);
+
+    /**
+     * Appends a component to the moniker for each key that can be read and is not NULL, in the path's order.
+     * `CMPI_uint8` to `CMPI_uint64` become numbers of that width, `CMPI_string` becomes text. The component
+     * appended last is then selected.
+     *
+     * What was appended before an exception stays.
+     *
+     * @throws FrameworkException "Moniker component for data type not available." for a key of any other
+     * type; "String Conversion Failed !!" for a name or text that cannot be read; what getKeyCount throws.
+     * @throws std::bad_alloc
+     */
+    static void transformObjectPathToMoniker(const CMPIObjectPath* objectPath, Moniker& moniker);
+
+    /**
+     * Adds a key to an object path for each component of the moniker, texts as `CMPI_chars`. The moniker's
+     * last component is then selected; an empty moniker keeps its selection.
+     *
+     * @param[in,out] moniker walked through its selection, otherwise unchanged.
+     * @param passedObjectPath where the handle of the path stands; read once, not written. The handle may be
+     * null when the moniker is empty.
+     * @throws FrameworkException "Moniker Component Type Has Not Been Accounted." for a component of an
+     * unknown type.
+     * @throws std::bad_alloc
+     */
+    static void transformMonikerToObjectPath(Moniker& moniker, CMPIObjectPath** passedObjectPath);
+    /** @} */
+
+    /** @name Class registry
+     * Class ids are the agent's numbers for its CIM classes. 0 stands for no name, 255 for a name that the
+     * registry does not know. Names compare as `strcasecmp` (POSIX) does, in the process's locale.
+     */
+    /** @{ */
+    /** @param name a class's name; may be null. @return its id, 0 for null, 255 for an unknown name. Does not
+     * trace or throw. */
+    static unsigned short getClassId(const char* name);
+
+    /** The same among the extension's classes alone, the ones from 180 on. */
+    static unsigned short extend_getClassId(const char* name);
+
+    /**
+     * The id of an object path's class; traces the class's name.
+     * @param objectPath may be null.
+     * @return 0 when there is no path or the broker cannot tell the name.
+     */
+    static unsigned short getClassId(const CMPIObjectPath* objectPath);
+
+    /**
+     * Whether one of several classes is another class or derives from it. Asks the broker; traces as
+     * createObjectPath does for each candidate until one is.
+     * @param nameSpace the namespace of all of them.
+     * @param candidates the names of the classes in question; not changed.
+     * @param ancestor the name of the other class.
+     * @return false also when there is no candidate or the broker reports an error.
+     * @throws std::bad_alloc
+     */
+    static bool areClassesRelated(const CMPIBroker* broker, const std::string& nameSpace,
+                                  std::vector<std::string>& candidates, const char* ancestor);
+
+    /**
+     * The same for one class. Mind the order: here the ancestor comes first.
+     * @param ancestor the name of the class that may be the ancestor.
+     * @param candidate the name of the class in question.
+     */
+    static bool areClassesRelated(const CMPIBroker* broker, const std::string& nameSpace,
+                                  const char* ancestor, const char* candidate);
+
+    /** Whether two texts are there and equal as `strcasecmp` compares. Null is equal to nothing. Does not
+     * trace or throw. */
+    static bool textEqual(const char* a, const char* b);
+    /** @} */
+
+    /**
+     * Creates an object path without keys. Traces its parameters on entry and exit, and the class.
+     * @param classname the class's name; a null pointer is passed on for the broker to judge.
+     * @param nameSpace the namespace.
+     * @return the path, which belongs to the request; null when the broker refuses.
+     * @throws std::bad_alloc
+     */
+    static CMPIObjectPath* createObjectPath(const CMPIBroker* broker, const char* classname,
+                                            std::string nameSpace);
+
+private:
+    TK_HIDDEN static unsigned short getKeyCount(const CMPIObjectPath* objectPath, unsigned short& keyCount);
+};
+
+} // namespace TK

@@ -1,0 +1,147 @@
+#include "HVLogger.h"
+#include "HVMessageBuffer.h"
+
+#include <cstdio>
+#include <fstream>
+#include <gtest/gtest.h>
+#include <sstream>
+#include <stdexcept>
+#include <system_error>
+#include <thread>
+#include <vector>
+
+using HVLog::Channel;
+using HVLog::HVLogger;
+using HVLog::HVMessageBuffer;
+
+namespace {
+
+void log(int level, const std::string& text = "text") {
+    HVLogger::logLevelMessage("function", "File.cpp", 3, "Test", level, nullptr, 0, 0, text);
+}
+
+class TheLogger : public testing::Test {
+protected:
+    void TearDown() override { HVLogger::reset(); }
+
+    void keepLevels() {
+        HVLogger::setSink([this](const HVLog::Message& message) { levels_.push_back(message.level); });
+    }
+
+    std::vector<int> levels_;
+};
+
+std::string contentOf(const std::string& path) {
+    std::ifstream file(path);
+    std::ostringstream content;
+    content << file.rdbuf();
+    return content.str();
+}
+
+} // namespace
+
+TEST_F(TheLogger, WritesNothingUntilItHasASinkAndAThreshold) {
+    keepLevels();
+    log(6000);
+    HVLogger::setSink(nullptr);
+    HVLogger::setThreshold(0);
+    log(6000);
+    EXPECT_TRUE(levels_.empty());
+    keepLevels();
+    log(6000);
+    EXPECT_EQ(levels_, std::vector<int>({6000}));
+}
+
+TEST_F(TheLogger, WritesByThresholdAndByLevelCode) {
+    keepLevels();
+    HVLogger::setThreshold(4000);
+    HVLogger::setLevel(6000, false);
+    HVLogger::setLevel(1000, true);
+    for (const int level : {1000, 3000, 3999, 4000, 4001, 6000}) {
+        log(level);
+    }
+    EXPECT_EQ(levels_, std::vector<int>({1000, 4000, 4001}));
+}
+
+TEST_F(TheLogger, HandsTheWholeMessageToTheSink) {
+    std::vector<std::string> seen;
+    HVLogger::setSink([&](const HVLog::Message& m) {
+        seen.push_back(std::string(m.channel == Channel::log ? "log" : "trace") + '|' + m.function + '|' +
+                       m.file + '|' + std::to_string(m.line) + '|' + m.category + '|' +
+                       std::to_string(m.level) + '|' + m.text);
+        seen.push_back(HVLogger::lineOf(m));
+    });
+    HVLogger::setThreshold(3000);
+    log(4000, "one\ntwo");
+    HVLogger::traceLevelMessage("function", "File.cpp", 3, "Test", 3000, nullptr, 0, 0, "text");
+    EXPECT_EQ(seen,
+              std::vector<std::string>({"log|function|File.cpp|3|Test|4000|one\ntwo", "log 4000 Test one two",
+                                        "trace|function|File.cpp|3|Test|3000|text", "trace 3000 Test text"}));
+}
+
+TEST_F(TheLogger, DropsWhatItsSinkLogsAndSurvivesWhatItThrows) {
+    int calls = 0;
+    HVLogger::setSink([&](const HVLog::Message&) {
+        ++calls;
+        log(6000);
+        throw std::runtime_error("sink");
+    });
+    HVLogger::setThreshold(0);
+    EXPECT_THROW(log(6000), std::runtime_error);
+    EXPECT_THROW(log(6000), std::runtime_error);
+    EXPECT_EQ(calls, 2);
+}
+
+TEST_F(TheLogger, WritesWholeLinesToAFileFromManyThreads) {
+    const std::string path = testing::TempDir() + "oxahv-logger-test.log";
+    std::remove(path.c_str());
+    HVLogger::setFileSink(path);
+    HVLogger::setThreshold(0);
+    std::vector<std::thread> threads;
+    for (int t = 0; t < 4; ++t) {
+        threads.emplace_back([t] {
+            for (int i = 0; i < 100; ++i) {
+                log(4000, std::string(200, static_cast<char>('a' + t)));
+            }
+        });
+    }
+    for (std::thread& thread : threads) {
+        thread.join();
+    }
+    HVLogger::reset();
+    std::istringstream lines(contentOf(path));
+    int count = 0;
+    for (std::string line; std::getline(lines, line); ++count) {
+        ASSERT_EQ(line, "log 4000 Test " + std::string(200, line.back()));
+    }
+    EXPECT_EQ(count, 400);
+    std::remove(path.c_str());
+}
+
+TEST_F(TheLogger, KeepsItsSinkWhenAFileCannotBeOpened) {
+    keepLevels();
+    HVLogger::setThreshold(0);
+    EXPECT_THROW(HVLogger::setFileSink("/no such folder/file"), std::system_error);
+    log(4000);
+    EXPECT_EQ(levels_.size(), 1U);
+}
+
+TEST(AMessageBuffer, IsEmptyAndSoundAgainAfterEachText) {
+    HVMessageBuffer buffer;
+    const char* const none = nullptr;
+    for (int round = 0; round < 2; ++round) {
+        EXPECT_EQ(buffer.str(buffer << "a=" << std::hex << 255 << " b=" << none << " c"), "a=ff b=") << round;
+        EXPECT_EQ(buffer.str(buffer << "a=" << 255), "a=255") << round;
+        EXPECT_EQ(buffer.str(buffer << "a=" << none << "b"), "a=") << round;
+    }
+}
+
+TEST(AMessageBuffer, KeepsTheOrderOfItsTextsAndItsStream) {
+    HVMessageBuffer buffer;
+    std::ostream& stream = buffer << "a" << 1;
+    buffer << "b";
+    stream << 2 << 'c';
+    EXPECT_EQ(buffer.str(stream), "a1b2c");
+    stream << 3;
+    EXPECT_EQ(buffer.str(buffer), "3");
+}
