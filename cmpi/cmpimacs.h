@@ -330,29 +330,29 @@ static inline CMPICount CMGetContextEntryCount(const CMPIContext* o, CMPIStatus*
 
 /** Functions: `pfx##Cleanup`, `pfx##EnumInstanceNames`, `pfx##EnumInstances`, `pfx##GetInstance`,
  * `pfx##CreateInstance`, `pfx##ModifyInstance`, `pfx##DeleteInstance`, `pfx##ExecQuery`. */
-#define CMInstanceMIStub(pfx, miname, mbvar, hook)                              \
-    static CMPI_CONST_SINCE_210 CMPIInstanceMIFT miname##InstanceTable_ = {     \
-        CMPICurrentVersion,                                                     \
-        CMPICurrentVersion,                                                     \
-        "instance" #miname,                                                     \
-        pfx##Cleanup,                                                           \
-        pfx##EnumInstanceNames,                                                 \
-        pfx##EnumInstances,                                                     \
-        pfx##GetInstance,                                                       \
-        pfx##CreateInstance,                                                    \
-        pfx##ModifyInstance,                                                    \
-        pfx##DeleteInstance,                                                    \
-        pfx##ExecQuery CMPI_NO_FILTERED_INSTANCES};                             \
-    CMPI_EXTERN_C CMPI_EXPORT CMPIInstanceMI* miname##_Create_InstanceMI(       \
-        const CMPIBroker* broker, const CMPIContext* context, CMPIStatus* rc);  \
-    CMPI_EXTERN_C CMPI_EXPORT CMPIInstanceMI* miname##_Create_InstanceMI(       \
-        const CMPIBroker* broker, const CMPIContext* context, CMPIStatus* rc) { \
-        static CMPIInstanceMI mi = {NULL, &miname##InstanceTable_};             \
-        (void)context;                                                          \
-        mbvar = broker;                                                         \
-        hook;                                                                   \
-        CMSetStatus(rc, CMPI_RC_OK);                                            \
-        return &mi;                                                             \
+#define CMInstanceMIStub(pfx, miname, mbvar, hook)                           \
+    static CMPI_CONST_SINCE_210 CMPIInstanceMIFT miname##InstanceTable_ = {  \
+        CMPICurrentVersion,                                                  \
+        CMPICurrentVersion,                                                  \
+        "instance" #miname,                                                  \
+        pfx##Cleanup,                                                        \
+        pfx##EnumInstanceNames,                                              \
+        pfx##EnumInstances,                                                  \
+        pfx##GetInstance,                                                    \
+        pfx##CreateInstance,                                                 \
+        pfx##ModifyInstance,                                                 \
+        pfx##DeleteInstance,                                                 \
+        pfx##ExecQuery CMPI_NO_FILTERED_INSTANCES};                          \
+    CMPI_EXTERN_C CMPI_EXPORT CMPIInstanceMI* miname##_Create_InstanceMI(    \
+        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_);  \
+    CMPI_EXTERN_C CMPI_EXPORT CMPIInstanceMI* miname##_Create_InstanceMI(    \
+        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_) { \
+        static CMPIInstanceMI mi = {NULL, &miname##InstanceTable_};          \
+        (void)ctx_;                                                          \
+        mbvar = brkr_;                                                       \
+        hook;                                                                \
+        CMSetStatus(rc_, CMPI_RC_OK);                                        \
+        return &mi;                                                          \
     }
 
 /** Functions: `pfx##AssociationCleanup`, `pfx##Associators`, `pfx##AssociatorNames`, `pfx##References`,
@@ -364,14 +364,14 @@ static inline CMPICount CMGetContextEntryCount(const CMPIContext* o, CMPIStatus*
         pfx##Associators,      pfx##AssociatorNames,                               \
         pfx##References,       pfx##ReferenceNames CMPI_NO_FILTERED_ASSOCIATIONS}; \
     CMPI_EXTERN_C CMPI_EXPORT CMPIAssociationMI* miname##_Create_AssociationMI(    \
-        const CMPIBroker* broker, const CMPIContext* context, CMPIStatus* rc);     \
+        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_);        \
     CMPI_EXTERN_C CMPI_EXPORT CMPIAssociationMI* miname##_Create_AssociationMI(    \
-        const CMPIBroker* broker, const CMPIContext* context, CMPIStatus* rc) {    \
+        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_) {       \
         static CMPIAssociationMI mi = {NULL, &miname##AssociationTable_};          \
-        (void)context;                                                             \
-        mbvar = broker;                                                            \
+        (void)ctx_;                                                                \
+        mbvar = brkr_;                                                             \
         hook;                                                                      \
-        CMSetStatus(rc, CMPI_RC_OK);                                               \
+        CMSetStatus(rc_, CMPI_RC_OK);                                              \
         return &mi;                                                                \
     }
 
@@ -380,32 +380,32 @@ static inline CMPICount CMGetContextEntryCount(const CMPIContext* o, CMPIStatus*
     static CMPI_CONST_SINCE_210 CMPIMethodMIFT miname##MethodTable_ = {                                   \
         CMPICurrentVersion, CMPICurrentVersion, "method" #miname, pfx##MethodCleanup, pfx##InvokeMethod}; \
     CMPI_EXTERN_C CMPI_EXPORT CMPIMethodMI* miname##_Create_MethodMI(                                     \
-        const CMPIBroker* broker, const CMPIContext* context, CMPIStatus* rc);                            \
+        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_);                               \
     CMPI_EXTERN_C CMPI_EXPORT CMPIMethodMI* miname##_Create_MethodMI(                                     \
-        const CMPIBroker* broker, const CMPIContext* context, CMPIStatus* rc) {                           \
+        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_) {                              \
         static CMPIMethodMI mi = {NULL, &miname##MethodTable_};                                           \
-        (void)context;                                                                                    \
-        mbvar = broker;                                                                                   \
+        (void)ctx_;                                                                                       \
+        mbvar = brkr_;                                                                                    \
         hook;                                                                                             \
-        CMSetStatus(rc, CMPI_RC_OK);                                                                      \
+        CMSetStatus(rc_, CMPI_RC_OK);                                                                     \
         return &mi;                                                                                       \
     }
 
 /** Functions: `pfx##PropertyCleanup`, `pfx##SetProperty`, `pfx##GetProperty`. */
-#define CMPropertyMIStub(pfx, miname, mbvar, hook)                              \
-    static CMPI_CONST_SINCE_210 CMPIPropertyMIFT miname##PropertyTable_ = {     \
-        CMPICurrentVersion,   CMPICurrentVersion, "property" #miname,           \
-        pfx##PropertyCleanup, pfx##SetProperty,   pfx##GetProperty};            \
-    CMPI_EXTERN_C CMPI_EXPORT CMPIPropertyMI* miname##_Create_PropertyMI(       \
-        const CMPIBroker* broker, const CMPIContext* context, CMPIStatus* rc);  \
-    CMPI_EXTERN_C CMPI_EXPORT CMPIPropertyMI* miname##_Create_PropertyMI(       \
-        const CMPIBroker* broker, const CMPIContext* context, CMPIStatus* rc) { \
-        static CMPIPropertyMI mi = {NULL, &miname##PropertyTable_};             \
-        (void)context;                                                          \
-        mbvar = broker;                                                         \
-        hook;                                                                   \
-        CMSetStatus(rc, CMPI_RC_OK);                                            \
-        return &mi;                                                             \
+#define CMPropertyMIStub(pfx, miname, mbvar, hook)                           \
+    static CMPI_CONST_SINCE_210 CMPIPropertyMIFT miname##PropertyTable_ = {  \
+        CMPICurrentVersion,   CMPICurrentVersion, "property" #miname,        \
+        pfx##PropertyCleanup, pfx##SetProperty,   pfx##GetProperty};         \
+    CMPI_EXTERN_C CMPI_EXPORT CMPIPropertyMI* miname##_Create_PropertyMI(    \
+        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_);  \
+    CMPI_EXTERN_C CMPI_EXPORT CMPIPropertyMI* miname##_Create_PropertyMI(    \
+        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_) { \
+        static CMPIPropertyMI mi = {NULL, &miname##PropertyTable_};          \
+        (void)ctx_;                                                          \
+        mbvar = brkr_;                                                       \
+        hook;                                                                \
+        CMSetStatus(rc_, CMPI_RC_OK);                                        \
+        return &mi;                                                          \
     }
 
 /** Functions: `pfx##IndicationCleanup`, `pfx##AuthorizeFilter`, `pfx##MustPoll`, `pfx##ActivateFilter`,
@@ -416,14 +416,14 @@ static inline CMPICount CMGetContextEntryCount(const CMPIContext* o, CMPIStatus*
         pfx##AuthorizeFilter,   pfx##MustPoll,          pfx##ActivateFilter,  pfx##DeActivateFilter,  \
         pfx##EnableIndications, pfx##DisableIndications};                                             \
     CMPI_EXTERN_C CMPI_EXPORT CMPIIndicationMI* miname##_Create_IndicationMI(                         \
-        const CMPIBroker* broker, const CMPIContext* context, CMPIStatus* rc);                        \
+        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_);                           \
     CMPI_EXTERN_C CMPI_EXPORT CMPIIndicationMI* miname##_Create_IndicationMI(                         \
-        const CMPIBroker* broker, const CMPIContext* context, CMPIStatus* rc) {                       \
+        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_) {                          \
         static CMPIIndicationMI mi = {NULL, &miname##IndicationTable_};                               \
-        (void)context;                                                                                \
-        mbvar = broker;                                                                               \
+        (void)ctx_;                                                                                   \
+        mbvar = brkr_;                                                                                \
         hook;                                                                                         \
-        CMSetStatus(rc, CMPI_RC_OK);                                                                  \
+        CMSetStatus(rc_, CMPI_RC_OK);                                                                 \
         return &mi;                                                                                   \
     }
 /** @} */

@@ -1,0 +1,110 @@
+#include "Host.h"
+
+#include <algorithm>
+#include <charconv>
+#include <filesystem>
+#include <fstream>
+#include <system_error>
+
+namespace {
+
+bool isNumber(const std::string& text) {
+    return !text.empty() && text.find_first_not_of("0123456789") == std::string::npos;
+}
+
+std::optional<unsigned long long> numberIn(const std::string& text) {
+    unsigned long long number = 0;
+    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
+    const bool isWhole = error == std::errc() && end == text.data() + text.size();
+    return isWhole ? std::optional(number) : std::nullopt;
+}
+
+// The value of a line KEY=VALUE or KEY: VALUE unit in a file.
+std::string valueOf(std::ifstream file, const std::string& key) {
+    for (std::string line; std::getline(file, line);) {
+        if (line.rfind(key, 0) == 0) {
+            const std::size_t begin = line.find_first_not_of(" \t\"", key.size());
+            return begin != std::string::npos ? line.substr(begin, line.find_last_not_of("\" ") + 1 - begin)
+                                              : "";
+        }
+    }
+    return "";
+}
+
+// Of /proc/meminfo's "123 kB" the number.
+std::optional<unsigned long long> kibibytes(const std::string& text) {
+    return numberIn(text.substr(0, text.find(' ')));
+}
+
+} // namespace
+
+std::string Host::line(const std::string& path) const {
+    std::ifstream file(root_ + path);
+    std::string text;
+    std::getline(file, text);
+    return text;
+}
+
+std::optional<unsigned long long> Host::number(const std::string& path) const {
+    return numberIn(line(path));
+}
+
+std::vector<std::string> Host::entries(const std::string& path) const {
+    std::vector<std::string> names;
+    std::error_code error;
+    for (std::filesystem::directory_iterator entry(root_ + path, error), end; !error && entry != end;
+         entry.increment(error)) {
+        names.push_back(entry->path().filename());
+    }
+    std::sort(names.begin(), names.end());
+    return names;
+}
+
+std::string Host::name() const {
+    return line("/proc/sys/kernel/hostname");
+}
+
+OperatingSystem Host::operatingSystem() const {
+    const std::string memory = root_ + "/proc/meminfo";
+    OperatingSystem system;
+    system.name = valueOf(std::ifstream(root_ + "/etc/os-release"), "PRETTY_NAME=");
+    if (system.name.empty()) {
+        system.name = "Linux";
+    }
+    system.kernelVersion = line("/proc/sys/kernel/osrelease");
+    const std::vector<std::string> processes = entries("/proc");
+    system.processes = static_cast<unsigned int>(std::count_if(processes.begin(), processes.end(), isNumber));
+    system.totalMemory = kibibytes(valueOf(std::ifstream(memory), "MemTotal:"));
+    system.freeMemory = kibibytes(valueOf(std::ifstream(memory), "MemFree:"));
+    system.totalSwap = kibibytes(valueOf(std::ifstream(memory), "SwapTotal:"));
+    return system;
+}
+
+std::vector<EthernetPort> Host::ethernetPorts() const {
+    constexpr unsigned long long ethernet = 1; // ARPHRD_ETHER
+    std::vector<EthernetPort> ports;
+    for (const std::string& name : entries("/sys/class/net")) {
+        if (number("/sys/class/net/" + name + "/type") == ethernet) {
+            ports.push_back(ethernetPort(name));
+        }
+    }
+    return ports;
+}
+
+EthernetPort Host::ethernetPort(const std::string& name) const {
+    const std::string folder = "/sys/class/net/" + name + '/';
+    EthernetPort port;
+    port.name = name;
+    port.address = line(folder + "address");
+    port.address.erase(std::remove(port.address.begin(), port.address.end(), ':'), port.address.end());
+    port.isUp = line(folder + "operstate") == "up";
+    const std::string duplex = line(folder + "duplex");
+    if (duplex == "full" || duplex == "half") {
+        port.isFullDuplex = duplex == "full";
+    }
+    if (const auto megabits = number(folder + "speed")) {
+        port.speed = *megabits * 1'000'000;
+    }
+    port.maximumTransmissionUnit = number(folder + "mtu");
+    return port;
+}

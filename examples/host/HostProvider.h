@@ -1,0 +1,12 @@
+// The provider's own entry points, for programs that link it in place of loading it.
+#pragma once
+
+#include <ProviderUtilities.h>
+
+#include <string>
+
+// Makes the provider read a machine below `root` from now on.
+void setHostRoot(const std::string& root);
+
+extern "C" CMPIInstanceMI* OXAHostProvider_Create_InstanceMI(const CMPIBroker* broker,
+                                                             const CMPIContext* context, CMPIStatus* rc);

@@ -1,0 +1,145 @@
+#include "Output.h"
+
+#include <nlohmann/json.hpp>
+
+namespace {
+
+using Json = nlohmann::ordered_json;
+
+struct NamedData {
+    std::string name;
+    CMPIData data;
+};
+
+std::string textOf(const CMPIString* string) {
+    const char* const chars = string != nullptr ? CMGetCharsPtr(string, nullptr) : nullptr;
+    return chars != nullptr ? chars : "";
+}
+
+// The values of an instance or an object path: `count` and `at` are the slots that tell them.
+template <class Object, class Count, class At>
+std::vector<NamedData> valuesOf(const Object* object, Count count, At at) {
+    std::vector<NamedData> values;
+    const CMPICount size = count(object, nullptr);
+    for (CMPICount i = 0; i < size; ++i) {
+        CMPIString* name = nullptr;
+        const CMPIData data = at(object, i, &name, nullptr);
+        values.push_back({textOf(name), data});
+    }
+    return values;
+}
+
+std::vector<NamedData> propertiesOf(const CMPIInstance* instance) {
+    return valuesOf(instance, CMGetPropertyCount, CMGetPropertyAt);
+}
+
+std::vector<NamedData> keysOf(const CMPIObjectPath* path) {
+    return valuesOf(path, CMGetKeyCount, CMGetKeyAt);
+}
+
+Json jsonOf(const CMPIData& data);
+
+Json jsonOfArray(const CMPIArray* array) {
+    Json elements = Json::array();
+    const CMPICount size = CMGetArrayCount(array, nullptr);
+    for (CMPICount i = 0; i < size; ++i) {
+        elements.push_back(jsonOf(CMGetArrayElementAt(array, i, nullptr)));
+    }
+    return elements;
+}
+
+Json jsonOf(const CMPIData& data) {
+    if (CMIsNullValue(data)) {
+        return nullptr;
+    }
+    if (CMIsArray(data)) {
+        return jsonOfArray(data.value.array);
+    }
+    switch (data.type) {
+    case CMPI_boolean:
+        return data.value.boolean != 0;
+    case CMPI_uint8:
+        return data.value.uint8;
+    case CMPI_char16:
+    case CMPI_uint16:
+        return data.value.uint16;
+    case CMPI_uint32:
+        return data.value.uint32;
+    case CMPI_uint64:
+        return data.value.uint64;
+    case CMPI_sint8:
+        return data.value.sint8;
+    case CMPI_sint16:
+        return data.value.sint16;
+    case CMPI_sint32:
+        return data.value.sint32;
+    case CMPI_sint64:
+        return data.value.sint64;
+    case CMPI_real32:
+        return data.value.real32;
+    case CMPI_real64:
+        return data.value.real64;
+    case CMPI_string:
+        return textOf(data.value.string);
+    case CMPI_chars:
+        return data.value.chars;
+    case CMPI_dateTime:
+        return textOf(CMGetStringFormat(data.value.dateTime, nullptr));
+    case CMPI_ref:
+        return oxahv::pathText(data.value.ref);
+    default:
+        return oxahv::valueText(data);
+    }
+}
+
+Json jsonOf(const CMPIObjectPath* path, const std::vector<NamedData>& values) {
+    Json properties = Json::object();
+    for (const NamedData& value : values) {
+        properties[value.name] = jsonOf(value.data);
+    }
+    return {{"class", textOf(CMGetClassName(path, nullptr))},
+            {"namespace", textOf(CMGetNameSpace(path, nullptr))},
+            {"path", oxahv::pathText(path)},
+            {"properties", properties}};
+}
+
+// A provider's texts need not be UTF-8; what is not is replaced.
+void print(std::ostream& out, const Json& json) {
+    out << json.dump(2, ' ', false, Json::error_handler_t::replace) << '\n';
+}
+
+} // namespace
+
+void printInstances(std::ostream& out, Format format, const std::vector<CMPIInstance*>& instances) {
+    Json array = Json::array();
+    for (const CMPIInstance* const instance : instances) {
+        const CMPIObjectPath* const path = CMGetObjectPath(instance, nullptr);
+        const std::vector<NamedData> properties = propertiesOf(instance);
+        if (format == Format::json) {
+            array.push_back(jsonOf(path, properties));
+            continue;
+        }
+        out << "instance of " << textOf(CMGetClassName(path, nullptr)) << " {\n";
+        for (const NamedData& property : properties) {
+            out << "  " << property.name << " = " << oxahv::valueText(property.data) << ";\n";
+        }
+        out << "};\n";
+    }
+    if (format == Format::json) {
+        print(out, array);
+    }
+}
+
+void printPaths(std::ostream& out, Format format, const std::vector<CMPIObjectPath*>& paths) {
+    Json array = Json::array();
+    for (const CMPIObjectPath* const path : paths) {
+        if (format == Format::json) {
+            array.push_back(jsonOf(path, keysOf(path)));
+        } else {
+            out << oxahv::pathText(path) << '\n';
+        }
+    }
+    if (format == Format::json) {
+        print(out, array);
+    }
+}
