@@ -17,6 +17,9 @@ if(PROJECT_IS_TOP_LEVEL)
     endif()
 endif()
 
+# An installed copy finds its libraries beside itself, wherever it lies.
+set(CMAKE_INSTALL_RPATH "$ORIGIN;$ORIGIN/../${CMAKE_INSTALL_LIBDIR}")
+
 set(OXAHV_SANITIZE "" CACHE STRING "Sanitizers to build with, for example address,undefined")
 
 set(oxahv_warnings -Wall -Wextra -Wpedantic -Wconversion -Wshadow)

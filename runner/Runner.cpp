@@ -38,9 +38,10 @@ oxahv::Reply getInstance(oxahv::Request& request, const Options& options, const 
     return reply;
 }
 
-// The MI name that a library's file stands for: its stem without "lib".
+// The MI name that a library's file stands for: its stem without "lib". A version behind ".so" is none of it.
 std::string nameOf(const std::string& library) {
-    const std::string stem = std::filesystem::path(library).stem();
+    const std::string file = std::filesystem::path(library).filename();
+    const std::string stem = file.substr(0, file.find(".so"));
     return stem.rfind("lib", 0) == 0 ? stem.substr(3) : stem;
 }
 

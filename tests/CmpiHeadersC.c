@@ -1,4 +1,5 @@
-/* A provider written in C, with every kind of MI: that the CMPI headers are C is shown by its being compiled. */
+/* A provider written in C, with every kind of MI: that the CMPI headers are C is shown by its being compiled.
+ */
 #include <cmpidt.h>
 #include <cmpift.h>
 #include <cmpimacs.h>
@@ -8,8 +9,10 @@
 static const CMPIBroker* broker;
 
 /* The functions that this provider does not serve. */
-#define NOT_SUPPORTED(name, parameters) \
-    static CMPIStatus name parameters { CMReturn(CMPI_RC_ERR_NOT_SUPPORTED); }
+#define NOT_SUPPORTED(name, parameters)      \
+    static CMPIStatus name parameters {      \
+        CMReturn(CMPI_RC_ERR_NOT_SUPPORTED); \
+    }
 
 static CMPIStatus CCleanup(CMPIInstanceMI* mi, const CMPIContext* context, CMPIBoolean ending) {
     (void)mi;

@@ -695,11 +695,12 @@ public:
 } // namespace
 
 CMProviderBase(TestProvider) CMInstanceMIFactory(Provider, TestProvider)
-    CMAssociationMIFactory(Provider, TestProvider) CMMethodMIFactory(Provider, TestProvider)
-        CMPropertyMIFactory(Provider, TestProvider) CMIndicationMIFactory(Provider, TestProvider)
-            CMProviderBase(OtherProvider) CMMethodMIFactory(Provider, OtherProvider)
+CMAssociationMIFactory(Provider, TestProvider)
+CMMethodMIFactory(Provider, TestProvider)
+CMPropertyMIFactory(Provider, TestProvider) CMIndicationMIFactory(Provider, TestProvider)
+    CMProviderBase(OtherProvider) CMMethodMIFactory(Provider, OtherProvider)
 
-                TEST(AProviderFactory, SharesOneObjectAmongTheKindsOfOneName) {
+TEST(AProviderFactory, SharesOneObjectAmongTheKindsOfOneName) {
     CMPIStatus status = {CMPI_RC_ERR_FAILED, nullptr};
     CMPIInstanceMI* const instances = TestProvider_Create_InstanceMI(nullptr, nullptr, &status);
     EXPECT_EQ(status.rc, CMPI_RC_OK);

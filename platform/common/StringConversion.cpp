@@ -2,6 +2,8 @@
 
 namespace TK {
 
-std::ostream& operator<<(std::ostream& stream, const std::string& text) { return std::operator<<(stream, text); }
+std::ostream& operator<<(std::ostream& stream, const std::string& text) {
+    return std::operator<<(stream, text);
+}
 
 } // namespace TK

@@ -1,0 +1,46 @@
+# What an installed copy holds: the libraries and their headers, a CMake package and pkg-config files.
+
+set(oxahv_targets oxahvexport oxahvcmpi oxahvlibrarycmpi oxahvcommon oxahvlogger oxahvproviderutilities oxahvbroker)
+install(TARGETS ${oxahv_targets}
+    EXPORT oxahvproviderutilities-targets
+    LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} COMPONENT runtime NAMELINK_COMPONENT development)
+
+set(oxahv_include ${CMAKE_INSTALL_INCLUDEDIR}/oxahv)
+install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/ ${PROJECT_SOURCE_DIR}/export/
+    DESTINATION ${oxahv_include} COMPONENT development FILES_MATCHING PATTERN "*.h")
+install(DIRECTORY ${PROJECT_SOURCE_DIR}/platform/common/ ${PROJECT_SOURCE_DIR}/platform/logger/
+    DESTINATION ${oxahv_include}/platform COMPONENT development FILES_MATCHING PATTERN "*.h")
+install(DIRECTORY ${PROJECT_SOURCE_DIR}/cmpi/
+    DESTINATION ${oxahv_include}/cmpi COMPONENT development FILES_MATCHING PATTERN "*.h")
+install(FILES ${PROJECT_SOURCE_DIR}/broker/EmbeddedBroker.h
+    DESTINATION ${oxahv_include}/broker COMPONENT development)
+
+set(oxahv_package_dir ${CMAKE_INSTALL_LIBDIR}/cmake/oxahvproviderutilities)
+install(EXPORT oxahvproviderutilities-targets
+    NAMESPACE oxahv:: DESTINATION ${oxahv_package_dir} COMPONENT development)
+configure_package_config_file(
+    ${PROJECT_SOURCE_DIR}/cmake/oxahvproviderutilities-config.cmake.in
+    ${PROJECT_BINARY_DIR}/oxahvproviderutilities-config.cmake
+    INSTALL_DESTINATION ${oxahv_package_dir}
+    NO_SET_AND_CHECK_MACRO)
+write_basic_package_version_file(
+    ${PROJECT_BINARY_DIR}/oxahvproviderutilities-config-version.cmake COMPATIBILITY SameMajorVersion)
+install(FILES
+    ${PROJECT_BINARY_DIR}/oxahvproviderutilities-config.cmake
+    ${PROJECT_BINARY_DIR}/oxahvproviderutilities-config-version.cmake
+    DESTINATION ${oxahv_package_dir} COMPONENT development)
+
+# The prefix is found from where the .pc file lies, so that an installed copy can be moved.
+file(RELATIVE_PATH oxahv_pc_prefix
+    ${CMAKE_INSTALL_FULL_LIBDIR}/pkgconfig ${CMAKE_INSTALL_PREFIX})
+string(REGEX REPLACE "/$" "" oxahv_pc_prefix "${oxahv_pc_prefix}")
+if(CMPI_INCLUDE_DIR)
+    set(oxahv_pc_cmpi "${CMPI_INCLUDE_DIR}")
+else()
+    set(oxahv_pc_cmpi "\${includedir}/oxahv/cmpi")
+endif()
+foreach(name oxahvproviderutilities oxahvbroker)
+    configure_file(${PROJECT_SOURCE_DIR}/cmake/${name}.pc.in ${PROJECT_BINARY_DIR}/${name}.pc @ONLY)
+    install(FILES ${PROJECT_BINARY_DIR}/${name}.pc
+        DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig COMPONENT development)
+endforeach()

@@ -1,0 +1,347 @@
+// The broker's objects: what their function tables do.
+#include "EmbeddedBroker.h"
+
+#include <cstring>
+#include <ctime>
+#include <gtest/gtest.h>
+
+using oxahv::ClassDeclaration;
+using oxahv::EmbeddedBroker;
+using oxahv::LiveObjects;
+using oxahv::Request;
+
+namespace {
+
+class ABroker : public testing::Test {
+protected:
+    CMPIString* string(const char* text) { return CMNewString(handle_, text, nullptr); }
+
+    static std::string textOf(const CMPIString* string) { return CMGetCharsPtr(string, nullptr); }
+
+    // Whether every slot of a function table is there; tables begin with numbers.
+    template <class Table>
+    static bool isFull(const Table* table) {
+        constexpr std::size_t words = sizeof(Table) / sizeof(void*);
+        const void* slots[words];
+        std::memcpy(slots, table, sizeof slots);
+        for (std::size_t i = 1; i < words; ++i) {
+            if (slots[i] == nullptr) {
+                return false;
+            }
+        }
+        return true;
+    }
+
+    EmbeddedBroker broker_;
+    const CMPIBroker* const handle_ = broker_.handle();
+    Request request_{broker_};
+};
+
+} // namespace
+
+TEST_F(ABroker, HasNoNullSlot) {
+    EXPECT_TRUE(isFull(handle_->bft) && isFull(handle_->eft) && isFull(handle_->xft) && isFull(handle_->mft));
+    const CMPIObjectPath* const path = request_.objectPath("root", "Demo");
+    EXPECT_TRUE(isFull(path->ft));
+    EXPECT_TRUE(isFull(CMNewInstance(handle_, path, nullptr)->ft));
+    EXPECT_TRUE(isFull(CMNewArgs(handle_, nullptr)->ft));
+    EXPECT_TRUE(isFull(string("")->ft));
+    EXPECT_TRUE(isFull(CMNewArray(handle_, 1, CMPI_uint8, nullptr)->ft));
+    EXPECT_TRUE(isFull(CMNewDateTime(handle_, nullptr)->ft));
+    EXPECT_TRUE(isFull(request_.context()->ft));
+    EXPECT_TRUE(isFull(handle_->eft->newPropertyList(handle_, nullptr, nullptr)->ft));
+    EXPECT_TRUE(isFull(
+        handle_->eft
+            ->newCMPIError(handle_, "o", "i", "m", ErrorSevLow, ErrorProbCauseOther, CMPI_RC_OK, nullptr)
+            ->ft));
+}
+
+TEST_F(ABroker, AnswersInvalidHandleToNullAndForeignHandles) {
+    CMPIObjectPath* const path = request_.objectPath("root", "Demo");
+    CMPIInstance* const instance = CMNewInstance(handle_, path, nullptr);
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    EXPECT_EQ(instance->ft->getProperty(nullptr, "p", &status).state, CMPI_nullValue);
+    EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_HANDLE);
+    EXPECT_EQ(path->ft->addKey(nullptr, "k", nullptr, CMPI_string).rc, CMPI_RC_ERR_INVALID_HANDLE);
+    EXPECT_EQ(path->ft->getKeyCount(nullptr, nullptr), 0U);
+    EXPECT_EQ(instance->ft->release(nullptr).rc, CMPI_RC_ERR_INVALID_HANDLE);
+    EXPECT_EQ(handle_->eft->newString(nullptr, "text", &status), nullptr);
+    EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_HANDLE);
+    EXPECT_EQ(CMNewInstance(handle_, reinterpret_cast<CMPIObjectPath*>(instance), &status), nullptr);
+    EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_HANDLE);
+    EXPECT_EQ(handle_->bft->getInstance(handle_, request_.context(), nullptr, nullptr, &status), nullptr);
+    EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_HANDLE);
+
+    EXPECT_EQ(CMNewString(handle_, nullptr, &status), nullptr);
+    EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_PARAMETER);
+    EXPECT_EQ(CMAddKey(path, nullptr, "v", CMPI_chars).rc, CMPI_RC_ERR_INVALID_PARAMETER);
+    EXPECT_EQ(CMNewObjectPath(handle_, "root", nullptr, &status), nullptr);
+    EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_PARAMETER);
+}
+
+TEST_F(ABroker, KeepsValuesByNameIgnoringCaseInTheirOrder) {
+    CMPIObjectPath* const path = request_.objectPath("root", "Demo");
+    char text[] = "first";
+    CMPIValue value = {};
+    value.uint16 = 7;
+    CMAddKey(path, "B", text, CMPI_chars);
+    CMAddKey(path, "a", &value, CMPI_uint16);
+    text[0] = 'X'; // texts are copied
+    EXPECT_EQ(oxahv::pathText(path), "root:Demo.B=\"first\",a=7");
+    CMAddKey(path, "b", "second", CMPI_chars); // and replaced in their place
+    EXPECT_EQ(oxahv::pathText(path), "root:Demo.B=\"second\",a=7");
+
+    CMPIString* name = nullptr;
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    const CMPIData key = CMGetKeyAt(path, 0, &name, &status);
+    EXPECT_EQ(key.type, CMPI_string);
+    EXPECT_EQ(key.state, CMPI_keyValue);
+    EXPECT_EQ(textOf(name), "B");
+    CMGetKeyAt(path, 2, nullptr, &status);
+    EXPECT_EQ(status.rc, CMPI_RC_ERR_NOT_FOUND);
+    EXPECT_EQ(CMGetKey(path, "missing", &status).state, CMPI_nullValue | CMPI_notFound);
+    EXPECT_EQ(status.rc, CMPI_RC_ERR_NOT_FOUND);
+}
+
+TEST_F(ABroker, KeepsNullAsNull) {
+    CMPIInstance* const instance = CMNewInstance(handle_, request_.objectPath("root", "Demo"), nullptr);
+    CMPIValue none = {};
+    CMSetProperty(instance, "pointer", nullptr, CMPI_uint32);
+    CMSetProperty(instance, "text", nullptr, CMPI_chars);
+    CMSetProperty(instance, "string", &none, CMPI_string);
+    for (const char* const name : {"pointer", "text", "string"}) {
+        CMPIStatus status = {CMPI_RC_ERR_FAILED, nullptr};
+        EXPECT_TRUE(CMIsNullValue(CMGetProperty(instance, name, &status))) << name;
+        EXPECT_EQ(status.rc, CMPI_RC_OK) << name;
+    }
+    EXPECT_EQ(CMGetProperty(instance, "text", nullptr).type, CMPI_string);
+}
+
+TEST_F(ABroker, ChecksInstancesAgainstTheirClass) {
+    broker_.declare(ClassDeclaration("Demo_Base").key("Id", CMPI_uint16).property("Text", CMPI_string));
+    broker_.declare(ClassDeclaration("Demo").superclass("demo_base").property("Numbers", CMPI_uint8A));
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    EXPECT_EQ(CMNewInstance(handle_, request_.objectPath("root", "Other"), &status), nullptr);
+    EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_CLASS);
+
+    CMPIObjectPath* const path = request_.objectPath("root", "demo");
+    CMPIValue value = {};
+    value.uint16 = 7;
+    EXPECT_EQ(CMAddKey(path, "Id", &value, CMPI_uint32).rc, CMPI_RC_ERR_TYPE_MISMATCH);
+    EXPECT_EQ(CMAddKey(path, "Key", &value, CMPI_uint16).rc, CMPI_RC_ERR_NO_SUCH_PROPERTY);
+    EXPECT_EQ(CMAddKey(path, "id", &value, CMPI_uint16).rc, CMPI_RC_OK);
+
+    CMPIInstance* const instance = CMNewInstance(handle_, path, nullptr);
+    EXPECT_EQ(CMGetPropertyCount(instance, nullptr), 3U);
+    EXPECT_EQ(CMGetProperty(instance, "ID", nullptr).value.uint16, 7);
+    EXPECT_TRUE(CMIsNullValue(CMGetProperty(instance, "Text", nullptr)));
+    EXPECT_EQ(CMSetProperty(instance, "text", "ok", CMPI_chars).rc, CMPI_RC_OK);
+    EXPECT_EQ(CMSetProperty(instance, "Text", &value, CMPI_uint16).rc, CMPI_RC_ERR_TYPE_MISMATCH);
+    EXPECT_EQ(CMSetProperty(instance, "Nothing", &value, CMPI_uint16).rc, CMPI_RC_ERR_NO_SUCH_PROPERTY);
+    value.array = CMNewArray(handle_, 2, CMPI_uint8, nullptr);
+    EXPECT_EQ(CMSetProperty(instance, "Numbers", &value, CMPI_uint8A).rc, CMPI_RC_OK);
+    EXPECT_EQ(CMGetProperty(instance, "missing", &status).state, CMPI_nullValue | CMPI_notFound);
+    EXPECT_EQ(status.rc, CMPI_RC_ERR_NO_SUCH_PROPERTY);
+
+    EXPECT_NE(CMClassPathIsA(handle_, path, "DEMO_BASE", nullptr), 0);
+    EXPECT_EQ(CMClassPathIsA(handle_, request_.objectPath("root", "Demo_Base"), "Demo", nullptr), 0);
+}
+
+TEST_F(ABroker, LetsOnlyKeysAndWantedPropertiesThroughAFilter) {
+    CMPIObjectPath* const path = request_.objectPath("root", "Demo");
+    CMAddKey(path, "Id", "x", CMPI_chars);
+    CMPIInstance* const instance = CMNewInstance(handle_, path, nullptr);
+    CMSetProperty(instance, "Before", "x", CMPI_chars);
+    const char* wanted[] = {"wanted", nullptr};
+    CMSetPropertyFilter(instance, wanted, nullptr);
+    EXPECT_EQ(CMSetProperty(instance, "Wanted", "x", CMPI_chars).rc, CMPI_RC_OK);
+    EXPECT_EQ(CMSetProperty(instance, "Other", "x", CMPI_chars).rc, CMPI_RC_OK);
+    CMSetProperty(instance, "Id", "y", CMPI_chars);
+    EXPECT_EQ(CMGetPropertyCount(instance, nullptr), 2U);
+    EXPECT_EQ(oxahv::pathText(CMGetObjectPath(instance, nullptr)), "root:Demo.Id=\"y\"");
+}
+
+TEST_F(ABroker, HoldsArraysOfEveryTypeWithNullElements) {
+    const CMPIType types[] = {CMPI_boolean, CMPI_char16, CMPI_real32, CMPI_real64, CMPI_uint8,
+                              CMPI_uint16,  CMPI_uint32, CMPI_uint64, CMPI_sint8,  CMPI_sint16,
+                              CMPI_sint32,  CMPI_sint64, CMPI_string, CMPI_ref,    CMPI_dateTime};
+    for (const CMPIType type : types) {
+        CMPIValue value = {};
+        value.uint64 = 1;
+        if (type == CMPI_string) {
+            value.string = string("text");
+        } else if (type == CMPI_ref) {
+            value.ref = request_.objectPath("root", "Demo");
+        } else if (type == CMPI_dateTime) {
+            value.dateTime = CMNewDateTime(handle_, nullptr);
+        } else if (type == CMPI_real32) {
+            value.real32 = 1;
+        }
+        CMPIArray* const array = CMNewArray(handle_, 2, type, nullptr);
+        EXPECT_EQ(CMGetArrayCount(array, nullptr), 2U);
+        EXPECT_EQ(CMGetArrayType(array, nullptr), type);
+        EXPECT_EQ(CMSetArrayElementAt(array, 1, &value, type).rc, CMPI_RC_OK) << type;
+        EXPECT_TRUE(CMIsNullValue(CMGetArrayElementAt(array, 0, nullptr))) << type;
+        const std::string expected = oxahv::valueText({type, 0, value});
+        EXPECT_EQ(oxahv::valueText(CMGetArrayElementAt(array, 1, nullptr)), expected) << type;
+        EXPECT_EQ(CMSetArrayElementAt(array, 2, &value, type).rc, CMPI_RC_ERR_NOT_FOUND) << type;
+        const CMPIType other = type == CMPI_uint8 ? CMPI_uint16 : CMPI_uint8;
+        EXPECT_EQ(CMSetArrayElementAt(array, 0, &value, other).rc, CMPI_RC_ERR_TYPE_MISMATCH) << type;
+        CMPIInstance* const instance = CMNewInstance(handle_, request_.objectPath("root", "Demo"), nullptr);
+        CMPIValue whole = {};
+        whole.array = array;
+        CMSetProperty(instance, "Array", &whole, static_cast<CMPIType>(type | CMPI_ARRAY));
+        EXPECT_EQ(oxahv::valueText(CMGetProperty(instance, "Array", nullptr)), "{NULL, " + expected + "}")
+            << type;
+    }
+    CMPIArray* const texts = CMNewArray(handle_, 1, CMPI_string, nullptr);
+    EXPECT_EQ(CMSetArrayElementAt(texts, 0, "chars", CMPI_chars).rc, CMPI_RC_OK);
+    EXPECT_EQ(oxahv::valueText(CMGetArrayElementAt(texts, 0, nullptr)), "\"chars\"");
+    EXPECT_EQ(CMNewArray(handle_, 1, CMPI_uint8A, nullptr), nullptr);
+}
+
+TEST_F(ABroker, ReadsAndWritesDatesAndIntervals) {
+    struct {
+        const char* text;
+        bool isInterval;
+        CMPIUint64 binary;
+        const char* back; // from the binary form
+    } const rows[] = {
+        {"19700101000000.000000+000", false, 0, "19700101000000.000000+000"},
+        {"20240229235959.123456+000", false, 1709251199123456, "20240229235959.123456+000"},
+        {"20240301013000.000000+090", false, 1709251200000000, "20240301000000.000000+000"},
+        {"20240229190000.000000-300", false, 1709251200000000, "20240301000000.000000+000"},
+        {"99991231235959.999999+000", false, 253402300799999999, "99991231235959.999999+000"},
+        {"2024****************.***", false, 0, nullptr},
+        {"20240301******.******+000", false, 1709251200000000, "20240301000000.000000+000"},
+        {"20240301000000.12****+000", false, 1709251200120000, "20240301000000.120000+000"},
+        {"00000001020304.000005:000", true, 93784000005, "00000001020304.000005:000"},
+        {"99999999235959.999999:000", true, 8639999999999999999ULL / 1000000 * 1000000 + 999999, nullptr},
+    };
+    for (const auto& row : rows) {
+        CMPIStatus status = {CMPI_RC_OK, nullptr};
+        CMPIDateTime* const dateTime = CMNewDateTimeFromChars(handle_, row.text, &status);
+        if (std::strlen(row.text) != 25) {
+            EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_PARAMETER) << row.text;
+            continue;
+        }
+        ASSERT_NE(dateTime, nullptr) << row.text;
+        EXPECT_EQ(textOf(CMGetStringFormat(dateTime, nullptr)), row.text);
+        EXPECT_EQ(CMIsInterval(dateTime, nullptr) != 0, row.isInterval) << row.text;
+        if (row.back != nullptr) {
+            EXPECT_EQ(CMGetBinaryFormat(dateTime, nullptr), row.binary) << row.text;
+            CMPIDateTime* const back =
+                CMNewDateTimeFromBinary(handle_, row.binary, row.isInterval ? 1 : 0, nullptr);
+            EXPECT_EQ(textOf(CMGetStringFormat(back, nullptr)), row.back) << row.text;
+        }
+    }
+    for (const char* const bad :
+         {"", "2024", "20241301000000.000000+000", "20240132000000.000000+000", "20240101240000.000000+000",
+          "20240101000060.000000+000", "20240101000000:000000+000", "20240101000000.000000 000",
+          "20240101000000.000000+0x0", "2024**01000000.000000+000", "20240101000000.1*2***+000",
+          "00000001020304.000005:001", "00000001240000.000000:000", "20240101000000.000000+0000"}) {
+        CMPIStatus status = {CMPI_RC_OK, nullptr};
+        EXPECT_EQ(CMNewDateTimeFromChars(handle_, bad, &status), nullptr) << bad;
+        EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_PARAMETER) << bad;
+    }
+    EXPECT_EQ(CMNewDateTimeFromBinary(handle_, ~0ULL, 0, nullptr), nullptr);
+    // Every day of four centuries comes back.
+    for (CMPIUint64 day = 0; day < 146097; ++day) {
+        const CMPIUint64 binary = day * 86400000000ULL;
+        CMPIDateTime* const dateTime = CMNewDateTimeFromBinary(handle_, binary, 0, nullptr);
+        ASSERT_EQ(CMGetBinaryFormat(dateTime, nullptr), binary);
+        const std::time_t seconds = static_cast<std::time_t>(day * 86400);
+        std::tm time{};
+        char text[32];
+        std::strftime(text, sizeof text, "%Y%m%d%H%M%S.000000+000", gmtime_r(&seconds, &time));
+        ASSERT_EQ(textOf(CMGetStringFormat(dateTime, nullptr)), text);
+        CMRelease(dateTime);
+    }
+}
+
+TEST_F(ABroker, FreesWithARequestWhatWasNotClonedOrReleased) {
+    const LiveObjects before = broker_.liveObjects();
+    CMPIInstance* clone = nullptr;
+    {
+        Request inner(broker_);
+        CMPIObjectPath* const path = inner.objectPath("root", "Demo");
+        CMAddKey(path, "Key", "text", CMPI_chars);
+        CMPIInstance* const instance = CMNewInstance(handle_, path, nullptr);
+        clone = CMClone(instance, nullptr);
+        CMRelease(CMGetObjectPath(instance, nullptr));
+        EXPECT_GT(broker_.liveObjects().total(), before.total() + 4);
+    }
+    EXPECT_EQ(oxahv::pathText(CMGetObjectPath(clone, nullptr)), "root:Demo.Key=\"text\"");
+    EXPECT_EQ(broker_.liveObjects().instances, before.instances + 1);
+    EXPECT_EQ(CMRelease(clone).rc, CMPI_RC_OK);
+    EXPECT_EQ(broker_.liveObjects().instances, before.instances);
+
+    CMPIGcStat* const mark = handle_->mft->mark(handle_, nullptr);
+    const LiveObjects marked = broker_.liveObjects();
+    string("text");
+    CMNewArgs(handle_, nullptr);
+    EXPECT_EQ(handle_->mft->release(handle_, mark).rc, CMPI_RC_OK);
+    EXPECT_EQ(broker_.liveObjects().total(), marked.total() - 1);
+}
+
+TEST_F(ABroker, TellsAboutObjectsAndMakesMessages) {
+    CMPIObjectPath* const path = request_.objectPath("root", "Demo");
+    EXPECT_EQ(textOf(handle_->eft->getType(handle_, path, nullptr)), "CMPIObjectPath");
+    EXPECT_NE(handle_->eft->isOfType(handle_, string("x"), "CMPIString", nullptr), 0);
+    EXPECT_EQ(textOf(handle_->eft->toString(handle_, path, nullptr)), "root:Demo");
+    CMPIString* const message =
+        handle_->eft->getMessage(handle_, "id", "{0} of {1}: {2}", nullptr, 3, CMPI_chars, "port",
+                                 CMPI_uint32, 7U, CMPI_string, string("down"));
+    EXPECT_EQ(textOf(message), "port of 7: down");
+    const CMPIError* const error = handle_->eft->newCMPIError(
+        handle_, "owner", "id", "message", ErrorSevHigh, ErrorProbCauseOther, CMPI_RC_ERR_FAILED, nullptr);
+    error->ft->setErrorSource(error, "source");
+    EXPECT_EQ(textOf(error->ft->getErrorSource(error, nullptr)), "source");
+    EXPECT_EQ(error->ft->getPerceivedSeverity(error, nullptr), ErrorSevHigh);
+    const char* names[] = {"One", "Two", nullptr};
+    const CMPIPropertyList* const list = handle_->eft->newPropertyList(handle_, names, nullptr);
+    EXPECT_NE(list->ft->isPropertyInList(list, "two", nullptr), 0);
+    EXPECT_STREQ(list->ft->getProperties(list, nullptr)[0], "One");
+
+    std::vector<std::string> seen;
+    broker_.setMessageHandler(
+        [&](const oxahv::BrokerMessage& m) { seen.push_back(m.component + '|' + m.text); });
+    handle_->eft->logMessage(handle_, CMPI_SEV_ERROR, "id", nullptr, string("text"));
+    handle_->eft->trace(handle_, CMPI_LEV_INFO, "component", "trace", nullptr);
+    EXPECT_EQ(seen, std::vector<std::string>({"id|text", "component|trace"}));
+}
+
+TEST_F(ABroker, LendsTheOperatingSystemsThreadsAndMemory) {
+    const CMPIBrokerExtFT* const x = handle_->xft;
+    struct Shared {
+        const CMPIBrokerExtFT* x;
+        CMPI_MUTEX_TYPE mutex;
+        CMPI_COND_TYPE condition;
+        int value;
+    } shared = {x, x->newMutex(0), x->newCondition(0), 0};
+    CMPI_THREAD_TYPE const thread = x->newThread(
+        [](void* parameter) -> void* {
+            auto* const mine = static_cast<Shared*>(parameter);
+            mine->x->lockMutex(mine->mutex);
+            mine->value = 7;
+            mine->x->signalCondition(mine->condition);
+            mine->x->unlockMutex(mine->mutex);
+            return parameter;
+        },
+        &shared, 0);
+    x->lockMutex(shared.mutex);
+    while (shared.value == 0) {
+        EXPECT_EQ(x->condWait(shared.condition, shared.mutex), 0);
+    }
+    x->unlockMutex(shared.mutex);
+    CMPI_THREAD_RETURN result = nullptr;
+    EXPECT_EQ(x->joinThread(thread, &result), 0);
+    EXPECT_EQ(result, &shared);
+    EXPECT_EQ(x->destroyCondition2(shared.condition), 0);
+    EXPECT_EQ(x->destroyMutex2(shared.mutex), 0);
+    EXPECT_NE(x->lockMutex2(nullptr), 0);
+
+    char* const text = handle_->mft->cmpiStrDup(handle_, "text");
+    EXPECT_STREQ(text, "text");
+    handle_->mft->cmpiFree(handle_, text);
+}

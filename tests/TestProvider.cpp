@@ -1,0 +1,60 @@
+// A provider library with factories of one name, and generic ones that refuse every other name but "Generic".
+#include <cmpimacs.h>
+
+#include <cstring>
+
+static const CMPIBroker* broker;
+
+static CMPIStatus TestCleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
+    CMReturn(CMPI_RC_OK);
+}
+
+static CMPIStatus TestEnumInstanceNames(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+                                        const CMPIObjectPath* path) {
+    CMPIStatus status = CMReturnObjectPath(result, path);
+    CMReturnDone(result);
+    return status;
+}
+
+static CMPIStatus TestEnumInstances(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
+                                    const CMPIObjectPath*, const char**) {
+    CMPIStatus status = {CMPI_RC_ERR_ACCESS_DENIED, CMNewString(broker, "not for you", nullptr)};
+    return status;
+}
+
+static CMPIStatus TestGetInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
+                                  const CMPIObjectPath*, const char**) {
+    CMReturn(CMPI_RC_OK);
+}
+
+static CMPIStatus TestCreateInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
+                                     const CMPIObjectPath*, const CMPIInstance*) {
+    CMReturn(CMPI_RC_ERR_NOT_SUPPORTED);
+}
+
+static CMPIStatus TestModifyInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
+                                     const CMPIObjectPath*, const CMPIInstance*, const char**) {
+    CMReturn(CMPI_RC_ERR_NOT_SUPPORTED);
+}
+
+static CMPIStatus TestDeleteInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
+                                     const CMPIObjectPath*) {
+    CMReturn(CMPI_RC_ERR_NOT_SUPPORTED);
+}
+
+static CMPIStatus TestExecQuery(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*,
+                                const char*, const char*) {
+    CMReturn(CMPI_RC_ERR_NOT_SUPPORTED);
+}
+
+CMInstanceMIStub(Test, TestProvider, broker, )
+
+extern "C" CMPI_EXPORT CMPIInstanceMI* _Generic_Create_InstanceMI(const CMPIBroker* theBroker,
+                                                                  const CMPIContext* context,
+                                                                  const char* name, CMPIStatus* status) {
+    if (std::strcmp(name, "Generic") != 0) {
+        CMSetStatus(status, CMPI_RC_ERR_NOT_FOUND);
+        return nullptr;
+    }
+    return TestProvider_Create_InstanceMI(theBroker, context, status);
+}
