@@ -1,6 +1,9 @@
 # What an installed copy holds: the libraries and their headers, a CMake package and pkg-config files.
 
-set(oxahv_targets oxahvexport oxahvcmpi oxahvlibrarycmpi oxahvcommon oxahvlogger oxahvproviderutilities oxahvbroker)
+set(oxahv_targets
+    oxahvexport oxahvcmpi oxahvlibrarycmpi
+    oxahvcommon oxahvlocale oxahvlogger
+    oxahvproviderutilities oxahvbroker)
 install(TARGETS ${oxahv_targets}
     EXPORT oxahvproviderutilities-targets
     LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} COMPONENT runtime NAMELINK_COMPONENT development)
@@ -8,8 +11,12 @@ install(TARGETS ${oxahv_targets}
 set(oxahv_include ${CMAKE_INSTALL_INCLUDEDIR}/oxahv)
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/ ${PROJECT_SOURCE_DIR}/export/
     DESTINATION ${oxahv_include} COMPONENT development FILES_MATCHING PATTERN "*.h")
-install(DIRECTORY ${PROJECT_SOURCE_DIR}/platform/common/ ${PROJECT_SOURCE_DIR}/platform/logger/
-    DESTINATION ${oxahv_include}/platform COMPONENT development FILES_MATCHING PATTERN "*.h")
+install(DIRECTORY
+    ${PROJECT_SOURCE_DIR}/platform/common/
+    ${PROJECT_SOURCE_DIR}/platform/locale/
+    ${PROJECT_SOURCE_DIR}/platform/logger/
+    DESTINATION ${oxahv_include}/platform COMPONENT development
+    FILES_MATCHING PATTERN "*.h" PATTERN private EXCLUDE PATTERN po EXCLUDE)
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/cmpi/
     DESTINATION ${oxahv_include}/cmpi COMPONENT development FILES_MATCHING PATTERN "*.h")
 install(FILES ${PROJECT_SOURCE_DIR}/broker/EmbeddedBroker.h

@@ -1,6 +1,85 @@
 #include "StringConversion.h"
 
+#include <array>
+#include <climits>
+#include <cwchar>
+
 namespace TK {
+
+namespace {
+
+constexpr auto failed = static_cast<std::size_t>(-1);
+constexpr auto incomplete = static_cast<std::size_t>(-2);
+
+// What an invalid byte from 0x80 on becomes: the byte added to this.
+constexpr wchar_t escapedByte = 0xDC00;
+
+bool isEscapedByte(wchar_t character) {
+    return character >= escapedByte + 0x80 && character <= escapedByte + 0xFF;
+}
+
+wchar_t escape(unsigned char byte) {
+    return static_cast<wchar_t>(byte < 0x80 ? byte : escapedByte + byte);
+}
+
+} // namespace
+
+// Both directions convert the terminating NUL too: it brings a stateful encoding back to its initial state
+// and brings out a character that an encoding holds back to see what follows.
+
+std::string make_string(const std::wstring& text) {
+    std::string result;
+    result.reserve(text.size() + 1);
+    std::array<char, MB_LEN_MAX> bytes{};
+    std::mbstate_t state{};
+    for (std::size_t i = 0; i <= text.size(); ++i) {
+        const std::mbstate_t before = state;
+        std::size_t count = std::wcrtomb(bytes.data(), text[i], &state);
+        if (count == failed) {
+            state = before;
+            if (isEscapedByte(text[i])) {
+                bytes[0] = static_cast<char>(text[i] - escapedByte);
+                count = 1;
+            } else {
+                count = std::wcrtomb(bytes.data(), L'?', &state);
+            }
+        }
+        result.append(bytes.data(), count);
+    }
+    result.pop_back();
+    return result;
+}
+
+std::string make_string(const char* text) {
+    return text == nullptr ? std::string() : std::string(text);
+}
+
+std::wstring make_wstring(const std::string& text) {
+    std::wstring result;
+    result.reserve(text.size() + 1);
+    const char* const end = text.data() + text.size() + 1;
+    std::mbstate_t state{};
+    for (const char* position = text.data(); position != end;) {
+        const std::mbstate_t before = state;
+        wchar_t character = 0;
+        const std::size_t count =
+            std::mbrtowc(&character, position, static_cast<std::size_t>(end - position), &state);
+        if (count == failed || count == incomplete) {
+            state = before;
+            result += escape(static_cast<unsigned char>(*position++));
+        } else if (count == 0 && character == L'\0') {
+            // The bytes that bring the encoding back to its initial state may stand before the NUL.
+            result += L'\0';
+            position += std::char_traits<char>::length(position) + 1;
+        } else {
+            // No byte is used when the character is the second that one byte sequence stands for.
+            result += character;
+            position += count;
+        }
+    }
+    result.pop_back();
+    return result;
+}
 
 std::ostream& operator<<(std::ostream& stream, const std::string& text) {
     return std::operator<<(stream, text);
