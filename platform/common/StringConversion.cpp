@@ -37,11 +37,10 @@ std::string make_string(const std::wstring& text) {
         std::size_t count = std::wcrtomb(bytes.data(), text[i], &state);
         if (count == failed) {
             state = before;
+            // Before a bare byte the encoding goes to its initial state, as before a NUL.
+            count = std::wcrtomb(bytes.data(), isEscapedByte(text[i]) ? L'\0' : L'?', &state);
             if (isEscapedByte(text[i])) {
-                bytes[0] = static_cast<char>(text[i] - escapedByte);
-                count = 1;
-            } else {
-                count = std::wcrtomb(bytes.data(), L'?', &state);
+                bytes[count - 1] = static_cast<char>(text[i] - escapedByte);
             }
         }
         result.append(bytes.data(), count);
