@@ -50,7 +50,7 @@ public:
      * @param path the file's path, absolute unless the process stays in its folder.
      * @throws std::system_error when the file exists but cannot be read. std::bad_alloc
      */
-    explicit PropertyFile(const std::string& path);
+    explicit PropertyFile(std::string path);
 
     PropertyFile(const PropertyFile&) = delete;
     PropertyFile& operator=(const PropertyFile&) = delete;
