@@ -215,6 +215,7 @@ TEST_F(APropertyFile, KeepsWhatAChangeDoesNotTouch) {
          "a="},
         {"", set(L"a", L"1"), "a=1\n"},
         {"\xEF\xBB\xBF", [](PropertyFile&) {}, "\xEF\xBB\xBF"},
+        {"", set(L"\uFEFF#", L"\t= a\tb\x1B "), "\\u{feff}\\#=\\t= a\\tb\\u{1b}\\s\n"},
         {"a =", set(L"a", L"= #"), "a == #"},
         {"a=x\r\r\n\r\n", set(L"b", L"1"), "a=x\r\r\n\r\nb=1\r\n"},
     };
@@ -233,7 +234,7 @@ TEST_F(APropertyFile, ReportsDamagedLinesAndWritesThemBackAsTheyAre) {
                                 "a\\=b\n"
                                 "a=\\u{\n"
                                 "a=\\u{}\n"
-                                "a=\\u{123456789}\n"
+                                "a=\\u{000000041}\n"
                                 "a=\\u41\n"
                                 "a=\\u{-1}\n"
                                 "a=\\u{0x41}\n"
@@ -253,9 +254,9 @@ TEST_F(APropertyFile, ReportsDamagedLinesAndWritesThemBackAsTheyAre) {
     EXPECT_EQ(after, damaged + "\na=1\n");
     // Whatever the bytes are, they come through.
     std::mt19937 random(7);
-    for (int i = 0; i < 300; ++i) {
+    for (int i = 0; i < 30; ++i) {
         std::string bytes;
-        for (auto left = random() % 200; left > 0; --left) {
+        for (auto left = random() % 2000; left > 0; --left) {
             bytes +=
                 (random() & 1U) != 0 ? "=\\\n\r# u{1}"[random() % 10] : static_cast<char>(random() & 0xFFU);
         }
