@@ -351,6 +351,36 @@ TEST_F(APropertyFile, IsUntouchedByASaveThatFails) {
     EXPECT_EQ(content(), "a=" + std::string(5000, 'x') + '\n');
 }
 
+TEST_F(APropertyFile, GivesNothingAwayWhenItsGroupCannotBeKept) {
+    constexpr uid_t nobody = 65534;
+    if (::geteuid() != 0) {
+        GTEST_SKIP() << "needs to be root first, and nobody then";
+    }
+    write("a=1\n");
+    ASSERT_EQ(::chown(path().c_str(), 1, 2), 0);
+    fs::permissions(path(), fs::perms(0664));
+    ASSERT_EQ(::chown(folder_.c_str(), nobody, nobody), 0);
+    PropertyFile file(path());
+    file.setEntry(L"a", L"2");
+    ASSERT_EQ(::seteuid(nobody), 0);
+    // A folder that cannot be read, and so not be synchronised, and one that cannot be written.
+    fs::permissions(folder_, fs::perms(0300));
+    const int unreadable = failureOf([&] { file.save(); });
+    fs::permissions(folder_, fs::perms(0500));
+    const int unwritable = failureOf([&] { file.save(); });
+    fs::permissions(folder_, fs::perms(0700));
+    const std::string untouched = content();
+    const int none = failureOf([&] { file.save(); });
+    ASSERT_EQ(::seteuid(0), 0);
+    EXPECT_EQ(unreadable, EACCES);
+    EXPECT_EQ(unwritable, EACCES);
+    EXPECT_EQ(untouched, "a=1\n");
+    EXPECT_EQ(none, 0);
+    EXPECT_EQ(content(), "a=2\n");
+    EXPECT_EQ(fs::status(path()).permissions(), fs::perms(0604));
+    EXPECT_EQ(filesInFolder(), 1U);
+}
+
 TEST(ADerivedPropertyFile, TakesTheCallsMadeThroughItsBase) {
     struct Derived : PropertyFile {
         std::wstring getEntry(const std::wstring& key) override { return key + L"!"; }

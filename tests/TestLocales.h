@@ -6,6 +6,11 @@
 #include <gtest/gtest.h>
 #include <locale.h>
 
+// Before there are threads. TEST_LOCALES is the folder that make-locales has filled; LANGUAGE would have a
+// say in what language a localised text is in.
+inline const bool testLocalesAreFound =
+    ::setenv("LOCPATH", TEST_LOCALES, 1) == 0 && ::unsetenv("LANGUAGE") == 0;
+
 // The leak sanitizer's, where there is one.
 extern "C" void __lsan_disable() __attribute__((weak));
 extern "C" void __lsan_enable() __attribute__((weak));
@@ -15,7 +20,6 @@ extern "C" void __lsan_enable() __attribute__((weak));
 class ThreadLocale {
 public:
     explicit ThreadLocale(const char* name, int mask = LC_ALL_MASK) {
-        ::setenv("LOCPATH", TEST_LOCALES, 1); // TEST_LOCALES: the folder that make-locales has filled
         // The C library's newlocale loses the list that it makes of LOCPATH.
         if (__lsan_disable != nullptr) {
             __lsan_disable();
