@@ -3,9 +3,9 @@
  * TK::ProviderUtilities: what a CIM provider does with CMPI objects, without building CMPI's records by hand.
  *
  * - reading a request: its class (getClassId), its keys (transformObjectPathToMoniker, getKeyProperty), a
- * method's arguments (getProperty);
+ * method's arguments (getProperty), whether a user's text is acceptable (ValidateInput);
  * - writing a reply: createObjectPath, transformMonikerToObjectPath, createInstance, setProperty;
- * - asking the CIM server: areClassesRelated.
+ * - asking the CIM server (areClassesRelated) and the host (isKVM, getNLSText).
  *
  * **Threads.** Every operation may run on any number of threads at once, as far as CMPI lets the objects
  * passed in be used there. None takes a lock, keeps a state or waits.
@@ -14,7 +14,9 @@
  * request, as CMPI defines; texts, monikers and vectors belong to the caller. No pointer that is passed in is
  * kept.
  *
- * **Encoding.** Names and narrow texts are handed to the broker, and taken from it, byte by byte.
+ * **Encoding.** Names and narrow texts are handed to the broker, and taken from it, byte by byte. Wide texts
+ * are converted on the way, as TK::CUtility does it, by the character-type locale of the calling thread; in
+ * the "C" locale only ASCII converts.
  *
  * **Arguments.** Handles, names and output pointers have to be valid: a null one is not looked for unless an
  * operation says so.
@@ -143,6 +145,126 @@ public:
     static bool getProperty(const CMPIArgs* args, const char* name, unsigned short& out);
     static bool getProperty(const CMPIArgs* args, const char* name, unsigned int& out);
     static bool getProperty(const CMPIArgs* args, const char* name, bool& out);
+    /** @} */
+
+    /** @name Text properties, keys and arguments
+     * The setters drop the broker's status. The getters return false and leave `out` as it was when the
+     * broker reports an error, the value is NULL, or its characters cannot be read; they take the value for a
+     * CMPI string whatever type the broker reports.
+     *
+     * @param name the name of the property, key or argument.
+     * @throws std::bad_alloc
+     */
+    /** @{ */
+    /**
+     * Sets a text, or a date/time from a text.
+     * @param value the text; not changed.
+     * @param isDate true: `value` is a CIM date/time text, as TK::Utils::convertCIMDateTime writes it, and
+     * the property gets a date/time made of it (`CMPI_dateTime`). Traces that, and the text. When the broker
+     * refuses the text, the property stays as it was.
+     */
+    static void setProperty(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
+                            std::string& value, bool isDate);
+    /** Reads a text argument of a method. */
+    static bool getProperty(const CMPIArgs* args, const char* name, std::string& out);
+    /** Reads a text, or a date/time as a CIM date/time text. @param isDate whether it is a date/time. */
+    static bool getProperty(const CMPIInstance* instance, const char* name, std::string& out, bool isDate);
+    /** @} */
+
+    /** @name Wide texts
+     * As the narrow ones, with a conversion. When the locale cannot convert a text, these trace the message
+     * "Failed to convert the data to Multi byte", in either direction; then nothing is set, or false is
+     * returned and `out` is as it was. What the conversion itself traces comes before.
+     *
+     * @throws std::bad_alloc
+     */
+    /** @{ */
+    static bool getProperty(const CMPIArgs* args, const char* name, std::wstring& out);
+    static bool getProperty(const CMPIInstance* instance, const char* name, std::wstring& out);
+    static bool getKeyProperty(const CMPIObjectPath* objectPath, const char* name, std::wstring& out);
+    static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, const std::wstring& value);
+    static void setProperty(CMPIInstance* instance, const char* name, std::wstring& value);
+    /** @} */
+
+    /** @name Array properties
+     * The setters make an array (`CMPI_uint8A`, `CMPI_uint16A`, `CMPI_stringA`) and set the property to it;
+     * an empty vector, or an array that the broker refuses, leaves the property as it was. An element that
+     * the broker refuses ends the filling; the property then gets the array as far as it came. They do not
+     * change the vector. They trace the number of elements; the first three also trace entry and exit with
+     * the vector's address, which the one for `std::string` leaves out for the property "UserPassword".
+     *
+     * The getters **append** to `out`. They return false when the property is NULL or no array, or cannot be
+     * read; an element that cannot be read is left out. They look at no element's type or state, and do not
+     * trace.
+     *
+     * @throws std::bad_alloc what a getter has appended until then stays
+     */
+    /** @{ */
+    static void setProperty(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
+                            std::vector<unsigned char>& value);
+    static void setProperty(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
+                            std::vector<unsigned short>& value);
+    static void setProperty(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
+                            std::vector<std::string>& value);
+    /** A text that the locale cannot convert becomes an empty one. **Traces every text**, whatever the
+     * property. */
+    static void setProperty(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
+                            std::vector<std::wstring>& value);
+    static bool getProperty(const CMPIInstance* instance, const char* name, std::vector<unsigned short>& out);
+    static bool getProperty(const CMPIInstance* instance, const char* name, std::vector<std::string>& out);
+    /** @} */
+
+    /** @name Users' texts
+     */
+    /** @{ */
+    /**
+     * Whether a text that a user gave is acceptable: a screen against markup, web addresses, paths and shell
+     * characters. It is refused when it holds, in any case of letters, one of these:
+     *
+     *     <  http:  https:  %  $  \\  www.  wap.  ftp:  sftp:  :  \
+     *
+     * It is a screen and not a proof: what it accepts still has to be quoted for wherever it goes. Letters
+     * are folded by `tolower` (C) in the process's locale. Does not trace.
+     *
+     * @param text the text.
+     * @param exemption one of the above, exactly as written; neither it nor **any that stands behind it** is
+     * looked for. Any other text, the empty one too, exempts nothing.
+     * @throws std::bad_alloc
+     */
+    static bool ValidateInput(std::string text, std::string exemption);
+    /** The same for wide text; characters above U+00FF are not folded. */
+    static bool ValidateInput(std::wstring text, std::wstring exemption);
+
+    /** TK::CUtility::WStringToAString, which the empty text does not reach. Traces as that does. @throws
+     * std::bad_alloc
+     */
+    static bool ConvertWideCharToMultiByte(std::wstring in, std::string& out);
+    /** TK::CUtility::AStringToWString, which the empty text does not reach. Traces as that does. @throws
+     * std::bad_alloc
+     */
+    static bool ConvertMultiByteToWideChar(std::string in, std::wstring& out);
+    /** @} */
+
+    /** @name The host
+     * These do not trace.
+     */
+    /** @{ */
+    /**
+     * Whether this process may use kernel virtual machines (it may read "/dev/kvm") on a system without a CIM
+     * server of the agent's own at "/opt/oxa/vex/bin/cimserver". When it may not, writes "File cannot be
+     * found." to the standard output, without a line end.
+     */
+    static bool isKVM();
+
+    /**
+     * The localised text of a key, from the providers' resource library, in the language of the calling
+     * thread.
+     * @param key the text's key.
+     * @return the text in the multibyte encoding of `LC_CTYPE`; the key's own when there is none. It belongs
+     * to the library and is valid until the calling thread has asked for eight more, or ends.
+     * @throws std::bad_alloc, and what the locale library throws
+     */
+    static const char* getNLSText(std::wstring key);
     /** @} */
 
     /** @name Object paths and monikers

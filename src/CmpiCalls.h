@@ -50,6 +50,18 @@ inline bool classPathIsA(const CMPIBroker* broker, const CMPIObjectPath* path, c
     return CMClassPathIsA(writable(broker), writable(path), className, fresh(status)) != 0;
 }
 
+inline CMPIString* newString(const CMPIBroker* broker, const char* chars, CMPIStatus& status) {
+    return CMNewString(writable(broker), chars, fresh(status));
+}
+
+inline CMPIArray* newArray(const CMPIBroker* broker, CMPICount size, CMPIType type, CMPIStatus& status) {
+    return CMNewArray(writable(broker), size, type, fresh(status));
+}
+
+inline CMPIDateTime* newDateTime(const CMPIBroker* broker, const char* text, CMPIStatus& status) {
+    return CMNewDateTimeFromChars(writable(broker), text, fresh(status));
+}
+
 // On object paths.
 
 inline CMPIStatus add(CMPIObjectPath* path, const char* key, CMPIValue* value, CMPIType type) {
@@ -109,6 +121,30 @@ inline const char* readChars(const CMPIString* string) {
     CMPIStatus status;
     const char* const chars = getChars(string, status);
     return failed(status) ? nullptr : chars;
+}
+
+// On date/times.
+
+// The CIM date/time text; null for a null date/time, which no broker should hand out.
+inline const CMPIString* getText(const CMPIDateTime* dateTime, CMPIStatus& status) {
+    fresh(status);
+    return dateTime != nullptr ? CMGetStringFormat(writable(dateTime), &status) : nullptr;
+}
+
+// On arrays.
+
+// 0 for a null array, which no broker should hand out.
+inline CMPICount getCount(const CMPIArray* array, CMPIStatus& status) {
+    fresh(status);
+    return array != nullptr ? CMGetArrayCount(writable(array), &status) : 0;
+}
+
+inline CMPIData getElementAt(const CMPIArray* array, CMPICount index, CMPIStatus& status) {
+    return CMGetArrayElementAt(writable(array), index, fresh(status));
+}
+
+inline CMPIStatus setElementAt(CMPIArray* array, CMPICount index, CMPIValue* value, CMPIType type) {
+    return CMSetArrayElementAt(array, index, value, type);
 }
 
 } // namespace TK::cmpi

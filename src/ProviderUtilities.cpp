@@ -2,10 +2,21 @@
 
 #include "ClassTable.h"
 #include "CmpiCalls.h"
+#include "Locale.h"
+#include "ResourceString.h"
+#include "StringConversion.h"
 #include "Trace.h"
+#include "Utility.h"
 
 #include <algorithm>
+#include <array>
+#include <cctype>
 #include <cstddef>
+#include <cstring>
+#include <cwchar>
+#include <fstream>
+#include <iostream>
+#include <string_view>
 #include <strings.h>
 #include <utility>
 
@@ -77,6 +88,24 @@ bool get(const Object* object, const char* name, T& out) {
         return false;
     }
     out = static_cast<T>(data.value.*CmpiType<T>::member);
+    return true;
+}
+
+// The characters of a text value, null when there are none to read.
+template <class Object>
+const char* readText(const Object* object, const char* name) {
+    CMPIData data;
+    return read(object, name, data) ? cmpi::readChars(data.value.string) : nullptr;
+}
+
+// A getter of a text.
+template <class Object>
+bool getText(const Object* object, const char* name, std::string& out) {
+    const char* const chars = readText(object, name);
+    if (chars == nullptr) {
+        return false;
+    }
+    out = chars;
     return true;
 }
 
@@ -214,16 +243,7 @@ bool ProviderUtilities::getKeyProperty(const CMPIObjectPath* objectPath, const c
 }
 
 bool ProviderUtilities::getKeyProperty(const CMPIObjectPath* objectPath, const char* name, std::string& out) {
-    CMPIData data;
-    if (!read(objectPath, name, data)) {
-        return false;
-    }
-    const char* const chars = cmpi::readChars(data.value.string);
-    if (chars == nullptr) {
-        return false;
-    }
-    out = chars;
-    return true;
+    return getText(objectPath, name, out);
 }
 
 bool ProviderUtilities::getProperty(const CMPIInstance* instance, const char* name, unsigned short& out) {
@@ -252,6 +272,379 @@ bool ProviderUtilities::getProperty(const CMPIArgs* args, const char* name, unsi
 
 bool ProviderUtilities::getProperty(const CMPIArgs* args, const char* name, bool& out) {
     return get(args, name, out);
+}
+
+// Text properties, keys and arguments
+
+void ProviderUtilities::setProperty(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
+                                    std::string& value, bool isDate) {
+    if (!isDate) {
+        set(instance, name, value.c_str());
+        return;
+    }
+    TK_TRACE_VARIABLE(loggerProviderUtilities, "isDate", isDate);
+    TK_TRACE_VARIABLE(loggerProviderUtilities, "Date", value);
+    CMPIStatus status;
+    CMPIValue date = {};
+    date.dateTime = cmpi::newDateTime(broker, value.c_str(), status);
+    if (!cmpi::failed(status) && date.dateTime != nullptr) {
+        cmpi::add(instance, name, &date, CMPI_dateTime);
+    }
+}
+
+bool ProviderUtilities::getProperty(const CMPIArgs* args, const char* name, std::string& out) {
+    CMPIData data;
+    if (!read(args, name, data)) {
+        return false;
+    }
+    // The characters alone decide here: some brokers report a status with a text that can be read.
+    CMPIStatus status;
+    const char* const chars = cmpi::getChars(data.value.string, status);
+    if (chars == nullptr) {
+        return false;
+    }
+    out = chars;
+    return true;
+}
+
+bool ProviderUtilities::getProperty(const CMPIInstance* instance, const char* name, std::string& out,
+                                    bool isDate) {
+    if (!isDate) {
+        return getText(instance, name, out);
+    }
+    CMPIData data;
+    if (!read(instance, name, data)) {
+        return false;
+    }
+    CMPIStatus status;
+    const char* const chars = cmpi::readChars(cmpi::getText(data.value.dateTime, status));
+    if (chars == nullptr) {
+        return false;
+    }
+    out = chars;
+    return true;
+}
+
+// Wide texts
+
+static const char* const conversionFailed = "Failed to convert the data to Multi byte";
+
+bool ProviderUtilities::getProperty(const CMPIArgs* args, const char* name, std::wstring& out) {
+    const char* const chars = readText(args, name);
+    if (chars == nullptr) {
+        return false;
+    }
+    std::wstring converted;
+    if (!ConvertMultiByteToWideChar(chars, converted)) {
+        TK_TRACE_MESSAGE(loggerProviderUtilities, conversionFailed);
+        return false;
+    }
+    out.swap(converted);
+    return true;
+}
+
+bool ProviderUtilities::getProperty(const CMPIInstance* instance, const char* name, std::wstring& out) {
+    const char* const chars = readText(instance, name);
+    if (chars == nullptr) {
+        return false;
+    }
+    std::wstring converted;
+    if (!ConvertMultiByteToWideChar(chars, converted)) {
+        TK_TRACE_MESSAGE(loggerProviderUtilities, conversionFailed);
+        return false;
+    }
+    out.swap(converted);
+    return true;
+}
+
+bool ProviderUtilities::getKeyProperty(const CMPIObjectPath* objectPath, const char* name,
+                                       std::wstring& out) {
+    const char* const chars = readText(objectPath, name);
+    if (chars == nullptr) {
+        return false;
+    }
+    std::wstring converted;
+    if (!ConvertMultiByteToWideChar(chars, converted)) {
+        TK_TRACE_MESSAGE(loggerProviderUtilities, conversionFailed);
+        return false;
+    }
+    out.swap(converted);
+    return true;
+}
+
+void ProviderUtilities::setKeyProperty(CMPIObjectPath* objectPath, const char* name,
+                                       const std::wstring& value) {
+    std::string converted;
+    if (!ConvertWideCharToMultiByte(value, converted)) {
+        TK_TRACE_MESSAGE(loggerProviderUtilities, conversionFailed);
+        return;
+    }
+    set(objectPath, name, converted.c_str());
+}
+
+void ProviderUtilities::setProperty(CMPIInstance* instance, const char* name, std::wstring& value) {
+    std::string converted;
+    if (!ConvertWideCharToMultiByte(value, converted)) {
+        TK_TRACE_MESSAGE(loggerProviderUtilities, conversionFailed);
+        return;
+    }
+    set(instance, name, converted.c_str());
+}
+
+// Array properties
+
+namespace {
+
+// An array on its way into a property: filled element by element, until the broker refuses one.
+class ArrayFilling {
+public:
+    // An empty array is not made at all.
+    ArrayFilling(const CMPIBroker* broker, std::size_t size, CMPIType elementType)
+        : broker_(broker), size_(static_cast<CMPICount>(size)), elementType_(elementType) {
+        if (size_ != 0) {
+            CMPIArray* const array = cmpi::newArray(broker, size_, elementType, status_);
+            array_ = cmpi::failed(status_) ? nullptr : array;
+        }
+    }
+
+    // Whether there is an element to put next, and where.
+    bool wantsMore() const { return array_ != nullptr && next_ < size_ && !refused_; }
+    CMPICount next() const { return next_; }
+
+    template <class Number>
+    void put(Number number) {
+        CMPIValue value = {};
+        value.*CmpiType<Number>::member = number;
+        putValue(value);
+    }
+
+    // A string that the broker does not make ends the filling like an element that it does not take.
+    CMPIString* newString(const std::string& text) {
+        CMPIString* const string = cmpi::newString(broker_, text.c_str(), status_);
+        return cmpi::failed(status_) ? nullptr : string;
+    }
+    void put(CMPIString* string) {
+        refused_ = string == nullptr;
+        if (!refused_) {
+            CMPIValue value = {};
+            value.string = string;
+            putValue(value);
+        }
+    }
+    void put(const std::string& text) { put(newString(text)); }
+
+    // Sets the property, also when the filling ended early; not when there is no array.
+    void finish(CMPIInstance* instance, const char* name) {
+        if (array_ != nullptr) {
+            CMPIValue value = {};
+            value.array = array_;
+            cmpi::add(instance, name, &value, static_cast<CMPIType>(elementType_ | CMPI_ARRAY));
+        }
+    }
+
+private:
+    void putValue(CMPIValue& value) {
+        status_ = cmpi::setElementAt(array_, next_++, &value, elementType_);
+        refused_ = cmpi::failed(status_);
+    }
+
+    const CMPIBroker* broker_;
+    CMPICount size_;
+    CMPIType elementType_;
+    CMPIStatus status_{};
+    CMPIArray* array_ = nullptr;
+    CMPICount next_ = 0;
+    bool refused_ = false;
+};
+
+template <class Element>
+void setArray(const CMPIBroker* broker, CMPIInstance* instance, const char* name, CMPIType elementType,
+              const std::vector<Element>& elements) {
+    ArrayFilling filling(broker, elements.size(), elementType);
+    while (filling.wantsMore()) {
+        filling.put(elements[filling.next()]);
+    }
+    filling.finish(instance, name);
+}
+
+// Reads an array property's elements one by one; `append` gets each that the broker could read. The data
+// alone says whether there is an array: the status is the broker's affair.
+template <class Append>
+bool getArray(const CMPIInstance* instance, const char* name, const Append& append) {
+    CMPIStatus status;
+    const CMPIData data = cmpi::get(instance, name, status);
+    if (cmpi::isNull(data) || (data.type & CMPI_ARRAY) == 0) {
+        return false;
+    }
+    const CMPICount count = cmpi::getCount(data.value.array, status);
+    for (CMPICount i = 0; i < count; ++i) {
+        const CMPIData element = cmpi::getElementAt(data.value.array, i, status);
+        if (!cmpi::failed(status)) {
+            append(element.value);
+        }
+    }
+    return true;
+}
+
+} // namespace
+
+void ProviderUtilities::setProperty(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
+                                    std::vector<unsigned char>& value) {
+    TK_TRACE_ENTERING_PARAMETERS(loggerProviderUtilities, " broker=" << broker << " instance=" << instance
+                                                                     << " name=" << name
+                                                                     << " value=" << &value);
+    TK_TRACE_VARIABLE(loggerProviderUtilities, "count", value.size());
+    setArray(broker, instance, name, CMPI_uint8, value);
+    TK_TRACE_EXITING_PARAMETERS(loggerProviderUtilities, " broker=" << broker << " instance=" << instance
+                                                                    << " name=" << name
+                                                                    << " value=" << &value);
+}
+
+void ProviderUtilities::setProperty(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
+                                    std::vector<unsigned short>& value) {
+    TK_TRACE_ENTERING_PARAMETERS(loggerProviderUtilities, " broker=" << broker << " instance=" << instance
+                                                                     << " name=" << name
+                                                                     << " value=" << &value);
+    TK_TRACE_VARIABLE(loggerProviderUtilities, "count", value.size());
+    setArray(broker, instance, name, CMPI_uint16, value);
+    TK_TRACE_EXITING_PARAMETERS(loggerProviderUtilities, " broker=" << broker << " instance=" << instance
+                                                                    << " name=" << name
+                                                                    << " value=" << &value);
+}
+
+void ProviderUtilities::setProperty(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
+                                    std::vector<std::string>& value) {
+    // Not even where a password lies is anybody's business.
+    const bool isSecret = name != nullptr && std::strcmp(name, "UserPassword") == 0;
+    if (isSecret) {
+        TK_TRACE_ENTERING_PARAMETERS(loggerProviderUtilities,
+                                     " broker=" << broker << " instance=" << instance << " name=" << name);
+    } else {
+        TK_TRACE_ENTERING_PARAMETERS(loggerProviderUtilities, " broker=" << broker << " instance=" << instance
+                                                                         << " name=" << name
+                                                                         << " value=" << &value);
+    }
+    TK_TRACE_VARIABLE(loggerProviderUtilities, "count", value.size());
+    setArray(broker, instance, name, CMPI_string, value);
+    if (isSecret) {
+        TK_TRACE_EXITING_PARAMETERS(loggerProviderUtilities,
+                                    " broker=" << broker << " instance=" << instance << " name=" << name);
+    } else {
+        TK_TRACE_EXITING_PARAMETERS(loggerProviderUtilities, " broker=" << broker << " instance=" << instance
+                                                                        << " name=" << name
+                                                                        << " value=" << &value);
+    }
+}
+
+void ProviderUtilities::setProperty(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
+                                    std::vector<std::wstring>& value) {
+    TK_TRACE_VARIABLE(loggerProviderUtilities, "count", value.size());
+    ArrayFilling filling(broker, value.size(), CMPI_string);
+    while (filling.wantsMore()) {
+        std::string strTarget;
+        CUtility::WStringToAString(value[filling.next()], strTarget); // failed: the empty text
+        CMPIString* const string = filling.newString(strTarget);
+        TK_TRACE_VARIABLE(loggerProviderUtilities, "strTarget", strTarget);
+        filling.put(string);
+    }
+    filling.finish(instance, name);
+}
+
+bool ProviderUtilities::getProperty(const CMPIInstance* instance, const char* name,
+                                    std::vector<unsigned short>& out) {
+    return getArray(instance, name, [&out](const CMPIValue& value) { out.push_back(value.uint16); });
+}
+
+bool ProviderUtilities::getProperty(const CMPIInstance* instance, const char* name,
+                                    std::vector<std::string>& out) {
+    return getArray(instance, name, [&out](const CMPIValue& value) {
+        const char* const chars = cmpi::readChars(value.string);
+        if (chars != nullptr) {
+            out.emplace_back(chars);
+        }
+    });
+}
+
+// Users' texts
+
+namespace {
+
+// What a user's text must not hold. The order matters to exemptions alone.
+constexpr std::array<std::string_view, 12> denied = {"<",    "http:", "https:", "%",     "$", "\\\\",
+                                                     "www.", "wap.",  "ftp:",   "sftp:", ":", "\\"};
+constexpr std::array<std::wstring_view, 12> wideDenied = {
+    L"<", L"http:", L"https:", L"%", L"$", L"\\\\", L"www.", L"wap.", L"ftp:", L"sftp:", L":", L"\\"};
+
+char lowerCase(char c) {
+    return static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
+}
+
+// Of wide characters, those that tolower may be asked about.
+wchar_t lowerCase(wchar_t c) {
+    const auto code = static_cast<unsigned long>(c);
+    return code <= 0xFF ? static_cast<wchar_t>(std::tolower(static_cast<int>(code))) : c;
+}
+
+template <class Char, std::size_t size>
+bool isAcceptable(std::basic_string<Char>& text, const std::basic_string<Char>& exemption,
+                  const std::array<std::basic_string_view<Char>, size>& entries) {
+    std::transform(text.begin(), text.end(), text.begin(), [](Char c) { return lowerCase(c); });
+    const auto end = std::find(entries.begin(), entries.end(), exemption);
+    return std::none_of(entries.begin(), end, [&text](std::basic_string_view<Char> entry) {
+        return text.find(entry) != std::basic_string<Char>::npos;
+    });
+}
+
+} // namespace
+
+bool ProviderUtilities::ValidateInput(std::string text, std::string exemption) {
+    return isAcceptable(text, exemption, denied);
+}
+
+bool ProviderUtilities::ValidateInput(std::wstring text, std::wstring exemption) {
+    return isAcceptable(text, exemption, wideDenied);
+}
+
+bool ProviderUtilities::ConvertWideCharToMultiByte(std::wstring in, std::string& out) {
+    if (in.empty()) {
+        out.clear();
+        return true;
+    }
+    return CUtility::WStringToAString(std::move(in), out);
+}
+
+bool ProviderUtilities::ConvertMultiByteToWideChar(std::string in, std::wstring& out) {
+    if (in.empty()) {
+        out.clear();
+        return true;
+    }
+    return CUtility::AStringToWString(std::move(in), out);
+}
+
+// The host
+
+bool ProviderUtilities::isKVM() {
+    const std::ifstream device("/dev/kvm");
+    if (!device) {
+        std::cout << "File cannot be found.";
+        return false;
+    }
+    const std::ifstream server("/opt/oxa/vex/bin/cimserver");
+    return !server;
+}
+
+const char* ProviderUtilities::getNLSText(std::wstring key) {
+    constexpr unsigned long providersTexts = 2;
+    const std::string language = Locale::getLanguageId();
+    const std::wstring library = Locale::getResourceLibrary(providersTexts, language);
+    const std::wstring text = ResourceString(library, key);
+    // A few results stay valid, so that several can stand in one expression.
+    static thread_local std::array<std::string, 8> results;
+    static thread_local std::size_t latest = 0;
+    std::string result = make_string(text);
+    latest = (latest + 1) % results.size();
+    results[latest].swap(result);
+    return results[latest].c_str();
 }
 
 // Object paths and monikers
