@@ -2,10 +2,8 @@
 #include "ResourceString.h"
 #include "TestLocales.h"
 
-#include <fstream>
 #include <future>
 #include <string>
-#include <thread>
 
 using TK::Locale;
 using TK::ResourceString;
