@@ -386,6 +386,32 @@ TEST(Hosting, LoadsAndUnloadsLibraries) {
     EXPECT_EQ(errorOf([&] { broker.host("Empty", {}); }), "provider Empty has no factory");
 }
 
+TEST(Hosting, ServesAProviderThatIsWrittenInC) {
+    EmbeddedBroker broker;
+    broker.load(C_PROVIDER, "CProvider");
+    Request request(broker);
+    CMPIObjectPath* const path = request.objectPathFromText("root:Demo.Key=\"text\",Number=7", "");
+    const std::vector<std::string> properties = {"Array", "Date"};
+    const Reply all = request.enumerateInstances(path, &properties);
+    ASSERT_EQ(all.instances.size(), 1U) << oxahv::codeName(all.code);
+    EXPECT_EQ(oxahv::pathText(CMGetObjectPath(all.instances[0], nullptr)), oxahv::pathText(path));
+    EXPECT_EQ(oxahv::valueText(CMGetProperty(all.instances[0], "Array", nullptr)), "{7}");
+    EXPECT_EQ(oxahv::valueText(CMGetProperty(all.instances[0], "Date", nullptr)),
+              "\"20240229120000.000000+000\"");
+    EXPECT_TRUE(CMIsNullValue(CMGetProperty(all.instances[0], "Text", nullptr))) << "not asked for";
+
+    const Reply associates = request.associators(path, {"", "demo", "Role", ""});
+    EXPECT_EQ(oxahv::valueText(CMGetProperty(associates.instances.at(0), "Text", nullptr)), "\"Role\"");
+    EXPECT_TRUE(request.associators(path, {"", "Other", "", ""}).instances.empty());
+
+    CMPIArgs* const in = CMNewArgs(broker.handle(), nullptr);
+    CMAddArg(in, "In", "value", CMPI_chars);
+    const Reply method = request.invokeMethod(path, "Name", in);
+    EXPECT_EQ(oxahv::valueText(method.data.at(0)), "\"root\"");
+    EXPECT_EQ(oxahv::valueText(CMGetArg(method.out, "In", nullptr)), "\"value\"");
+    EXPECT_EQ(oxahv::valueText(CMGetArg(method.out, "Method", nullptr)), "\"Name\"");
+}
+
 TEST(Hosting, DeclaresClassesOnce) {
     EmbeddedBroker broker;
     broker.declare(ClassDeclaration("A").key("K", CMPI_uint8).property("P", CMPI_string));
