@@ -229,7 +229,8 @@ public:
      */
     void load(const std::string& file, const std::string& name, std::vector<std::string> classes = {});
     /**
-     * Calls the provider's `cleanup`, waits for requests that are inside it, and unloads its library.
+     * Calls the provider's `cleanup`, waits for requests that are inside it, and unloads its library. Not to
+     * be called from a request that is inside it.
      * @throws BrokerError when no such provider is hosted.
      */
     void unload(const std::string& name);
@@ -257,7 +258,8 @@ public:
     /** Counts of the objects that are alive now. */
     LiveObjects liveObjects() const;
     /** Receives what providers write through the `logMessage` and `trace` slots; null: dropped. Called on
-     * their thread. */
+     * their threads, by several at once; the earlier handler is called no more when this returns. A handler
+     * must not set another. */
     void setMessageHandler(std::function<void(const BrokerMessage&)> handler);
     /** @} */
 

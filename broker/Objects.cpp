@@ -157,9 +157,13 @@ std::unique_ptr<Object> Owner::release(Object& object) {
 }
 
 void Owner::freeSince(const Object& mark) {
+    Owner doomed(core_); // frees outside the lock
+    const std::lock_guard<std::mutex> lock(mutex_);
     for (bool reached = false; !reached && newest_ != nullptr;) {
-        reached = newest_ == &mark;
-        release(*newest_);
+        Object& object = *newest_;
+        reached = &object == &mark;
+        unlink(object);
+        doomed.adopt(std::unique_ptr<Object>(&object));
     }
 }
 

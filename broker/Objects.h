@@ -84,6 +84,18 @@ public:
     void leave();
     static Owner& current(Core& core);
 
+    // Makes an owner the innermost one of the thread while it lives.
+    class Scope {
+    public:
+        explicit Scope(Owner& owner) : owner_(owner) { owner_.enter(); }
+        ~Scope() { owner_.leave(); }
+        Scope(const Scope&) = delete;
+        Scope& operator=(const Scope&) = delete;
+
+    private:
+        Owner& owner_;
+    };
+
 private:
     void unlink(Object& object);
 
@@ -264,9 +276,11 @@ class Result : public RecordedObject<CMPIResult, Kind::result, Result> {
 public:
     static const CMPIResultFT table;
 
-    explicit Result(Core& core) : RecordedObject(core) {}
+    Result(Core& core, Owner& itsKeeper) : RecordedObject(core), keeper(itsKeeper) {}
     std::unique_ptr<Object> clone() const override { throw Failure{CMPI_RC_ERR_NOT_SUPPORTED}; }
 
+    // Owns what is returned: the provider may return it on a thread whose own objects die before the request.
+    Owner& keeper;
     Reply reply;
 };
 

@@ -222,7 +222,7 @@ template <class Class>
 auto cloneObject(const Class& object) {
     std::unique_ptr<Object> copy = object.clone();
     auto& result = static_cast<Class&>(*copy);
-    object.core().owner.adopt(std::move(copy));
+    object.core().clones.adopt(std::move(copy));
     return &result;
 }
 

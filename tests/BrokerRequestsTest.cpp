@@ -362,6 +362,23 @@ TEST_F(ARequest, CanBeLeftToAThreadThatIsAttached) {
     }).join();
 }
 
+TEST_F(ARequest, KeepsWhatAnAttachedThreadReturns) {
+    behaviour.serve = [](const CMPIContext* context, const CMPIResult* result, const CMPIObjectPath* p) {
+        const CMPIBroker* const broker = behaviour.broker;
+        CMPIContext* const prepared = broker->bft->prepareAttachThread(broker, context);
+        std::thread([&] {
+            broker->bft->attachThread(broker, prepared);
+            CMReturnInstance(result, CMNewInstance(broker, p, nullptr));
+            CMReturnData(result, "text", CMPI_chars);
+            broker->bft->detachThread(broker, prepared);
+        }).join();
+        return CMRelease(prepared);
+    };
+    const Reply reply = request_.getInstance(path("Demo.K=1"));
+    EXPECT_EQ(oxahv::pathText(CMGetObjectPath(reply.instances.at(0), nullptr)), "root:Demo.K=1");
+    EXPECT_EQ(oxahv::valueText(reply.data.at(0)), "\"text\"");
+}
+
 TEST(Hosting, LoadsAndUnloadsLibraries) {
     EmbeddedBroker broker;
     broker.load(TEST_PROVIDER, "TestProvider");
@@ -410,6 +427,49 @@ TEST(Hosting, ServesAProviderThatIsWrittenInC) {
     EXPECT_EQ(oxahv::valueText(method.data.at(0)), "\"root\"");
     EXPECT_EQ(oxahv::valueText(CMGetArg(method.out, "In", nullptr)), "\"value\"");
     EXPECT_EQ(oxahv::valueText(CMGetArg(method.out, "Method", nullptr)), "\"Name\"");
+}
+
+namespace {
+
+// A provider whose MI has no function but cleanup, which sends a request to the provider "Tested".
+CMPIStatus endWithARequest(CMPIInstanceMI* /*mi*/, const CMPIContext* context, CMPIBoolean /*isEnding*/) {
+    const CMPIBroker* const broker = behaviour.broker;
+    CMPIStatus status = ok();
+    const CMPIObjectPath* const path = CMNewObjectPath(broker, "root", "Other", nullptr);
+    CMPIEnumeration* const names = broker->bft->enumerateInstanceNames(broker, context, path, &status);
+    behaviour.filters.push_back(oxahv::codeName(status.rc));
+    EXPECT_TRUE(status.rc != CMPI_RC_OK || CMHasNext(names, nullptr) != 0);
+    return ok();
+}
+
+CMPIInstanceMI* createEmpty(const CMPIBroker* broker, const CMPIContext* /*context*/,
+                            CMPIStatus* /*status*/) {
+    static CMPIInstanceMIFT table = {};
+    static CMPIInstanceMI mi = {nullptr, &table};
+    table.cleanup = endWithARequest;
+    behaviour.broker = broker;
+    return &mi;
+}
+
+} // namespace
+
+TEST(Hosting, LetsAProviderSendRequestsWhileItEnds) {
+    behaviour.serve = echo;
+    behaviour.filters.clear();
+    {
+        EmbeddedBroker broker;
+        broker.host("Empty", {createEmpty}, {"Empty"});
+        broker.host("Tested", {Tested_Create_InstanceMI}, {"Other"});
+        Request request(broker);
+        EXPECT_EQ(request.getInstance(request.objectPath("root", "Empty")).code, CMPI_RC_ERR_NOT_SUPPORTED)
+            << "the slot is empty";
+        broker.unload("Empty");
+        broker.host("Empty", {createEmpty}, {"Empty"});
+        broker.unload("Tested");
+        broker.host("Tested", {Tested_Create_InstanceMI}, {"Other"});
+    }
+    EXPECT_EQ(behaviour.filters, std::vector<std::string>(2, "CMPI_RC_OK"));
+    EXPECT_EQ(behaviour.alive, 0);
 }
 
 TEST(Hosting, DeclaresClassesOnce) {
