@@ -77,6 +77,18 @@ bool areFields(std::string_view text, const std::array<Field, count>& fields) {
     return true;
 }
 
+int daysOfMonth(int year, int month) {
+    const bool isLeapYear = year % 4 == 0 && (year % 100 != 0 || year % 400 == 0);
+    constexpr std::array<int, 12> days = {31, 28, 31, 30, 31, 30, 31, 31, 30, 31, 30, 31};
+    return month == 2 && isLeapYear ? 29 : days.at(static_cast<std::size_t>(month - 1));
+}
+
+// Whether the fields, each in its own range, name a day that its month has.
+bool isDayOfItsMonth(std::string_view text) {
+    const auto& f = timestampFields;
+    return valueOf(text, f[2]) <= daysOfMonth(valueOf(text, f[0]), valueOf(text, f[1]));
+}
+
 // Days since 1970-01-01 of a date in the Gregorian calendar, which repeats itself every 400 years.
 std::int64_t daysSinceEpoch(int year, int month, int dayOfMonth) {
     const std::int64_t y = year - (month <= 2 ? 1 : 0);
@@ -130,7 +142,8 @@ bool isDateTimeText(std::string_view text) {
         return offset == "000" && areFields(text, intervalFields);
     }
     return (text[signPosition] == '+' || text[signPosition] == '-') &&
-           (isDigits(offset) || isAsterisks(offset)) && areFields(text, timestampFields);
+           (isDigits(offset) || isAsterisks(offset)) && areFields(text, timestampFields) &&
+           isDayOfItsMonth(text);
 }
 
 std::uint64_t binaryOf(std::string_view text) {
