@@ -3,6 +3,7 @@
 
 #include "EmbeddedBroker.h"
 
+#include <algorithm>
 #include <atomic>
 #include <memory>
 #include <mutex>
@@ -109,6 +110,9 @@ private:
 // `CMPI_chars` the pointer itself.
 CMPIValue memberOf(const CMPIValue* value, CMPIType type);
 
+// The type under which values of a type are stored: texts are CMPI_string, their arrays CMPI_stringA.
+CMPIType storedType(CMPIType type);
+
 // A CMPI value that owns its text or object.
 class Value {
 public:
@@ -133,6 +137,9 @@ public:
     CMPIData data(CMPIValueState state = CMPI_goodValue) const;
     // A text as `CMPI_chars`, or as `CMPI_string` again.
     void retype(CMPIType type) { type_ = type; }
+    // A key, which may have come as the KeyMode has it, as a property of a type: a text as `CMPI_string`, an
+    // integer of the widest type as the narrower one where it fits.
+    Value asProperty(CMPIType declared) const;
 
 private:
     CMPIType type_ = CMPI_null;
@@ -154,6 +161,13 @@ public:
     std::size_t size() const { return values_.size(); }
     // Throws CMPI_RC_ERR_NOT_FOUND for an index out of range.
     const NamedValue& at(std::size_t index) const;
+    // Removes the others. `isKept` takes a name.
+    template <class Predicate>
+    void keepOnly(const Predicate& isKept) {
+        const auto end = std::remove_if(values_.begin(), values_.end(),
+                                        [&](const NamedValue& named) { return !isKept(named.name); });
+        values_.erase(end, values_.end());
+    }
     auto begin() const { return values_.begin(); }
     auto end() const { return values_.end(); }
     auto begin() { return values_.begin(); }
@@ -195,6 +209,8 @@ public:
 
     Array(Core& core, CMPIType type, std::size_t size);
     std::unique_ptr<Object> clone() const override;
+    // The type of a value that holds this array.
+    CMPIType type() const { return static_cast<CMPIType>(elementType | CMPI_ARRAY); }
 
     CMPIType elementType;
     std::vector<Value> elements;
@@ -264,6 +280,8 @@ public:
     Instance(Core& core, std::unique_ptr<ObjectPath> itsPath)
         : RecordedObject(core), path(std::move(itsPath)) {}
     std::unique_ptr<Object> clone() const override;
+    // Sets the properties that are a path's keys, with their declared types.
+    void setKeysOf(const ObjectPath& source);
 
     std::unique_ptr<ObjectPath> path;
     NamedValues properties;

@@ -160,6 +160,14 @@ TEST_F(ABroker, LetsOnlyKeysAndWantedPropertiesThroughAFilter) {
     CMSetProperty(instance, "Id", "y", CMPI_chars);
     EXPECT_EQ(CMGetPropertyCount(instance, nullptr), 2U);
     EXPECT_EQ(oxahv::pathText(CMGetObjectPath(instance, nullptr)), "root:Demo.Id=\"y\"");
+    const char* keys[] = {"NewKey", nullptr};
+    CMSetPropertyFilter(instance, wanted, keys);
+    CMSetProperty(instance, "newkey", "k", CMPI_chars);
+    EXPECT_EQ(CMGetPropertyCount(instance, nullptr), 3U);
+
+    CMAddKey(path, "Id", "z", CMPI_chars);
+    EXPECT_EQ(instance->ft->setObjectPath(instance, path).rc, CMPI_RC_OK);
+    EXPECT_EQ(oxahv::pathText(CMGetObjectPath(instance, nullptr)), "root:Demo.Id=\"z\"");
 }
 
 TEST_F(ABroker, HoldsArraysOfEveryTypeWithNullElements) {
@@ -199,6 +207,18 @@ TEST_F(ABroker, HoldsArraysOfEveryTypeWithNullElements) {
     EXPECT_EQ(CMSetArrayElementAt(texts, 0, "chars", CMPI_chars).rc, CMPI_RC_OK);
     EXPECT_EQ(oxahv::valueText(CMGetArrayElementAt(texts, 0, nullptr)), "\"chars\"");
     EXPECT_EQ(CMNewArray(handle_, 1, CMPI_uint8A, nullptr), nullptr);
+
+    broker_.declare(
+        ClassDeclaration("Typed").property("Texts", CMPI_stringA).property("Numbers", CMPI_uint16A));
+    CMPIInstance* const typed = CMNewInstance(handle_, request_.objectPath("root", "Typed"), nullptr);
+    CMPIValue whole = {};
+    whole.array = CMNewArray(handle_, 1, CMPI_chars, nullptr);
+    EXPECT_EQ(CMSetProperty(typed, "Texts", &whole, CMPI_charsA).rc, CMPI_RC_OK);
+    EXPECT_EQ(CMSetProperty(typed, "Texts", nullptr, CMPI_charsA).rc, CMPI_RC_OK);
+    EXPECT_EQ(CMGetProperty(typed, "Texts", nullptr).type, CMPI_stringA);
+    whole.array = CMNewArray(handle_, 1, CMPI_uint8, nullptr);
+    EXPECT_EQ(CMSetProperty(typed, "Numbers", &whole, CMPI_uint16A).rc, CMPI_RC_ERR_TYPE_MISMATCH)
+        << "the array's own type counts";
 }
 
 TEST_F(ABroker, ReadsAndWritesDatesAndIntervals) {
@@ -309,9 +329,9 @@ TEST_F(ABroker, TellsAboutObjectsAndMakesMessages) {
     EXPECT_NE(handle_->eft->isOfType(handle_, string("x"), "CMPIString", nullptr), 0);
     EXPECT_EQ(textOf(handle_->eft->toString(handle_, path, nullptr)), "root:Demo");
     CMPIString* const message =
-        handle_->eft->getMessage(handle_, "id", "{0} of {1}: {2}", nullptr, 3, CMPI_chars, "port",
+        handle_->eft->getMessage(handle_, "id", "{0} of {1}: {2} {0} {3} {", nullptr, 3, CMPI_chars, "{1}",
                                  CMPI_uint32, 7U, CMPI_string, string("down"));
-    EXPECT_EQ(textOf(message), "port of 7: down");
+    EXPECT_EQ(textOf(message), "{1} of 7: down {1} {3} {");
     const CMPIError* const error = handle_->eft->newCMPIError(
         handle_, "owner", "id", "message", ErrorSevHigh, ErrorProbCauseOther, CMPI_RC_ERR_FAILED, nullptr);
     error->ft->setErrorSource(error, "source");
@@ -328,6 +348,8 @@ TEST_F(ABroker, TellsAboutObjectsAndMakesMessages) {
     handle_->eft->logMessage(handle_, CMPI_SEV_ERROR, "id", nullptr, string("text"));
     handle_->eft->trace(handle_, CMPI_LEV_INFO, "component", "trace", nullptr);
     EXPECT_EQ(seen, std::vector<std::string>({"id|text", "component|trace"}));
+    broker_.setMessageHandler([](const oxahv::BrokerMessage&) { throw std::runtime_error("handler"); });
+    EXPECT_EQ(handle_->eft->trace(handle_, CMPI_LEV_INFO, nullptr, "trace", nullptr).rc, CMPI_RC_ERR_FAILED);
 }
 
 TEST_F(ABroker, LendsTheOperatingSystemsThreadsAndMemory) {

@@ -228,6 +228,11 @@ TEST_F(ARequest, DeliversKeysAsTheModeSays) {
         std::vector<CMPIType> types;
         behaviour.serve = [&](const CMPIContext*, const CMPIResult*, const CMPIObjectPath* p) {
             EXPECT_EQ(oxahv::pathText(p), text);
+            const CMPIInstance* const instance = CMNewInstance(behaviour.broker, p, nullptr);
+            EXPECT_EQ(CMGetProperty(instance, "U", nullptr).type, CMPI_uint8) << "as it is declared";
+            EXPECT_EQ(oxahv::valueText(CMGetProperty(instance, "S", nullptr)), "-5");
+            EXPECT_EQ(CMGetProperty(instance, "S", nullptr).type, CMPI_sint16);
+            EXPECT_EQ(CMGetProperty(instance, "T", nullptr).type, CMPI_string);
             for (CMPICount i = 0; i < CMGetKeyCount(p, nullptr); ++i) {
                 types.push_back(CMGetKeyAt(p, i, nullptr, nullptr).type);
             }
@@ -286,6 +291,14 @@ TEST_F(ARequest, MeetsTheFaultsThatAreInjected) {
     EXPECT_EQ(CMNewString(broker_.handle(), "x", &status), nullptr);
     EXPECT_EQ(status.rc, CMPI_RC_OK);
     EXPECT_NE(CMNewString(broker_.handle(), "x", &status), nullptr);
+    broker_.injectFault("getKey", {CMPI_RC_OK, true, CMPI_badValue});
+    CMPIData key = CMGetKey(demo, "A", &status);
+    EXPECT_EQ(key.state, CMPI_keyValue | CMPI_badValue);
+    EXPECT_TRUE(key.type == CMPI_uint64 && key.value.uint64 == 0 && status.rc == CMPI_RC_OK);
+    broker_.injectFault("getKey", {CMPI_RC_ERR_FAILED, false, CMPI_badValue});
+    key = CMGetKey(demo, "A", &status);
+    EXPECT_EQ(key.state, CMPI_nullValue | CMPI_badValue);
+    EXPECT_EQ(status.rc, CMPI_RC_ERR_FAILED);
     broker_.injectFault("CMPIObjectPathFT.addKey", {});
     EXPECT_EQ(CMAddKey(demo, "C", "x", CMPI_chars).rc, CMPI_RC_ERR_FAILED);
     EXPECT_EQ(CMGetKeyCount(demo, nullptr), 2U) << "a call that fails does nothing";
