@@ -43,8 +43,8 @@ private:
     template <class MI>
     MI* createFromLibrary(const char* kind, bool& found);
     void* function(const std::string& symbol) const;
-    template <class MI>
-    void require(MI* mi, const CMPIStatus& status) const;
+    template <class MI, class Factory>
+    MI* made(const Factory& factory) const;
 
     Core& core_;
     std::string name_;
@@ -185,11 +185,21 @@ HostedProvider::~HostedProvider() {
     gone_.set_value();
 }
 
-template <class MI>
-void HostedProvider::require(MI* mi, const CMPIStatus& status) const {
+// The MI that a factory makes. What the factory throws ends here: its code may be unloaded next.
+template <class MI, class Factory>
+MI* HostedProvider::made(const Factory& factory) const {
+    const CMPIContext* const context = handOut(std::make_unique<Context>(core_));
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    MI* mi = nullptr;
+    try {
+        mi = factory(&core_.record, context, &status);
+    } catch (const std::exception& exception) {
+        throw BrokerError("provider " + name_ + ": its factory threw: " + exception.what());
+    }
     if (status.rc != CMPI_RC_OK || mi == nullptr) {
         throw BrokerError("provider " + name_ + ": its factory answered " + wordsOf(status));
     }
+    return mi;
 }
 
 void HostedProvider::create(const ProviderFactories& factories) {
@@ -197,9 +207,7 @@ void HostedProvider::create(const ProviderFactories& factories) {
     const Owner::Scope scope(own);
     const auto make = [&](auto factory, auto*& mi) {
         if (factory != nullptr) {
-            CMPIStatus status = {CMPI_RC_OK, nullptr};
-            mi = factory(&core_.record, handOut(std::make_unique<Context>(core_)), &status);
-            require(mi, status);
+            mi = made<std::remove_reference_t<decltype(*mi)>>(factory);
         }
     };
     make(factories.instance, instance_);
@@ -215,19 +223,17 @@ template <class MI>
 MI* HostedProvider::createFromLibrary(const char* kind, bool& found) {
     using Factory = MI* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
     using GenericFactory = MI* (*)(const CMPIBroker*, const CMPIContext*, const char*, CMPIStatus*);
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    MI* mi = nullptr;
-    const CMPIContext* const context = handOut(std::make_unique<Context>(core_));
     if (void* const own = function(name_ + "_Create_" + kind)) {
-        mi = reinterpret_cast<Factory>(own)(&core_.record, context, &status);
-    } else if (void* const generic = function(std::string("_Generic_Create_") + kind)) {
-        mi = reinterpret_cast<GenericFactory>(generic)(&core_.record, context, name_.c_str(), &status);
-    } else {
-        return nullptr;
+        found = true;
+        return made<MI>(reinterpret_cast<Factory>(own));
     }
-    found = true;
-    require(mi, status);
-    return mi;
+    if (void* const generic = function(std::string("_Generic_Create_") + kind)) {
+        found = true;
+        return made<MI>([&](const CMPIBroker* broker, const CMPIContext* context, CMPIStatus* status) {
+            return reinterpret_cast<GenericFactory>(generic)(broker, context, name_.c_str(), status);
+        });
+    }
+    return nullptr;
 }
 
 void HostedProvider::createFromLibrary(const std::string& file) {

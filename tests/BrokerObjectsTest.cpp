@@ -305,6 +305,9 @@ TEST_F(ABroker, FreesWithARequestWhatWasNotClonedOrReleased) {
     }
     EXPECT_EQ(oxahv::pathText(CMGetObjectPath(clone, nullptr)), "root:Demo.Key=\"text\"");
     EXPECT_EQ(broker_.liveObjects().instances, before.instances + 1);
+    EXPECT_EQ(CMRelease(CMGetProperty(clone, "Key", nullptr).value.string).rc, CMPI_RC_OK);
+    EXPECT_EQ(textOf(CMGetProperty(clone, "Key", nullptr).value.string), "text")
+        << "a part stays its whole's";
     EXPECT_EQ(CMRelease(clone).rc, CMPI_RC_OK);
     EXPECT_EQ(broker_.liveObjects().instances, before.instances);
 

@@ -81,7 +81,8 @@ public:
     }
 };
 
-CMProviderBase(Tested) CMInstanceMIFactory(TestedProvider, Tested)
+CMProviderBase(Tested)
+CMInstanceMIFactory(TestedProvider, Tested)
 CMAssociationMIFactory(TestedProvider, Tested)
 CMMethodMIFactory(TestedProvider, Tested)
 
@@ -414,6 +415,8 @@ TEST(Hosting, LoadsAndUnloadsLibraries) {
         errorOf([&] { broker.load("/nowhere/lib.so", "None"); }).rfind("cannot load provider library: ", 0),
         0U);
     EXPECT_EQ(errorOf([&] { broker.host("Empty", {}); }), "provider Empty has no factory");
+    EXPECT_EQ(errorOf([&] { broker.load(TEST_PROVIDER, "Throws"); }),
+              "provider Throws: its factory threw: no provider");
 }
 
 TEST(Hosting, ServesAProviderThatIsWrittenInC) {

@@ -686,11 +686,14 @@ public:
 
 } // namespace
 
-CMProviderBase(TestProvider) CMInstanceMIFactory(Provider, TestProvider)
+CMProviderBase(TestProvider)
+CMInstanceMIFactory(Provider, TestProvider)
 CMAssociationMIFactory(Provider, TestProvider)
 CMMethodMIFactory(Provider, TestProvider)
-CMPropertyMIFactory(Provider, TestProvider) CMIndicationMIFactory(Provider, TestProvider)
-    CMProviderBase(OtherProvider) CMMethodMIFactory(Provider, OtherProvider)
+CMPropertyMIFactory(Provider, TestProvider)
+CMIndicationMIFactory(Provider, TestProvider)
+CMProviderBase(OtherProvider)
+CMMethodMIFactory(Provider, OtherProvider)
 
 TEST(AProviderFactory, SharesOneObjectAmongTheKindsOfOneName) {
     CMPIStatus status = {CMPI_RC_ERR_FAILED, nullptr};
