@@ -22,9 +22,10 @@
  *
  * **Ownership.** Every CMPI object that the broker makes belongs to the request that is current on the
  * calling thread, the innermost Request alive there; without one, to the broker itself. It dies with its
- * owner, unless the caller released it before. What a `clone` slot returned belongs to its caller, who
- * releases it with its `release` slot; what is left then dies with the broker. An object may be used after
- * its release by nobody.
+ * owner, unless the caller released it before. What a `clone` slot or `prepareAttachThread` returned belongs
+ * to its caller, who releases it with its `release` slot; what is left then dies with the broker. A part of
+ * an object, such as a property's string, dies with the object; its release does nothing. An object may be
+ * used after its release by nobody. A memory mark frees what the current owner has got since.
  *
  * **Encoding.** All texts are UTF-8; a CMPIString keeps its bytes as they came.
  *

@@ -116,6 +116,13 @@ TEST_F(ABroker, KeepsNullAsNull) {
         EXPECT_EQ(status.rc, CMPI_RC_OK) << name;
     }
     EXPECT_EQ(CMGetProperty(instance, "text", nullptr).type, CMPI_string);
+
+    CMPIObjectPath* const path = request_.objectPath("root", "Demo");
+    EXPECT_EQ(CMAddKey(path, "K", nullptr, CMPI_uint16).rc, CMPI_RC_OK);
+    const CMPIData key = CMGetKeyAt(path, 0, nullptr, nullptr);
+    EXPECT_EQ(key.type, CMPI_uint16);
+    EXPECT_EQ(key.state, CMPI_keyValue | CMPI_nullValue);
+    EXPECT_TRUE(CMIsNullValue(CMGetProperty(CMNewInstance(handle_, path, nullptr), "K", nullptr)));
 }
 
 TEST_F(ABroker, ChecksInstancesAgainstTheirClass) {

@@ -3,6 +3,7 @@
 
 #include <atomic>
 #include <functional>
+#include <future>
 #include <gtest/gtest.h>
 #include <stdexcept>
 
@@ -374,6 +375,67 @@ TEST_F(ARequest, CanBeLeftToAThreadThatIsAttached) {
         EXPECT_EQ(broker_.liveObjects().strings, before.strings);
         EXPECT_EQ(broker->bft->detachThread(broker, prepared).rc, CMPI_RC_ERR_FAILED);
     }).join();
+}
+
+TEST_F(ARequest, KeepsItsProviderWhileItIsInside) {
+    std::promise<void> entered;
+    std::promise<void> mayLeave;
+    behaviour.serve = [&](const CMPIContext*, const CMPIResult*, const CMPIObjectPath*) {
+        entered.set_value();
+        mayLeave.get_future().wait();
+        EXPECT_EQ(behaviour.alive, 1);
+        return ok();
+    };
+    std::thread inside([this] {
+        Request request(broker_);
+        EXPECT_TRUE(request.getInstance(request.objectPath("root", "Demo")).ok());
+    });
+    entered.get_future().wait();
+    std::thread unloading([this] {
+        broker_.unload("Tested");
+        EXPECT_EQ(behaviour.alive, 0) << "unload returned too early";
+    });
+    while (request_.invokeMethod(path("Demo"), "Out", nullptr).code != CMPI_RC_ERR_NOT_SUPPORTED) {
+        std::this_thread::yield(); // until it takes no further request
+    }
+    mayLeave.set_value();
+    inside.join();
+    unloading.join();
+}
+
+TEST_F(ARequest, RunsWhileTheBrokerIsSetUp) {
+    behaviour.serve = [](const CMPIContext* context, const CMPIResult* result, const CMPIObjectPath* p) {
+        CMAddContextEntry(context, "Entry", "text", CMPI_chars);
+        return CMReturnInstance(result, CMNewInstance(behaviour.broker, p, nullptr));
+    };
+    broker_.declare(ClassDeclaration("Demo").key("K", CMPI_uint8));
+    std::atomic<bool> isOver{false};
+    std::vector<std::thread> threads;
+    for (int t = 0; t < 3; ++t) {
+        threads.emplace_back([&] {
+            while (!isOver) {
+                Request request(broker_);
+                const Reply reply = request.getInstance(request.objectPathFromText("Demo.K=1", "root"));
+                EXPECT_TRUE(reply.ok() || reply.code == CMPI_RC_ERR_FAILED);
+            }
+        });
+    }
+    for (int i = 0; i < 50; ++i) {
+        const std::string number = std::to_string(i);
+        broker_.declare(ClassDeclaration("Class" + number).superclass("Demo"));
+        broker_.load(TEST_PROVIDER, "TestProvider", {"Class" + number});
+        broker_.startRecording();
+        broker_.injectFault("newInstance", {CMPI_RC_ERR_FAILED, false, 0, 1, 1});
+        broker_.setKeyMode(i % 2 == 0 ? KeyMode::untyped : KeyMode::chars);
+        broker_.setMessageHandler([](const oxahv::BrokerMessage&) {});
+        broker_.clearFaults();
+        broker_.stopRecording();
+        broker_.unload("TestProvider");
+    }
+    isOver = true;
+    for (std::thread& thread : threads) {
+        thread.join();
+    }
 }
 
 TEST_F(ARequest, KeepsWhatAnAttachedThreadReturns) {
