@@ -281,13 +281,11 @@ Value Value::asProperty(CMPIType declared) const {
     const bool isUnsigned = declared >= CMPI_uint8 && declared <= CMPI_uint64;
     const bool isSigned = declared >= CMPI_sint8 && declared <= CMPI_sint64;
     const unsigned int bits = 8U << (declared >> 4U & 3U); // as the codes of the integer types have it
-    if (type_ == CMPI_uint64 && isUnsigned && (bits == 64 || plain_.uint64 >> bits == 0)) {
-        result.type_ = declared; // the narrower members share its low bytes
-    } else if (type_ == CMPI_sint64 && isSigned && plain_.sint64 >> (bits - 1) == plain_.sint64 >> 63) {
-        result.type_ = declared;
-    } else {
-        result.type_ = storedType(type_);
-    }
+    // The narrower members share the low bytes of the widest.
+    const bool fits =
+        (type_ == CMPI_uint64 && isUnsigned && (bits == 64 || plain_.uint64 >> bits == 0)) ||
+        (type_ == CMPI_sint64 && isSigned && plain_.sint64 >> (bits - 1) == plain_.sint64 >> 63);
+    result.type_ = fits ? declared : storedType(type_);
     return result;
 }
 

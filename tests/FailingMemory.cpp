@@ -20,10 +20,13 @@ unsigned int failing::allocations() {
     return asked;
 }
 
-void* operator new(std::size_t size) {
+void* operator new(std::size_t size, const std::nothrow_t& /*nothrow*/) noexcept {
     ++asked;
-    void* const block =
-        failingFrom != 0 && asked >= failingFrom ? nullptr : std::malloc(size != 0 ? size : 1);
+    return failingFrom != 0 && asked >= failingFrom ? nullptr : std::malloc(size != 0 ? size : 1);
+}
+
+void* operator new(std::size_t size) {
+    void* const block = operator new(size, std::nothrow);
     if (block == nullptr) {
         throw std::bad_alloc();
     }
