@@ -239,7 +239,7 @@ CMPIString* getMessage(const CMPIBroker* broker, const char* id, const char* tex
     return result;
 }
 
-CMPIString* getMessageOfFile(const CMPIBroker* broker, const char* id, const CMPIMsgFileHandle /*file*/,
+CMPIString* getMessageOfFile(const CMPIBroker* broker, const char* id, CMPIMsgFileHandle /*file*/,
                              const char* text, CMPIStatus* rc, CMPICount count, ...) {
     std::va_list list;
     va_start(list, count);

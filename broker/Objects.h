@@ -306,7 +306,7 @@ class PropertyList : public RecordedObject<CMPIPropertyList, Kind::other, Proper
 public:
     static const CMPIPropertyListFT table;
 
-    PropertyList(Core& core, std::vector<std::string> names);
+    PropertyList(Core& core, std::vector<std::string> list);
     std::unique_ptr<Object> clone() const override { return std::make_unique<PropertyList>(core(), names); }
 
     std::vector<std::string> names;
