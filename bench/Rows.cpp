@@ -10,6 +10,7 @@
 #include <array>
 #include <cctype>
 #include <charconv>
+#include <cmpimacs.h>
 #include <cstdio>
 #include <cstring>
 #include <cwchar>
@@ -859,12 +860,48 @@ unsigned short answer() {
     return id;
 }
 
+// The calls of the broker alone that such an answer takes.
+CMPICount callTheBroker() {
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    const CMPIBroker* const server = &broker.broker;
+    const CMPIObjectPath* const path = &broker.path;
+    CMGetCharsPtr(CMGetClassName(path, &status), &status);
+    CMGetCharsPtr(CMGetNameSpace(path, &status), &status);
+    const CMPICount keys = CMGetKeyCount(path, &status);
+    CMPIString* name = nullptr;
+    for (CMPICount i = 0; i < 2 * keys; ++i) {
+        CMGetKeyAt(path, i % keys, &name, &status);
+    }
+    CMPIObjectPath* const reply = CMNewObjectPath(server, "root/cimv2", "OXATK_EthernetPort", &status);
+    CMSetNameSpace(reply, "root/cimv2");
+    setKeyNumbers<BareCalls>();
+    floors::setKeyProperty(reply, "DeviceID", "eth0");
+    CMPIInstance* const port = CMNewInstance(server, reply, &status);
+    setNumbers<BareCalls>();
+    floors::setProperty(port, "RequestedState", static_cast<unsigned short>(12));
+    floors::setProperty(port, "MaxSpeed", 10000000000ULL);
+    for (const char* text : {"ElementName", "Caption", "Description"}) {
+        floors::setProperty(port, text, text);
+    }
+    CMPIValue value = {};
+    value.dateTime = CMNewDateTimeFromChars(server, "20260329013007.000250+120", &status);
+    CMSetProperty(port, "InstallDate", &value, CMPI_dateTime);
+    CMPIArray* const array = CMNewArray(server, 4, CMPI_uint16, &status);
+    for (CMPICount i = 0; i < 4; ++i) {
+        CMSetArrayElementAt(array, i, &value, CMPI_uint16);
+    }
+    value.array = array;
+    CMSetProperty(port, "Capabilities", &value, CMPI_uint16A);
+    return keys;
+}
+
 void addRequest(Table& table) {
     // Class id; the two conversions and the five keys; the new path; one conversion of text; a date formatted
     // and set; an array; the moniker's, the texts' and the array's own blocks.
     constexpr double blocks = traces(1, 0) + traces(2, 2) + 5 + traces(0, 2) + traces(2, 2) + traces(2, 0) +
                               2 + traces(2, 0) + 1 + traces(2, 0) + traces(1, 2) + 2;
     table.addBoth("whole request", [](auto side) { return answer<decltype(side)>(); })
+        .floor("the broker's calls alone", callTheBroker, 0)
         .timesFaster(4.5)
         .allocations(blocks)
         .onTwoThreads();
