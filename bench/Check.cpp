@@ -131,12 +131,10 @@ void HVLog::HVLogger::traceLevelMessage(const char* function, const char* /*file
     recordTrace("trace", function, category, level, text);
 }
 
-int main() {
-    if (std::setlocale(LC_CTYPE, "C.UTF-8") == nullptr) {
-        std::cerr << "there is no locale C.UTF-8\n";
-        return EXIT_FAILURE;
-    }
-    recordCalls();
+namespace {
+
+// Compares every row that has a twin; returns whether all are the same.
+bool compareAll() {
     int differences = 0;
     int compared = 0;
     for (const rows::Row& row : rows::all(0)) {
@@ -154,5 +152,21 @@ int main() {
         }
     }
     std::cout << compared << " rows compared, " << differences << " differ\n";
-    return differences == 0 && compared != 0 ? EXIT_SUCCESS : EXIT_FAILURE;
+    return differences == 0 && compared != 0;
+}
+
+} // namespace
+
+int main() {
+    try {
+        if (std::setlocale(LC_CTYPE, "C.UTF-8") == nullptr) {
+            std::cerr << "there is no locale C.UTF-8\n";
+            return EXIT_FAILURE;
+        }
+        recordCalls();
+        return compareAll() ? EXIT_SUCCESS : EXIT_FAILURE;
+    } catch (const std::exception& exception) {
+        std::cerr << exception.what() << '\n';
+        return EXIT_FAILURE;
+    }
 }

@@ -41,22 +41,22 @@ extern "C" {
 
 // The C library's own heap, under names that it keeps for this purpose.
 void* __libc_malloc(std::size_t size);                    // NOLINT(bugprone-reserved-identifier,cert-*)
-void* __libc_calloc(std::size_t count, std::size_t size); // NOLINT(bugprone-reserved-identifier,cert-*)
-void* __libc_realloc(void* pointer, std::size_t size);    // NOLINT(bugprone-reserved-identifier,cert-*)
+void* __libc_calloc(std::size_t nmemb, std::size_t size); // NOLINT(bugprone-reserved-identifier,cert-*)
+void* __libc_realloc(void* ptr, std::size_t size);        // NOLINT(bugprone-reserved-identifier,cert-*)
 
 void* malloc(std::size_t size) {
     ++blocksTaken;
     return __libc_malloc(size);
 }
 
-void* calloc(std::size_t count, std::size_t size) {
+void* calloc(std::size_t nmemb, std::size_t size) {
     ++blocksTaken;
-    return __libc_calloc(count, size);
+    return __libc_calloc(nmemb, size);
 }
 
-void* realloc(void* pointer, std::size_t size) {
+void* realloc(void* ptr, std::size_t size) {
     ++blocksTaken;
-    return __libc_realloc(pointer, size);
+    return __libc_realloc(ptr, size);
 }
 
 } // extern "C"
@@ -187,6 +187,30 @@ void measureGain(benchmark::State& state, const rows::Row& row) {
     state.SetLabel(row.floorName);
 }
 
+// A measurement of a row, as Google Benchmark takes it.
+class RowBenchmark : public benchmark::Fixture {
+public:
+    using Measurement = void(benchmark::State& state, const rows::Row& row);
+
+    RowBenchmark(const std::string& name, Measurement* measurement, const rows::Row& row)
+        : measurement_(measurement), row_(row) {
+        SetName(name.c_str());
+    }
+
+private:
+    void BenchmarkCase(benchmark::State& state) override { measurement_(state, row_); }
+
+    Measurement* measurement_;
+    const rows::Row& row_;
+};
+
+void add(const std::string& name, RowBenchmark::Measurement* measurement, const rows::Row& row,
+         std::size_t rounds) {
+    benchmark::internal::RegisterBenchmarkInternal(new RowBenchmark(name, measurement, row))
+        ->UseManualTime()
+        ->Iterations(static_cast<benchmark::IterationCount>(rounds));
+}
+
 // An option of our own, `--name=number`; the others are Google Benchmark's.
 std::size_t option(int& argc, char** argv, const std::string& name, std::size_t otherwise) {
     const std::string start = "--" + name + '=';
@@ -215,11 +239,6 @@ int main(int argc, char** argv) {
         return EXIT_FAILURE;
     }
     const std::vector<rows::Row> table = rows::all(large << 20U);
-    const auto add = [](const std::string& name, auto measurement, const rows::Row& row, std::size_t times) {
-        benchmark::RegisterBenchmark(name.c_str(), measurement, row)
-            ->UseManualTime()
-            ->Iterations(static_cast<benchmark::IterationCount>(times));
-    };
     for (const rows::Row& row : table) {
         // A slice of the growing rows takes a fraction of a second.
         const bool growth = row.floorUnits != row.units;

@@ -60,41 +60,43 @@ using MessageBuffer = std::array<char, 512>;
 char* flowText(const char* kind, const char* function, int line) {
     static thread_local MessageBuffer messageBuffer;
     messageBuffer.fill(0);
-    std::snprintf(messageBuffer.data(), messageBuffer.size(), "%s: %s() in %s [Line: %d]", kind, function,
-                  "Naive.cpp", line);
+    static_cast<void>(std::snprintf(messageBuffer.data(), messageBuffer.size(), "%s: %s() in %s [Line: %d]",
+                                    kind, function, "Naive.cpp", line));
     return messageBuffer.data();
 }
 
 char* messageText(const char* text, int line) {
     static thread_local MessageBuffer messageBuffer;
     messageBuffer.fill(0);
-    std::snprintf(messageBuffer.data(), messageBuffer.size(), "MESSAGE [File: %s, Line: %d]: %s", "Naive.cpp",
-                  line, text);
+    static_cast<void>(std::snprintf(messageBuffer.data(), messageBuffer.size(),
+                                    "MESSAGE [File: %s, Line: %d]: %s", "Naive.cpp", line, text));
     return messageBuffer.data();
 }
 
 char* variableText(const char* name, unsigned int value, int line) {
     static thread_local MessageBuffer messageBuffer;
     messageBuffer.fill(0);
-    std::snprintf(messageBuffer.data(), messageBuffer.size(),
-                  "VARIABLE: '%s' has Value '%d' at line %d in %s", name, static_cast<int>(value), line,
-                  "Naive.cpp");
+    static_cast<void>(std::snprintf(messageBuffer.data(), messageBuffer.size(),
+                                    "VARIABLE: '%s' has Value '%d' at line %d in %s", name,
+                                    static_cast<int>(value), line, "Naive.cpp"));
     return messageBuffer.data();
 }
 
 char* variableText(const char* name, const char* value, int line) {
     static thread_local MessageBuffer messageBuffer;
     messageBuffer.fill(0);
-    std::snprintf(messageBuffer.data(), messageBuffer.size(),
-                  "VARIABLE: '%s' has Value '%s' at line %d in %s", name, value, line, "Naive.cpp");
+    static_cast<void>(std::snprintf(messageBuffer.data(), messageBuffer.size(),
+                                    "VARIABLE: '%s' has Value '%s' at line %d in %s", name, value, line,
+                                    "Naive.cpp"));
     return messageBuffer.data();
 }
 
 char* parametersText(const char* kind, const char* function, int line, const char* parameters) {
     static thread_local MessageBuffer messageBuffer;
     messageBuffer.fill(0);
-    std::snprintf(messageBuffer.data(), messageBuffer.size(), "%s: %s() in %s [Line: %d],Parameters List: %s",
-                  kind, function, "Naive.cpp", line, parameters);
+    static_cast<void>(std::snprintf(messageBuffer.data(), messageBuffer.size(),
+                                    "%s: %s() in %s [Line: %d],Parameters List: %s", kind, function,
+                                    "Naive.cpp", line, parameters));
     return messageBuffer.data();
 }
 
@@ -543,7 +545,7 @@ bool CUtility::WStringToAString(std::wstring in, std::string& out) {
     if (converted) {
         const std::unique_ptr<char[]> buffer(new char[size + 1]);
         state = {};
-        std::wcsrtombs(buffer.get(), &source, size + 1, &state);
+        static_cast<void>(std::wcsrtombs(buffer.get(), &source, size + 1, &state));
         out = buffer.get();
     }
     NAIVE_EXITING(providerUtilities);
@@ -718,7 +720,7 @@ long fieldOf(const std::string& text, std::size_t position, std::size_t width) {
 
 std::string fieldText(unsigned int number, std::size_t width) {
     std::array<char, 16> buffer{};
-    std::snprintf(buffer.data(), buffer.size(), "%u", number);
+    static_cast<void>(std::snprintf(buffer.data(), buffer.size(), "%u", number));
     const std::string digits = Utils::stripSpaces(buffer.data());
     return digits.size() < width ? Utils::addZero(static_cast<unsigned char>(width - digits.size())) + digits
                                  : digits;

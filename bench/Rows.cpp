@@ -46,10 +46,10 @@ struct Library {
         static void variable(const std::string& logger, const char* name, Value value) {
             TK_TRACE_VARIABLE(logger, name, value);
         }
-        static void parameters(const std::string& logger, const CMPIBroker* broker,
+        static void parameters(const std::string& logger, const CMPIBroker* server,
                                const CMPIInstance* instance, const char* name,
                                const std::vector<unsigned short>* value) {
-            TK_TRACE_ENTERING_PARAMETERS(logger, " broker=" << broker << " instance=" << instance
+            TK_TRACE_ENTERING_PARAMETERS(logger, " broker=" << server << " instance=" << instance
                                                             << " name=" << name << " value=" << value);
         }
     };
@@ -117,7 +117,12 @@ std::string textOf(Moniker moniker) {
         default:
             moniker.getValue(value);
         }
-        text += name + '=' + std::to_string(type) + ':' + value + '\n';
+        text.append(name)
+            .append(1, ' ')
+            .append(std::to_string(type))
+            .append(1, ' ')
+            .append(value)
+            .append(1, '\n');
     }
     return text;
 }
@@ -226,7 +231,7 @@ void addRegistry(Table& table) {
     const auto compareAll = [] {
         int sum = 0;
         for (const auto& [asked, given] : names) {
-            sum += strcasecmp(opaque(asked.c_str()), given.c_str());
+            sum += static_cast<int>(strcasecmp(opaque(asked.c_str()), given.c_str()) == 0);
         }
         return sum;
     };
@@ -562,8 +567,7 @@ template <class... Arguments>
 void formatTwice(const char* format, Arguments... arguments) {
     std::array<char, TK::traceBufferSize> text; // NOLINT(cppcoreguidelines-pro-type-member-init): the floor
     for (int i = 0; i < 2; ++i) {
-        // NOLINTNEXTLINE(cert-err33-c): a text that is cut is what a trace point gives too
-        std::snprintf(text.data(), text.size(), format, arguments...);
+        static_cast<void>(std::snprintf(text.data(), text.size(), format, arguments...));
         benchmark::DoNotOptimize(text);
     }
 }
@@ -938,7 +942,7 @@ void addGrowth(Table& table, std::size_t large) {
     static const std::string narrowBlock = words(block);
     static const std::wstring wideBlock = wide(narrowBlock);
     const std::string size = std::to_string(large >> 20U) + " Mi characters, each";
-    const double each = static_cast<double>(large);
+    const auto each = static_cast<double>(large);
     const auto row = [&](const std::string& name, auto operation, const auto& grown, const auto& ungrown) {
         table.add("growth: " + name + ", " + size, [=, &grown] { return operation(grown); })
             .floor(
