@@ -90,6 +90,7 @@ std::size_t callsPerSlice(const rows::Run& run) {
 
 void waitFor(const std::atomic<bool>& flag) {
     while (!flag) {
+        std::this_thread::yield(); // the thread that is waited for may need this very processor
     }
 }
 

@@ -206,7 +206,7 @@ def draw(entries, path):
         else:
             labels.append(f"{entry['ratio']:.3g}× {entry['floor']}  (goal {entry['goal']['bound']}×)")
     used = [entry["used"] for entry in shown]
-    pyplot.rcParams["svg.hashsalt"] = "oxahv"
+    pyplot.rcParams.update({"svg.hashsalt": "oxahv", "svg.fonttype": "none"})
     figure, axes = pyplot.subplots(figsize=(13, 0.27 * len(shown) + 1.4), layout="constrained")
     axes.barh(range(len(shown)), used, color=["#2a7f62" if share <= 1 else "#c0392b" for share in used], height=0.72)
     axes.set_xscale("log")
