@@ -914,8 +914,8 @@ void addRequest(Table& table) {
 // Growth: what a unit costs in a large input, against what it costs in a small one.
 
 void addGrowth(Table& table, std::size_t large) {
-    // Caches and fresh pages have their price; anything that is not linear would show a thousandfold.
-    constexpr double most = 4;
+    // Caches and pages fresh from the system have their price; what is not linear would show a thousandfold.
+    constexpr double most = 6;
     constexpr double manyKeys = 65535;
     const auto toMoniker = [](const CMPIObjectPath* path) {
         return [path] {
