@@ -10,6 +10,60 @@
 #include <string>
 #include <vector>
 
+// A broker's object that answers every name with one value and one status, as no correct broker would.
+template <class Object, class Table>
+class Answering {
+public:
+    template <class Handle>
+    Answering(const Object* real, CMPIData (*Table::*getter)(Handle*, const char*, CMPIStatus*),
+              const CMPIData& data, CMPIrc code)
+        : table_(*real->ft), object_(*real) {
+        object_.ft = &table_;
+        table_.*getter = &answer<Handle>;
+        data_ = data;
+        code_ = code;
+    }
+    Answering(const Answering&) = delete;
+    Answering& operator=(const Answering&) = delete;
+
+    Object* handle() { return &object_; }
+
+private:
+    template <class Handle>
+    static CMPIData answer(Handle* /*object*/, const char* /*name*/, CMPIStatus* status) {
+        *status = {code_, nullptr};
+        return data_;
+    }
+
+    Table table_;
+    Object object_;
+    static inline CMPIData data_;
+    static inline CMPIrc code_;
+};
+
+// A string whose characters come with a status that is no success.
+class StringWithAnError {
+public:
+    explicit StringWithAnError(const CMPIString* real) : table_(*real->ft), string_(*real) {
+        string_.ft = &table_;
+        setGetter(&CMPIStringFT::getCharPtr);
+    }
+    CMPIString* handle() { return &string_; }
+
+private:
+    template <class Chars>
+    void setGetter(Chars* (*CMPIStringFT::*getter)(const CMPIString*, CMPIStatus*)) {
+        table_.*getter = [](const CMPIString* /*string*/, CMPIStatus* status) -> Chars* {
+            static char characters[] = "characters";
+            *status = {CMPI_RC_ERR_FAILED, nullptr};
+            return characters;
+        };
+    }
+
+    CMPIStringFT table_;
+    CMPIString string_;
+};
+
 class BrokerTest : public testing::Test {
 protected:
     BrokerTest() { forgetLoggerCalls(); }

@@ -86,6 +86,17 @@ TEST_F(ClassRegistry, KnowsTheClassesOfBothTables) {
     EXPECT_TRUE(tracedTexts().empty());
 }
 
+// Callers keep class ids, so none may ever change: a sum over all rows (64 bit FNV-1a of ids and names).
+TEST_F(ClassRegistry, KeepsItsIds) {
+    unsigned long long sum = 0xCBF29CE484222325U;
+    for (const TK::ClassEntry& entry : TK::classTable) {
+        for (const char c : std::to_string(entry.id) + entry.name) {
+            sum = (sum ^ static_cast<unsigned char>(c)) * 0x100000001B3U;
+        }
+    }
+    EXPECT_EQ(sum, 0xEAB88D90EA28EDCCU);
+}
+
 TEST_F(ClassRegistry, AnswersAsAChainOfComparisonsForEveryEdit) {
     const std::string letters = "_aZ5-\x80\xC4\xB1";
     for (const TK::ClassEntry& entry : TK::classTable) {
@@ -140,6 +151,21 @@ TEST_F(ClassRegistry, SurvivesABrokerThatYieldsNoName) {
         EXPECT_EQ(ProviderUtilities::getClassId(path), 0) << slot;
         EXPECT_EQ(tracedTexts().back().rfind("VARIABLE: 'classname' has Value '(null)'", 0), 0U);
     }
+}
+
+TEST_F(ClassRegistry, TakesANameThatCameWithAnError) {
+    static StringWithAnError name(CMNewString(broker_.handle(), "text", nullptr));
+    const CMPIObjectPath* const real = request_.objectPath("root/cimv2", "OXATK_Fan");
+    CMPIObjectPathFT table = *real->ft;
+    table.getClassName = [](const CMPIObjectPath* /*path*/, CMPIStatus* status) {
+        *status = {CMPI_RC_OK, nullptr};
+        return name.handle();
+    };
+    CMPIObjectPath path = *real;
+    path.ft = &table;
+    EXPECT_EQ(ProviderUtilities::getClassId(&path), 255); // "characters" is no class, 0 would be no name
+    EXPECT_EQ(takeTraces(), std::vector<std::string>(
+                                {variable(providerUtilities, "getClassId", "classname", "characters")}));
 }
 
 TEST_F(Ancestry, IsWhatTheBrokerSays) {

@@ -1,5 +1,7 @@
 #include "Moniker.h"
 
+#include "Allocations.h"
+
 #include <cstring>
 #include <functional>
 #include <gtest/gtest.h>
@@ -183,6 +185,37 @@ TEST(AMoniker, ReadsItsNumbersBackUnderALocaleThatGroupsDigits) {
     Moniker moniker;
     moniker.addKey("k", 1234567U);
     EXPECT_EQ(valueOf<unsigned int>(moniker), 1234567U);
+}
+
+TEST(AMoniker, IsAsItWasWhenMemoryRunsOut) {
+    const std::string text(1000, 'x');
+    Moniker other;
+    other.addKey(text, text);
+    const std::function<void(Moniker&)> operations[] = {
+        [&](Moniker& moniker) { moniker.addKey(text, text); },
+        [&](Moniker& moniker) { moniker.addKey(text, 7U); },
+        [&](Moniker& moniker) { moniker = other; },
+    };
+    for (const auto& operation : operations) {
+        bool reached = true;
+        unsigned int failures = 0;
+        for (unsigned int n = 1; reached; ++n) {
+            Moniker moniker = oneOfEach();
+            moniker.selectKey(1);
+            failAllocation(n);
+            try {
+                operation(moniker);
+                reached = failAllocation(0);
+                EXPECT_FALSE(reached) << "a failed allocation was swallowed";
+            } catch (const std::bad_alloc&) {
+                failAllocation(0);
+                ++failures;
+                EXPECT_EQ(nameOf(moniker), "b");
+                EXPECT_EQ(moniker.getKeyCount(), 5U);
+            }
+        }
+        EXPECT_GT(failures, 0U);
+    }
 }
 
 TEST(AFrameworkException, KeepsItsOwnCopyOfTheMessage) {
