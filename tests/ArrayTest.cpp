@@ -182,6 +182,24 @@ TEST_F(Arrays, AreFilledUntilTheBrokerRefusesAnElement) {
                               {"t\xC3\xA4", "b", "\xF0\x9F\x98\x80"});
 }
 
+TEST_F(Arrays, HoldNothingThatCameWithAnError) {
+    std::vector<unsigned short> numbers = {1, 2};
+    Strings narrow = {"a", "b"};
+    std::vector<std::wstring> wide = {L"a", L"b"};
+    const ErringBroker noArrays(broker_.handle(), &CMPIBrokerEncFT::newArray);
+    const ErringBroker noStrings(broker_.handle(), &CMPIBrokerEncFT::newString);
+    CMSetProperty(instance_, "Name", "earlier", CMPI_chars);
+    ProviderUtilities::setProperty(noArrays.handle(), instance_, "Name", numbers);
+    ProviderUtilities::setProperty(noArrays.handle(), instance_, "Name", narrow);
+    ProviderUtilities::setProperty(noArrays.handle(), instance_, "Name", wide);
+    EXPECT_EQ(CMGetProperty(instance_, "Name", nullptr).type, CMPI_string);
+    ProviderUtilities::setProperty(noStrings.handle(), instance_, "Name", narrow);
+    EXPECT_EQ(elements(CMPI_string), Strings({"-", "-"}));
+    CMSetProperty(instance_, "Name", "earlier", CMPI_chars);
+    ProviderUtilities::setProperty(noStrings.handle(), instance_, "Name", wide);
+    EXPECT_EQ(elements(CMPI_string), Strings({"-", "-"}));
+}
+
 TEST_F(Arrays, OfPasswordsDoNotTellWhereTheyLie) {
     Strings value = {"secret"};
     for (const Strings& values : {Strings({"secret"}), Strings()}) {

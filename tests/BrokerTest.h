@@ -8,6 +8,7 @@
 
 #include <gtest/gtest.h>
 #include <string>
+#include <tuple>
 #include <vector>
 
 // A broker's object that answers every name with one value and one status, as no correct broker would.
@@ -62,6 +63,50 @@ private:
 
     CMPIStringFT table_;
     CMPIString string_;
+};
+
+// A broker that makes every object and reports an error nevertheless.
+class ErringBroker {
+public:
+    explicit ErringBroker(const CMPIBroker* real) : table_(*real->eft), broker_(*real) {
+        broker_.eft = &table_;
+        real_ = real;
+        replace<&CMPIBrokerEncFT::newInstance>();
+        replace<&CMPIBrokerEncFT::newObjectPath>();
+        replace<&CMPIBrokerEncFT::newString>();
+        replace<&CMPIBrokerEncFT::newArray>();
+        replace<&CMPIBrokerEncFT::newDateTimeFromChars>();
+        replace<&CMPIBrokerEncFT::classPathIsA>();
+    }
+    // Makes one kind alone err.
+    template <class Slot>
+    ErringBroker(const CMPIBroker* real, Slot CMPIBrokerEncFT::*slot) : ErringBroker(real) {
+        const Slot only = table_.*slot;
+        table_ = *real->eft;
+        table_.*slot = only;
+    }
+    ErringBroker(const ErringBroker&) = delete;
+    ErringBroker& operator=(const ErringBroker&) = delete;
+
+    const CMPIBroker* handle() const { return &broker_; }
+
+private:
+    template <auto slot>
+    void replace() {
+        table_.*slot = erring<slot>(table_.*slot);
+    }
+    template <auto slot, class Result, class Handle, class... Rest>
+    static auto erring(Result (* /*real*/)(Handle*, Rest...)) {
+        return [](Handle* /*broker*/, Rest... rest) {
+            const Result result = (real_->eft->*slot)(real_, rest...);
+            *std::get<CMPIStatus*>(std::make_tuple(rest...)) = {CMPI_RC_ERR_FAILED, nullptr};
+            return result;
+        };
+    }
+
+    CMPIBrokerEncFT table_;
+    CMPIBroker broker_;
+    static inline const CMPIBroker* real_;
 };
 
 class BrokerTest : public testing::Test {

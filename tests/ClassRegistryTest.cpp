@@ -197,6 +197,13 @@ TEST_F(Ancestry, IsNoneWhenTheBrokerFails) {
     broker_.injectFault("newObjectPath", {CMPI_RC_ERR_FAILED});
     const std::vector<oxahv::Call> calls = recorded([&] { EXPECT_FALSE(related("CIM_Port", "Demo_Port")); });
     EXPECT_EQ(members(calls), std::vector<std::string>({"newObjectPath"}));
+    // An answer that comes with an error counts for nothing.
+    const ErringBroker noPaths(broker_.handle(), &CMPIBrokerEncFT::newObjectPath);
+    const ErringBroker noAnswers(broker_.handle(), &CMPIBrokerEncFT::classPathIsA);
+    for (const ErringBroker* const erring : {&noPaths, &noAnswers}) {
+        EXPECT_FALSE(
+            ProviderUtilities::areClassesRelated(erring->handle(), nameSpace_, "CIM_Port", "Demo_Port"));
+    }
     // A candidate without a path does not end the list.
     broker_.clearFaults();
     broker_.injectFault("newObjectPath", {CMPI_RC_ERR_FAILED});

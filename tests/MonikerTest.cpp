@@ -227,6 +227,9 @@ TEST(AFrameworkException, KeepsItsOwnCopyOfTheMessage) {
     text[0] = 'X';
     EXPECT_STREQ(exception.what(), "a message that is longer than any short string buffer holds");
     EXPECT_STREQ(copy.what(), exception.what());
+    FrameworkException assigned("");
+    assigned = exception;
+    EXPECT_STREQ(assigned.what(), exception.what());
     EXPECT_NE(copy.what(), exception.what());
     EXPECT_STREQ(FrameworkException(nullptr).what(), "");
 }

@@ -215,19 +215,21 @@ namespace {
 // An object path of as many keys as one likes, all of one type and with the value 0.
 class PathOfEqualKeys {
 public:
-    PathOfEqualKeys(const CMPIObjectPath* real, CMPIString* name, CMPICount count, CMPIType type)
+    PathOfEqualKeys(const CMPIObjectPath* real, CMPIString* name, CMPICount count, CMPIType type,
+                    CMPIrc code = CMPI_RC_OK)
         : table_(*real->ft), path_(*real) {
         path_.ft = &table_;
         name_ = name;
         count_ = count;
         type_ = type;
+        code_ = code;
         table_.getKeyCount = [](const CMPIObjectPath* /*path*/, CMPIStatus* status) {
             *status = {CMPI_RC_OK, nullptr};
             return count_;
         };
         table_.getKeyAt = [](const CMPIObjectPath* /*path*/, CMPICount /*index*/, CMPIString** keyName,
                              CMPIStatus* status) {
-            *status = {CMPI_RC_OK, nullptr};
+            *status = {code_, nullptr};
             *keyName = name_;
             CMPIData data = {};
             data.type = type_;
@@ -242,6 +244,7 @@ private:
     static inline CMPIString* name_;
     static inline CMPICount count_;
     static inline CMPIType type_;
+    static inline CMPIrc code_;
 };
 
 } // namespace
@@ -252,6 +255,13 @@ TEST_F(ObjectPaths, CountTheirKeysModulo65536) {
     EXPECT_EQ(ProviderUtilities::getKeyCount(path.handle()), 2);
     EXPECT_EQ(takeTraces(),
               std::vector<std::string>({keyCountTrace("keyCount", "2"), keyCountTrace("count", "2")}));
+}
+
+TEST_F(ObjectPaths, SkipKeysThatComeWithAnError) {
+    const PathOfEqualKeys path(newPath(), CMNewString(broker_.handle(), "key", nullptr), 3, CMPI_uint32,
+                               CMPI_RC_ERR_FAILED);
+    EXPECT_EQ(ProviderUtilities::getKeyCount(path.handle()), 0);
+    EXPECT_EQ(monikerOf(path.handle()).getKeyCount(), 0U);
 }
 
 TEST_F(ObjectPaths, WithAKeyOfAnyOtherTypeThrow) {

@@ -203,6 +203,11 @@ TEST_F(Texts, AreSetAsTextsOrAsDates) {
         EXPECT_EQ(takeTraces(), traces(text));
     }
     EXPECT_EQ(CMGetProperty(instance_, "Name", nullptr).type, CMPI_dateTime);
+    CMSetProperty(instance_, "Name", "earlier", CMPI_chars);
+    std::string value = text;
+    ProviderUtilities::setProperty(ErringBroker(broker_.handle()).handle(), instance_, "Name", value, true);
+    EXPECT_EQ(CMGetProperty(instance_, "Name", nullptr).type, CMPI_string) << "a date with an error";
+    takeTraces();
     broker_.injectFault("CMPIInstanceFT.setProperty", {CMPI_RC_ERR_FAILED, false, 0, 1, 0});
     set(text, true);
     set(text, false);

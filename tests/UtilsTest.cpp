@@ -10,6 +10,7 @@
 #include <mutex>
 #include <random>
 #include <stdexcept>
+#include <type_traits>
 #include <utility>
 #include <vector>
 
@@ -217,6 +218,8 @@ TEST_F(CimDates, AreMadeOfStrippedAndPaddedTexts) {
         EXPECT_EQ(Utils::addZero(static_cast<unsigned char>(count)), std::string(count, '0'));
     }
     EXPECT_TRUE(takeTraces().empty());
+    static_assert(std::is_default_constructible_v<Utils> && std::is_destructible_v<Utils>);
+    EXPECT_EQ(Utils().addZero(3), "000");
 }
 
 namespace {
