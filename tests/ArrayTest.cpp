@@ -2,6 +2,9 @@
 #include "BrokerTest.h"
 #include "TestLocales.h"
 
+#include <algorithm>
+#include <stdexcept>
+
 using TK::ProviderUtilities;
 
 namespace {
@@ -145,6 +148,25 @@ protected:
         EXPECT_EQ(elements(type), Strings({"none"}));
     }
 
+    // Stops a setter at each of its trace points: the steps are the slots that it calls, "trace" among them.
+    template <class Element>
+    void checkOrder(std::vector<Element> value, const Strings& steps) {
+        for (std::size_t step = 0, points = 0; step < steps.size(); ++step) {
+            if (steps[step] == "trace") {
+                failLoggerCall(static_cast<int>(2 * points + 1));
+                const std::vector<oxahv::Call> calls = recorded([&] {
+                    EXPECT_THROW(ProviderUtilities::setProperty(broker_.handle(), instance_, "Name", value),
+                                 std::runtime_error);
+                });
+                ++points;
+                Strings wanted(steps.begin(), steps.begin() + static_cast<std::ptrdiff_t>(step));
+                wanted.erase(std::remove(wanted.begin(), wanted.end(), "trace"), wanted.end());
+                EXPECT_EQ(members(calls), wanted);
+            }
+        }
+        forgetLoggerCalls();
+    }
+
     // Reads the property over what the vector already holds.
     template <class Element>
     std::pair<bool, std::vector<Element>> get(std::vector<Element> out, const char* name = "Name") {
@@ -180,6 +202,16 @@ TEST_F(Arrays, AreFilledUntilTheBrokerRefusesAnElement) {
     const ThreadLocale utf8("C.UTF-8");
     checkSetter<std::wstring>({L"t\u00E4", L"b", L"\U0001F600"}, CMPI_string,
                               {"t\xC3\xA4", "b", "\xF0\x9F\x98\x80"});
+}
+
+TEST_F(Arrays, AreTracedBetweenTheStepsThatTheTracesTellOf) {
+    checkOrder<unsigned char>({1}, {"trace", "trace", "newArray", "setElementAt", "setProperty", "trace"});
+    checkOrder<unsigned short>({1}, {"trace", "trace", "newArray", "setElementAt", "setProperty", "trace"});
+    checkOrder<std::string>(
+        {"a"}, {"trace", "trace", "newArray", "newString", "setElementAt", "setProperty", "trace"});
+    checkOrder<std::wstring>({L"a", L"b"},
+                             {"trace", "newArray", "trace", "trace", "newString", "trace", "setElementAt",
+                              "trace", "trace", "newString", "trace", "setElementAt", "setProperty"});
 }
 
 TEST_F(Arrays, HoldNothingThatCameWithAnError) {
