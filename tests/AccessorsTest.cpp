@@ -252,6 +252,19 @@ TEST_F(Accessors, DoNotTakeAValueThatComesWithAnError) {
     EXPECT_EQ(string, nullptr);
     EXPECT_EQ(reference, nullptr);
 
+    static CMPIString* name = nullptr;
+    name = data.value.string;
+    CMPIObjectPathFT table = *path_->ft;
+    table.getClassName = [](const CMPIObjectPath* /*path*/, CMPIStatus* status) {
+        *status = {CMPI_RC_ERR_FAILED, nullptr};
+        return name;
+    };
+    table.getNameSpace = table.getClassName;
+    CMPIObjectPath unnamed = *path_;
+    unnamed.ft = &table;
+    EXPECT_EQ(ProviderUtilities::getClassName(&unnamed), "");
+    EXPECT_EQ(ProviderUtilities::getNamespace(&unnamed), "");
+
     StringWithAnError erring(data.value.string);
     EXPECT_EQ(failureOf([&] { ProviderUtilities::convertToString(erring.handle()); }),
               "String Conversion Failed !!");

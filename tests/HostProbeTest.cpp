@@ -112,22 +112,23 @@ TEST(LocalisedTexts, AreInTheLanguageAndTheEncodingOfTheThread) {
 }
 
 TEST(LocalisedTexts, StayUntilTheirThreadHasAskedForEightMore) {
-    const auto key = [](std::size_t i) {
-        return L"a key that no short string buffer holds, " + std::to_wstring(i);
-    };
-    const auto text = [](std::size_t i) {
-        return "a key that no short string buffer holds, " + std::to_string(i);
-    };
+    // All made before: a text made later could come to lie, and be right, where a freed result was.
+    std::vector<std::wstring> keys;
+    std::vector<std::string> expected;
+    for (std::size_t i = 0; i < 48; ++i) {
+        keys.push_back(L"a key that no short string buffer holds, " + std::to_wstring(i));
+        expected.push_back("a key that no short string buffer holds, " + std::to_string(i));
+    }
     std::vector<const char*> texts;
     for (std::size_t i = 0; i < 24; ++i) {
-        texts.push_back(ProviderUtilities::getNLSText(key(i)));
-        std::thread([&key] {
-            for (std::size_t other = 100; other < 120; ++other) {
-                ProviderUtilities::getNLSText(key(other));
+        texts.push_back(ProviderUtilities::getNLSText(keys[i]));
+        std::thread([&keys] {
+            for (std::size_t other = 24; other < 48; ++other) {
+                ProviderUtilities::getNLSText(keys[other]);
             }
         }).join();
         for (std::size_t valid = i < 7 ? 0 : i - 7; valid <= i; ++valid) {
-            ASSERT_EQ(texts[valid], text(valid)) << "after " << i;
+            ASSERT_STREQ(texts[valid], expected[valid].c_str()) << "after " << i;
         }
     }
 }

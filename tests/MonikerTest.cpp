@@ -193,7 +193,7 @@ TEST(AMoniker, IsAsItWasWhenMemoryRunsOut) {
     other.addKey(text, text);
     const std::function<void(Moniker&)> operations[] = {
         [&](Moniker& moniker) { moniker.addKey(text, text); },
-        [&](Moniker& moniker) { moniker.addKey(text, 7U); },
+        [&](Moniker& moniker) { moniker.addKey(text, 18446744073709551615ULL); },
         [&](Moniker& moniker) { moniker = other; },
     };
     for (const auto& operation : operations) {
@@ -215,6 +215,25 @@ TEST(AMoniker, IsAsItWasWhenMemoryRunsOut) {
             }
         }
         EXPECT_GT(failures, 0U);
+    }
+}
+
+TEST(AMoniker, ReadsANumberWholeOrThrowsWhenMemoryRunsOut) {
+    const GlobalLocale grouped(std::locale(std::locale::classic(), new Grouped));
+    Moniker moniker;
+    moniker.addKey("k", 18446744073709551615ULL);
+    bool reached = true;
+    for (unsigned int n = 1; reached; ++n) {
+        unsigned long long value = 7;
+        failAllocation(n);
+        try {
+            moniker.getValue(value);
+            reached = failAllocation(0);
+            EXPECT_FALSE(reached) << "a failed allocation was swallowed";
+            EXPECT_EQ(value, 18446744073709551615ULL);
+        } catch (const std::bad_alloc&) {
+            failAllocation(0);
+        }
     }
 }
 
