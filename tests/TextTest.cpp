@@ -146,6 +146,27 @@ TEST_F(Texts, OfDatesAreReadInTheirCimForm) {
         });
 }
 
+// The string decides, not the status that the date/time reports with it.
+TEST_F(Texts, OfDatesAreReadWhenThereIsOne) {
+    static CMPIString* text = nullptr;
+    text = CMNewString(broker_.handle(), "20090307050409.000123-300", nullptr);
+    CMPIDateTime date = *CMNewDateTime(broker_.handle(), nullptr);
+    CMPIDateTimeFT table = *date.ft;
+    table.getStringFormat = [](const CMPIDateTime* /*date*/, CMPIStatus* status) {
+        *status = {CMPI_RC_ERR_FAILED, nullptr};
+        return text;
+    };
+    date.ft = &table;
+    CMPIData data = {};
+    data.type = CMPI_dateTime;
+    data.value.dateTime = &date;
+    Answering<CMPIInstance, CMPIInstanceFT> instance(instance_, &CMPIInstanceFT::getProperty, data,
+                                                     CMPI_RC_OK);
+    std::string out;
+    EXPECT_TRUE(ProviderUtilities::getProperty(instance.handle(), "Name", out, true));
+    EXPECT_EQ(out, "20090307050409.000123-300");
+}
+
 TEST_F(Texts, WithCharactersAndAnErrorAreReadFromArgumentsAlone) {
     StringWithAnError string(CMNewString(broker_.handle(), "text", nullptr));
     CMPIData data = {};
