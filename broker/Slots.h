@@ -8,6 +8,7 @@
 
 #include "Core.h"
 
+#include <cstring>
 #include <new>
 #include <tuple>
 #include <type_traits>
@@ -182,7 +183,8 @@ private:
             CMPIData data = run(self, status, rest...);
             data.state = static_cast<CMPIValueState>(data.state | fault.stateBits);
             if (fault.yieldsNull) {
-                data.value = {};
+                // An empty initializer would be free to zero the union's first member alone.
+                std::memset(&data.value, 0, sizeof data.value);
             }
             return data;
         } else {
