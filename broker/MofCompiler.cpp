@@ -89,6 +89,8 @@ std::size_t placeOf(const DeclarationError& error, const MofClass& declared) {
         return declared.properties[error.index()].name.offset;
     case DeclarationError::Part::method:
         return declared.methods[error.index()].name.offset;
+    case DeclarationError::Part::parameter:
+        return declared.methods[error.index()].parameters[error.parameter()].name.offset;
     default:
         return declared.name.offset;
     }
@@ -214,7 +216,7 @@ PropertyDeclaration MofCompiler::propertyOf(const MofSource& source, const MofEl
 }
 
 MethodDeclaration MofCompiler::methodOf(const MofSource& source, const MofMethod& method) const {
-    MethodDeclaration result{method.name.text, method.type};
+    MethodDeclaration result{method.name.text, method.type, {}, method.referenceClass};
     result.qualifiers = qualifiersOf(source, method.qualifiers, mofScope::method, "method");
     for (const MofElement& element : method.parameters) {
         ParameterDeclaration parameter{element.name.text, element.type};
