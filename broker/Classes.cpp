@@ -43,6 +43,11 @@ ClassDeclaration& ClassDeclaration::qualifier(QualifierDeclaration qualifier) {
     return *this;
 }
 
+ClassDeclaration& ClassDeclaration::qualifiers(Qualifiers list) {
+    qualifiers_ = std::move(list);
+    return *this;
+}
+
 ClassDeclaration& ClassDeclaration::key(std::string name, CMPIType type) {
     return property({std::move(name), type, true, {}, {}, Qualifiers({trueQualifier("Key")})});
 }

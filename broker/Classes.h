@@ -23,7 +23,6 @@ struct DeclaredClass {
     const PropertyDeclaration* find(std::string_view property) const;
     const MethodDeclaration* findMethod(std::string_view method) const;
     bool isA(std::string_view ancestor) const;
-    bool isAssociation() const { return qualifiers.isTrue("Association"); }
 };
 
 // What a declared qualifier type says: where it may stand, and in `implied` what it has when nothing else is

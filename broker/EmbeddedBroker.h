@@ -159,6 +159,8 @@ public:
     ClassDeclaration& abstract();
     /** Adds a qualifier to the class. */
     ClassDeclaration& qualifier(QualifierDeclaration qualifier);
+    /** Gives the class these qualifiers, in place of those that it has. */
+    ClassDeclaration& qualifiers(Qualifiers list);
     /** Adds a key property, with the qualifier Key. */
     ClassDeclaration& key(std::string name, CMPIType type);
     /** Adds a property that is no key. */

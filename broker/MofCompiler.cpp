@@ -174,10 +174,7 @@ void MofCompiler::declare(const MofSource& source, const MofQualifierType& decla
 void MofCompiler::declare(const MofSource& source, const MofClass& declared) {
     ClassDeclaration declaration(declared.name.text);
     declaration.superclass(declared.superclass.text);
-    const Qualifiers qualifiers = qualifiersOf(source, declared.qualifiers, scopesOf(declared), "class");
-    for (const QualifierDeclaration& qualifier : qualifiers.list()) {
-        declaration.qualifier(qualifier);
-    }
+    declaration.qualifiers(qualifiersOf(source, declared.qualifiers, scopesOf(declared), "class"));
     for (const MofElement& property : declared.properties) {
         declaration.property(propertyOf(source, property));
     }
