@@ -38,6 +38,20 @@ void EmbeddedBroker::Impl::setMessageHandler(std::function<void(const BrokerMess
     handler_.swap(handler);
 }
 
+void EmbeddedBroker::Impl::setContextEntry(const std::string& name, const std::string& text) {
+    const std::unique_lock<std::shared_mutex> lock(contextMutex_);
+    contextEntries_[name] = text;
+}
+
+Context* EmbeddedBroker::Impl::newContext() {
+    auto context = std::make_unique<Context>(*this);
+    const std::shared_lock<std::shared_mutex> lock(contextMutex_);
+    for (const auto& [name, text] : contextEntries_) {
+        context->values.set(name, Value::text(*this, text));
+    }
+    return handOut(std::move(context));
+}
+
 EmbeddedBroker::EmbeddedBroker() : impl_(std::make_unique<Impl>()) {}
 EmbeddedBroker::~EmbeddedBroker() = default;
 
@@ -74,6 +88,10 @@ void EmbeddedBroker::host(const std::string& name, const ProviderFactories& fact
 void EmbeddedBroker::load(const std::string& file, const std::string& name,
                           std::vector<std::string> classes) {
     impl_->hosting.load(file, name, std::move(classes));
+}
+
+void EmbeddedBroker::setContextEntry(const std::string& name, const std::string& text) {
+    impl_->setContextEntry(name, text);
 }
 
 void EmbeddedBroker::unload(const std::string& name) {

@@ -229,6 +229,13 @@ public:
      */
     void load(const std::string& file, const std::string& name, std::vector<std::string> classes = {});
     /**
+     * Gives providers an entry of their contexts, as a CIM server's configuration would: it stands in the
+     * context of every factory call and every request that begins from now on.
+     * @param name the entry's name; one that begins with "CMPI" is the standard's.
+     * @param text its value, a `CMPI_string`; takes the place of an earlier one.
+     */
+    void setContextEntry(const std::string& name, const std::string& text);
+    /**
      * Calls the provider's `cleanup`, waits for requests that are inside it, and unloads its library.
      * @throws BrokerError when no such provider is hosted.
      */
@@ -308,6 +315,13 @@ public:
 
     /** The request's context, as provider functions receive it. */
     const CMPIContext* context() const;
+
+    /**
+     * Tells how far the operations of this request have come, while they run.
+     * @param handler called with the number of instances and object paths that the provider has returned so
+     * far, after each of them and on the thread that returned it; null: nobody. It must not throw.
+     */
+    void setProgressHandler(std::function<void(std::size_t results)> handler);
 
     /** A new object path, made through the broker's own slot; null when that refuses. */
     CMPIObjectPath* objectPath(const std::string& nameSpace, const std::string& className);

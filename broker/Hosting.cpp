@@ -160,7 +160,7 @@ PropertyArray::PropertyArray(const std::vector<std::string>* names) {
 HostedProvider::~HostedProvider() {
     Owner own(core_); // what the provider makes while it ends
     own.enter();
-    const CMPIContext* const context = handOut(std::make_unique<Context>(core_));
+    const CMPIContext* const context = core_.newContext();
     cleanUp(instance_, context);
     cleanUp(association_, context);
     cleanUp(method_, context);
@@ -184,7 +184,7 @@ void HostedProvider::create(const ProviderFactories& factories) {
     const auto make = [&](auto factory, auto*& mi) {
         if (factory != nullptr) {
             CMPIStatus status = {CMPI_RC_OK, nullptr};
-            mi = factory(&core_.record, handOut(std::make_unique<Context>(core_)), &status);
+            mi = factory(&core_.record, core_.newContext(), &status);
             require(mi, status);
         }
     };
@@ -209,7 +209,7 @@ MI* HostedProvider::createFromLibrary(const char* kind, bool& found) {
     using GenericFactory = MI* (*)(const CMPIBroker*, const CMPIContext*, const char*, CMPIStatus*);
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     MI* mi = nullptr;
-    const CMPIContext* const context = handOut(std::make_unique<Context>(core_));
+    const CMPIContext* const context = core_.newContext();
     if (void* const own = function(name_ + "_Create_" + kind)) {
         mi = reinterpret_cast<Factory>(own)(&core_.record, context, &status);
     } else if (void* const generic = function(std::string("_Generic_Create_") + kind)) {
@@ -338,7 +338,7 @@ CMPIObjectPath* Hosting::deliver(const CMPIObjectPath* handle) const {
 }
 
 template <class MI, class Function>
-Reply Hosting::request(const CMPIObjectPath* handle, const Function& function,
+Reply Hosting::request(const CMPIContext* context, const CMPIObjectPath* handle, const Function& function,
                        std::string_view associationClass) {
     Reply reply;
     const ObjectPath* const path = ObjectPath::of(handle);
@@ -358,6 +358,9 @@ Reply Hosting::request(const CMPIObjectPath* handle, const Function& function,
         return reply;
     }
     Result* const result = handOut(std::make_unique<Result>(core_));
+    if (Context* const own = Context::of(context)) {
+        result->progress = std::exchange(own->progress, nullptr);
+    }
     const CMPIObjectPath* const delivered = deliver(handle);
     std::string message;
     const CMPIStatus status =
@@ -372,20 +375,20 @@ Reply Hosting::request(const CMPIObjectPath* handle, const Function& function,
 Reply Hosting::enumerateInstances(const CMPIContext* context, const CMPIObjectPath* path,
                                   const char** properties) {
     return request<CMPIInstanceMI>(
-        path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+        context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
             return mi->ft->enumerateInstances(mi, context, result, delivered, properties);
         });
 }
 
 Reply Hosting::enumerateInstanceNames(const CMPIContext* context, const CMPIObjectPath* path) {
-    return request<CMPIInstanceMI>(path,
+    return request<CMPIInstanceMI>(context, path,
                                    [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
                                        return mi->ft->enumerateInstanceNames(mi, context, result, delivered);
                                    });
 }
 
 Reply Hosting::getInstance(const CMPIContext* context, const CMPIObjectPath* path, const char** properties) {
-    return request<CMPIInstanceMI>(path,
+    return request<CMPIInstanceMI>(context, path,
                                    [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
                                        return mi->ft->getInstance(mi, context, result, delivered, properties);
                                    });
@@ -394,7 +397,7 @@ Reply Hosting::getInstance(const CMPIContext* context, const CMPIObjectPath* pat
 Reply Hosting::createInstance(const CMPIContext* context, const CMPIObjectPath* path,
                               const CMPIInstance* instance) {
     return request<CMPIInstanceMI>(
-        path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+        context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
             return mi->ft->createInstance(mi, context, result, delivered, instance);
         });
 }
@@ -402,13 +405,13 @@ Reply Hosting::createInstance(const CMPIContext* context, const CMPIObjectPath* 
 Reply Hosting::modifyInstance(const CMPIContext* context, const CMPIObjectPath* path,
                               const CMPIInstance* instance, const char** properties) {
     return request<CMPIInstanceMI>(
-        path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+        context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
             return mi->ft->modifyInstance(mi, context, result, delivered, instance, properties);
         });
 }
 
 Reply Hosting::deleteInstance(const CMPIContext* context, const CMPIObjectPath* path) {
-    return request<CMPIInstanceMI>(path,
+    return request<CMPIInstanceMI>(context, path,
                                    [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
                                        return mi->ft->deleteInstance(mi, context, result, delivered);
                                    });
@@ -417,7 +420,7 @@ Reply Hosting::deleteInstance(const CMPIContext* context, const CMPIObjectPath* 
 Reply Hosting::execQuery(const CMPIContext* context, const CMPIObjectPath* path, const char* query,
                          const char* language) {
     return request<CMPIInstanceMI>(
-        path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+        context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
             return mi->ft->execQuery(mi, context, result, delivered, query, language);
         });
 }
@@ -425,7 +428,7 @@ Reply Hosting::execQuery(const CMPIContext* context, const CMPIObjectPath* path,
 Reply Hosting::associators(const CMPIContext* context, const CMPIObjectPath* path,
                            const AssociationFilter& filter, const char** properties) {
     return request<CMPIAssociationMI>(
-        path,
+        context, path,
         [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
             return mi->ft->associators(mi, context, result, delivered, orNull(filter.associationClass),
                                        orNull(filter.resultClass), orNull(filter.role),
@@ -437,7 +440,7 @@ Reply Hosting::associators(const CMPIContext* context, const CMPIObjectPath* pat
 Reply Hosting::associatorNames(const CMPIContext* context, const CMPIObjectPath* path,
                                const AssociationFilter& filter) {
     return request<CMPIAssociationMI>(
-        path,
+        context, path,
         [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
             return mi->ft->associatorNames(mi, context, result, delivered, orNull(filter.associationClass),
                                            orNull(filter.resultClass), orNull(filter.role),
@@ -449,7 +452,7 @@ Reply Hosting::associatorNames(const CMPIContext* context, const CMPIObjectPath*
 Reply Hosting::references(const CMPIContext* context, const CMPIObjectPath* path,
                           const AssociationFilter& filter, const char** properties) {
     return request<CMPIAssociationMI>(
-        path,
+        context, path,
         [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
             return mi->ft->references(mi, context, result, delivered, orNull(filter.resultClass),
                                       orNull(filter.role), properties);
@@ -460,7 +463,7 @@ Reply Hosting::references(const CMPIContext* context, const CMPIObjectPath* path
 Reply Hosting::referenceNames(const CMPIContext* context, const CMPIObjectPath* path,
                               const AssociationFilter& filter) {
     return request<CMPIAssociationMI>(
-        path,
+        context, path,
         [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
             return mi->ft->referenceNames(mi, context, result, delivered, orNull(filter.resultClass),
                                           orNull(filter.role));
@@ -472,8 +475,8 @@ Reply Hosting::invokeMethod(const CMPIContext* context, const CMPIObjectPath* pa
                             const CMPIArgs* in) {
     const CMPIArgs* const given = in != nullptr ? in : handOut(std::make_unique<Arguments>(core_));
     CMPIArgs* const out = handOut(std::make_unique<Arguments>(core_));
-    Reply reply =
-        request<CMPIMethodMI>(path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+    Reply reply = request<CMPIMethodMI>(
+        context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
             return mi->ft->invokeMethod(mi, context, result, delivered, method, given, out);
         });
     reply.out = out;

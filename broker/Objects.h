@@ -4,6 +4,7 @@
 #include "EmbeddedBroker.h"
 
 #include <atomic>
+#include <functional>
 #include <memory>
 #include <mutex>
 #include <string>
@@ -216,6 +217,9 @@ public:
     std::unique_ptr<Object> clone() const override;
 
     NamedValues values;
+    // Who wants to know of the results of the request that begins next; null for nobody. Upcalls, which come
+    // under the same context, find it taken.
+    const std::function<void(std::size_t)>* progress = nullptr;
 };
 
 class Enumeration : public RecordedObject<CMPIEnumeration, Kind::enumeration, Enumeration> {
@@ -267,7 +271,15 @@ public:
     explicit Result(Core& core) : RecordedObject(core) {}
     std::unique_ptr<Object> clone() const override { throw Failure{CMPI_RC_ERR_NOT_SUPPORTED}; }
 
+    // Says that one more has come.
+    void tellProgress() const {
+        if (progress != nullptr && *progress) {
+            (*progress)(reply.instances.size() + reply.objectPaths.size());
+        }
+    }
+
     Reply reply;
+    const std::function<void(std::size_t)>* progress = nullptr;
 };
 
 class PropertyList : public RecordedObject<CMPIPropertyList, Kind::other, PropertyList> {

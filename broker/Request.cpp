@@ -7,7 +7,7 @@ class Request::Impl {
 public:
     explicit Impl(EmbeddedBroker& broker) : core(broker.impl()) {
         owner.enter();
-        context = handOut(std::make_unique<Context>(core));
+        context = core.newContext();
         CMPIValue flags = {};
         flags.uint32 = 0;
         context->values.set(CMPIInvocationFlags, Value::number(flags, CMPI_uint32));
@@ -23,12 +23,14 @@ public:
         if (target != nullptr) {
             context->values.set(CMPIInitNameSpace, Value::text(core, target->nameSpace));
         }
+        context->progress = &progress;
         return context;
     }
 
     Core& core;
     Owner owner{core};
     Context* context = nullptr;
+    std::function<void(std::size_t)> progress;
 };
 
 Request::Request(EmbeddedBroker& broker) : impl_(std::make_unique<Impl>(broker)) {}
@@ -41,6 +43,10 @@ EmbeddedBroker::Impl& Request::core() {
 
 const CMPIContext* Request::context() const {
     return impl_->context;
+}
+
+void Request::setProgressHandler(std::function<void(std::size_t results)> handler) {
+    impl_->progress = std::move(handler);
 }
 
 CMPIObjectPath* Request::objectPath(const std::string& nameSpace, const std::string& className) {
