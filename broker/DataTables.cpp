@@ -130,13 +130,6 @@ Class* copyFor(const Result& result, const Record* handle) {
     return given;
 }
 
-// A value that belongs to an array of one, which the request owns.
-CMPIData keep(Core& core, Value value) {
-    auto holder = std::make_unique<Array>(core, value.type(), 0);
-    holder->elements.push_back(std::move(value));
-    return handOut(std::move(holder))->elements.front().data();
-}
-
 void returnData(Result& result, const CMPIValue* value, CMPIType type) {
     result.reply.data.push_back(keep(result.core(), Value::from(result.core(), value, type)));
 }

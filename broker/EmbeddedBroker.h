@@ -333,6 +333,14 @@ public:
      * @throws BrokerError naming the column (from 1) and what is wrong there.
      */
     CMPIObjectPath* objectPathFromText(const std::string& text, const std::string& nameSpace);
+    /**
+     * The value of a text, written as those in an object path are. A text, date/time or path may stand
+     * without quotes, and is then taken as it is.
+     * @param type the type of the value, no array; `CMPI_null`: what it looks like, as in a path of an
+     * undeclared class, a text when it is neither a number nor `TRUE` or `FALSE`.
+     * @throws BrokerError naming the column (from 1) and what is wrong there.
+     */
+    CMPIData valueFromText(const std::string& text, CMPIType type);
     /** A copy of the path as a client's request would bring it to a provider: its keys as the broker's
      * KeyMode says. */
     CMPIObjectPath* deliver(const CMPIObjectPath* path);

@@ -337,4 +337,7 @@ auto handOut(std::unique_ptr<Class> object) {
     return &given;
 }
 
+// A value that belongs to an array of one, which the current owner has.
+CMPIData keep(Core& core, Value value);
+
 } // namespace oxahv

@@ -414,6 +414,10 @@ TEST(TheTexts, NameCodesAndValues) {
     value.sint8 = -5;
     EXPECT_EQ(oxahv::valueText({CMPI_sint8, 0, value}), "-5");
     value.real64 = 0.1;
-    EXPECT_EQ(oxahv::valueText({CMPI_real64, 0, value}), "0.10000000000000001");
+    EXPECT_EQ(oxahv::valueText({CMPI_real64, 0, value}), "0.1");
     EXPECT_EQ(oxahv::valueText({CMPI_real64, CMPI_nullValue, value}), "NULL");
+    value.real64 = 1e300;
+    EXPECT_EQ(oxahv::valueText({CMPI_real64, 0, value}), "1.0e+300");
+    value.real32 = -3;
+    EXPECT_EQ(oxahv::valueText({CMPI_real32, 0, value}), "-3.0");
 }
