@@ -131,6 +131,13 @@ Value widest(const Value& value) {
     return Value::number(wide, type);
 }
 
+// Whether a path's class is declared, and without the method.
+bool lacksMethod(const Classes& classes, const CMPIObjectPath* handle, const char* method) {
+    const ObjectPath* const path = ObjectPath::of(handle);
+    const auto declared = path != nullptr ? classes.find(path->className) : nullptr;
+    return declared != nullptr && declared->findMethod(method) == nullptr;
+}
+
 void applyKeyMode(ObjectPath& path, KeyMode mode) {
     for (NamedValue& key : path.keys) {
         if (key.value.isNull()) {
@@ -475,10 +482,16 @@ Reply Hosting::invokeMethod(const CMPIContext* context, const CMPIObjectPath* pa
                             const CMPIArgs* in) {
     const CMPIArgs* const given = in != nullptr ? in : handOut(std::make_unique<Arguments>(core_));
     CMPIArgs* const out = handOut(std::make_unique<Arguments>(core_));
-    Reply reply = request<CMPIMethodMI>(
-        context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
-            return mi->ft->invokeMethod(mi, context, result, delivered, method, given, out);
-        });
+    Reply reply;
+    if (lacksMethod(core_.classes, path, method)) {
+        reply.code = CMPI_RC_ERR_METHOD_NOT_FOUND;
+        reply.message = std::string("the class declares no method ") + method;
+    } else {
+        reply = request<CMPIMethodMI>(
+            context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+                return mi->ft->invokeMethod(mi, context, result, delivered, method, given, out);
+            });
+    }
     reply.out = out;
     return reply;
 }
