@@ -42,7 +42,7 @@ const char* const sensorPath =
 const char* const detailsPath = "root/cimv2:OXATK_AssetIDDetails.InstanceID=\"OXATK:AssetIDDetails:machine\"";
 
 class TheHostProvider : public testing::Test {
-protected:
+public:
     TheHostProvider() {
         write("/proc/sys/kernel/hostname", "machine");
         write("/proc/sys/kernel/osrelease", "6.1.0-test");
@@ -215,7 +215,8 @@ TEST_F(TheHostProvider, ReadsNumberKeysOfEveryUnsignedWidth) {
     };
     for (const KeyMode mode : {KeyMode::exact, KeyMode::untyped}) {
         broker_.setKeyMode(mode);
-        for (const CMPIType type : {CMPI_uint8, CMPI_uint16, CMPI_uint32, CMPI_uint64}) {
+        for (const CMPIType type :
+             {CMPIType{CMPI_uint8}, CMPIType{CMPI_uint16}, CMPIType{CMPI_uint32}, CMPIType{CMPI_uint64}}) {
             EXPECT_EQ(reading(1, type), "0.25");
             EXPECT_EQ(reading(15, type), "2.0");
             EXPECT_EQ(reading(2, type), "CMPI_RC_ERR_NOT_FOUND");
@@ -287,7 +288,7 @@ TEST_F(TheHostProvider, LeadsFromOneSideOfTheAssociationToTheOther) {
     }
     const std::vector<std::string> wanted = {"Dependent", "NameFormat"};
     EXPECT_EQ(textOf(request_.associators(path(osPath), {}, &wanted)),
-              "CreationClassName=\"OXATK_ComputerSystem\" Name=\"machine\" NameFormat=\"HostName\" ");
+              "Name=\"machine\" CreationClassName=\"OXATK_ComputerSystem\" NameFormat=\"HostName\" ");
 
     std::string other = systemPath;
     other.replace(other.rfind("machine"), 7, "others");
