@@ -26,9 +26,11 @@ set(oxahv_warnings -Wall -Wextra -Wpedantic -Wconversion -Wshadow)
 set(oxahv_hardening
     -fstack-protector-strong
     -fstack-clash-protection
-    $<$<IN_LIST:${CMAKE_SYSTEM_PROCESSOR},x86_64;i686>:-fcf-protection>
-    # Fortified libc calls need the optimizer, and sanitizers bring checks of their own.
-    $<$<AND:$<NOT:$<CONFIG:Debug>>,$<STREQUAL:${OXAHV_SANITIZE},>>:-D_FORTIFY_SOURCE=2>)
+    $<$<IN_LIST:${CMAKE_SYSTEM_PROCESSOR},x86_64;i686>:-fcf-protection>)
+# Fortified libc calls need the optimizer, and sanitizers bring checks of their own.
+if(NOT OXAHV_SANITIZE)
+    list(APPEND oxahv_hardening $<$<NOT:$<CONFIG:Debug>>:-D_FORTIFY_SOURCE=2>)
+endif()
 
 # Warnings, hidden symbols, hardening and sanitizers for one target.
 function(oxahv_target_defaults target)

@@ -17,7 +17,7 @@ constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
 
 PropertyFile::PropertyFile() = default;
 
-PropertyFile::PropertyFile(const std::string& path) : path_(path) {
+PropertyFile::PropertyFile(std::string path) : path_(std::move(path)) {
     load();
 }
 

@@ -50,7 +50,7 @@ public:
      * @param path the file's path, absolute unless the process stays in its folder.
      * @throws std::system_error when the file exists but cannot be read. std::bad_alloc
      */
-    explicit PropertyFile(const std::string& path);
+    explicit PropertyFile(std::string path);
 
     PropertyFile(const PropertyFile&) = delete;
     PropertyFile& operator=(const PropertyFile&) = delete;
@@ -80,8 +80,9 @@ public:
 
     /**
      * Writes the file, all or nothing: whoever reads it, and whatever fails, sees the earlier content or the
-     * new one whole. The file keeps its permissions, and its owner and group where the process may set them;
-     * a new one can be read by its owner alone. A symbolic link stays, what it names is written.
+     * new one whole. The file keeps its permission bits, and its owner and group where the process may set
+     * them (where it may not set the group, the group's permissions go); a new one can be read by its owner
+     * alone. A symbolic link stays, what it names is written.
      *
      * @throws std::system_error when it cannot be written; the earlier file is then untouched, unless its
      * folder alone could not be synchronised: then the new content is in place but may not outlive a power

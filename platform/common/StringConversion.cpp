@@ -3,6 +3,8 @@
 #include <array>
 #include <climits>
 #include <cwchar>
+#include <langinfo.h>
+#include <string_view>
 
 namespace TK {
 
@@ -22,26 +24,40 @@ wchar_t escape(unsigned char byte) {
     return static_cast<wchar_t>(byte < 0x80 ? byte : escapedByte + byte);
 }
 
+// Whether ASCII characters are their own bytes, with no state to them: then they need no conversion.
+bool asciiIsPlain() {
+    const std::string_view codeset = ::nl_langinfo(CODESET);
+    return codeset == "UTF-8" || codeset == "ANSI_X3.4-1968" || codeset.substr(0, 9) == "ISO-8859-";
+}
+
+bool isAscii(wchar_t character) {
+    return character >= 0 && character < 0x80;
+}
+
 } // namespace
 
 // Both directions convert the terminating NUL too: it brings a stateful encoding back to its initial state
 // and brings out a character that an encoding holds back to see what follows.
 
 std::string make_string(const std::wstring& text) {
+    const bool plain = asciiIsPlain();
     std::string result;
     result.reserve(text.size() + 1);
     std::array<char, MB_LEN_MAX> bytes{};
     std::mbstate_t state{};
     for (std::size_t i = 0; i <= text.size(); ++i) {
+        if (plain && isAscii(text[i])) {
+            result += static_cast<char>(text[i]);
+            continue;
+        }
         const std::mbstate_t before = state;
         std::size_t count = std::wcrtomb(bytes.data(), text[i], &state);
         if (count == failed) {
             state = before;
+            count = std::wcrtomb(bytes.data(), L'?', &state);
+            // A bare byte takes the question mark's place, behind a character that was held back.
             if (isEscapedByte(text[i])) {
-                bytes[0] = static_cast<char>(text[i] - escapedByte);
-                count = 1;
-            } else {
-                count = std::wcrtomb(bytes.data(), L'?', &state);
+                bytes[count - 1] = static_cast<char>(text[i] - escapedByte);
             }
         }
         result.append(bytes.data(), count);
@@ -55,11 +71,16 @@ std::string make_string(const char* text) {
 }
 
 std::wstring make_wstring(const std::string& text) {
+    const bool plain = asciiIsPlain();
     std::wstring result;
     result.reserve(text.size() + 1);
     const char* const end = text.data() + text.size() + 1;
     std::mbstate_t state{};
     for (const char* position = text.data(); position != end;) {
+        if (plain && isAscii(static_cast<unsigned char>(*position))) {
+            result += static_cast<wchar_t>(*position++);
+            continue;
+        }
         const std::mbstate_t before = state;
         wchar_t character = 0;
         const std::size_t count =

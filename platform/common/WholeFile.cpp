@@ -16,7 +16,8 @@ namespace {
 
 // Throws the failure that errno tells.
 [[noreturn]] void fail(const char* action, const std::string& path) {
-    throw std::system_error(errno, std::generic_category(), std::string(action) + " '" + path + "'");
+    const int code = errno;
+    throw std::system_error(code, std::generic_category(), std::string(action) + " '" + path + "'");
 }
 
 class Descriptor {
