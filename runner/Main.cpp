@@ -87,16 +87,22 @@ void addFilters(CLI::App& command, Takes takes, oxahv::AssociationFilter& filter
 }
 
 void addVerb(CLI::App& app, const Verb& verb, Operands& operands) {
+    const bool isOfClass = verb.target == Target::ofClass;
     CLI::App* const command = app.add_subcommand(verb.name, verb.help);
-    command->add_option(verb.target == Target::ofClass ? "CLASS" : "PATH", operands.target)->required();
+    command
+        ->add_option(isOfClass ? "CLASS" : "PATH", operands.target,
+                     isOfClass ? "a class's name" : "an instance's path, such as Class.Key=\"text\",Number=3")
+        ->required()
+        ->type_name("");
     if (verb.takes == Takes::filter || verb.takes == Takes::referenceFilter) {
         addFilters(*command, verb.takes, operands.filter);
     } else if (verb.takes == Takes::method) {
-        command->add_option("METHOD", operands.method)->required();
-        command->add_option("name=value", operands.arguments, "an input argument; repeatable");
+        command->add_option("METHOD", operands.method, "the method's name")->required()->type_name("");
+        command->add_option("name=value", operands.arguments, "an input argument")->type_name("");
         command->footer(methodFooter);
     }
     command->fallthrough();
+    command->group("Verbs");
 }
 
 int parseAndRun(CLI::App& app, int argc, char** argv) {
@@ -107,6 +113,7 @@ int parseAndRun(CLI::App& app, int argc, char** argv) {
     for (const Verb& verb : verbs()) {
         addVerb(app, verb, operands);
     }
+    app.get_formatter()->label("SUBCOMMAND", "VERB");
     app.require_subcommand(1);
     app.footer(footer);
     app.parse(argc, argv);

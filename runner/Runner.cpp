@@ -129,21 +129,20 @@ void showTraces() {
 
 const std::vector<Verb>& verbs() {
     static const std::vector<Verb> all = {
-        {"ein", Target::ofClass, Takes::nothing, Yields::paths, "the paths of a class's instances",
+        {"ein", Target::ofClass, Takes::nothing, Yields::paths, "CLASS: the paths of its instances",
          enumerateNames},
-        {"ei", Target::ofClass, Takes::nothing, Yields::instances, "a class's instances", enumerate},
-        {"gi", Target::ofInstance, Takes::nothing, Yields::instances, "the instance with a path",
-         getInstance},
+        {"ei", Target::ofClass, Takes::nothing, Yields::instances, "CLASS: its instances", enumerate},
+        {"gi", Target::ofInstance, Takes::nothing, Yields::instances, "PATH: the instance", getInstance},
         {"an", Target::ofInstance, Takes::filter, Yields::paths,
-         "the paths of the instances associated with one", associatorNames},
-        {"ai", Target::ofInstance, Takes::filter, Yields::instances, "the instances associated with one",
+         "PATH: the paths of the instances associated with it", associatorNames},
+        {"ai", Target::ofInstance, Takes::filter, Yields::instances, "PATH: the instances associated with it",
          associators},
         {"rn", Target::ofInstance, Takes::referenceFilter, Yields::paths,
-         "the paths of the associations that refer to one", referenceNames},
+         "PATH: the paths of the associations that refer to it", referenceNames},
         {"ri", Target::ofInstance, Takes::referenceFilter, Yields::instances,
-         "the associations that refer to one", references},
-        {"cm", Target::ofInstance, Takes::method, Yields::methodResult, "call a method of an instance",
-         callMethod},
+         "PATH: the associations that refer to it", references},
+        {"cm", Target::ofInstance, Takes::method, Yields::methodResult,
+         "PATH METHOD name=value ...: call a method of the instance", callMethod},
     };
     return all;
 }
