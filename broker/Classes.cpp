@@ -109,20 +109,19 @@ void requireSameType(const std::string& what, CMPIType inherited, CMPIType type,
     }
 }
 
-// A class's own declarations of one kind have different names.
+// Whether the declaration at the index is the first of its name.
 template <class Declaration>
-void requireOwnName(const std::string& what, const std::vector<Declaration>& declarations, Part part,
-                    std::size_t index) {
-    if (named(declarations, declarations[index].name) != &declarations[index]) {
-        throw DeclarationError(what + " stands twice", part, index);
-    }
+bool isFirstOfName(const std::vector<Declaration>& declarations, std::size_t index) {
+    return named(declarations, declarations[index].name) == &declarations[index];
 }
 
 // Adds a class's own property to the inherited ones; a redeclaration may make it a key.
 void addProperty(DeclaredClass& declared, const ClassDeclaration& declaration, std::size_t index) {
     PropertyDeclaration property = declaration.properties()[index];
     const std::string what = "class " + declared.name + ": property " + property.name;
-    requireOwnName(what, declaration.properties(), Part::property, index);
+    if (!isFirstOfName(declaration.properties(), index)) {
+        throw DeclarationError(what + " stands twice", Part::property, index);
+    }
     property.isKey = property.isKey || property.qualifiers.isTrue("Key");
     for (PropertyDeclaration& inherited : declared.properties) {
         if (sameName(inherited.name, property.name)) {
@@ -163,10 +162,14 @@ void setDirections(MethodDeclaration& method) {
 void addMethod(DeclaredClass& declared, const ClassDeclaration& declaration, std::size_t index) {
     MethodDeclaration method = declaration.methods()[index];
     const std::string what = "class " + declared.name + ": method " + method.name;
-    requireOwnName(what, declaration.methods(), Part::method, index);
+    if (!isFirstOfName(declaration.methods(), index)) {
+        throw DeclarationError(what + " stands twice", Part::method, index);
+    }
     for (std::size_t i = 0; i < method.parameters.size(); ++i) {
-        requireOwnName(what + ": parameter " + method.parameters[i].name, method.parameters, Part::method,
-                       index);
+        if (!isFirstOfName(method.parameters, i)) {
+            throw DeclarationError(what + ": parameter " + method.parameters[i].name + " stands twice",
+                                   Part::parameter, index, i);
+        }
     }
     const auto inherited = std::find_if(declared.methods.begin(), declared.methods.end(),
                                         [&](const auto& m) { return sameName(m->name, method.name); });

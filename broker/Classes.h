@@ -36,16 +36,19 @@ struct QualifierType {
 // Why a declaration is refused, and which part of it is at fault.
 class DeclarationError : public BrokerError {
 public:
-    enum class Part { name, superclass, property, method };
-    DeclarationError(const std::string& message, Part part, std::size_t index = 0)
-        : BrokerError(message), part_(part), index_(index) {}
+    enum class Part { name, superclass, property, method, parameter };
+    DeclarationError(const std::string& message, Part part, std::size_t index = 0, std::size_t parameter = 0)
+        : BrokerError(message), part_(part), index_(index), parameter_(parameter) {}
     Part part() const { return part_; }
-    // Of a property or method: its position among the declaration's own.
+    // The position of the property or method among the declaration's own.
     std::size_t index() const { return index_; }
+    // The position of the parameter in the method.
+    std::size_t parameter() const { return parameter_; }
 
 private:
     Part part_;
     std::size_t index_;
+    std::size_t parameter_;
 };
 
 // A set of declared classes and qualifier types.

@@ -130,6 +130,7 @@ struct MethodDeclaration {
     std::string name;                               ///< as declared
     CMPIType returnType = CMPI_null;                ///< `CMPI_ref` for references
     std::vector<ParameterDeclaration> parameters{}; ///< in order
+    std::string returnClass{};                      ///< of a reference: the class that it leads to
     Qualifiers qualifiers{};
 
     /** The parameter of a name, in any case; null when there is none. */

@@ -131,13 +131,6 @@ Value widest(const Value& value) {
     return Value::number(wide, type);
 }
 
-// Whether a path's class is declared, and without the method.
-bool lacksMethod(const Classes& classes, const CMPIObjectPath* handle, const char* method) {
-    const ObjectPath* const path = ObjectPath::of(handle);
-    const auto declared = path != nullptr ? classes.find(path->className) : nullptr;
-    return declared != nullptr && declared->findMethod(method) == nullptr;
-}
-
 void applyKeyMode(ObjectPath& path, KeyMode mode) {
     for (NamedValue& key : path.keys) {
         if (key.value.isNull()) {
@@ -483,9 +476,11 @@ Reply Hosting::invokeMethod(const CMPIContext* context, const CMPIObjectPath* pa
     const CMPIArgs* const given = in != nullptr ? in : handOut(std::make_unique<Arguments>(core_));
     CMPIArgs* const out = handOut(std::make_unique<Arguments>(core_));
     Reply reply;
-    if (lacksMethod(core_.classes, path, method)) {
+    const ObjectPath* const target = ObjectPath::of(path);
+    const auto declared = target != nullptr ? core_.classes.find(target->className) : nullptr;
+    if (declared != nullptr && declared->findMethod(method) == nullptr) {
         reply.code = CMPI_RC_ERR_METHOD_NOT_FOUND;
-        reply.message = std::string("the class declares no method ") + method;
+        reply.message = "class " + declared->name + " has no method " + method;
     } else {
         reply = request<CMPIMethodMI>(
             context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {

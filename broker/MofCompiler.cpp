@@ -21,22 +21,22 @@ constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
 // the same in a text that does not bring their declarations.
 struct StandardQualifier {
     const char* name;
-    CMPIType type;
     unsigned int scopes;
+    CMPIType type;
     bool reachesSubclass;
 };
+constexpr unsigned int classScopes = mofScope::classes | mofScope::association | mofScope::indication;
 constexpr StandardQualifier standardQualifiers[] = {
-    {"Abstract", CMPI_boolean, mofScope::classes | mofScope::association | mofScope::indication, false},
-    {"Association", CMPI_boolean, mofScope::association, true},
-    {"Deprecated", CMPI_stringA, mofScope::any, false},
-    {"Experimental", CMPI_boolean, mofScope::any, false},
-    {"In", CMPI_boolean, mofScope::parameter, true},
-    {"Indication", CMPI_boolean, mofScope::classes | mofScope::indication, true},
-    {"Key", CMPI_boolean, mofScope::property | mofScope::reference, true},
-    {"Out", CMPI_boolean, mofScope::parameter, true},
-    {"Override", CMPI_string, mofScope::property | mofScope::method | mofScope::reference, false},
-    {"Version", CMPI_string,
-     mofScope::classes | mofScope::schema | mofScope::association | mofScope::indication, false},
+    {"Abstract", classScopes, CMPI_boolean, false},
+    {"Association", mofScope::association, CMPI_boolean, true},
+    {"Deprecated", mofScope::any, CMPI_stringA, false},
+    {"Experimental", mofScope::any, CMPI_boolean, false},
+    {"In", mofScope::parameter, CMPI_boolean, true},
+    {"Indication", mofScope::classes | mofScope::indication, CMPI_boolean, true},
+    {"Key", mofScope::property | mofScope::reference, CMPI_boolean, true},
+    {"Out", mofScope::parameter, CMPI_boolean, true},
+    {"Override", mofScope::property | mofScope::method | mofScope::reference, CMPI_string, false},
+    {"Version", classScopes | mofScope::schema, CMPI_string, false},
 };
 
 // What a qualifier has that names no value.
@@ -89,6 +89,8 @@ std::size_t placeOf(const DeclarationError& error, const MofClass& declared) {
         return declared.properties[error.index()].name.offset;
     case DeclarationError::Part::method:
         return declared.methods[error.index()].name.offset;
+    case DeclarationError::Part::parameter:
+        return declared.methods[error.index()].parameters[error.parameter()].name.offset;
     default:
         return declared.name.offset;
     }
@@ -214,7 +216,7 @@ PropertyDeclaration MofCompiler::propertyOf(const MofSource& source, const MofEl
 }
 
 MethodDeclaration MofCompiler::methodOf(const MofSource& source, const MofMethod& method) const {
-    MethodDeclaration result{method.name.text, method.type};
+    MethodDeclaration result{method.name.text, method.type, {}, method.referenceClass};
     result.qualifiers = qualifiersOf(source, method.qualifiers, mofScope::method, "method");
     for (const MofElement& element : method.parameters) {
         ParameterDeclaration parameter{element.name.text, element.type};
