@@ -31,8 +31,8 @@ public:
     void setMessageHandler(std::function<void(const BrokerMessage&)> handler);
 
     void setContextEntry(const std::string& name, const std::string& text);
-    // A context with the program's entries; the current owner's.
-    Context* newContext();
+    // Puts the program's entries into a new context.
+    void addContextEntries(Context& context);
 
 private:
     std::array<std::atomic<int>, kindCount>
@@ -45,6 +45,7 @@ private:
 public:
     CMPIBroker record = {this, &requestTable, &encapsulationTable, &systemTable, &memoryTable};
     Owner owner{*this};
+    Owner clones{*this}; // apart from what a memory mark frees: they are their callers'
     Classes classes;
     Hooks hooks;
     Hosting hosting{*this};

@@ -44,13 +44,11 @@ void EmbeddedBroker::Impl::setContextEntry(const std::string& name, const std::s
     contextEntries_[name] = text;
 }
 
-Context* EmbeddedBroker::Impl::newContext() {
-    auto context = std::make_unique<Context>(*this);
+void EmbeddedBroker::Impl::addContextEntries(Context& context) {
     const std::shared_lock<std::shared_mutex> lock(contextMutex_);
     for (const auto& [name, text] : contextEntries_) {
-        context->values.set(name, Value::text(*this, text));
+        context.values.set(name, Value::text(*this, text));
     }
-    return handOut(std::move(context));
 }
 
 EmbeddedBroker::EmbeddedBroker() : impl_(std::make_unique<Impl>()) {}

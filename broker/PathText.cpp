@@ -1,6 +1,7 @@
 // Reads object paths, and single values, from texts.
 
 #include "Core.h"
+#include "DateTimeText.h"
 #include "Integers.h"
 
 #include <cerrno>
@@ -207,12 +208,12 @@ private:
             return Value::from(core_, &value, CMPI_ref);
         }
         case CMPI_dateTime: {
-            CMPIStatus status = {CMPI_RC_OK, nullptr};
-            CMPIValue value = {};
-            value.dateTime = CMNewDateTimeFromChars(&core_.record, text.c_str(), &status);
-            if (status.rc != CMPI_RC_OK) {
+            if (!isDateTimeText(text)) {
                 fail(start, "expected a datetime");
             }
+            DateTime dateTime(core_, text);
+            CMPIValue value = {};
+            value.dateTime = &dateTime;
             return Value::from(core_, &value, CMPI_dateTime);
         }
         default:

@@ -6,31 +6,28 @@ namespace oxahv {
 class Request::Impl {
 public:
     explicit Impl(EmbeddedBroker& broker) : core(broker.impl()) {
-        owner.enter();
-        context = core.newContext();
+        core.addContextEntries(context);
         CMPIValue flags = {};
         flags.uint32 = 0;
-        context->values.set(CMPIInvocationFlags, Value::number(flags, CMPI_uint32));
-        context->values.set(CMPIPrincipal, Value::text(core, ""));
+        context.values.set(CMPIInvocationFlags, Value::number(flags, CMPI_uint32));
+        context.values.set(CMPIPrincipal, Value::text(core, ""));
     }
-    ~Impl() { owner.leave(); }
-    Impl(const Impl&) = delete;
-    Impl& operator=(const Impl&) = delete;
 
     // The context of a request for a path.
     const CMPIContext* contextFor(const CMPIObjectPath* path) {
         const ObjectPath* const target = ObjectPath::of(path);
         if (target != nullptr) {
-            context->values.set(CMPIInitNameSpace, Value::text(core, target->nameSpace));
+            context.values.set(CMPIInitNameSpace, Value::text(core, target->nameSpace));
         }
-        context->progress = &progress;
-        return context;
+        context.progress = &progress;
+        return &context;
     }
 
     Core& core;
+    Context context{core}; // nobody's: a provider that releases it does no harm
     Owner owner{core};
-    Context* context = nullptr;
     std::function<void(std::size_t)> progress;
+    Owner::Scope scope{owner};
 };
 
 Request::Request(EmbeddedBroker& broker) : impl_(std::make_unique<Impl>(broker)) {}
@@ -42,7 +39,7 @@ EmbeddedBroker::Impl& Request::core() {
 }
 
 const CMPIContext* Request::context() const {
-    return impl_->context;
+    return &impl_->context;
 }
 
 void Request::setProgressHandler(std::function<void(std::size_t results)> handler) {

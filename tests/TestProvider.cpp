@@ -1,9 +1,11 @@
-// A provider library with factories of one name, and generic ones that refuse every other name but "Generic".
-// It returns the paths and arguments that it is given; of class Slow a path takes half a second.
+// A provider library with factories of one name, and generic ones that refuse every other name but "Generic",
+// "Throws" by an exception. It returns the paths and arguments that it is given; of class Slow a path takes
+// half a second.
 #include <cmpimacs.h>
 
 #include <chrono>
 #include <cstring>
+#include <exception>
 #include <thread>
 
 static const CMPIBroker* broker;
@@ -75,9 +77,22 @@ static CMPIStatus TestInvokeMethod(CMPIMethodMI*, const CMPIContext*, const CMPI
 CMInstanceMIStub(Test, TestProvider, broker, )
 CMMethodMIStub(Test, TestProvider, broker, )
 
+namespace {
+
+// Lives in this library alone, with all that a handler needs of it.
+class NoProvider : public std::exception {
+public:
+    const char* what() const noexcept override { return "no provider"; }
+};
+
+} // namespace
+
 extern "C" CMPI_EXPORT CMPIInstanceMI* _Generic_Create_InstanceMI(const CMPIBroker* theBroker,
                                                                   const CMPIContext* context,
                                                                   const char* name, CMPIStatus* status) {
+    if (std::strcmp(name, "Throws") == 0) {
+        throw NoProvider();
+    }
     if (std::strcmp(name, "Generic") != 0) {
         CMSetStatus(status, CMPI_RC_ERR_NOT_FOUND);
         return nullptr;
