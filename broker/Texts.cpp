@@ -5,7 +5,8 @@
 
 #include <algorithm>
 #include <array>
-#include <cstdio>
+#include <charconv>
+#include <cmath>
 #include <cstdlib>
 
 namespace oxahv {
@@ -123,10 +124,15 @@ std::string arrayText(const Array& array) {
     return text + "}";
 }
 
-std::string realText(double value, int digits) {
-    std::array<char, 40> text{};
-    std::snprintf(text.data(), text.size(), "%.*g", digits, value);
-    return text.data();
+// The shortest text that reads back as the same number. MOF wants a point in it.
+template <class Real>
+std::string realText(Real value) {
+    std::array<char, 40> buffer{};
+    std::string text(buffer.data(), std::to_chars(buffer.data(), buffer.data() + buffer.size(), value).ptr);
+    if (std::isfinite(value) && text.find('.') == std::string::npos) {
+        text.insert(std::min(text.find('e'), text.size()), ".0");
+    }
+    return text;
 }
 
 std::string objectText(const CMPIData& data) {
@@ -172,9 +178,9 @@ std::string valueText(const CMPIData& data) {
     case CMPI_sint64:
         return std::to_string(data.value.sint64);
     case CMPI_real32:
-        return realText(data.value.real32, 9);
+        return realText(data.value.real32);
     case CMPI_real64:
-        return realText(data.value.real64, 17);
+        return realText(data.value.real64);
     case CMPI_chars:
         return quoted(data.value.chars);
     default:
