@@ -159,8 +159,8 @@ private:
     }
 
     void noteAllocations() {
+        failing::ended();
         allocations_ = failing::allocations();
-        failing::allocationsFrom(0);
     }
 
     template <class Type>

@@ -1,12 +1,24 @@
-// Makes memory run out: a test program that links FailingMemory.cpp has its own `operator new`.
+// Stands in the place of `operator new`, so that memory runs out when a test says so. A test program that
+// links FailingMemory.cpp sees every allocation of the libraries too, since the dynamic linker takes the
+// program's own operator first. All of it is about the calling thread alone.
 #pragma once
 
 namespace failing {
 
-// Lets every allocation of this thread fail from the n-th on, 1 being the next one; 0: none.
+// Lets the n-th allocation from now fail and those after it succeed, 1 being the next one.
+void allocation(unsigned int n);
+
+// Lets every allocation fail from the n-th on; 0: none.
 void allocationsFrom(unsigned int n);
 
-// How many allocations this thread has asked for since that was called.
+// Ends failing. Returns whether an allocation has failed since it began.
+bool ended();
+
+// How many allocations have been asked for since allocation() or allocationsFrom() was called, up to ended().
 unsigned int allocations();
+
+// Whether the first allocation that failed was asked for below a function of a library, `name` being a part
+// of its file's name.
+bool failedIn(const char* name);
 
 } // namespace failing

@@ -3,6 +3,8 @@
 #include "HostProvider.h"
 #include "AssetTag.h"
 #include "EmbeddedBroker.h"
+#include "FailingMemory.h"
+#include "HVLogger.h"
 #include "HostTime.h"
 #include "Keys.h"
 
@@ -460,41 +462,83 @@ TEST_F(TheHostProvider, AnswersWithACodeWhateverFailsBelowIt) {
         {systemPath, [](auto& request, auto* system,
                         auto* in) { return request.invokeMethod(system, "SetAssetTag", in); }},
     };
+    unsigned int points = 0;
     for (const auto& operation : operations) {
         SCOPED_TRACE(operation.path);
-        // The operation's reply, when one call of a slot fails that the provider makes.
-        const auto sendWith = [&](const oxahv::Fault* fault, std::size_t& calls) {
+        // The code that the operation answers, between `prepare` and `finish`.
+        const auto sendWith = [&](const auto& prepare, const auto& finish) {
             Request request(broker_);
             const CMPIObjectPath* const target = request.objectPathFromText(operation.path, "root/cimv2");
             const CMPIArgs* const in = tagArguments("tag");
-            if (fault != nullptr) {
-                broker_.injectFault("*", *fault);
+            prepare();
+            try {
+                const Reply reply = operation.send(request, target, in);
+                finish();
+                EXPECT_NE(reply.message.rfind("exception", 0), 0U) << reply.message;
+                return reply.code;
+            } catch (const std::bad_alloc&) {
+                finish();
+                EXPECT_FALSE(failing::failedIn("HostProvider")) << "the provider let an exception out";
+                return CMPI_RC_ERROR_SYSTEM; // the broker itself had no room for the reply
             }
-            broker_.startRecording();
-            const Reply reply = operation.send(request, target, in);
-            calls = broker_.stopRecording().size();
-            broker_.clearFaults();
-            EXPECT_NE(reply.message.rfind("exception", 0), 0U) << reply.message;
-            return reply.code;
         };
+        // One call of a slot fails that the provider makes.
         std::size_t calls = 0;
-        std::size_t ignored = 0;
+        const auto sendWithFault = [&](const oxahv::Fault* fault) {
+            return sendWith(
+                [&] {
+                    if (fault != nullptr) {
+                        broker_.injectFault("*", *fault);
+                    }
+                    broker_.startRecording();
+                },
+                [&] {
+                    calls = broker_.stopRecording().size();
+                    broker_.clearFaults();
+                });
+        };
         unsigned int failures = 0;
-        EXPECT_EQ(sendWith(nullptr, calls), CMPI_RC_OK);
+        EXPECT_EQ(sendWithFault(nullptr), CMPI_RC_OK);
         EXPECT_GT(calls, 10U);
         for (const oxahv::Fault& kind : {oxahv::Fault{CMPI_RC_ERR_FAILED}, oxahv::Fault{CMPI_RC_OK, true},
-                                         oxahv::Fault{CMPI_RC_OK, false, CMPI_nullValue}}) {
-            for (unsigned int call = 1; call <= calls; ++call) {
-                oxahv::Fault fault = kind;
-                fault.firstCall = call;
-                failures += sendWith(&fault, ignored) != CMPI_RC_OK ? 1U : 0U;
+                                         oxahv::Fault{CMPI_RC_OK, false, CMPI_nullValue},
+                                         oxahv::Fault{CMPI_RC_OK, false, CMPI_badValue}}) {
+            oxahv::Fault fault = kind;
+            for (fault.firstCall = 1, calls = 1; fault.firstCall <= calls; ++fault.firstCall, ++points) {
+                failures += sendWithFault(&fault) != CMPI_RC_OK ? 1U : 0U;
             }
         }
         EXPECT_GT(failures, 5U) << "what a reply cannot do without";
+        // Memory runs out, once and for good.
+        for (const bool once : {true, false}) {
+            bool isReached = true;
+            for (unsigned int n = 1; isReached; ++n, ++points) {
+                SCOPED_TRACE((once ? "allocation " : "allocations from ") + std::to_string(n));
+                const CMPIrc code =
+                    sendWith([&] { once ? failing::allocation(n) : failing::allocationsFrom(n); },
+                             [&] { isReached = failing::ended(); });
+                EXPECT_TRUE(isReached || code == CMPI_RC_OK);
+            }
+        }
+        // The logger throws.
+        bool isReached = true;
+        for (unsigned int n = 1; isReached; ++n, ++points) {
+            unsigned int logged = 0;
+            HVLog::HVLogger::setSink([&](const HVLog::Message& /*message*/) {
+                if (++logged == n) {
+                    throw std::runtime_error("logger");
+                }
+            });
+            HVLog::HVLogger::setThreshold(0);
+            const CMPIrc code = sendWith([] {}, [] { HVLog::HVLogger::reset(); });
+            isReached = logged >= n;
+            EXPECT_EQ(code, isReached ? CMPI_RC_ERR_FAILED : CMPI_RC_OK);
+        }
         const oxahv::Fault noDone = {CMPI_RC_ERR_ACCESS_DENIED};
         broker_.injectFault("CMPIResultFT.returnDone", noDone);
-        EXPECT_EQ(sendWith(nullptr, ignored), CMPI_RC_ERR_ACCESS_DENIED);
+        EXPECT_EQ(sendWithFault(nullptr), CMPI_RC_ERR_ACCESS_DENIED);
     }
+    std::cerr << points << " failures below the provider\n";
     EXPECT_EQ(broker_.liveObjects().total(), before.total()) << "nothing outlives its request";
 }
 

@@ -154,7 +154,7 @@ TEST(AMessageBuffer, ThrowsInsteadOfHandingOutAShortText) {
     std::ostream& stream = buffer << "a" << 1;
     failing::allocationsFrom(1);
     stream << text << 2; // a stream swallows what is thrown below it
-    failing::allocationsFrom(0);
+    failing::ended();
     EXPECT_THROW(buffer.str(stream), std::bad_alloc);
     EXPECT_EQ(buffer.str(buffer << "a" << 1), "a1");
 
@@ -167,5 +167,5 @@ TEST(AMessageBuffer, ThrowsInsteadOfHandingOutAShortText) {
     plain << "a";
     failing::allocationsFrom(1);
     EXPECT_THROW(plain << text.c_str(), std::bad_alloc);
-    failing::allocationsFrom(0);
+    failing::ended();
 }

@@ -1,6 +1,6 @@
 #include "Moniker.h"
 
-#include "Allocations.h"
+#include "FailingMemory.h"
 
 #include <cstring>
 #include <functional>
@@ -202,13 +202,13 @@ TEST(AMoniker, IsAsItWasWhenMemoryRunsOut) {
         for (unsigned int n = 1; reached; ++n) {
             Moniker moniker = oneOfEach();
             moniker.selectKey(1);
-            failAllocation(n);
+            failing::allocation(n);
             try {
                 operation(moniker);
-                reached = failAllocation(0);
+                reached = failing::ended();
                 EXPECT_FALSE(reached) << "a failed allocation was swallowed";
             } catch (const std::bad_alloc&) {
-                failAllocation(0);
+                failing::ended();
                 ++failures;
                 EXPECT_EQ(nameOf(moniker), "b");
                 EXPECT_EQ(moniker.getKeyCount(), 5U);
@@ -225,14 +225,14 @@ TEST(AMoniker, ReadsANumberWholeOrThrowsWhenMemoryRunsOut) {
     bool reached = true;
     for (unsigned int n = 1; reached; ++n) {
         unsigned long long value = 7;
-        failAllocation(n);
+        failing::allocation(n);
         try {
             moniker.getValue(value);
-            reached = failAllocation(0);
+            reached = failing::ended();
             EXPECT_FALSE(reached) << "a failed allocation was swallowed";
             EXPECT_EQ(value, 18446744073709551615ULL);
         } catch (const std::bad_alloc&) {
-            failAllocation(0);
+            failing::ended();
         }
     }
 }

@@ -1,7 +1,7 @@
 // Wide and narrow texts: everything that the C library converts, and nothing that it does not.
 #include "Utility.h"
 
-#include "Allocations.h"
+#include "FailingMemory.h"
 #include "LoggerCalls.h"
 #include "TestLocales.h"
 
@@ -236,13 +236,13 @@ void checkMemory(const From& in, const To& earlier, const To& result,
         forgetLoggerCalls();
         To out = earlier;
         bool converted = false;
-        failAllocation(n);
+        failing::allocation(n);
         try {
             converted = convert(in, out);
         } catch (const std::bad_alloc&) {
             ++failures;
         }
-        reached = failAllocation(0);
+        reached = failing::ended();
         if (converted) {
             EXPECT_EQ(out, result);
         } else {
