@@ -19,6 +19,7 @@ struct State {
     unsigned int failed = 0;
     std::array<void*, 64> stack{}; // of the first failure
     int depth = 0;
+    const void* asker = nullptr; // where in it operator new was called
 };
 thread_local State state;
 
@@ -30,13 +31,14 @@ void begin(unsigned int first, bool once) {
     state.counts = true;
 }
 
-void* allocate(std::size_t size) {
+void* allocate(std::size_t size, const void* asker) {
     if (state.counts) {
         ++state.asked;
         const bool fails =
             state.first != 0 && (state.once ? state.asked == state.first : state.asked >= state.first);
         if (fails) {
             if (state.failed++ == 0) {
+                state.asker = asker;
                 state.depth = ::backtrace(state.stack.data(), static_cast<int>(state.stack.size()));
             }
             return nullptr;
@@ -45,12 +47,23 @@ void* allocate(std::size_t size) {
     return std::malloc(size != 0 ? size : 1);
 }
 
-void* allocateOrThrow(std::size_t size) {
-    void* const block = allocate(size);
+void* allocateOrThrow(std::size_t size, const void* asker) {
+    void* const block = allocate(size, asker);
     if (block == nullptr) {
         throw std::bad_alloc();
     }
     return block;
+}
+
+// Whether a function is the C++ library's: its own, or a template of its. All libraries of a process share
+// one copy of such a template, wherever it lies.
+bool isStandard(const Dl_info& info) {
+    constexpr std::array<const char*, 4> prefixes = {"_ZNSt", "_ZNKSt", "_ZSt", "_ZN9__gnu_cxx"};
+    return std::strstr(info.dli_fname, "libstdc++") != nullptr ||
+           std::any_of(prefixes.begin(), prefixes.end(), [&info](const char* prefix) {
+               return info.dli_sname != nullptr &&
+                      std::strncmp(info.dli_sname, prefix, std::strlen(prefix)) == 0;
+           });
 }
 
 } // namespace
@@ -73,27 +86,31 @@ unsigned int failing::allocations() {
 }
 
 bool failing::failedIn(const char* name) {
-    return state.failed != 0 &&
-           std::any_of(state.stack.begin(), state.stack.begin() + state.depth, [name](const void* frame) {
-               Dl_info info{};
-               return ::dladdr(frame, &info) != 0 && std::strstr(info.dli_fname, name) != nullptr;
-           });
+    void* const* const begin = state.stack.data();
+    void* const* const end = begin + (state.failed != 0 ? state.depth : 0);
+    for (void* const* frame = std::find(begin, end, state.asker); frame != end; ++frame) {
+        Dl_info info{};
+        if (::dladdr(*frame, &info) != 0 && !isStandard(info)) {
+            return std::strstr(info.dli_fname, name) != nullptr;
+        }
+    }
+    return false;
 }
 
 void* operator new(std::size_t size) {
-    return allocateOrThrow(size);
+    return allocateOrThrow(size, __builtin_return_address(0));
 }
 
 void* operator new[](std::size_t size) {
-    return allocateOrThrow(size);
+    return allocateOrThrow(size, __builtin_return_address(0));
 }
 
 void* operator new(std::size_t size, const std::nothrow_t& /*nothrow*/) noexcept {
-    return allocate(size);
+    return allocate(size, __builtin_return_address(0));
 }
 
 void* operator new[](std::size_t size, const std::nothrow_t& /*nothrow*/) noexcept {
-    return allocate(size);
+    return allocate(size, __builtin_return_address(0));
 }
 
 void operator delete(void* block) noexcept {

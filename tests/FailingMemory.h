@@ -17,8 +17,8 @@ bool ended();
 // How many allocations have been asked for since allocation() or allocationsFrom() was called, up to ended().
 unsigned int allocations();
 
-// Whether the first allocation that failed was asked for below a function of a library, `name` being a part
-// of its file's name.
+// Whether the first allocation that failed was asked for by a library, itself or through the C++ library;
+// `name` is a part of its file's name.
 bool failedIn(const char* name);
 
 } // namespace failing

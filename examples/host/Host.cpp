@@ -2,8 +2,10 @@
 
 #include <algorithm>
 #include <charconv>
-#include <filesystem>
+#include <dirent.h>
 #include <fstream>
+#include <memory>
+#include <string_view>
 #include <system_error>
 
 namespace {
@@ -19,9 +21,25 @@ std::optional<unsigned long long> numberIn(const std::string& text) {
     return isWhole ? std::optional(number) : std::nullopt;
 }
 
+// Reads the next line. A stream keeps to itself what is thrown below it; here lack of memory is let through,
+// and a file that cannot be read has no lines.
+bool readLine(std::ifstream& file, std::string& text) {
+    try {
+        file.exceptions(std::ios_base::badbit);
+        return static_cast<bool>(std::getline(file, text));
+    } catch (const std::ios_base::failure&) {
+        text.clear();
+        return false;
+    }
+}
+
+struct CloseFolder {
+    void operator()(DIR* folder) const { ::closedir(folder); }
+};
+
 // The value of a line KEY=VALUE or KEY: VALUE unit in a file.
 std::string valueOf(std::ifstream file, const std::string& key) {
-    for (std::string line; std::getline(file, line);) {
+    for (std::string line; readLine(file, line);) {
         if (line.rfind(key, 0) == 0) {
             const std::size_t begin = line.find_first_not_of(" \t\"", key.size());
             return begin != std::string::npos ? line.substr(begin, line.find_last_not_of("\" ") + 1 - begin)
@@ -41,7 +59,7 @@ std::optional<unsigned long long> kibibytes(const std::string& text) {
 std::string Host::line(const std::string& path) const {
     std::ifstream file(root_ + path);
     std::string text;
-    std::getline(file, text);
+    readLine(file, text);
     return text;
 }
 
@@ -51,10 +69,13 @@ std::optional<unsigned long long> Host::number(const std::string& path) const {
 
 std::vector<std::string> Host::entries(const std::string& path) const {
     std::vector<std::string> names;
-    std::error_code error;
-    for (std::filesystem::directory_iterator entry(root_ + path, error), end; !error && entry != end;
-         entry.increment(error)) {
-        names.push_back(entry->path().filename());
+    // std::filesystem's iterator would end the process where memory runs out.
+    const std::unique_ptr<DIR, CloseFolder> folder(::opendir((root_ + path).c_str()));
+    while (const dirent* const entry = folder != nullptr ? ::readdir(folder.get()) : nullptr) {
+        const std::string_view name(entry->d_name);
+        if (name != "." && name != "..") {
+            names.emplace_back(name);
+        }
     }
     std::sort(names.begin(), names.end());
     return names;
