@@ -96,7 +96,7 @@ Value checkedValue(Core& core, const CMPIValue* value, CMPIType type, CMPIType d
         return Value::null(declared);
     }
     Value result = Value::from(core, value, type);
-    if (result.type() != declared) {
+    if (result.type() != storedType(declared)) {
         throw Failure{CMPI_RC_ERR_TYPE_MISMATCH};
     }
     return result;

@@ -38,6 +38,7 @@ private:
 public:
     CMPIBroker record = {this, &requestTable, &encapsulationTable, &systemTable, &memoryTable};
     Owner owner{*this};
+    Owner clones{*this}; // apart from what a memory mark frees: they are their callers'
     Classes classes;
     Hooks hooks;
     Hosting hosting{*this};

@@ -126,19 +126,16 @@ Class* copyFor(const Result& result, const Record* handle) {
     }
     std::unique_ptr<Object> copy = object->clone();
     auto* const given = static_cast<Class*>(copy.get());
-    Owner::current(result.core()).adopt(std::move(copy));
+    result.keeper.adopt(std::move(copy));
     return given;
 }
 
-// A value that belongs to an array of one, which the request owns.
-CMPIData keep(Core& core, Value value) {
-    auto holder = std::make_unique<Array>(core, value.type(), 0);
-    holder->elements.push_back(std::move(value));
-    return handOut(std::move(holder))->elements.front().data();
-}
-
+// The value is kept in an array of one.
 void returnData(Result& result, const CMPIValue* value, CMPIType type) {
-    result.reply.data.push_back(keep(result.core(), Value::from(result.core(), value, type)));
+    auto holder = std::make_unique<Array>(result.core(), type, 0);
+    holder->elements.push_back(Value::from(result.core(), value, type));
+    result.reply.data.push_back(holder->elements.front().data());
+    result.keeper.adopt(std::move(holder));
 }
 
 void returnInstance(Result& result, const CMPIInstance* instance) {

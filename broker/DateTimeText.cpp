@@ -59,6 +59,10 @@ bool isFraction(std::string_view text) {
     return isDigits(text.substr(0, firstAsterisk)) && isAsterisks(text.substr(firstAsterisk));
 }
 
+bool isNumberIn(std::string_view digits, const Field& field) {
+    return isDigits(digits) && numberOf(digits) >= field.lowest && numberOf(digits) <= field.highest;
+}
+
 template <std::size_t count>
 bool areFields(std::string_view text, const std::array<Field, count>& fields) {
     bool isOpen = false; // once a field is left open, all that follow are
@@ -66,15 +70,24 @@ bool areFields(std::string_view text, const std::array<Field, count>& fields) {
         const std::string_view digits = text.substr(field.position, field.width);
         if (isAsterisks(digits)) {
             isOpen = true;
-        } else if (isOpen) {
-            return false;
-        } else if (field.position == fractionPosition) {
-            return isFraction(digits);
-        } else if (!isDigits(digits) || numberOf(digits) < field.lowest || numberOf(digits) > field.highest) {
+        } else if (isOpen ||
+                   !(field.position == fractionPosition ? isFraction(digits) : isNumberIn(digits, field))) {
             return false;
         }
     }
     return true;
+}
+
+int daysOfMonth(int year, int month) {
+    const bool isLeapYear = year % 4 == 0 && (year % 100 != 0 || year % 400 == 0);
+    constexpr std::array<int, 12> days = {31, 28, 31, 30, 31, 30, 31, 31, 30, 31, 30, 31};
+    return month == 2 && isLeapYear ? 29 : days.at(static_cast<std::size_t>(month - 1));
+}
+
+// Whether the fields, each in its own range, name a day that its month has.
+bool isDayOfItsMonth(std::string_view text) {
+    const auto& f = timestampFields;
+    return valueOf(text, f[2]) <= daysOfMonth(valueOf(text, f[0]), valueOf(text, f[1]));
 }
 
 // Days since 1970-01-01 of a date in the Gregorian calendar, which repeats itself every 400 years.
@@ -130,7 +143,8 @@ bool isDateTimeText(std::string_view text) {
         return offset == "000" && areFields(text, intervalFields);
     }
     return (text[signPosition] == '+' || text[signPosition] == '-') &&
-           (isDigits(offset) || isAsterisks(offset)) && areFields(text, timestampFields);
+           (isDigits(offset) || isAsterisks(offset)) && areFields(text, timestampFields) &&
+           isDayOfItsMonth(text);
 }
 
 std::uint64_t binaryOf(std::string_view text) {
@@ -145,13 +159,13 @@ std::uint64_t binaryOf(std::string_view text) {
         daysSinceEpoch(valueOf(text, f[0]), valueOf(text, f[1]), valueOf(text, f[2])) * day +
         timeOfDay(valueOf(text, f[3]), valueOf(text, f[4]), valueOf(text, f[5])) + fractionOf(text);
     const std::string_view minutes = text.substr(signPosition + 1);
-    const std::int64_t offset = (isAsterisks(minutes) ? 0 : numberOf(minutes)) * 60 * second;
+    const std::int64_t offset = (isAsterisks(minutes) ? 0 : numberOf(minutes)) * (60 * second);
     const std::int64_t utc = text[signPosition] == '-' ? local + offset : local - offset;
     return utc > 0 ? static_cast<std::uint64_t>(utc) : 0;
 }
 
 std::string dateTimeText(std::uint64_t microseconds, bool isInterval) {
-    constexpr std::uint64_t dayLength = static_cast<std::uint64_t>(day);
+    constexpr auto dayLength = static_cast<std::uint64_t>(day);
     const std::uint64_t days = microseconds / dayLength;
     const auto rest = static_cast<std::int64_t>(microseconds % dayLength);
     const int hour = static_cast<int>(rest / (3'600 * second));
@@ -163,16 +177,16 @@ std::string dateTimeText(std::uint64_t microseconds, bool isInterval) {
         if (days > 99'999'999) {
             return {};
         }
-        std::snprintf(text.data(), text.size(), "%08d%02d%02d%02d.%06d:000", static_cast<int>(days), hour,
-                      minute, seconds, fraction);
+        (void)std::snprintf(text.data(), text.size(), "%08d%02d%02d%02d.%06d:000", static_cast<int>(days),
+                            hour, minute, seconds, fraction);
         return text.data();
     }
     const Date date = dateOf(static_cast<std::int64_t>(days));
     if (date.year > 9999) {
         return {};
     }
-    std::snprintf(text.data(), text.size(), "%04d%02d%02d%02d%02d%02d.%06d+000", static_cast<int>(date.year),
-                  date.month, date.day, hour, minute, seconds, fraction);
+    (void)std::snprintf(text.data(), text.size(), "%04d%02d%02d%02d%02d%02d.%06d+000",
+                        static_cast<int>(date.year), date.month, date.day, hour, minute, seconds, fraction);
     return text.data();
 }
 

@@ -22,9 +22,10 @@
  *
  * **Ownership.** Every CMPI object that the broker makes belongs to the request that is current on the
  * calling thread, the innermost Request alive there; without one, to the broker itself. It dies with its
- * owner, unless the caller released it before. What a `clone` slot returned belongs to its caller, who
- * releases it with its `release` slot; what is left then dies with the broker. An object may be used after
- * its release by nobody.
+ * owner, unless the caller released it before. What a `clone` slot or `prepareAttachThread` returned belongs
+ * to its caller, who releases it with its `release` slot; what is left then dies with the broker. A part of
+ * an object, such as a property's string, dies with the object; its release does nothing. An object may be
+ * used after its release by nobody. A memory mark frees what the current owner has got since.
  *
  * **Encoding.** All texts are UTF-8; a CMPIString keeps its bytes as they came.
  *
@@ -229,7 +230,8 @@ public:
      */
     void load(const std::string& file, const std::string& name, std::vector<std::string> classes = {});
     /**
-     * Calls the provider's `cleanup`, waits for requests that are inside it, and unloads its library.
+     * Calls the provider's `cleanup`, waits for requests that are inside it, and unloads its library. Not to
+     * be called from a request that is inside it.
      * @throws BrokerError when no such provider is hosted.
      */
     void unload(const std::string& name);
@@ -257,7 +259,8 @@ public:
     /** Counts of the objects that are alive now. */
     LiveObjects liveObjects() const;
     /** Receives what providers write through the `logMessage` and `trace` slots; null: dropped. Called on
-     * their thread. */
+     * their threads, by several at once; the earlier handler is called no more when this returns. A handler
+     * must not set another. */
     void setMessageHandler(std::function<void(const BrokerMessage&)> handler);
     /** @} */
 

@@ -3,6 +3,7 @@
 #include "DateTimeText.h"
 #include "Slots.h"
 
+#include <charconv>
 #include <chrono>
 #include <cstdarg>
 
@@ -31,9 +32,7 @@ CMPIInstance* newInstance(Core& core, const CMPIObjectPath* handle) {
             instance->properties.set(property.name, Value::null(property.type));
         }
     }
-    for (const NamedValue& key : path->keys) {
-        instance->properties.set(key.name, key.value);
-    }
+    instance->setKeysOf(*path);
     return handOut(std::move(instance));
 }
 
@@ -56,8 +55,7 @@ CMPIArray* newArray(Core& core, CMPICount size, CMPIType type) {
     if (type == CMPI_null || (type & CMPI_ARRAY) != 0) {
         throw Failure{CMPI_RC_ERR_INVALID_DATA_TYPE};
     }
-    return handOut(
-        std::make_unique<Array>(core, type == CMPI_chars ? static_cast<CMPIType>(CMPI_string) : type, size));
+    return handOut(std::make_unique<Array>(core, type, size));
 }
 
 CMPIDateTime* newDateTimeOf(Core& core, std::string text) {
@@ -157,12 +155,20 @@ CMPIString* toString(Core& core, const void* handle) {
 // The default text of a message with its insertions: {0}, {1}, … stand for them.
 CMPIString* newMessage(Core& core, const char* /*id*/, const char* text,
                        const std::vector<std::string>* insertions) {
-    std::string message = required(text);
-    for (std::size_t i = 0; i < insertions->size(); ++i) {
-        const std::string mark = '{' + std::to_string(i) + '}';
-        const std::size_t position = message.find(mark);
-        if (position != std::string::npos) {
-            message.replace(position, mark.size(), (*insertions)[i]);
+    std::string message;
+    for (std::string_view rest = required(text); !rest.empty();) {
+        std::size_t number = insertions->size();
+        const char* const end = rest.data() + rest.size();
+        const char* after = rest.data() + 1;
+        if (rest.front() == '{') {
+            after = std::from_chars(after, end, number).ptr;
+        }
+        if (number < insertions->size() && after != end && *after == '}') {
+            message += (*insertions)[number];
+            rest.remove_prefix(static_cast<std::size_t>(after + 1 - rest.data()));
+        } else {
+            message += rest.front();
+            rest.remove_prefix(1);
         }
     }
     return newText(core, message);
@@ -233,7 +239,7 @@ CMPIString* getMessage(const CMPIBroker* broker, const char* id, const char* tex
     return result;
 }
 
-CMPIString* getMessageOfFile(const CMPIBroker* broker, const char* id, const CMPIMsgFileHandle /*file*/,
+CMPIString* getMessageOfFile(const CMPIBroker* broker, const char* id, CMPIMsgFileHandle /*file*/,
                              const char* text, CMPIStatus* rc, CMPICount count, ...) {
     std::va_list list;
     va_start(list, count);

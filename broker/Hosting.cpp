@@ -43,8 +43,8 @@ private:
     template <class MI>
     MI* createFromLibrary(const char* kind, bool& found);
     void* function(const std::string& symbol) const;
-    template <class MI>
-    void require(MI* mi, const CMPIStatus& status) const;
+    template <class MI, class Factory>
+    MI* made(const Factory& factory) const;
 
     Core& core_;
     std::string name_;
@@ -96,6 +96,19 @@ CMPIStatus guarded(const Function& function, std::string& message) {
         message = "exception of an unknown kind";
     }
     return {CMPI_RC_ERR_FAILED, nullptr};
+}
+
+Reply refused(CMPIrc code, std::string message = {}) {
+    Reply reply;
+    reply.code = code;
+    reply.message = std::move(message);
+    return reply;
+}
+
+// Calls a slot of an MI; a provider may leave one empty.
+template <class MI, class... Parameters, class... Arguments>
+CMPIStatus callSlot(CMPIStatus (*slot)(MI*, Parameters...), MI* mi, Arguments... arguments) {
+    return slot != nullptr ? slot(mi, arguments...) : CMPIStatus{CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
 }
 
 // A signed integer is widened with its sign, any other with zeros.
@@ -158,45 +171,48 @@ PropertyArray::PropertyArray(const std::vector<std::string>* names) {
 }
 
 HostedProvider::~HostedProvider() {
-    Owner own(core_); // what the provider makes while it ends
-    own.enter();
-    const CMPIContext* const context = handOut(std::make_unique<Context>(core_));
-    cleanUp(instance_, context);
-    cleanUp(association_, context);
-    cleanUp(method_, context);
-    own.leave();
+    {
+        Owner own(core_); // what the provider makes while it ends
+        const Owner::Scope scope(own);
+        const Context context(core_);
+        cleanUp(instance_, &context);
+        cleanUp(association_, &context);
+        cleanUp(method_, &context);
+    }
     if (library_ != nullptr) {
         dlclose(library_);
     }
     gone_.set_value();
 }
 
-template <class MI>
-void HostedProvider::require(MI* mi, const CMPIStatus& status) const {
+// The MI that a factory makes. What the factory throws ends here: its code may be unloaded next.
+template <class MI, class Factory>
+MI* HostedProvider::made(const Factory& factory) const {
+    const CMPIContext* const context = handOut(std::make_unique<Context>(core_));
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    MI* mi = nullptr;
+    try {
+        mi = factory(&core_.record, context, &status);
+    } catch (const std::exception& exception) {
+        throw BrokerError("provider " + name_ + ": its factory threw: " + exception.what());
+    }
     if (status.rc != CMPI_RC_OK || mi == nullptr) {
         throw BrokerError("provider " + name_ + ": its factory answered " + wordsOf(status));
     }
+    return mi;
 }
 
 void HostedProvider::create(const ProviderFactories& factories) {
     Owner own(core_);
-    own.enter();
+    const Owner::Scope scope(own);
     const auto make = [&](auto factory, auto*& mi) {
         if (factory != nullptr) {
-            CMPIStatus status = {CMPI_RC_OK, nullptr};
-            mi = factory(&core_.record, handOut(std::make_unique<Context>(core_)), &status);
-            require(mi, status);
+            mi = made<std::remove_reference_t<decltype(*mi)>>(factory);
         }
     };
-    try {
-        make(factories.instance, instance_);
-        make(factories.association, association_);
-        make(factories.method, method_);
-    } catch (...) {
-        own.leave();
-        throw;
-    }
-    own.leave();
+    make(factories.instance, instance_);
+    make(factories.association, association_);
+    make(factories.method, method_);
 }
 
 void* HostedProvider::function(const std::string& symbol) const {
@@ -207,34 +223,26 @@ template <class MI>
 MI* HostedProvider::createFromLibrary(const char* kind, bool& found) {
     using Factory = MI* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
     using GenericFactory = MI* (*)(const CMPIBroker*, const CMPIContext*, const char*, CMPIStatus*);
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    MI* mi = nullptr;
-    const CMPIContext* const context = handOut(std::make_unique<Context>(core_));
     if (void* const own = function(name_ + "_Create_" + kind)) {
-        mi = reinterpret_cast<Factory>(own)(&core_.record, context, &status);
-    } else if (void* const generic = function(std::string("_Generic_Create_") + kind)) {
-        mi = reinterpret_cast<GenericFactory>(generic)(&core_.record, context, name_.c_str(), &status);
-    } else {
-        return nullptr;
+        found = true;
+        return made<MI>(reinterpret_cast<Factory>(own));
     }
-    found = true;
-    require(mi, status);
-    return mi;
+    if (void* const generic = function(std::string("_Generic_Create_") + kind)) {
+        found = true;
+        return made<MI>([&](const CMPIBroker* broker, const CMPIContext* context, CMPIStatus* status) {
+            return reinterpret_cast<GenericFactory>(generic)(broker, context, name_.c_str(), status);
+        });
+    }
+    return nullptr;
 }
 
 void HostedProvider::createFromLibrary(const std::string& file) {
     Owner own(core_);
-    own.enter();
+    const Owner::Scope scope(own);
     bool found = false;
-    try {
-        instance_ = createFromLibrary<CMPIInstanceMI>("InstanceMI", found);
-        association_ = createFromLibrary<CMPIAssociationMI>("AssociationMI", found);
-        method_ = createFromLibrary<CMPIMethodMI>("MethodMI", found);
-    } catch (...) {
-        own.leave();
-        throw;
-    }
-    own.leave();
+    instance_ = createFromLibrary<CMPIInstanceMI>("InstanceMI", found);
+    association_ = createFromLibrary<CMPIAssociationMI>("AssociationMI", found);
+    method_ = createFromLibrary<CMPIMethodMI>("MethodMI", found);
     if (!found) {
         throw BrokerError("library " + file + " has no factory for a provider " + name_ + ", such as " +
                           name_ + "_Create_InstanceMI");
@@ -249,12 +257,29 @@ bool HostedProvider::serves(const Classes& declared, std::string_view className)
 Hosting::~Hosting() {
     // In the order in which they came; each may still send requests to those after it.
     while (!providers_.empty()) {
-        providers_.erase(providers_.begin());
+        take(providers_.front()->name());
     }
+}
+
+// The provider leaves the list under the lock, but ends without it: its cleanup may send requests.
+std::shared_ptr<HostedProvider> Hosting::take(const std::string& name) {
+    const std::unique_lock<std::shared_mutex> lock(mutex_);
+    const auto found = std::find_if(providers_.begin(), providers_.end(),
+                                    [&](const auto& provider) { return provider->name() == name; });
+    if (found == providers_.end()) {
+        throw BrokerError("no provider " + name + " is hosted");
+    }
+    std::shared_ptr<HostedProvider> taken = std::move(*found);
+    providers_.erase(found);
+    return taken;
 }
 
 void Hosting::requireFreeName(const std::string& name) const {
     const std::shared_lock<std::shared_mutex> lock(mutex_);
+    requireFreeNameLocked(name);
+}
+
+void Hosting::requireFreeNameLocked(const std::string& name) const {
     for (const std::shared_ptr<HostedProvider>& provider : providers_) {
         if (provider->name() == name) {
             throw BrokerError("a provider " + name + " is hosted already");
@@ -264,6 +289,7 @@ void Hosting::requireFreeName(const std::string& name) const {
 
 void Hosting::add(std::shared_ptr<HostedProvider> provider) {
     const std::unique_lock<std::shared_mutex> lock(mutex_);
+    requireFreeNameLocked(provider->name()); // another thread may have been faster
     providers_.push_back(std::move(provider));
 }
 
@@ -290,18 +316,9 @@ void Hosting::load(const std::string& file, const std::string& name, std::vector
 }
 
 void Hosting::unload(const std::string& name) {
-    std::future<void> gone;
-    {
-        const std::unique_lock<std::shared_mutex> lock(mutex_);
-        const auto found = std::find_if(providers_.begin(), providers_.end(),
-                                        [&](const auto& provider) { return provider->name() == name; });
-        if (found == providers_.end()) {
-            throw BrokerError("no provider " + name + " is hosted");
-        }
-        gone = (*found)->gone();
-        const std::shared_ptr<HostedProvider> last = std::move(*found);
-        providers_.erase(found);
-    }
+    std::shared_ptr<HostedProvider> provider = take(name);
+    const std::future<void> gone = provider->gone();
+    provider.reset();
     gone.wait();
 }
 
@@ -338,98 +355,98 @@ CMPIObjectPath* Hosting::deliver(const CMPIObjectPath* handle) const {
 }
 
 template <class MI, class Function>
-Reply Hosting::request(const CMPIObjectPath* handle, const Function& function,
+Reply Hosting::request(const CMPIContext* context, const CMPIObjectPath* handle, const Function& function,
                        std::string_view associationClass) {
-    Reply reply;
     const ObjectPath* const path = ObjectPath::of(handle);
-    if (path == nullptr) {
-        reply.code = CMPI_RC_ERR_INVALID_HANDLE;
-        return reply;
+    if (path == nullptr || Context::of(context) == nullptr) {
+        return refused(CMPI_RC_ERR_INVALID_HANDLE);
     }
     if (core_.classes.any() && core_.classes.find(path->className) == nullptr) {
-        reply.code = CMPI_RC_ERR_INVALID_CLASS;
-        reply.message = "class " + path->className + " is not declared";
-        return reply;
+        return refused(CMPI_RC_ERR_INVALID_CLASS, "class " + path->className + " is not declared");
     }
     const std::shared_ptr<HostedProvider> provider = find<MI>(*path, associationClass);
     if (provider == nullptr) {
-        reply.code = CMPI_RC_ERR_NOT_SUPPORTED;
-        reply.message = "no provider serves this for class " + path->className;
-        return reply;
+        return refused(CMPI_RC_ERR_NOT_SUPPORTED, "no provider serves this for class " + path->className);
     }
-    Result* const result = handOut(std::make_unique<Result>(core_));
+    Result result(core_, Owner::current(core_));
     const CMPIObjectPath* const delivered = deliver(handle);
     std::string message;
     const CMPIStatus status =
-        guarded([&] { return function(provider->mi<MI>(), result, delivered); }, message);
+        guarded([&] { return function(provider->mi<MI>(), &result, delivered); }, message);
     if (status.rc != CMPI_RC_OK) { // else an error that the provider returned as a result stands
-        result->reply.code = status.rc;
-        result->reply.message = message;
+        result.reply.code = status.rc;
+        result.reply.message = message;
     }
-    return result->reply;
+    return std::move(result.reply);
 }
 
 Reply Hosting::enumerateInstances(const CMPIContext* context, const CMPIObjectPath* path,
                                   const char** properties) {
     return request<CMPIInstanceMI>(
-        path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
-            return mi->ft->enumerateInstances(mi, context, result, delivered, properties);
+        context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+            return callSlot(mi->ft->enumerateInstances, mi, context, result, delivered, properties);
         });
 }
 
 Reply Hosting::enumerateInstanceNames(const CMPIContext* context, const CMPIObjectPath* path) {
-    return request<CMPIInstanceMI>(path,
-                                   [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
-                                       return mi->ft->enumerateInstanceNames(mi, context, result, delivered);
-                                   });
+    return request<CMPIInstanceMI>(
+        context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+            return callSlot(mi->ft->enumerateInstanceNames, mi, context, result, delivered);
+        });
 }
 
 Reply Hosting::getInstance(const CMPIContext* context, const CMPIObjectPath* path, const char** properties) {
-    return request<CMPIInstanceMI>(path,
-                                   [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
-                                       return mi->ft->getInstance(mi, context, result, delivered, properties);
-                                   });
+    return request<CMPIInstanceMI>(
+        context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+            return callSlot(mi->ft->getInstance, mi, context, result, delivered, properties);
+        });
 }
 
 Reply Hosting::createInstance(const CMPIContext* context, const CMPIObjectPath* path,
                               const CMPIInstance* instance) {
+    if (Instance::of(instance) == nullptr) {
+        return refused(CMPI_RC_ERR_INVALID_HANDLE);
+    }
     return request<CMPIInstanceMI>(
-        path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
-            return mi->ft->createInstance(mi, context, result, delivered, instance);
+        context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+            return callSlot(mi->ft->createInstance, mi, context, result, delivered, instance);
         });
 }
 
 Reply Hosting::modifyInstance(const CMPIContext* context, const CMPIObjectPath* path,
                               const CMPIInstance* instance, const char** properties) {
+    if (Instance::of(instance) == nullptr) {
+        return refused(CMPI_RC_ERR_INVALID_HANDLE);
+    }
     return request<CMPIInstanceMI>(
-        path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
-            return mi->ft->modifyInstance(mi, context, result, delivered, instance, properties);
+        context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+            return callSlot(mi->ft->modifyInstance, mi, context, result, delivered, instance, properties);
         });
 }
 
 Reply Hosting::deleteInstance(const CMPIContext* context, const CMPIObjectPath* path) {
-    return request<CMPIInstanceMI>(path,
-                                   [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
-                                       return mi->ft->deleteInstance(mi, context, result, delivered);
-                                   });
+    return request<CMPIInstanceMI>(
+        context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+            return callSlot(mi->ft->deleteInstance, mi, context, result, delivered);
+        });
 }
 
 Reply Hosting::execQuery(const CMPIContext* context, const CMPIObjectPath* path, const char* query,
                          const char* language) {
     return request<CMPIInstanceMI>(
-        path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
-            return mi->ft->execQuery(mi, context, result, delivered, query, language);
+        context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+            return callSlot(mi->ft->execQuery, mi, context, result, delivered, query, language);
         });
 }
 
 Reply Hosting::associators(const CMPIContext* context, const CMPIObjectPath* path,
                            const AssociationFilter& filter, const char** properties) {
     return request<CMPIAssociationMI>(
-        path,
+        context, path,
         [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
-            return mi->ft->associators(mi, context, result, delivered, orNull(filter.associationClass),
-                                       orNull(filter.resultClass), orNull(filter.role),
-                                       orNull(filter.resultRole), properties);
+            return callSlot(mi->ft->associators, mi, context, result, delivered,
+                            orNull(filter.associationClass), orNull(filter.resultClass), orNull(filter.role),
+                            orNull(filter.resultRole), properties);
         },
         filter.associationClass);
 }
@@ -437,11 +454,11 @@ Reply Hosting::associators(const CMPIContext* context, const CMPIObjectPath* pat
 Reply Hosting::associatorNames(const CMPIContext* context, const CMPIObjectPath* path,
                                const AssociationFilter& filter) {
     return request<CMPIAssociationMI>(
-        path,
+        context, path,
         [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
-            return mi->ft->associatorNames(mi, context, result, delivered, orNull(filter.associationClass),
-                                           orNull(filter.resultClass), orNull(filter.role),
-                                           orNull(filter.resultRole));
+            return callSlot(mi->ft->associatorNames, mi, context, result, delivered,
+                            orNull(filter.associationClass), orNull(filter.resultClass), orNull(filter.role),
+                            orNull(filter.resultRole));
         },
         filter.associationClass);
 }
@@ -449,10 +466,10 @@ Reply Hosting::associatorNames(const CMPIContext* context, const CMPIObjectPath*
 Reply Hosting::references(const CMPIContext* context, const CMPIObjectPath* path,
                           const AssociationFilter& filter, const char** properties) {
     return request<CMPIAssociationMI>(
-        path,
+        context, path,
         [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
-            return mi->ft->references(mi, context, result, delivered, orNull(filter.resultClass),
-                                      orNull(filter.role), properties);
+            return callSlot(mi->ft->references, mi, context, result, delivered, orNull(filter.resultClass),
+                            orNull(filter.role), properties);
         },
         filter.resultClass);
 }
@@ -460,10 +477,10 @@ Reply Hosting::references(const CMPIContext* context, const CMPIObjectPath* path
 Reply Hosting::referenceNames(const CMPIContext* context, const CMPIObjectPath* path,
                               const AssociationFilter& filter) {
     return request<CMPIAssociationMI>(
-        path,
+        context, path,
         [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
-            return mi->ft->referenceNames(mi, context, result, delivered, orNull(filter.resultClass),
-                                          orNull(filter.role));
+            return callSlot(mi->ft->referenceNames, mi, context, result, delivered,
+                            orNull(filter.resultClass), orNull(filter.role));
         },
         filter.resultClass);
 }
@@ -472,9 +489,9 @@ Reply Hosting::invokeMethod(const CMPIContext* context, const CMPIObjectPath* pa
                             const CMPIArgs* in) {
     const CMPIArgs* const given = in != nullptr ? in : handOut(std::make_unique<Arguments>(core_));
     CMPIArgs* const out = handOut(std::make_unique<Arguments>(core_));
-    Reply reply =
-        request<CMPIMethodMI>(path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
-            return mi->ft->invokeMethod(mi, context, result, delivered, method, given, out);
+    Reply reply = request<CMPIMethodMI>(
+        context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+            return callSlot(mi->ft->invokeMethod, mi, context, result, delivered, method, given, out);
         });
     reply.out = out;
     return reply;

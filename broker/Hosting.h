@@ -69,10 +69,12 @@ private:
     std::shared_ptr<HostedProvider> find(const ObjectPath& path,
                                          std::string_view associationClass = {}) const;
     template <class MI, class Function>
-    Reply request(const CMPIObjectPath* path, const Function& function,
+    Reply request(const CMPIContext* context, const CMPIObjectPath* path, const Function& function,
                   std::string_view associationClass = {});
     void add(std::shared_ptr<HostedProvider> provider);
+    std::shared_ptr<HostedProvider> take(const std::string& name);
     void requireFreeName(const std::string& name) const;
+    void requireFreeNameLocked(const std::string& name) const;
 
     EmbeddedBroker::Impl& core_;
     mutable std::shared_mutex mutex_;

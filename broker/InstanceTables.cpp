@@ -162,25 +162,30 @@ CMPIObjectPath* getObjectPath(const Instance& instance) {
     return handOut(std::move(path));
 }
 
-void setObjectPath(Instance& instance, const CMPIObjectPath* path) {
-    instance.path = pathOf(path).copy();
+// The path's keys become properties, as they do in a new instance.
+void setObjectPath(Instance& instance, const CMPIObjectPath* handle) {
+    std::unique_ptr<ObjectPath> path = pathOf(handle).copy();
+    instance.setKeysOf(*path);
+    instance.path = std::move(path);
 }
 
-// From here on only keys and the properties of the list can be set; what is there of others goes.
-void setPropertyFilter(Instance& instance, const char** properties, const char** /*keys*/) {
+void appendNames(std::vector<std::string>& names, const char** list) {
+    for (; list != nullptr && *list != nullptr; ++list) {
+        names.emplace_back(*list);
+    }
+}
+
+// From here on only keys and the properties of the list can be set; what is there of others goes. `keys`
+// names keys that neither the class nor the path tells.
+void setPropertyFilter(Instance& instance, const char** properties, const char** keys) {
+    std::vector<std::string> filter;
+    appendNames(filter, properties);
+    appendNames(filter, keys);
+    instance.filter = std::move(filter);
     instance.isFiltered = properties != nullptr;
-    instance.filter.clear();
-    for (const char** name = properties; instance.isFiltered && *name != nullptr; ++name) {
-        instance.filter.emplace_back(*name);
-    }
     const auto declared = instance.core().classes.find(instance.path->className);
-    NamedValues passing;
-    for (NamedValue& property : instance.properties) {
-        if (passesFilter(instance, declared.get(), property.name)) {
-            passing.set(property.name, std::move(property.value));
-        }
-    }
-    instance.properties = std::move(passing);
+    instance.properties.keepOnly(
+        [&](const std::string& name) { return passesFilter(instance, declared.get(), name); });
 }
 
 } // namespace

@@ -157,9 +157,13 @@ std::unique_ptr<Object> Owner::release(Object& object) {
 }
 
 void Owner::freeSince(const Object& mark) {
+    Owner doomed(core_); // frees outside the lock
+    const std::lock_guard<std::mutex> lock(mutex_);
     for (bool reached = false; !reached && newest_ != nullptr;) {
-        reached = newest_ == &mark;
-        release(*newest_);
+        Object& object = *newest_;
+        reached = &object == &mark;
+        unlink(object);
+        doomed.adopt(std::unique_ptr<Object>(&object));
     }
 }
 
@@ -211,9 +215,15 @@ Value& Value::operator=(const Value& other) {
     return *this;
 }
 
+CMPIType storedType(CMPIType type) {
+    const auto element = static_cast<CMPIType>(type & ~CMPI_ARRAY);
+    const bool isText = element == CMPI_chars || element == CMPI_charsptr;
+    return isText ? static_cast<CMPIType>(CMPI_string | (type & CMPI_ARRAY)) : type;
+}
+
 Value Value::null(CMPIType type) {
     Value result;
-    result.type_ = type == CMPI_chars ? static_cast<CMPIType>(CMPI_string) : type;
+    result.type_ = storedType(type);
     return result;
 }
 
@@ -247,7 +257,7 @@ Value Value::from(Core& core, const CMPIValue* value, CMPIType type) {
                    : text(core, std::string(static_cast<const char*>(pointer.ptr), pointer.length));
     }
     Value result;
-    result.type_ = type;
+    result.type_ = storedType(type);
     if (copyPlain(result.plain_, *value, type)) {
         result.isNull_ = false;
         return result;
@@ -258,9 +268,24 @@ Value Value::from(Core& core, const CMPIValue* value, CMPIType type) {
     }
     result.object_ = objectIn(value->string); // all handles stand in the same place
     result.isNull_ = result.object_ == nullptr;
-    if (!result.isNull_ && result.object_->kind() != kind) {
+    if (!result.isNull_ &&
+        (result.object_->kind() != kind ||
+         (kind == Kind::array && static_cast<Array&>(*result.object_).type() != result.type_))) {
         throw Failure{CMPI_RC_ERR_TYPE_MISMATCH};
     }
+    return result;
+}
+
+Value Value::asProperty(CMPIType declared) const {
+    Value result = *this;
+    const bool isUnsigned = declared >= CMPI_uint8 && declared <= CMPI_uint64;
+    const bool isSigned = declared >= CMPI_sint8 && declared <= CMPI_sint64;
+    const unsigned int bits = 8U << (declared >> 4U & 3U); // as the codes of the integer types have it
+    // The narrower members share the low bytes of the widest.
+    const bool fits =
+        (type_ == CMPI_uint64 && isUnsigned && (bits == 64 || plain_.uint64 >> bits == 0)) ||
+        (type_ == CMPI_sint64 && isSigned && plain_.sint64 >> (bits - 1) == plain_.sint64 >> 63);
+    result.type_ = fits ? declared : storedType(type_);
     return result;
 }
 
@@ -300,7 +325,7 @@ const NamedValue& NamedValues::at(std::size_t index) const {
 }
 
 Array::Array(Core& core, CMPIType type, std::size_t size)
-    : RecordedObject(core), elementType(type), elements(size, Value::null(type)) {}
+    : RecordedObject(core), elementType(storedType(type)), elements(size, Value::null(type)) {}
 
 std::unique_ptr<Object> Array::clone() const {
     auto copy = std::make_unique<Array>(core(), elementType, 0);
@@ -340,6 +365,15 @@ std::unique_ptr<Object> Instance::clone() const {
     copy->isFiltered = isFiltered;
     copy->filter = filter;
     return copy;
+}
+
+void Instance::setKeysOf(const ObjectPath& source) {
+    const auto declared = core().classes.find(source.className);
+    for (const NamedValue& key : source.keys) {
+        const PropertyDeclaration* const property = declared != nullptr ? declared->find(key.name) : nullptr;
+        properties.set(key.name,
+                       key.value.asProperty(property != nullptr ? property->type : CMPIType{CMPI_null}));
+    }
 }
 
 PropertyList::PropertyList(Core& core, std::vector<std::string> list)

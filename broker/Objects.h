@@ -3,6 +3,7 @@
 
 #include "EmbeddedBroker.h"
 
+#include <algorithm>
 #include <atomic>
 #include <memory>
 #include <mutex>
@@ -84,6 +85,18 @@ public:
     void leave();
     static Owner& current(Core& core);
 
+    // Makes an owner the innermost one of the thread while it lives.
+    class Scope {
+    public:
+        explicit Scope(Owner& owner) : owner_(owner) { owner_.enter(); }
+        ~Scope() { owner_.leave(); }
+        Scope(const Scope&) = delete;
+        Scope& operator=(const Scope&) = delete;
+
+    private:
+        Owner& owner_;
+    };
+
 private:
     void unlink(Object& object);
 
@@ -96,6 +109,9 @@ private:
 // The member of a value that its type says, and no byte more: the caller may have no whole value. Of a
 // `CMPI_chars` the pointer itself.
 CMPIValue memberOf(const CMPIValue* value, CMPIType type);
+
+// The type under which values of a type are stored: texts are CMPI_string, their arrays CMPI_stringA.
+CMPIType storedType(CMPIType type);
 
 // A CMPI value that owns its text or object.
 class Value {
@@ -121,6 +137,9 @@ public:
     CMPIData data(CMPIValueState state = CMPI_goodValue) const;
     // A text as `CMPI_chars`, or as `CMPI_string` again.
     void retype(CMPIType type) { type_ = type; }
+    // A key, which may have come as the KeyMode has it, as a property of a type: a text as `CMPI_string`, an
+    // integer of the widest type as the narrower one where it fits.
+    Value asProperty(CMPIType declared) const;
 
 private:
     CMPIType type_ = CMPI_null;
@@ -142,6 +161,13 @@ public:
     std::size_t size() const { return values_.size(); }
     // Throws CMPI_RC_ERR_NOT_FOUND for an index out of range.
     const NamedValue& at(std::size_t index) const;
+    // Removes the others. `isKept` takes a name.
+    template <class Predicate>
+    void keepOnly(const Predicate& isKept) {
+        const auto end = std::remove_if(values_.begin(), values_.end(),
+                                        [&](const NamedValue& named) { return !isKept(named.name); });
+        values_.erase(end, values_.end());
+    }
     auto begin() const { return values_.begin(); }
     auto end() const { return values_.end(); }
     auto begin() { return values_.begin(); }
@@ -183,6 +209,8 @@ public:
 
     Array(Core& core, CMPIType type, std::size_t size);
     std::unique_ptr<Object> clone() const override;
+    // The type of a value that holds this array.
+    CMPIType type() const { return static_cast<CMPIType>(elementType | CMPI_ARRAY); }
 
     CMPIType elementType;
     std::vector<Value> elements;
@@ -252,6 +280,8 @@ public:
     Instance(Core& core, std::unique_ptr<ObjectPath> itsPath)
         : RecordedObject(core), path(std::move(itsPath)) {}
     std::unique_ptr<Object> clone() const override;
+    // Sets the properties that are a path's keys, with their declared types.
+    void setKeysOf(const ObjectPath& source);
 
     std::unique_ptr<ObjectPath> path;
     NamedValues properties;
@@ -264,9 +294,11 @@ class Result : public RecordedObject<CMPIResult, Kind::result, Result> {
 public:
     static const CMPIResultFT table;
 
-    explicit Result(Core& core) : RecordedObject(core) {}
+    Result(Core& core, Owner& itsKeeper) : RecordedObject(core), keeper(itsKeeper) {}
     std::unique_ptr<Object> clone() const override { throw Failure{CMPI_RC_ERR_NOT_SUPPORTED}; }
 
+    // Owns what is returned: the provider may return it on a thread whose own objects die before the request.
+    Owner& keeper;
     Reply reply;
 };
 
@@ -274,7 +306,7 @@ class PropertyList : public RecordedObject<CMPIPropertyList, Kind::other, Proper
 public:
     static const CMPIPropertyListFT table;
 
-    PropertyList(Core& core, std::vector<std::string> names);
+    PropertyList(Core& core, std::vector<std::string> list);
     std::unique_ptr<Object> clone() const override { return std::make_unique<PropertyList>(core(), names); }
 
     std::vector<std::string> names;

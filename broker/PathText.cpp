@@ -1,6 +1,7 @@
 // Reads object paths from texts.
 
 #include "Core.h"
+#include "DateTimeText.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -163,12 +164,12 @@ private:
             return Value::from(core_, &value, CMPI_ref);
         }
         case CMPI_dateTime: {
-            CMPIStatus status = {CMPI_RC_OK, nullptr};
-            CMPIValue value = {};
-            value.dateTime = CMNewDateTimeFromChars(&core_.record, text.c_str(), &status);
-            if (status.rc != CMPI_RC_OK) {
+            if (!isDateTimeText(text)) {
                 fail(start, "expected a datetime");
             }
+            DateTime dateTime(core_, text);
+            CMPIValue value = {};
+            value.dateTime = &dateTime;
             return Value::from(core_, &value, CMPI_dateTime);
         }
         default:

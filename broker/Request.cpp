@@ -6,29 +6,25 @@ namespace oxahv {
 class Request::Impl {
 public:
     explicit Impl(EmbeddedBroker& broker) : core(broker.impl()) {
-        owner.enter();
-        context = handOut(std::make_unique<Context>(core));
         CMPIValue flags = {};
         flags.uint32 = 0;
-        context->values.set(CMPIInvocationFlags, Value::number(flags, CMPI_uint32));
-        context->values.set(CMPIPrincipal, Value::text(core, ""));
+        context.values.set(CMPIInvocationFlags, Value::number(flags, CMPI_uint32));
+        context.values.set(CMPIPrincipal, Value::text(core, ""));
     }
-    ~Impl() { owner.leave(); }
-    Impl(const Impl&) = delete;
-    Impl& operator=(const Impl&) = delete;
 
     // The context of a request for a path.
     const CMPIContext* contextFor(const CMPIObjectPath* path) {
         const ObjectPath* const target = ObjectPath::of(path);
         if (target != nullptr) {
-            context->values.set(CMPIInitNameSpace, Value::text(core, target->nameSpace));
+            context.values.set(CMPIInitNameSpace, Value::text(core, target->nameSpace));
         }
-        return context;
+        return &context;
     }
 
     Core& core;
+    Context context{core}; // nobody's: a provider that releases it does no harm
     Owner owner{core};
-    Context* context = nullptr;
+    Owner::Scope scope{owner};
 };
 
 Request::Request(EmbeddedBroker& broker) : impl_(std::make_unique<Impl>(broker)) {}
@@ -40,7 +36,7 @@ EmbeddedBroker::Impl& Request::core() {
 }
 
 const CMPIContext* Request::context() const {
-    return impl_->context;
+    return &impl_->context;
 }
 
 CMPIObjectPath* Request::objectPath(const std::string& nameSpace, const std::string& className) {

@@ -22,7 +22,7 @@ CMPIContext* prepareAttachThread(Core& core, const CMPIContext* handle) {
     auto copy = std::make_unique<Context>(core);
     copy->values = context->values;
     Context* const prepared = copy.get();
-    core.owner.adopt(std::move(copy));
+    core.clones.adopt(std::move(copy));
     return prepared;
 }
 

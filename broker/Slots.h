@@ -121,7 +121,11 @@ struct SlotOf<index, operation, Return (*)(Record*, Rest...)> {
             return failed<Return>(status, CMPI_RC_ERR_INVALID_HANDLE);
         }
         if (Self::core(*self).hooks.active()) {
-            return callHooked(*self, handle, status, rest...);
+            try {
+                return callHooked(*self, handle, status, rest...);
+            } catch (const std::bad_alloc&) { // no room for the record
+                return failed<Return>(status, CMPI_RC_ERROR_SYSTEM);
+            }
         }
         return run(*self, status, rest...);
     }
@@ -138,6 +142,8 @@ private:
             return failed<Return>(status, failure.code);
         } catch (const std::bad_alloc&) {
             return failed<Return>(status, CMPI_RC_ERROR_SYSTEM);
+        } catch (const std::exception&) { // such as a message handler's
+            return failed<Return>(status, CMPI_RC_ERR_FAILED);
         }
     }
 
@@ -166,7 +172,9 @@ private:
         } else {
             Return result = fault.code != CMPI_RC_OK ? failed<Return>(status, fault.code)
                                                      : runFaulted(self, fault, status, rest...);
-            if constexpr (std::is_same_v<Return, CMPIStatus>) {
+            if constexpr (std::is_same_v<Return, CMPIData>) {
+                result.state = static_cast<CMPIValueState>(result.state | fault.stateBits);
+            } else if constexpr (std::is_same_v<Return, CMPIStatus>) {
                 status = result;
                 description.call.hasStatus = true;
             }
@@ -180,7 +188,6 @@ private:
     static Return runFaulted(Object& self, const Fault& fault, CMPIStatus& status, Rest... rest) {
         if constexpr (std::is_same_v<Return, CMPIData>) {
             CMPIData data = run(self, status, rest...);
-            data.state = static_cast<CMPIValueState>(data.state | fault.stateBits);
             if (fault.yieldsNull) {
                 data.value = {};
             }
@@ -222,7 +229,7 @@ template <class Class>
 auto cloneObject(const Class& object) {
     std::unique_ptr<Object> copy = object.clone();
     auto& result = static_cast<Class&>(*copy);
-    object.core().owner.adopt(std::move(copy));
+    object.core().clones.adopt(std::move(copy));
     return &result;
 }
 

@@ -295,7 +295,6 @@ typedef enum _CMPIPredOp {
 #endif
 } CMPIPredOp;
 
-#if CMPI_VERSION >= 200
 /** How severe an error is. */
 typedef enum _CMPIErrorSeverity {
     ErrorSevUnknown = 0,
@@ -332,16 +331,13 @@ typedef enum _CMPIErrorType {
     UnavailableResourceError = 9,
     UnsupportedOperationError = 10
 } CMPIErrorType;
-#endif
 
-#if CMPI_VERSION >= 210
 /** How a text is encoded. */
 typedef enum _CMPICodepageID {
     CMPI_CPID_SYSTEM = 1,
     CMPI_CPID_USASCII = 2,
     CMPI_CPID_UTF16 = 3
 } CMPICodepageID;
-#endif
 
 #ifdef __cplusplus
 }

@@ -169,7 +169,6 @@ struct _CMPIBrokerExtFT {
 #endif
 };
 
-#if CMPI_VERSION >= 200
 /** Memory that belongs to the broker. */
 struct _CMPIBrokerMemFT {
     CMPIVersion ftVersion;
@@ -191,7 +190,6 @@ struct _CMPIBrokerMemFT {
     void (*freeChars)(const CMPIBroker* mb, char* chars);
 #endif
 };
-#endif
 
 /** A request's context: named values that travel with it. */
 struct _CMPIContext {
@@ -373,7 +371,6 @@ struct _CMPIDateTimeFT {
     CMPIBoolean (*isInterval)(const CMPIDateTime* dt, CMPIStatus* rc);
 };
 
-#if CMPI_VERSION >= 200
 /** An instance of CIM_Error. */
 struct _CMPIError {
     CMPI_CONST_SINCE_210 void* hdl;
@@ -410,7 +407,6 @@ struct _CMPIErrorFT {
     CMPIStatus (*setCIMStatusCodeDescription)(const CMPIError* er, const char* scd);
     CMPIStatus (*setMessageArguments)(const CMPIError* er, const CMPIArray* values);
 };
-#endif
 
 #if CMPI_VERSION >= 210
 /** The names of the properties that a client wants. */

@@ -328,6 +328,9 @@ static inline CMPICount CMGetContextEntryCount(const CMPIContext* o, CMPIStatus*
  */
 /** @{ */
 
+/** A `hook` that does nothing. */
+#define CMNoHook
+
 /** Functions: `pfx##Cleanup`, `pfx##EnumInstanceNames`, `pfx##EnumInstances`, `pfx##GetInstance`,
  * `pfx##CreateInstance`, `pfx##ModifyInstance`, `pfx##DeleteInstance`, `pfx##ExecQuery`. */
 #define CMInstanceMIStub(pfx, miname, mbvar, hook)                           \
@@ -445,6 +448,8 @@ static inline CMPICount CMGetContextEntryCount(const CMPIContext* o, CMPIStatus*
  * @endcode
  */
 /** @{ */
+
+extern "C++" { // a provider may include this header inside an extern "C" of its own
 
 #include <mutex>
 
@@ -738,6 +743,8 @@ struct CMPIIndicationAdapter {
         return base.template acquire<Provider>(broker, context, rc) ? &mi : nullptr;
     }
 };
+
+} // extern "C++"
 
 /** The object that the MIs named `miname` share; once for each name, before its factories. */
 #define CMProviderBase(miname) static CMPIProviderBase cmpiProviderBase_##miname;

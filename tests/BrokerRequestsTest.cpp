@@ -3,6 +3,7 @@
 
 #include <atomic>
 #include <functional>
+#include <future>
 #include <gtest/gtest.h>
 #include <stdexcept>
 
@@ -81,7 +82,8 @@ public:
     }
 };
 
-CMProviderBase(Tested) CMInstanceMIFactory(TestedProvider, Tested)
+CMProviderBase(Tested)
+CMInstanceMIFactory(TestedProvider, Tested)
 CMAssociationMIFactory(TestedProvider, Tested)
 CMMethodMIFactory(TestedProvider, Tested)
 
@@ -228,6 +230,11 @@ TEST_F(ARequest, DeliversKeysAsTheModeSays) {
         std::vector<CMPIType> types;
         behaviour.serve = [&](const CMPIContext*, const CMPIResult*, const CMPIObjectPath* p) {
             EXPECT_EQ(oxahv::pathText(p), text);
+            const CMPIInstance* const instance = CMNewInstance(behaviour.broker, p, nullptr);
+            EXPECT_EQ(CMGetProperty(instance, "U", nullptr).type, CMPI_uint8) << "as it is declared";
+            EXPECT_EQ(oxahv::valueText(CMGetProperty(instance, "S", nullptr)), "-5");
+            EXPECT_EQ(CMGetProperty(instance, "S", nullptr).type, CMPI_sint16);
+            EXPECT_EQ(CMGetProperty(instance, "T", nullptr).type, CMPI_string);
             for (CMPICount i = 0; i < CMGetKeyCount(p, nullptr); ++i) {
                 types.push_back(CMGetKeyAt(p, i, nullptr, nullptr).type);
             }
@@ -286,6 +293,14 @@ TEST_F(ARequest, MeetsTheFaultsThatAreInjected) {
     EXPECT_EQ(CMNewString(broker_.handle(), "x", &status), nullptr);
     EXPECT_EQ(status.rc, CMPI_RC_OK);
     EXPECT_NE(CMNewString(broker_.handle(), "x", &status), nullptr);
+    broker_.injectFault("getKey", {CMPI_RC_OK, true, CMPI_badValue});
+    CMPIData key = CMGetKey(demo, "A", &status);
+    EXPECT_EQ(key.state, CMPI_keyValue | CMPI_badValue);
+    EXPECT_TRUE(key.type == CMPI_uint64 && key.value.uint64 == 0 && status.rc == CMPI_RC_OK);
+    broker_.injectFault("getKey", {CMPI_RC_ERR_FAILED, false, CMPI_badValue});
+    key = CMGetKey(demo, "A", &status);
+    EXPECT_EQ(key.state, CMPI_nullValue | CMPI_badValue);
+    EXPECT_EQ(status.rc, CMPI_RC_ERR_FAILED);
     broker_.injectFault("CMPIObjectPathFT.addKey", {});
     EXPECT_EQ(CMAddKey(demo, "C", "x", CMPI_chars).rc, CMPI_RC_ERR_FAILED);
     EXPECT_EQ(CMGetKeyCount(demo, nullptr), 2U) << "a call that fails does nothing";
@@ -362,6 +377,84 @@ TEST_F(ARequest, CanBeLeftToAThreadThatIsAttached) {
     }).join();
 }
 
+TEST_F(ARequest, KeepsItsProviderWhileItIsInside) {
+    std::promise<void> entered;
+    std::promise<void> mayLeave;
+    behaviour.serve = [&](const CMPIContext*, const CMPIResult*, const CMPIObjectPath*) {
+        entered.set_value();
+        mayLeave.get_future().wait();
+        EXPECT_EQ(behaviour.alive, 1);
+        return ok();
+    };
+    std::thread inside([this] {
+        Request request(broker_);
+        EXPECT_TRUE(request.getInstance(request.objectPath("root", "Demo")).ok());
+    });
+    entered.get_future().wait();
+    std::thread unloading([this] {
+        broker_.unload("Tested");
+        EXPECT_EQ(behaviour.alive, 0) << "unload returned too early";
+    });
+    while (request_.invokeMethod(path("Demo"), "Out", nullptr).code != CMPI_RC_ERR_NOT_SUPPORTED) {
+        std::this_thread::yield(); // until it takes no further request
+    }
+    mayLeave.set_value();
+    inside.join();
+    unloading.join();
+}
+
+TEST_F(ARequest, RunsWhileTheBrokerIsSetUp) {
+    behaviour.serve = [](const CMPIContext* context, const CMPIResult* result, const CMPIObjectPath* p) {
+        CMAddContextEntry(context, "Entry", "text", CMPI_chars);
+        return CMReturnInstance(result, CMNewInstance(behaviour.broker, p, nullptr));
+    };
+    broker_.declare(ClassDeclaration("Demo").key("K", CMPI_uint8));
+    std::atomic<bool> isOver{false};
+    std::vector<std::thread> threads;
+    for (int t = 0; t < 3; ++t) {
+        threads.emplace_back([&] {
+            while (!isOver) {
+                Request request(broker_);
+                const Reply reply = request.getInstance(request.objectPathFromText("Demo.K=1", "root"));
+                EXPECT_TRUE(reply.ok() || reply.code == CMPI_RC_ERR_FAILED);
+            }
+        });
+    }
+    for (int i = 0; i < 50; ++i) {
+        const std::string number = std::to_string(i);
+        broker_.declare(ClassDeclaration("Class" + number).superclass("Demo"));
+        broker_.load(TEST_PROVIDER, "TestProvider", {"Class" + number});
+        broker_.startRecording();
+        broker_.injectFault("newInstance", {CMPI_RC_ERR_FAILED, false, 0, 1, 1});
+        broker_.setKeyMode(i % 2 == 0 ? KeyMode::untyped : KeyMode::chars);
+        broker_.setMessageHandler([](const oxahv::BrokerMessage&) {});
+        broker_.clearFaults();
+        broker_.stopRecording();
+        broker_.unload("TestProvider");
+    }
+    isOver = true;
+    for (std::thread& thread : threads) {
+        thread.join();
+    }
+}
+
+TEST_F(ARequest, KeepsWhatAnAttachedThreadReturns) {
+    behaviour.serve = [](const CMPIContext* context, const CMPIResult* result, const CMPIObjectPath* p) {
+        const CMPIBroker* const broker = behaviour.broker;
+        CMPIContext* const prepared = broker->bft->prepareAttachThread(broker, context);
+        std::thread([&] {
+            broker->bft->attachThread(broker, prepared);
+            CMReturnInstance(result, CMNewInstance(broker, p, nullptr));
+            CMReturnData(result, "text", CMPI_chars);
+            broker->bft->detachThread(broker, prepared);
+        }).join();
+        return CMRelease(prepared);
+    };
+    const Reply reply = request_.getInstance(path("Demo.K=1"));
+    EXPECT_EQ(oxahv::pathText(CMGetObjectPath(reply.instances.at(0), nullptr)), "root:Demo.K=1");
+    EXPECT_EQ(oxahv::valueText(reply.data.at(0)), "\"text\"");
+}
+
 TEST(Hosting, LoadsAndUnloadsLibraries) {
     EmbeddedBroker broker;
     broker.load(TEST_PROVIDER, "TestProvider");
@@ -384,6 +477,77 @@ TEST(Hosting, LoadsAndUnloadsLibraries) {
         errorOf([&] { broker.load("/nowhere/lib.so", "None"); }).rfind("cannot load provider library: ", 0),
         0U);
     EXPECT_EQ(errorOf([&] { broker.host("Empty", {}); }), "provider Empty has no factory");
+    EXPECT_EQ(errorOf([&] { broker.load(TEST_PROVIDER, "Throws"); }),
+              "provider Throws: its factory threw: no provider");
+}
+
+TEST(Hosting, ServesAProviderThatIsWrittenInC) {
+    EmbeddedBroker broker;
+    broker.load(C_PROVIDER, "CProvider");
+    Request request(broker);
+    CMPIObjectPath* const path = request.objectPathFromText("root:Demo.Key=\"text\",Number=7", "");
+    const std::vector<std::string> properties = {"Array", "Date"};
+    const Reply all = request.enumerateInstances(path, &properties);
+    ASSERT_EQ(all.instances.size(), 1U) << oxahv::codeName(all.code);
+    EXPECT_EQ(oxahv::pathText(CMGetObjectPath(all.instances[0], nullptr)), oxahv::pathText(path));
+    EXPECT_EQ(oxahv::valueText(CMGetProperty(all.instances[0], "Array", nullptr)), "{7}");
+    EXPECT_EQ(oxahv::valueText(CMGetProperty(all.instances[0], "Date", nullptr)),
+              "\"20240229120000.000000+000\"");
+    EXPECT_TRUE(CMIsNullValue(CMGetProperty(all.instances[0], "Text", nullptr))) << "not asked for";
+
+    const Reply associates = request.associators(path, {"", "demo", "Role", ""});
+    EXPECT_EQ(oxahv::valueText(CMGetProperty(associates.instances.at(0), "Text", nullptr)), "\"Role\"");
+    EXPECT_TRUE(request.associators(path, {"", "Other", "", ""}).instances.empty());
+
+    CMPIArgs* const in = CMNewArgs(broker.handle(), nullptr);
+    CMAddArg(in, "In", "value", CMPI_chars);
+    const Reply method = request.invokeMethod(path, "Name", in);
+    EXPECT_EQ(oxahv::valueText(method.data.at(0)), "\"root\"");
+    EXPECT_EQ(oxahv::valueText(CMGetArg(method.out, "In", nullptr)), "\"value\"");
+    EXPECT_EQ(oxahv::valueText(CMGetArg(method.out, "Method", nullptr)), "\"Name\"");
+}
+
+namespace {
+
+// A provider whose MI has no function but cleanup, which sends a request to the provider "Tested".
+CMPIStatus endWithARequest(CMPIInstanceMI* /*mi*/, const CMPIContext* context, CMPIBoolean /*isEnding*/) {
+    const CMPIBroker* const broker = behaviour.broker;
+    CMPIStatus status = ok();
+    const CMPIObjectPath* const path = CMNewObjectPath(broker, "root", "Other", nullptr);
+    CMPIEnumeration* const names = broker->bft->enumerateInstanceNames(broker, context, path, &status);
+    behaviour.filters.push_back(oxahv::codeName(status.rc));
+    EXPECT_TRUE(status.rc != CMPI_RC_OK || CMHasNext(names, nullptr) != 0);
+    return ok();
+}
+
+CMPIInstanceMI* createEmpty(const CMPIBroker* broker, const CMPIContext* /*context*/,
+                            CMPIStatus* /*status*/) {
+    static CMPIInstanceMIFT table = {};
+    static CMPIInstanceMI mi = {nullptr, &table};
+    table.cleanup = endWithARequest;
+    behaviour.broker = broker;
+    return &mi;
+}
+
+} // namespace
+
+TEST(Hosting, LetsAProviderSendRequestsWhileItEnds) {
+    behaviour.serve = echo;
+    behaviour.filters.clear();
+    {
+        EmbeddedBroker broker;
+        broker.host("Empty", {createEmpty}, {"Empty"});
+        broker.host("Tested", {Tested_Create_InstanceMI}, {"Other"});
+        Request request(broker);
+        EXPECT_EQ(request.getInstance(request.objectPath("root", "Empty")).code, CMPI_RC_ERR_NOT_SUPPORTED)
+            << "the slot is empty";
+        broker.unload("Empty");
+        broker.host("Empty", {createEmpty}, {"Empty"});
+        broker.unload("Tested");
+        broker.host("Tested", {Tested_Create_InstanceMI}, {"Other"});
+    }
+    EXPECT_EQ(behaviour.filters, std::vector<std::string>(2, "CMPI_RC_OK"));
+    EXPECT_EQ(behaviour.alive, 0);
 }
 
 TEST(Hosting, DeclaresClassesOnce) {

@@ -200,6 +200,7 @@ CODE(CMPI_PredOp_Not_Null, 11);
 CODE(CMPI_PredOp_Null, 12);
 CODE(CMPI_PredOp_And, 13);
 CODE(CMPI_PredOp_Or, 14);
+#endif
 CODE(ErrorSevUnknown, 0);
 CODE(ErrorSevLow, 2);
 CODE(ErrorSevMedium, 3);
@@ -221,12 +222,9 @@ CODE(UnavailableResourceError, 9);
 CODE(UnsupportedOperationError, 10);
 CODE(ErrorProbCauseUnknown, 0);
 CODE(ErrorProbCauseOther, 1);
-#endif
-#if CMPI_VERSION >= 210
 CODE(CMPI_CPID_SYSTEM, 1);
 CODE(CMPI_CPID_USASCII, 2);
 CODE(CMPI_CPID_UTF16, 3);
-#endif
 CODE(CMPIVersion100, 100);
 CODE(CMPIVersion200, 200);
 CODE(CMPIVersion210, 210);
@@ -337,7 +335,6 @@ SLOT(CMPIBrokerExtFT, destroyCondition2, 192, int (*)(CMPI_COND_TYPE));
 #endif
 static_assert(sizeof(CMPIBrokerExtFT) == byVersion(168, 168, 200));
 
-#if CMPI_VERSION >= 200
 SLOT(CMPIBrokerMemFT, ftVersion, 0, CMPIVersion);
 SLOT(CMPIBrokerMemFT, mark, 8, CMPIGcStat* (*)(const CMPIBroker*, CMPIStatus*));
 SLOT(CMPIBrokerMemFT, release, 16, CMPIStatus (*)(const CMPIBroker*, const CMPIGcStat*));
@@ -356,8 +353,7 @@ SLOT(CMPIBrokerMemFT, freeSelectExp, 112, void (*)(const CMPIBroker*, CMPISelect
 #if CMPI_VERSION >= 210
 SLOT(CMPIBrokerMemFT, freeChars, 120, void (*)(const CMPIBroker*, char*));
 #endif
-static_assert(sizeof(CMPIBrokerMemFT) == byVersion(0, 120, 128));
-#endif
+static_assert(sizeof(CMPIBrokerMemFT) == byVersion(120, 120, 128));
 
 SLOT(CMPIContext, hdl, 0, CMPI_CONST_SINCE_210 void*);
 SLOT(CMPIContext, ft, 8, CMPI_CONST_SINCE_210 CMPIContextFT*);
@@ -496,13 +492,10 @@ SLOT(CMPIDateTimeFT, getStringFormat, 32, CMPIString* (*)(const CMPIDateTime*, C
 SLOT(CMPIDateTimeFT, isInterval, 40, CMPIBoolean (*)(const CMPIDateTime*, CMPIStatus*));
 static_assert(sizeof(CMPIDateTimeFT) == 48);
 
-#if CMPI_VERSION >= 200
 SLOT(CMPIError, hdl, 0, CMPI_CONST_SINCE_210 void*);
 SLOT(CMPIError, ft, 8, CMPI_CONST_SINCE_210 CMPIErrorFT*);
 static_assert(sizeof(CMPIError) == 16);
-#endif
 
-#if CMPI_VERSION >= 200
 SLOT(CMPIErrorFT, ftVersion, 0, CMPIVersion);
 SLOT(CMPIErrorFT, release, 8, CMPIStatus (*)(CMPIError*));
 SLOT(CMPIErrorFT, clone, 16, CMPIError* (*)(const CMPIError*, CMPIStatus*));
@@ -531,7 +524,6 @@ SLOT(CMPIErrorFT, setOtherErrorSourceFormat, 192, CMPIStatus (*)(const CMPIError
 SLOT(CMPIErrorFT, setCIMStatusCodeDescription, 200, CMPIStatus (*)(const CMPIError*, const char*));
 SLOT(CMPIErrorFT, setMessageArguments, 208, CMPIStatus (*)(const CMPIError*, const CMPIArray*));
 static_assert(sizeof(CMPIErrorFT) == 216);
-#endif
 
 #if CMPI_VERSION >= 210
 SLOT(CMPIPropertyList, hdl, 0, CMPI_CONST_SINCE_210 void*);
@@ -694,11 +686,14 @@ public:
 
 } // namespace
 
-CMProviderBase(TestProvider) CMInstanceMIFactory(Provider, TestProvider)
+CMProviderBase(TestProvider)
+CMInstanceMIFactory(Provider, TestProvider)
 CMAssociationMIFactory(Provider, TestProvider)
 CMMethodMIFactory(Provider, TestProvider)
-CMPropertyMIFactory(Provider, TestProvider) CMIndicationMIFactory(Provider, TestProvider)
-    CMProviderBase(OtherProvider) CMMethodMIFactory(Provider, OtherProvider)
+CMPropertyMIFactory(Provider, TestProvider)
+CMIndicationMIFactory(Provider, TestProvider)
+CMProviderBase(OtherProvider)
+CMMethodMIFactory(Provider, OtherProvider)
 
 TEST(AProviderFactory, SharesOneObjectAmongTheKindsOfOneName) {
     CMPIStatus status = {CMPI_RC_ERR_FAILED, nullptr};

@@ -1,3 +1,5 @@
+#include "FailingMemory.h"
+
 #include "HVLogger.h"
 #include "HVMessageBuffer.h"
 
@@ -144,4 +146,26 @@ TEST(AMessageBuffer, KeepsTheOrderOfItsTextsAndItsStream) {
     EXPECT_EQ(buffer.str(stream), "a1b2c");
     stream << 3;
     EXPECT_EQ(buffer.str(buffer), "3");
+}
+
+TEST(AMessageBuffer, ThrowsInsteadOfHandingOutAShortText) {
+    const std::string text(100, 'x');
+    HVMessageBuffer buffer;
+    std::ostream& stream = buffer << "a" << 1;
+    failing::allocationsFrom(1);
+    stream << text << 2; // a stream swallows what is thrown below it
+    failing::allocationsFrom(0);
+    EXPECT_THROW(buffer.str(stream), std::bad_alloc);
+    EXPECT_EQ(buffer.str(buffer << "a" << 1), "a1");
+
+    stream.exceptions(std::ios_base::badbit); // a user of the stream leaves it as it likes
+    buffer.str(stream << std::hex);
+    const char* const none = nullptr;
+    EXPECT_EQ(buffer.str(buffer << 255 << none), "255");
+
+    HVMessageBuffer plain;
+    plain << "a";
+    failing::allocationsFrom(1);
+    EXPECT_THROW(plain << text.c_str(), std::bad_alloc);
+    failing::allocationsFrom(0);
 }

@@ -1,7 +1,9 @@
-// A provider library with factories of one name, and generic ones that refuse every other name but "Generic".
+// A provider library with factories of one name, and generic ones that refuse every other name but "Generic",
+// "Throws" by an exception.
 #include <cmpimacs.h>
 
 #include <cstring>
+#include <exception>
 
 static const CMPIBroker* broker;
 
@@ -49,9 +51,22 @@ static CMPIStatus TestExecQuery(CMPIInstanceMI*, const CMPIContext*, const CMPIR
 
 CMInstanceMIStub(Test, TestProvider, broker, )
 
+namespace {
+
+// Lives in this library alone, with all that a handler needs of it.
+class NoProvider : public std::exception {
+public:
+    const char* what() const noexcept override { return "no provider"; }
+};
+
+} // namespace
+
 extern "C" CMPI_EXPORT CMPIInstanceMI* _Generic_Create_InstanceMI(const CMPIBroker* theBroker,
                                                                   const CMPIContext* context,
                                                                   const char* name, CMPIStatus* status) {
+    if (std::strcmp(name, "Throws") == 0) {
+        throw NoProvider();
+    }
     if (std::strcmp(name, "Generic") != 0) {
         CMSetStatus(status, CMPI_RC_ERR_NOT_FOUND);
         return nullptr;

@@ -39,6 +39,7 @@ const std::string& HVMessageBuffer::str(std::ostream& /*inserted*/) {
 const std::string& HVMessageBuffer::take() {
     if (stream_) {
         // The stream stays where it is: its user may hold on to it between two messages.
+        stream_->exceptions(std::ios_base::goodbit);
         stream_->clear();
         stream_->flags(std::ios_base::skipws | std::ios_base::dec);
         stream_->precision(6);
