@@ -7,6 +7,7 @@
 
 #include <array>
 #include <cctype>
+#include <locale>
 #include <set>
 
 namespace {
@@ -78,9 +79,7 @@ bool isSame(const TK::Moniker& left, const TK::Moniker& right) {
     return type == otherType && name == otherName && compare.at(type)(left, right);
 }
 
-} // namespace
-
-extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
+void goThroughAPath(const std::uint8_t* data, std::size_t size) {
     using TK::ProviderUtilities;
     TK::Moniker moniker;
     std::set<std::string> names;
@@ -99,6 +98,21 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
         moniker.selectKey(i);
         again.selectKey(i);
         FUZZ_REQUIRE(isSame(moniker, again));
+    }
+}
+
+struct Grouped : std::numpunct<char> {
+    std::string do_grouping() const override { return "\1\3"; }
+    char do_thousands_sep() const override { return '.'; }
+};
+
+} // namespace
+
+extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
+    static const std::locale grouped(std::locale::classic(), new Grouped);
+    for (const std::locale& locale : {std::locale::classic(), grouped}) {
+        std::locale::global(locale);
+        goThroughAPath(data, size);
     }
     return 0;
 }
