@@ -5,7 +5,7 @@
 
 #include <algorithm>
 #include <array>
-#include <cstdio>
+#include <charconv>
 #include <cstdlib>
 
 namespace oxahv {
@@ -123,10 +123,12 @@ std::string arrayText(const Array& array) {
     return text + "}";
 }
 
+// A point stands before the fraction, whatever the locale says.
 std::string realText(double value, int digits) {
     std::array<char, 40> text{};
-    std::snprintf(text.data(), text.size(), "%.*g", digits, value);
-    return text.data();
+    const char* const end =
+        std::to_chars(text.data(), text.data() + text.size(), value, std::chars_format::general, digits).ptr;
+    return {text.data(), end};
 }
 
 std::string objectText(const CMPIData& data) {

@@ -1,4 +1,6 @@
 // Requests through the broker: providers, faults, records, modes, threads.
+#include "TestLocales.h"
+
 #include "EmbeddedBroker.h"
 
 #include <atomic>
@@ -580,4 +582,6 @@ TEST(TheTexts, NameCodesAndValues) {
     value.real64 = 0.1;
     EXPECT_EQ(oxahv::valueText({CMPI_real64, 0, value}), "0.10000000000000001");
     EXPECT_EQ(oxahv::valueText({CMPI_real64, CMPI_nullValue, value}), "NULL");
+    const ThreadLocale german("de_DE.ISO-8859-1"); // which writes 0,1
+    EXPECT_EQ(oxahv::valueText({CMPI_real64, 0, value}), "0.10000000000000001");
 }
