@@ -4,6 +4,21 @@
 
 namespace oxahv {
 
+namespace {
+
+QualifierDeclaration trueQualifier(const char* name) {
+    return {name, {CMPI_boolean, false, {PlainValue(true)}}};
+}
+
+template <class Declaration>
+const Declaration* named(const std::vector<Declaration>& declarations, std::string_view name) {
+    const auto found = std::find_if(declarations.begin(), declarations.end(),
+                                    [&](const Declaration& d) { return sameName(d.name, name); });
+    return found != declarations.end() ? &*found : nullptr;
+}
+
+} // namespace
+
 ClassDeclaration::ClassDeclaration(std::string name) : name_(std::move(name)) {}
 
 ClassDeclaration& ClassDeclaration::superclass(std::string name) {
@@ -11,20 +26,75 @@ ClassDeclaration& ClassDeclaration::superclass(std::string name) {
     return *this;
 }
 
-ClassDeclaration& ClassDeclaration::key(std::string name, CMPIType type) {
-    properties_.push_back({std::move(name), type, true});
+ClassDeclaration& ClassDeclaration::association() {
+    return qualifier(trueQualifier("Association"));
+}
+
+ClassDeclaration& ClassDeclaration::abstract() {
+    QualifierDeclaration abstract = trueQualifier("Abstract");
+    abstract.reachesSubclass = false;
+    return qualifier(std::move(abstract));
+}
+
+ClassDeclaration& ClassDeclaration::qualifier(QualifierDeclaration qualifier) {
+    std::vector<QualifierDeclaration> all = qualifiers_.list();
+    all.push_back(std::move(qualifier));
+    qualifiers_ = Qualifiers(std::move(all));
     return *this;
+}
+
+ClassDeclaration& ClassDeclaration::qualifiers(Qualifiers list) {
+    qualifiers_ = std::move(list);
+    return *this;
+}
+
+ClassDeclaration& ClassDeclaration::key(std::string name, CMPIType type) {
+    return property({std::move(name), type, true, {}, {}, Qualifiers({trueQualifier("Key")})});
 }
 
 ClassDeclaration& ClassDeclaration::property(std::string name, CMPIType type) {
-    properties_.push_back({std::move(name), type, false});
+    return property(PropertyDeclaration{std::move(name), type});
+}
+
+ClassDeclaration& ClassDeclaration::property(PropertyDeclaration property) {
+    properties_.push_back(std::move(property));
     return *this;
 }
 
+ClassDeclaration& ClassDeclaration::reference(std::string name, std::string className) {
+    return property({std::move(name), CMPI_ref, false, std::move(className)});
+}
+
+ClassDeclaration& ClassDeclaration::method(std::string name, CMPIType returnType,
+                                           std::vector<ParameterDeclaration> parameters) {
+    return method({std::move(name), returnType, std::move(parameters)});
+}
+
+ClassDeclaration& ClassDeclaration::method(MethodDeclaration method) {
+    methods_.push_back(std::move(method));
+    return *this;
+}
+
+bool ClassDeclaration::isAssociation() const {
+    return qualifiers_.isTrue("Association");
+}
+
+bool ClassDeclaration::isAbstract() const {
+    return qualifiers_.isTrue("Abstract");
+}
+
+const ParameterDeclaration* MethodDeclaration::find(std::string_view parameter) const {
+    return named(parameters, parameter);
+}
+
 const PropertyDeclaration* DeclaredClass::find(std::string_view property) const {
-    const auto found = std::find_if(properties.begin(), properties.end(),
-                                    [&](const PropertyDeclaration& p) { return sameName(p.name, property); });
-    return found != properties.end() ? &*found : nullptr;
+    return named(properties, property);
+}
+
+const MethodDeclaration* DeclaredClass::findMethod(std::string_view method) const {
+    const auto found = std::find_if(methods.begin(), methods.end(),
+                                    [&](const auto& m) { return sameName(m->name, method); });
+    return found != methods.end() ? found->get() : nullptr;
 }
 
 bool DeclaredClass::isA(std::string_view ancestor) const {
@@ -33,48 +103,189 @@ bool DeclaredClass::isA(std::string_view ancestor) const {
 
 namespace {
 
+using Part = DeclarationError::Part;
+
+// What is declared of a name in the superclass and now again.
+void requireSameType(const std::string& what, CMPIType inherited, CMPIType type, Part part,
+                     std::size_t index) {
+    if (inherited != type) {
+        throw DeclarationError(what + " is declared as " + declaredTypeName(inherited) + " already", part,
+                               index);
+    }
+}
+
+// Whether the declaration at the index is the first of its name.
+template <class Declaration>
+bool isFirstOfName(const std::vector<Declaration>& declarations, std::size_t index) {
+    return named(declarations, declarations[index].name) == &declarations[index];
+}
+
 // Adds a class's own property to the inherited ones; a redeclaration may make it a key.
-void addProperty(DeclaredClass& declared, const PropertyDeclaration& property) {
+void addProperty(DeclaredClass& declared, const ClassDeclaration& declaration, std::size_t index) {
+    PropertyDeclaration property = declaration.properties()[index];
+    const std::string what = "class " + declared.name + ": property " + property.name;
+    if (!isFirstOfName(declaration.properties(), index)) {
+        throw DeclarationError(what + " stands twice", Part::property, index);
+    }
+    property.isKey = property.isKey || property.qualifiers.isTrue("Key");
     for (PropertyDeclaration& inherited : declared.properties) {
         if (sameName(inherited.name, property.name)) {
-            if (inherited.type != property.type) {
-                throw BrokerError("class " + declared.name + ": property " + property.name +
-                                  " is declared as " + typeName(inherited.type) + " already");
+            requireSameType(what, inherited.type, property.type, Part::property, index);
+            property.isKey = property.isKey || inherited.isKey;
+            if (property.defaultValue.type == CMPI_null) {
+                property.defaultValue = inherited.defaultValue;
             }
-            inherited.isKey = inherited.isKey || property.isKey;
+            property.qualifiers = property.qualifiers.over(inherited.qualifiers);
+            inherited = std::move(property);
             return;
         }
     }
-    declared.properties.push_back(property);
+    declared.properties.push_back(std::move(property));
+}
+
+// The qualifiers of a method and its parameters over those of the method that it overrides.
+void inheritQualifiers(MethodDeclaration& method, const MethodDeclaration& inherited) {
+    method.qualifiers = method.qualifiers.over(inherited.qualifiers);
+    for (ParameterDeclaration& parameter : method.parameters) {
+        if (const ParameterDeclaration* const overridden = inherited.find(parameter.name)) {
+            parameter.qualifiers = parameter.qualifiers.over(overridden->qualifiers);
+        }
+    }
+}
+
+void setDirections(MethodDeclaration& method) {
+    for (ParameterDeclaration& parameter : method.parameters) {
+        if (parameter.qualifiers.find("In") != nullptr) {
+            parameter.isIn = parameter.qualifiers.isTrue("In");
+        }
+        if (parameter.qualifiers.find("Out") != nullptr) {
+            parameter.isOut = parameter.qualifiers.isTrue("Out");
+        }
+    }
+}
+
+void addMethod(DeclaredClass& declared, const ClassDeclaration& declaration, std::size_t index) {
+    MethodDeclaration method = declaration.methods()[index];
+    const std::string what = "class " + declared.name + ": method " + method.name;
+    if (!isFirstOfName(declaration.methods(), index)) {
+        throw DeclarationError(what + " stands twice", Part::method, index);
+    }
+    for (std::size_t i = 0; i < method.parameters.size(); ++i) {
+        if (!isFirstOfName(method.parameters, i)) {
+            throw DeclarationError(what + ": parameter " + method.parameters[i].name + " stands twice",
+                                   Part::parameter, index, i);
+        }
+    }
+    const auto inherited = std::find_if(declared.methods.begin(), declared.methods.end(),
+                                        [&](const auto& m) { return sameName(m->name, method.name); });
+    if (inherited == declared.methods.end()) {
+        setDirections(method);
+        declared.methods.push_back(std::make_shared<const MethodDeclaration>(std::move(method)));
+        return;
+    }
+    requireSameType(what, (*inherited)->returnType, method.returnType, Part::method, index);
+    inheritQualifiers(method, **inherited);
+    setDirections(method);
+    *inherited = std::make_shared<const MethodDeclaration>(std::move(method));
+}
+
+bool allReachSubclass(const Qualifiers& qualifiers) {
+    const std::vector<QualifierDeclaration>& list = qualifiers.list();
+    return std::all_of(list.begin(), list.end(),
+                       [](const QualifierDeclaration& q) { return q.reachesSubclass; });
+}
+
+// An inherited method, shared where no qualifier stays behind.
+std::shared_ptr<const MethodDeclaration> inheritedMethod(
+    const std::shared_ptr<const MethodDeclaration>& method) {
+    if (allReachSubclass(method->qualifiers) &&
+        std::all_of(method->parameters.begin(), method->parameters.end(),
+                    [](const ParameterDeclaration& p) { return allReachSubclass(p.qualifiers); })) {
+        return method;
+    }
+    MethodDeclaration copy = *method;
+    copy.qualifiers = Qualifiers().over(copy.qualifiers);
+    for (ParameterDeclaration& parameter : copy.parameters) {
+        parameter.qualifiers = Qualifiers().over(parameter.qualifiers);
+    }
+    return std::make_shared<const MethodDeclaration>(std::move(copy));
+}
+
+void inherit(DeclaredClass& declared) {
+    const DeclaredClass& superclass = *declared.superclass;
+    declared.qualifiers = declared.qualifiers.over(superclass.qualifiers);
+    declared.properties = superclass.properties;
+    for (PropertyDeclaration& property : declared.properties) {
+        property.qualifiers = Qualifiers().over(property.qualifiers);
+    }
+    for (const auto& method : superclass.methods) {
+        declared.methods.push_back(inheritedMethod(method));
+    }
 }
 
 } // namespace
 
-void Classes::declare(const ClassDeclaration& declaration) {
-    const std::unique_lock<std::shared_mutex> lock(mutex_);
+std::string declaredTypeName(CMPIType type) {
+    return typeName(type) + ((type & CMPI_ARRAY) != 0 ? "[]" : "");
+}
+
+void Declarations::declare(const ClassDeclaration& declaration) {
     if (declaration.name().empty()) {
-        throw BrokerError("a class needs a name");
+        throw DeclarationError("a class needs a name", Part::name);
     }
     const std::string key = foldedName(declaration.name());
     if (classes_.count(key) != 0) {
-        throw BrokerError("class " + declaration.name() + " is declared already");
+        throw DeclarationError("class " + declaration.name() + " is declared already", Part::name);
     }
     auto declared = std::make_shared<DeclaredClass>();
     declared->name = declaration.name();
+    declared->qualifiers = declaration.qualifiers();
     if (!declaration.superclass().empty()) {
-        const auto superclass = classes_.find(foldedName(declaration.superclass()));
-        if (superclass == classes_.end()) {
-            throw BrokerError("class " + declaration.name() + ": superclass " + declaration.superclass() +
-                              " is not declared");
+        declared->superclass = find(declaration.superclass());
+        if (declared->superclass == nullptr) {
+            throw DeclarationError("class " + declaration.name() + ": superclass " +
+                                       declaration.superclass() + " is not declared",
+                                   Part::superclass);
         }
-        declared->superclass = superclass->second;
-        declared->properties = superclass->second->properties;
+        inherit(*declared);
     }
-    for (const PropertyDeclaration& property : declaration.properties()) {
-        addProperty(*declared, property);
+    for (std::size_t i = 0; i < declaration.properties().size(); ++i) {
+        addProperty(*declared, declaration, i);
+    }
+    for (std::size_t i = 0; i < declaration.methods().size(); ++i) {
+        addMethod(*declared, declaration, i);
     }
     classes_.emplace(key, std::move(declared));
+}
+
+void Declarations::declare(QualifierType type) {
+    qualifiers_[foldedName(type.implied.name)] = std::move(type);
+}
+
+std::shared_ptr<const DeclaredClass> Declarations::find(std::string_view name) const {
+    const auto found = classes_.find(foldedName(name));
+    return found != classes_.end() ? found->second : nullptr;
+}
+
+const QualifierType* Declarations::findQualifier(std::string_view name) const {
+    const auto found = qualifiers_.find(foldedName(name));
+    return found != qualifiers_.end() ? &found->second : nullptr;
+}
+
+void Classes::declare(const ClassDeclaration& declaration) {
+    const std::lock_guard<std::mutex> changing(changing_);
+    const std::unique_lock<std::shared_mutex> lock(mutex_);
+    declarations_.declare(declaration);
     any_.store(true, std::memory_order_release);
+}
+
+void Classes::change(const std::function<void(Declarations&)>& change) {
+    const std::lock_guard<std::mutex> changing(changing_);
+    Declarations changed = declarations_;
+    change(changed);
+    const std::unique_lock<std::shared_mutex> lock(mutex_);
+    std::swap(declarations_, changed);
+    any_.store(declarations_.anyClass(), std::memory_order_release);
 }
 
 std::shared_ptr<const DeclaredClass> Classes::find(std::string_view name) const {
@@ -82,8 +293,7 @@ std::shared_ptr<const DeclaredClass> Classes::find(std::string_view name) const 
         return nullptr;
     }
     const std::shared_lock<std::shared_mutex> lock(mutex_);
-    const auto found = classes_.find(foldedName(name));
-    return found != classes_.end() ? found->second : nullptr;
+    return declarations_.find(name);
 }
 
 bool Classes::isA(std::string_view className, std::string_view ancestor) const {

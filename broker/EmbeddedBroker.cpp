@@ -1,6 +1,7 @@
 #include "EmbeddedBroker.h"
 
 #include "Core.h"
+#include "MofCompiler.h"
 
 namespace oxahv {
 
@@ -49,6 +50,15 @@ void EmbeddedBroker::declare(const ClassDeclaration& declaration) {
     impl_->classes.declare(declaration);
 }
 
+void EmbeddedBroker::compileMof(const std::string& file) {
+    impl_->classes.change([&](Declarations& declarations) { MofCompiler(declarations).compileFile(file); });
+}
+
+void EmbeddedBroker::compileMofText(const std::string& text, const std::string& name) {
+    impl_->classes.change(
+        [&](Declarations& declarations) { MofCompiler(declarations).compileText(text, name); });
+}
+
 bool EmbeddedBroker::hasDeclarations() const {
     return impl_->classes.any();
 }
@@ -60,6 +70,29 @@ bool EmbeddedBroker::isDeclared(const std::string& className) const {
 std::vector<PropertyDeclaration> EmbeddedBroker::propertiesOf(const std::string& className) const {
     const auto declared = impl_->classes.find(className);
     return declared != nullptr ? declared->properties : std::vector<PropertyDeclaration>();
+}
+
+std::vector<MethodDeclaration> EmbeddedBroker::methodsOf(const std::string& className) const {
+    std::vector<MethodDeclaration> methods;
+    if (const auto declared = impl_->classes.find(className)) {
+        for (const auto& method : declared->methods) {
+            methods.push_back(*method);
+        }
+    }
+    return methods;
+}
+
+Qualifiers EmbeddedBroker::qualifiersOf(const std::string& className) const {
+    const auto declared = impl_->classes.find(className);
+    return declared != nullptr ? declared->qualifiers : Qualifiers();
+}
+
+bool EmbeddedBroker::isAssociation(const std::string& className) const {
+    return qualifiersOf(className).isTrue("Association");
+}
+
+bool EmbeddedBroker::isAbstract(const std::string& className) const {
+    return qualifiersOf(className).isTrue("Abstract");
 }
 
 bool EmbeddedBroker::isA(const std::string& className, const std::string& ancestor) const {

@@ -49,7 +49,9 @@
 #include <memory>
 #include <stdexcept>
 #include <string>
+#include <string_view>
 #include <thread>
+#include <variant>
 #include <vector>
 
 namespace oxahv {
@@ -63,12 +65,77 @@ public:
     ~BrokerError() override;
 };
 
-/** One property of a class: its name as declared, its CMPI type (with `CMPI_ARRAY` for arrays) and whether it
- * is a key. */
-struct PropertyDeclaration {
+/** One plain value in a declaration: an unsigned integer (a `char16` too) or one with a sign, as its type
+ * says; a text, date/time or reference as text in UTF-8; the first alternative is a NULL. */
+using PlainValue = std::variant<std::monostate, bool, unsigned long long, long long, double, std::string>;
+
+/** A value in a declaration: a property's default, or a qualifier's. */
+struct DeclaredValue {
+    CMPIType type = CMPI_null; ///< with `CMPI_ARRAY` for arrays; `CMPI_null`: there is no value
+    bool isNull = true;
+    /** One of a single value, any number of an array, none where the value is NULL. */
+    std::vector<PlainValue> elements;
+};
+
+/** A qualifier of a class, property, method or parameter. */
+struct QualifierDeclaration {
     std::string name;
-    CMPIType type = CMPI_null;
+    DeclaredValue value;
+    bool isOverridable = true; ///< flavour EnableOverride; kept only, no override is refused
+    bool reachesSubclass =
+        true; ///< flavour ToSubclass; without it only the declaring class has the qualifier
+    bool isTranslatable = false; ///< flavour Translatable
+};
+
+/** The qualifiers of one element, in order. A constant list: copies share it. */
+class TK_EXPORT Qualifiers {
+public:
+    Qualifiers() = default;
+    explicit Qualifiers(std::vector<QualifierDeclaration> list);
+
+    /** The qualifier of a name, in any case; null when there is none. Valid as long as a copy of the list. */
+    const QualifierDeclaration* find(std::string_view name) const;
+    /** Whether the qualifier is there and TRUE. */
+    bool isTrue(std::string_view name) const;
+    /** These, and behind them those of `inherited` that reach subclasses and are not set here. */
+    Qualifiers over(const Qualifiers& inherited) const;
+    /** All of them. */
+    const std::vector<QualifierDeclaration>& list() const;
+
+private:
+    std::shared_ptr<const std::vector<QualifierDeclaration>> list_;
+};
+
+/** One property of a class. */
+struct PropertyDeclaration {
+    std::string name;          ///< as declared
+    CMPIType type = CMPI_null; ///< with `CMPI_ARRAY` for arrays; `CMPI_ref` for references
     bool isKey = false;
+    std::string referenceClass{}; ///< of a reference: the class that it leads to; empty if none is said
+    DeclaredValue defaultValue{}; ///< of type `CMPI_null` when none is declared
+    Qualifiers qualifiers{};
+};
+
+/** One parameter of a method. */
+struct ParameterDeclaration {
+    std::string name;             ///< as declared
+    CMPIType type = CMPI_null;    ///< with `CMPI_ARRAY` for arrays; `CMPI_ref` for references
+    std::string referenceClass{}; ///< of a reference: the class that it leads to; empty if none is said
+    bool isIn = true;             ///< a qualifier In decides, where there is one
+    bool isOut = false;           ///< a qualifier Out decides, where there is one
+    Qualifiers qualifiers{};
+};
+
+/** One method of a class. */
+struct MethodDeclaration {
+    std::string name;                               ///< as declared
+    CMPIType returnType = CMPI_null;                ///< `CMPI_ref` for references
+    std::vector<ParameterDeclaration> parameters{}; ///< in order
+    std::string returnClass{};                      ///< of a reference: the class that it leads to
+    Qualifiers qualifiers{};
+
+    /** The parameter of a name, in any case; null when there is none. */
+    TK_EXPORT const ParameterDeclaration* find(std::string_view parameter) const;
 };
 
 /**
@@ -77,7 +144,7 @@ struct PropertyDeclaration {
  *
  * @code
  * ClassDeclaration("Demo_Port").superclass("CIM_NetworkPort").key("Name", CMPI_string).property("Speed",
- * CMPI_uint64)
+ * CMPI_uint64).method("SetSpeed", CMPI_uint32, {{"Speed", CMPI_uint64}})
  * @endcode
  */
 class TK_EXPORT ClassDeclaration {
@@ -87,20 +154,48 @@ public:
 
     /** Names the superclass, which must be declared before this class is. */
     ClassDeclaration& superclass(std::string name);
-    /** Adds a key property. */
+    /** Makes it an association, by the qualifier Association. */
+    ClassDeclaration& association();
+    /** Makes it abstract, by the qualifier Abstract. */
+    ClassDeclaration& abstract();
+    /** Adds a qualifier to the class. */
+    ClassDeclaration& qualifier(QualifierDeclaration qualifier);
+    /** Gives the class these qualifiers, in place of those that it has. */
+    ClassDeclaration& qualifiers(Qualifiers list);
+    /** Adds a key property, with the qualifier Key. */
     ClassDeclaration& key(std::string name, CMPIType type);
     /** Adds a property that is no key. */
     ClassDeclaration& property(std::string name, CMPIType type);
+    /** Adds a property with all that can be said of it; a qualifier Key that is TRUE makes it a key too. */
+    ClassDeclaration& property(PropertyDeclaration property);
+    /** Adds a reference to instances of a class, which need not be declared. References are keys of most
+     * associations: `key(name, CMPI_ref)` adds one of those. */
+    ClassDeclaration& reference(std::string name, std::string className);
+    /** Adds a method. */
+    ClassDeclaration& method(std::string name, CMPIType returnType,
+                             std::vector<ParameterDeclaration> parameters = {});
+    /** Adds a method with all that can be said of it. */
+    ClassDeclaration& method(MethodDeclaration method);
 
     const std::string& name() const { return name_; }
     const std::string& superclass() const { return superclass_; }
+    /** Whether the class itself says that it is an association. */
+    bool isAssociation() const;
+    /** Whether the class is abstract. */
+    bool isAbstract() const;
+    /** The class's own qualifiers. */
+    const Qualifiers& qualifiers() const { return qualifiers_; }
     /** The class's own properties, in the order in which they were added. */
     const std::vector<PropertyDeclaration>& properties() const { return properties_; }
+    /** The class's own methods, in the order in which they were added. */
+    const std::vector<MethodDeclaration>& methods() const { return methods_; }
 
 private:
     std::string name_;
     std::string superclass_;
+    Qualifiers qualifiers_;
     std::vector<PropertyDeclaration> properties_;
+    std::vector<MethodDeclaration> methods_;
 };
 
 /** How the keys of a request's object path reach the provider. CIM servers differ in it. */
@@ -194,18 +289,46 @@ public:
     /** @name Classes */
     /** @{ */
     /**
-     * Declares a class. As soon as one class is declared, classes, properties, keys and their types are
-     * checked against the declarations; without any the broker takes what comes.
-     * @throws BrokerError when the superclass is not declared, the class already is, or a property is
-     * redeclared with another type.
+     * Declares a class. As soon as one class is declared, classes, properties, keys, their types and methods
+     * are checked against the declarations; without any the broker takes what comes.
+     * @throws BrokerError when the superclass is not declared, the class already is, a property or method
+     * stands twice, or an inherited one is redeclared with another type.
      */
     void declare(const ClassDeclaration& declaration);
+    /**
+     * Declares the classes of a MOF file, as DSP0004 (versions 2.x) defines the language: all of them, or
+     * none when there is an error. Several files may follow one another; qualifier types that one declares
+     * hold for the next.
+     *
+     * Of the pragmas, `include` is followed, relative to the file that it stands in; the others and instances
+     * are passed over. Superclasses must be declared before; classes that references lead to need not be
+     * declared. A qualifier without a declared type is taken with the type that its value has.
+     * @param file path of a regular file, at most 256 MiB with all that it includes.
+     * @throws BrokerError whose text is `file:line:column: message`, lines and characters counted from 1, for
+     * the first error; one of reading an included file stands where its pragma does.
+     */
+    void compileMof(const std::string& file);
+    /**
+     * The same for a text.
+     * @param text UTF-8, with or without a byte order mark.
+     * @param name what errors call the text; files that it includes are looked for beside a file of that
+     * name.
+     */
+    void compileMofText(const std::string& text, const std::string& name);
     /** Whether any class is declared. */
     bool hasDeclarations() const;
     /** Whether the class is declared. */
     bool isDeclared(const std::string& className) const;
     /** All properties of a declared class, inherited ones first; empty for one that is not declared. */
     std::vector<PropertyDeclaration> propertiesOf(const std::string& className) const;
+    /** All methods of a declared class, inherited ones first; empty for one that is not declared. */
+    std::vector<MethodDeclaration> methodsOf(const std::string& className) const;
+    /** The qualifiers of a declared class, own ones first; none for one that is not declared. */
+    Qualifiers qualifiersOf(const std::string& className) const;
+    /** Whether the class is declared, and is an association or derives from one. */
+    bool isAssociation(const std::string& className) const;
+    /** Whether the class is declared, and is abstract. */
+    bool isAbstract(const std::string& className) const;
     /** Whether `className` is `ancestor` or derives from it, by the declarations. */
     bool isA(const std::string& className, const std::string& ancestor) const;
     /** @} */
@@ -299,8 +422,9 @@ struct AssociationFilter {
  *
  * The operations find the provider by the class of the path, call its MI function, and collect what it
  * returns. Keys of the path are delivered as the broker's KeyMode says. With declarations, an unknown class
- * answers `CMPI_RC_ERR_INVALID_CLASS`; a class that no provider serves answers `CMPI_RC_ERR_NOT_SUPPORTED`.
- * None of them throws, but for `std::bad_alloc`.
+ * answers `CMPI_RC_ERR_INVALID_CLASS`, a method that its class does not have `CMPI_RC_ERR_METHOD_NOT_FOUND`;
+ * a class that no provider serves answers `CMPI_RC_ERR_NOT_SUPPORTED`. None of them throws, but for
+ * `std::bad_alloc`.
  */
 class TK_EXPORT Request {
 public:

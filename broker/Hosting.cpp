@@ -489,10 +489,18 @@ Reply Hosting::invokeMethod(const CMPIContext* context, const CMPIObjectPath* pa
                             const CMPIArgs* in) {
     const CMPIArgs* const given = in != nullptr ? in : handOut(std::make_unique<Arguments>(core_));
     CMPIArgs* const out = handOut(std::make_unique<Arguments>(core_));
-    Reply reply = request<CMPIMethodMI>(
-        context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
-            return callSlot(mi->ft->invokeMethod, mi, context, result, delivered, method, given, out);
-        });
+    Reply reply;
+    const ObjectPath* const target = ObjectPath::of(path);
+    const auto declared = target != nullptr ? core_.classes.find(target->className) : nullptr;
+    if (declared != nullptr && declared->findMethod(method) == nullptr) {
+        reply.code = CMPI_RC_ERR_METHOD_NOT_FOUND;
+        reply.message = "class " + declared->name + " has no method " + method;
+    } else {
+        reply = request<CMPIMethodMI>(
+            context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {
+                return callSlot(mi->ft->invokeMethod, mi, context, result, delivered, method, given, out);
+            });
+    }
     reply.out = out;
     return reply;
 }

@@ -85,16 +85,61 @@ void setHostAndNameSpaceFrom(ObjectPath& path, const CMPIObjectPath* source) {
     path.nameSpace = pathOf(source).nameSpace;
 }
 
-// There is no repository of qualifiers.
-CMPIData getClassQualifier(const ObjectPath& /*path*/, const char* /*qualifier*/) {
-    throw Failure{CMPI_RC_ERR_NOT_SUPPORTED};
+// Qualifiers, as far as classes are declared
+
+std::shared_ptr<const DeclaredClass> declaredClassOf(const ObjectPath& path) {
+    if (!path.core().classes.any()) {
+        throw Failure{CMPI_RC_ERR_NOT_SUPPORTED};
+    }
+    auto declared = path.core().classes.find(path.className);
+    if (declared == nullptr) {
+        throw Failure{CMPI_RC_ERR_INVALID_CLASS};
+    }
+    return declared;
 }
-CMPIData getQualifierOf(const ObjectPath& /*path*/, const char* /*element*/, const char* /*qualifier*/) {
-    throw Failure{CMPI_RC_ERR_NOT_SUPPORTED};
+
+CMPIData qualifierOf(const ObjectPath& path, const Qualifiers& qualifiers, const char* name) {
+    const QualifierDeclaration* const qualifier = qualifiers.find(required(name));
+    if (qualifier == nullptr) {
+        throw Failure{CMPI_RC_ERR_NOT_FOUND};
+    }
+    return dataOf(path.core(), qualifier->value);
 }
-CMPIData getParameterQualifier(const ObjectPath& /*path*/, const char* /*method*/, const char* /*parameter*/,
-                               const char* /*qualifier*/) {
-    throw Failure{CMPI_RC_ERR_NOT_SUPPORTED};
+
+const MethodDeclaration& methodOf(const DeclaredClass& declared, const char* name) {
+    const MethodDeclaration* const method = declared.findMethod(required(name));
+    if (method == nullptr) {
+        throw Failure{CMPI_RC_ERR_METHOD_NOT_FOUND};
+    }
+    return *method;
+}
+
+CMPIData getClassQualifier(const ObjectPath& path, const char* qualifier) {
+    return qualifierOf(path, declaredClassOf(path)->qualifiers, qualifier);
+}
+
+CMPIData getPropertyQualifier(const ObjectPath& path, const char* name, const char* qualifier) {
+    const auto declared = declaredClassOf(path);
+    const PropertyDeclaration* const property = declared->find(required(name));
+    if (property == nullptr) {
+        throw Failure{CMPI_RC_ERR_NO_SUCH_PROPERTY};
+    }
+    return qualifierOf(path, property->qualifiers, qualifier);
+}
+
+CMPIData getMethodQualifier(const ObjectPath& path, const char* method, const char* qualifier) {
+    const auto declared = declaredClassOf(path);
+    return qualifierOf(path, methodOf(*declared, method).qualifiers, qualifier);
+}
+
+CMPIData getParameterQualifier(const ObjectPath& path, const char* method, const char* name,
+                               const char* qualifier) {
+    const auto declared = declaredClassOf(path);
+    const ParameterDeclaration* const parameter = methodOf(*declared, method).find(required(name));
+    if (parameter == nullptr) {
+        throw Failure{CMPI_RC_ERR_INVALID_PARAMETER};
+    }
+    return qualifierOf(path, parameter->qualifiers, qualifier);
 }
 
 CMPIString* toString(const ObjectPath& path) {
@@ -207,8 +252,8 @@ const CMPIObjectPathFT ObjectPath::table = {
     SLOT(CMPIObjectPathFT, setNameSpaceFromObjectPath, setNameSpaceFrom),
     SLOT(CMPIObjectPathFT, setHostAndNameSpaceFromObjectPath, setHostAndNameSpaceFrom),
     SLOT(CMPIObjectPathFT, getClassQualifier, getClassQualifier),
-    SLOT(CMPIObjectPathFT, getPropertyQualifier, getQualifierOf),
-    SLOT(CMPIObjectPathFT, getMethodQualifier, getQualifierOf),
+    SLOT(CMPIObjectPathFT, getPropertyQualifier, getPropertyQualifier),
+    SLOT(CMPIObjectPathFT, getMethodQualifier, getMethodQualifier),
     SLOT(CMPIObjectPathFT, getParameterQualifier, getParameterQualifier),
     SLOT(CMPIObjectPathFT, toString, toString),
 };

@@ -2,11 +2,10 @@
 
 #include "Core.h"
 #include "DateTimeText.h"
+#include "Integers.h"
 
-#include <algorithm>
 #include <cerrno>
 #include <cstdlib>
-#include <limits>
 
 namespace oxahv {
 
@@ -16,17 +15,6 @@ bool isNameCharacter(char c) {
     return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') || c == '_' ||
            static_cast<unsigned char>(c) >= 0x80;
 }
-
-// An integer type's range, as far as a text can leave it.
-struct IntegerType {
-    CMPIType type;
-    bool isSigned;
-    unsigned int bits;
-};
-constexpr IntegerType integerTypes[] = {
-    {CMPI_uint8, false, 8}, {CMPI_uint16, false, 16}, {CMPI_uint32, false, 32}, {CMPI_uint64, false, 64},
-    {CMPI_sint8, true, 8},  {CMPI_sint16, true, 16},  {CMPI_sint32, true, 32},  {CMPI_sint64, true, 64},
-};
 
 class PathReader {
 public:
@@ -188,19 +176,14 @@ private:
         }
         const CMPIType type =
             wanted != CMPI_null ? wanted : static_cast<CMPIType>(hasSign ? CMPI_sint64 : CMPI_uint64);
-        const auto* const integer =
-            std::find_if(std::begin(integerTypes), std::end(integerTypes),
-                         [&](const IntegerType& entry) { return entry.type == type; });
-        if (integer == std::end(integerTypes)) {
+        const IntegerType* const integer = integerType(type);
+        if (integer == nullptr) {
             fail(start, "expected a " + typeName(type));
         }
         errno = 0;
         const unsigned long long magnitude = std::strtoull(digits.c_str(), nullptr, 10);
         const bool isNegative = text_[start] == '-' && magnitude != 0;
-        const unsigned long long highest = std::numeric_limits<unsigned long long>::max() >>
-                                           (64U - integer->bits + (integer->isSigned ? 1U : 0U));
-        if (errno == ERANGE || (isNegative && !integer->isSigned) ||
-            magnitude > highest + (isNegative ? 1U : 0U)) {
+        if (errno == ERANGE || !integer->holds(magnitude, isNegative)) {
             fail(start, text_.substr(start, position_ - start) + " does not fit into " + typeName(type));
         }
         CMPIValue value = {};

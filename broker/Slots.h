@@ -8,6 +8,7 @@
 
 #include "Core.h"
 
+#include <cstring>
 #include <new>
 #include <tuple>
 #include <type_traits>
@@ -189,7 +190,8 @@ private:
         if constexpr (std::is_same_v<Return, CMPIData>) {
             CMPIData data = run(self, status, rest...);
             if (fault.yieldsNull) {
-                data.value = {};
+                // An empty initializer would be free to zero the union's first member alone.
+                std::memset(&data.value, 0, sizeof data.value);
             }
             return data;
         } else {

@@ -6,6 +6,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <cwchar>
+#include <utility>
 
 namespace TK {
 
@@ -15,27 +16,25 @@ namespace {
 
 constexpr auto conversionFailed = static_cast<std::size_t>(-1);
 
-// One text, narrow to wide. A wide character takes one byte of input or more, so the input's length always
-// holds the result.
+// One text, narrow to wide, into one that is empty; what that holds after a failure counts for nothing. A
+// wide character takes one byte of input or more, so the input's length always holds the result.
 bool convert(const std::string& in, std::wstring& out) {
     const std::size_t length = std::strlen(in.c_str());
-    std::wstring converted(length, L'\0');
-    const std::size_t size = std::mbstowcs(converted.data(), in.c_str(), length + 1);
+    out.resize(length);
+    const std::size_t size = std::mbstowcs(out.data(), in.c_str(), length + 1);
     if (size == conversionFailed) {
         return false;
     }
-    converted.resize(size);
-    out.swap(converted);
+    out.resize(size);
     return true;
 }
 
-// One text, wide to narrow. How many bytes a character takes is the locale's affair, so the text goes through
-// a block of fixed size: each call goes on, in the same shift state, where the one before it found no room
-// for a whole character. The state is our own, because the one behind a null pointer belongs to all threads
-// of the process.
+// One text, wide to narrow, likewise. How many bytes a character takes is the locale's affair, so the text
+// goes through a block of fixed size: each call goes on, in the same shift state, where the one before it
+// found no room for a whole character. The state is our own, because the one behind a null pointer belongs to
+// all threads of the process.
 bool convert(const std::wstring& in, std::string& out) {
     std::array<char, 4096> block; // NOLINT(cppcoreguidelines-pro-type-member-init): the C library fills it
-    std::string converted;
     std::mbstate_t state{};
     const wchar_t* rest = in.c_str();
     while (rest != nullptr) {
@@ -43,9 +42,8 @@ bool convert(const std::wstring& in, std::string& out) {
         if (size == conversionFailed) {
             return false;
         }
-        converted.append(block.data(), size);
+        out.append(block.data(), size);
     }
-    out.swap(converted);
     return true;
 }
 
@@ -66,15 +64,23 @@ bool convertAll(const std::vector<From>& in, std::vector<To>& out) {
 
 bool CUtility::WStringToAString(std::wstring in, std::string& out) {
     TK_TRACE_ENTERING(loggerUtility);
-    const bool converted = convert(in, out);
+    std::string text;
+    const bool converted = convert(in, text);
     TK_TRACE_EXITING(loggerUtility);
+    if (converted) {
+        out.swap(text); // last, since a trace can throw
+    }
     return converted;
 }
 
 bool CUtility::AStringToWString(std::string in, std::wstring& out) {
     TK_TRACE_ENTERING(loggerUtility);
-    const bool converted = convert(in, out);
+    std::wstring text;
+    const bool converted = convert(in, text);
     TK_TRACE_EXITING(loggerUtility);
+    if (converted) {
+        out.swap(text); // last, since a trace can throw
+    }
     return converted;
 }
 

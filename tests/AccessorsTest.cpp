@@ -221,6 +221,56 @@ TEST_F(Accessors, GetAKeyOrLeaveTheOutputAlone) {
                                  });
 }
 
+TEST_F(Accessors, DoNotTakeAValueThatComesWithAnError) {
+    CMPIData data = {};
+    data.type = CMPI_string;
+    data.value.string = CMNewString(broker_.handle(), "text", nullptr);
+    Answering<CMPIInstance, CMPIInstanceFT> instance(instance_, &CMPIInstanceFT::getProperty, data,
+                                                     CMPI_RC_ERR_FAILED);
+    Answering<CMPIArgs, CMPIArgsFT> args(CMNewArgs(broker_.handle(), nullptr), &CMPIArgsFT::getArg, data,
+                                         CMPI_RC_ERR_FAILED);
+    Answering<CMPIObjectPath, CMPIObjectPathFT> path(path_, &CMPIObjectPathFT::getKey, data,
+                                                     CMPI_RC_ERR_FAILED);
+    unsigned short number16 = 7;
+    unsigned int number32 = 7;
+    bool flag = false;
+    std::string text = "as it was";
+    CMPIString* string = nullptr;
+    CMPIObjectPath* reference = nullptr;
+    EXPECT_FALSE(ProviderUtilities::getProperty(instance.handle(), "Name", number16));
+    EXPECT_FALSE(ProviderUtilities::getProperty(instance.handle(), "Name", number32));
+    EXPECT_FALSE(ProviderUtilities::getProperty(instance.handle(), "Name", flag));
+    EXPECT_FALSE(ProviderUtilities::getProperty(instance.handle(), "Name", &string));
+    EXPECT_FALSE(ProviderUtilities::getProperty(args.handle(), "Name", number16));
+    EXPECT_FALSE(ProviderUtilities::getProperty(args.handle(), "Name", number32));
+    EXPECT_FALSE(ProviderUtilities::getProperty(args.handle(), "Name", flag));
+    EXPECT_FALSE(ProviderUtilities::getProperty(args.handle(), "Name", text));
+    EXPECT_FALSE(ProviderUtilities::getKeyProperty(path.handle(), "Name", &string));
+    EXPECT_FALSE(ProviderUtilities::getKeyProperty(path.handle(), "Name", &reference));
+    EXPECT_FALSE(ProviderUtilities::getKeyProperty(path.handle(), "Name", text));
+    EXPECT_EQ(std::tie(number16, number32, flag, text), std::make_tuple(7, 7U, false, "as it was"));
+    EXPECT_EQ(string, nullptr);
+    EXPECT_EQ(reference, nullptr);
+
+    static CMPIString* name = nullptr;
+    name = data.value.string;
+    CMPIObjectPathFT table = *path_->ft;
+    table.getClassName = [](const CMPIObjectPath* /*path*/, CMPIStatus* status) {
+        *status = {CMPI_RC_ERR_FAILED, nullptr};
+        return name;
+    };
+    table.getNameSpace = table.getClassName;
+    CMPIObjectPath unnamed = *path_;
+    unnamed.ft = &table;
+    EXPECT_EQ(ProviderUtilities::getClassName(&unnamed), "");
+    EXPECT_EQ(ProviderUtilities::getNamespace(&unnamed), "");
+
+    StringWithAnError erring(data.value.string);
+    EXPECT_EQ(failureOf([&] { ProviderUtilities::convertToString(erring.handle()); }),
+              "String Conversion Failed !!");
+    EXPECT_EQ(ProviderUtilities::createInstance(ErringBroker(broker_.handle()).handle(), path_), nullptr);
+}
+
 TEST_F(Accessors, ReadTheMemberAskedForWhateverTheType) {
     CMPIValue value = {};
     value.uint16 = 60000;

@@ -154,6 +154,19 @@ TEST_F(ARequest, ReachesTheProviderAndBringsItsResultsBack) {
     EXPECT_EQ(behaviour.filters, std::vector<std::string>({"A", "null", "R", "null"}));
 }
 
+TEST_F(ARequest, AsksTheProviderForDeclaredMethodsAlone) {
+    broker_.declare(ClassDeclaration("Base").method("Out", CMPI_string, {{"In", CMPI_string}}));
+    broker_.declare(ClassDeclaration("Demo").superclass("Base"));
+    CMPIArgs* const in = CMNewArgs(broker_.handle(), nullptr);
+    CMAddArg(in, "In", "value", CMPI_chars);
+    EXPECT_EQ(request_.invokeMethod(path("Demo"), "OUT", in).data.size(), 1U);
+    const Reply reply = request_.invokeMethod(path("Demo"), "Other", in);
+    EXPECT_EQ(reply.code, CMPI_RC_ERR_METHOD_NOT_FOUND);
+    EXPECT_EQ(reply.message, "class Demo has no method Other");
+    EXPECT_TRUE(reply.data.empty());
+    EXPECT_EQ(CMGetArgCount(reply.out, nullptr), 0U);
+}
+
 TEST_F(ARequest, ReportsWhatTheProviderReports) {
     behaviour.serve = [](const CMPIContext*, const CMPIResult*, const CMPIObjectPath*) {
         return CMPIStatus{CMPI_RC_ERR_ACCESS_DENIED, CMNewString(behaviour.broker, "not for you", nullptr)};

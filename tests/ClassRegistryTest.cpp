@@ -86,6 +86,17 @@ TEST_F(ClassRegistry, KnowsTheClassesOfBothTables) {
     EXPECT_TRUE(tracedTexts().empty());
 }
 
+// Callers keep class ids, so none may ever change: a sum over all rows (64 bit FNV-1a of ids and names).
+TEST_F(ClassRegistry, KeepsItsIds) {
+    unsigned long long sum = 0xCBF29CE484222325U;
+    for (const TK::ClassEntry& entry : TK::classTable) {
+        for (const char c : std::to_string(entry.id) + entry.name) {
+            sum = (sum ^ static_cast<unsigned char>(c)) * 0x100000001B3U;
+        }
+    }
+    EXPECT_EQ(sum, 0xEAB88D90EA28EDCCU);
+}
+
 TEST_F(ClassRegistry, AnswersAsAChainOfComparisonsForEveryEdit) {
     const std::string letters = "_aZ5-\x80\xC4\xB1";
     for (const TK::ClassEntry& entry : TK::classTable) {
@@ -142,6 +153,21 @@ TEST_F(ClassRegistry, SurvivesABrokerThatYieldsNoName) {
     }
 }
 
+TEST_F(ClassRegistry, TakesANameThatCameWithAnError) {
+    static StringWithAnError name(CMNewString(broker_.handle(), "text", nullptr));
+    const CMPIObjectPath* const real = request_.objectPath("root/cimv2", "OXATK_Fan");
+    CMPIObjectPathFT table = *real->ft;
+    table.getClassName = [](const CMPIObjectPath* /*path*/, CMPIStatus* status) {
+        *status = {CMPI_RC_OK, nullptr};
+        return name.handle();
+    };
+    CMPIObjectPath path = *real;
+    path.ft = &table;
+    EXPECT_EQ(ProviderUtilities::getClassId(&path), 255); // "characters" is no class, 0 would be no name
+    EXPECT_EQ(takeTraces(), std::vector<std::string>(
+                                {variable(providerUtilities, "getClassId", "classname", "characters")}));
+}
+
 TEST_F(Ancestry, IsWhatTheBrokerSays) {
     EXPECT_TRUE(related("CIM_Port", "Demo_Port"));
     EXPECT_TRUE(related("cim_networkport", "DEMO_PORT"));
@@ -171,6 +197,13 @@ TEST_F(Ancestry, IsNoneWhenTheBrokerFails) {
     broker_.injectFault("newObjectPath", {CMPI_RC_ERR_FAILED});
     const std::vector<oxahv::Call> calls = recorded([&] { EXPECT_FALSE(related("CIM_Port", "Demo_Port")); });
     EXPECT_EQ(members(calls), std::vector<std::string>({"newObjectPath"}));
+    // An answer that comes with an error counts for nothing.
+    const ErringBroker noPaths(broker_.handle(), &CMPIBrokerEncFT::newObjectPath);
+    const ErringBroker noAnswers(broker_.handle(), &CMPIBrokerEncFT::classPathIsA);
+    for (const ErringBroker* const erring : {&noPaths, &noAnswers}) {
+        EXPECT_FALSE(
+            ProviderUtilities::areClassesRelated(erring->handle(), nameSpace_, "CIM_Port", "Demo_Port"));
+    }
     // A candidate without a path does not end the list.
     broker_.clearFaults();
     broker_.injectFault("newObjectPath", {CMPI_RC_ERR_FAILED});

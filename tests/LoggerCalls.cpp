@@ -5,6 +5,7 @@
 #include <atomic>
 #include <gtest/gtest.h>
 #include <mutex>
+#include <sstream>
 #include <stdexcept>
 
 namespace {
@@ -19,6 +20,27 @@ void record(LoggerCall&& call) {
     }
     const std::lock_guard<std::mutex> lock(mutex);
     calls.push_back(std::move(call));
+}
+
+std::string withoutLine(std::string text) {
+    for (const std::string& mark :
+         {std::string("[Line: "), std::string(", Line: "), std::string("at line ")}) {
+        const std::size_t begin = text.find(mark);
+        if (begin != std::string::npos) {
+            const std::size_t digits = begin + mark.size();
+            text.erase(digits, text.find_first_not_of("0123456789", digits) - digits);
+        }
+    }
+    return text;
+}
+
+std::string tracePoint(const TracingModule& module, int level, const std::string& function,
+                       const std::string& text) {
+    return module.category + (" " + std::to_string(level)) + " " + function + "| " + text;
+}
+
+std::string flow(const char* kind, const TracingModule& module, const std::string& function) {
+    return kind + function + "() in " + module.file + " [Line: ]";
 }
 
 } // namespace
@@ -62,6 +84,53 @@ std::vector<std::string> tracedTexts() {
         texts.push_back(log.text);
     }
     return texts;
+}
+
+std::vector<std::string> takeTraces() {
+    const std::vector<LoggerCall> all = loggerCalls();
+    std::vector<std::string> texts = tracedTexts();
+    for (std::size_t i = 0; i < texts.size(); ++i) {
+        const LoggerCall& call = all[2 * i];
+        texts[i] = tracePoint({call.category.c_str(), ""}, call.level, call.function, withoutLine(texts[i]));
+    }
+    forgetLoggerCalls();
+    return texts;
+}
+
+std::string entering(const TracingModule& module, const std::string& function) {
+    return tracePoint(module, 4000, function, flow("ENTERING: ", module, function));
+}
+
+std::string exiting(const TracingModule& module, const std::string& function) {
+    return tracePoint(module, 4000, function, flow("EXITING: ", module, function));
+}
+
+std::string entering(const TracingModule& module, const std::string& function,
+                     const std::string& parameters) {
+    return tracePoint(module, 3000, function,
+                      flow("ENTERING: ", module, function) + ",Parameters List: " + parameters);
+}
+
+std::string exiting(const TracingModule& module, const std::string& function, const std::string& parameters) {
+    return tracePoint(module, 3000, function,
+                      flow("EXITING: ", module, function) + ",Parameters List: " + parameters);
+}
+
+std::string variable(const TracingModule& module, const std::string& function, const std::string& name,
+                     const std::string& value) {
+    return tracePoint(module, 4000, function,
+                      "VARIABLE: '" + name + "' has Value '" + value + "' at line  in " + module.file);
+}
+
+std::string message(const TracingModule& module, const std::string& function, const std::string& text) {
+    return tracePoint(module, 6000, function,
+                      std::string("MESSAGE [File: ") + module.file + ", Line: ]: " + text);
+}
+
+std::string address(const void* pointer) {
+    std::ostringstream stream;
+    stream << pointer;
+    return stream.str();
 }
 
 void failLoggerCall(int n) {

@@ -28,5 +28,30 @@ std::vector<LoggerCall> loggerCalls();
 // is checked.
 std::vector<std::string> tracedTexts();
 
+// A module of the library, as its traces name it.
+struct TracingModule {
+    const char* category;
+    const char* file;
+};
+constexpr TracingModule providerUtilities = {"Hovara.ProviderUtilities", "ProviderUtilities.cpp"};
+constexpr TracingModule utility = {"Hovara.ProviderUtilities", "Utility.cpp"};
+constexpr TracingModule utils = {"Hovara.Utils", "utils.cpp"};
+
+// The trace points since the start or the last call: of each its category, level, function and text, the text
+// without its source line.
+std::vector<std::string> takeTraces();
+
+// What takeTraces tells of a trace point of each kind in `function` of `module`.
+std::string entering(const TracingModule& module, const std::string& function);
+std::string exiting(const TracingModule& module, const std::string& function);
+std::string entering(const TracingModule& module, const std::string& function, const std::string& parameters);
+std::string exiting(const TracingModule& module, const std::string& function, const std::string& parameters);
+std::string variable(const TracingModule& module, const std::string& function, const std::string& name,
+                     const std::string& value);
+std::string message(const TracingModule& module, const std::string& function, const std::string& text);
+
+// A pointer as a parameter list shows it.
+std::string address(const void* pointer);
+
 // Makes the n-th call from now (from 1) throw std::runtime_error("logger"); 0 none.
 void failLoggerCall(int n);

@@ -1,5 +1,7 @@
 #include "Moniker.h"
 
+#include "Allocations.h"
+
 #include <cstring>
 #include <functional>
 #include <gtest/gtest.h>
@@ -185,6 +187,56 @@ TEST(AMoniker, ReadsItsNumbersBackUnderALocaleThatGroupsDigits) {
     EXPECT_EQ(valueOf<unsigned int>(moniker), 1234567U);
 }
 
+TEST(AMoniker, IsAsItWasWhenMemoryRunsOut) {
+    const std::string text(1000, 'x');
+    Moniker other;
+    other.addKey(text, text);
+    const std::function<void(Moniker&)> operations[] = {
+        [&](Moniker& moniker) { moniker.addKey(text, text); },
+        [&](Moniker& moniker) { moniker.addKey(text, 18446744073709551615ULL); },
+        [&](Moniker& moniker) { moniker = other; },
+    };
+    for (const auto& operation : operations) {
+        bool reached = true;
+        unsigned int failures = 0;
+        for (unsigned int n = 1; reached; ++n) {
+            Moniker moniker = oneOfEach();
+            moniker.selectKey(1);
+            failAllocation(n);
+            try {
+                operation(moniker);
+                reached = failAllocation(0);
+                EXPECT_FALSE(reached) << "a failed allocation was swallowed";
+            } catch (const std::bad_alloc&) {
+                failAllocation(0);
+                ++failures;
+                EXPECT_EQ(nameOf(moniker), "b");
+                EXPECT_EQ(moniker.getKeyCount(), 5U);
+            }
+        }
+        EXPECT_GT(failures, 0U);
+    }
+}
+
+TEST(AMoniker, ReadsANumberWholeOrThrowsWhenMemoryRunsOut) {
+    const GlobalLocale grouped(std::locale(std::locale::classic(), new Grouped));
+    Moniker moniker;
+    moniker.addKey("k", 18446744073709551615ULL);
+    bool reached = true;
+    for (unsigned int n = 1; reached; ++n) {
+        unsigned long long value = 7;
+        failAllocation(n);
+        try {
+            moniker.getValue(value);
+            reached = failAllocation(0);
+            EXPECT_FALSE(reached) << "a failed allocation was swallowed";
+            EXPECT_EQ(value, 18446744073709551615ULL);
+        } catch (const std::bad_alloc&) {
+            failAllocation(0);
+        }
+    }
+}
+
 TEST(AFrameworkException, KeepsItsOwnCopyOfTheMessage) {
     static_assert(std::is_base_of_v<std::exception, FrameworkException>);
     static_assert(std::is_nothrow_destructible_v<FrameworkException>);
@@ -194,6 +246,9 @@ TEST(AFrameworkException, KeepsItsOwnCopyOfTheMessage) {
     text[0] = 'X';
     EXPECT_STREQ(exception.what(), "a message that is longer than any short string buffer holds");
     EXPECT_STREQ(copy.what(), exception.what());
+    FrameworkException assigned("");
+    assigned = exception;
+    EXPECT_STREQ(assigned.what(), exception.what());
     EXPECT_NE(copy.what(), exception.what());
     EXPECT_STREQ(FrameworkException(nullptr).what(), "");
 }

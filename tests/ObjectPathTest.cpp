@@ -2,48 +2,26 @@
 #include "BrokerTest.h"
 
 #include <algorithm>
-#include <sstream>
 
 using TK::Moniker;
 using TK::ProviderUtilities;
 
 namespace {
 
-std::string address(const void* pointer) {
-    std::ostringstream stream;
-    stream << pointer;
-    return stream.str();
-}
-
-// A trace's text without what depends on its line.
-std::string withoutLine(std::string text) {
-    for (const std::string& mark : {std::string("[Line: "), std::string("at line ")}) {
-        const std::size_t begin = text.find(mark);
-        if (begin != std::string::npos) {
-            const std::size_t digits = begin + mark.size();
-            text.erase(digits, text.find_first_not_of("0123456789", digits) - digits);
-        }
-    }
-    return text;
-}
-
-std::vector<std::string> traces() {
-    std::vector<std::string> texts = tracedTexts();
-    std::transform(texts.begin(), texts.end(), texts.begin(), withoutLine);
-    forgetLoggerCalls();
-    return texts;
-}
-
 std::string entering(const std::string& function, const std::string& list) {
-    return "ENTERING: " + function + "() in ProviderUtilities.cpp [Line: ],Parameters List: " + list;
+    return entering(providerUtilities, function, list);
 }
 
 std::string exiting(const std::string& function, const std::string& list) {
-    return "EXITING" + entering(function, list).substr(8);
+    return exiting(providerUtilities, function, list);
 }
 
-std::string variable(const std::string& name, const std::string& value) {
-    return "VARIABLE: '" + name + "' has Value '" + value + "' at line  in ProviderUtilities.cpp";
+std::string keyCountTrace(const std::string& name, const std::string& value) {
+    return variable(providerUtilities, "getKeyCount", name, value);
+}
+
+std::string pathTrace(const std::string& name, const std::string& value) {
+    return variable(providerUtilities, "createObjectPath", name, value);
 }
 
 struct Key {
@@ -133,9 +111,10 @@ TEST_F(ObjectPaths, BecomeMonikersOfTheSameKeys) {
     EXPECT_EQ(keysOf(moniker), oneOfEach);
     EXPECT_EQ(selectedName(moniker), "e");
     const std::string list = " objectPath=" + address(path) + " moniker=" + address(&moniker);
-    EXPECT_EQ(traces(), std::vector<std::string>({entering("transformObjectPathToMoniker", list),
-                                                  variable("keyCount", "5"), variable("count", "5"),
-                                                  exiting("transformObjectPathToMoniker", list)}));
+    EXPECT_EQ(takeTraces(),
+              std::vector<std::string>({entering("transformObjectPathToMoniker", list),
+                                        keyCountTrace("keyCount", "5"), keyCountTrace("count", "5"),
+                                        exiting("transformObjectPathToMoniker", list)}));
     ProviderUtilities::transformObjectPathToMoniker(path, moniker);
     EXPECT_EQ(moniker.getKeyCount(), 10U);
 }
@@ -154,8 +133,8 @@ TEST_F(ObjectPaths, AreFilledFromMonikersAndComeBack) {
     }
     EXPECT_EQ(selectedName(moniker), "e");
     const std::string list = " moniker=" + address(&moniker) + " passedObjectPath=" + address(&path);
-    EXPECT_EQ(traces(), std::vector<std::string>({entering("transformMonikerToObjectPath", list),
-                                                  exiting("transformMonikerToObjectPath", list)}));
+    EXPECT_EQ(takeTraces(), std::vector<std::string>({entering("transformMonikerToObjectPath", list),
+                                                      exiting("transformMonikerToObjectPath", list)}));
     EXPECT_EQ(keysOf(monikerOf(path)), oneOfEach);
 }
 
@@ -185,15 +164,15 @@ TEST_F(ObjectPaths, WithoutKeysLeaveMonikersAsTheyAre) {
     ProviderUtilities::transformObjectPathToMoniker(path, moniker);
     EXPECT_EQ(selectedName(moniker), "x");
     EXPECT_EQ(moniker.getKeyCount(), 2U);
-    const std::vector<std::string> texts = traces();
+    const std::vector<std::string> texts = takeTraces();
     ASSERT_EQ(texts.size(), 4U);
-    EXPECT_EQ(texts[1], variable("keyCount", "0"));
-    EXPECT_EQ(texts[2], variable("count", "0"));
+    EXPECT_EQ(texts[1], keyCountTrace("keyCount", "0"));
+    EXPECT_EQ(texts[2], keyCountTrace("count", "0"));
 
     Moniker empty;
     CMPIObjectPath* none = nullptr;
     ProviderUtilities::transformMonikerToObjectPath(empty, &none);
-    EXPECT_EQ(traces().size(), 2U);
+    EXPECT_EQ(takeTraces().size(), 2U);
     EXPECT_EQ(none, nullptr);
 }
 
@@ -204,7 +183,8 @@ TEST_F(ObjectPaths, CountAndConvertTheKeysThatHaveAValue) {
     CMAddKey(path, "other null", nullptr, CMPI_uint32);
     ProviderUtilities::setKeyProperty(path, "b", 2U);
     EXPECT_EQ(ProviderUtilities::getKeyCount(path), 2);
-    EXPECT_EQ(traces(), std::vector<std::string>({variable("keyCount", "4"), variable("count", "2")}));
+    EXPECT_EQ(takeTraces(),
+              std::vector<std::string>({keyCountTrace("keyCount", "4"), keyCountTrace("count", "2")}));
 
     // A key that cannot be read, at one position or all the time.
     for (unsigned int position = 1; position <= 4; ++position) {
@@ -230,6 +210,77 @@ TEST_F(ObjectPaths, CountAndConvertTheKeysThatHaveAValue) {
     }
 }
 
+namespace {
+
+// An object path of as many keys as one likes, all of one type and with the value 0.
+class PathOfEqualKeys {
+public:
+    PathOfEqualKeys(const CMPIObjectPath* real, CMPIString* name, CMPICount count, CMPIType type,
+                    CMPIrc code = CMPI_RC_OK)
+        : table_(*real->ft), path_(*real) {
+        path_.ft = &table_;
+        name_ = name;
+        count_ = count;
+        type_ = type;
+        code_ = code;
+        table_.getKeyCount = [](const CMPIObjectPath* /*path*/, CMPIStatus* status) {
+            *status = {CMPI_RC_OK, nullptr};
+            return count_;
+        };
+        table_.getKeyAt = [](const CMPIObjectPath* /*path*/, CMPICount /*index*/, CMPIString** keyName,
+                             CMPIStatus* status) {
+            *status = {code_, nullptr};
+            *keyName = name_;
+            CMPIData data = {};
+            data.type = type_;
+            return data;
+        };
+    }
+    const CMPIObjectPath* handle() const { return &path_; }
+
+private:
+    CMPIObjectPathFT table_;
+    CMPIObjectPath path_;
+    static inline CMPIString* name_;
+    static inline CMPICount count_;
+    static inline CMPIType type_;
+    static inline CMPIrc code_;
+};
+
+} // namespace
+
+TEST_F(ObjectPaths, CountTheirKeysModulo65536) {
+    const PathOfEqualKeys path(newPath(), CMNewString(broker_.handle(), "key", nullptr), 65536 + 2,
+                               CMPI_uint32);
+    EXPECT_EQ(ProviderUtilities::getKeyCount(path.handle()), 2);
+    EXPECT_EQ(takeTraces(),
+              std::vector<std::string>({keyCountTrace("keyCount", "2"), keyCountTrace("count", "2")}));
+}
+
+TEST_F(ObjectPaths, SkipKeysThatComeWithAnError) {
+    const PathOfEqualKeys path(newPath(), CMNewString(broker_.handle(), "key", nullptr), 3, CMPI_uint32,
+                               CMPI_RC_ERR_FAILED);
+    EXPECT_EQ(ProviderUtilities::getKeyCount(path.handle()), 0);
+    EXPECT_EQ(monikerOf(path.handle()).getKeyCount(), 0U);
+}
+
+TEST_F(ObjectPaths, WithAKeyOfAnyOtherTypeThrow) {
+    CMPIString* const name = CMNewString(broker_.handle(), "key", nullptr);
+    const CMPIObjectPath* const real = newPath();
+    for (unsigned int type = 0; type <= 0xFFFF; ++type) {
+        const bool fits = type == CMPI_uint8 || type == CMPI_uint16 || type == CMPI_uint32 ||
+                          type == CMPI_uint64 || type == CMPI_string;
+        const PathOfEqualKeys path(real, name, 1, static_cast<CMPIType>(type));
+        Moniker moniker;
+        ASSERT_EQ(failureOf([&] { ProviderUtilities::transformObjectPathToMoniker(path.handle(), moniker); }),
+                  !fits                 ? "Moniker component for data type not available."
+                  : type == CMPI_string ? "String Conversion Failed !!" // of a null string
+                                        : "no exception")
+            << type;
+        forgetLoggerCalls();
+    }
+}
+
 TEST_F(ObjectPaths, ThatCannotCountTheirKeysThrowAfterTheTrace) {
     const CMPIObjectPath* const path = pathWithOneOfEach();
     for (const bool viaMoniker : {false, true}) {
@@ -242,9 +293,9 @@ TEST_F(ObjectPaths, ThatCannotCountTheirKeysThrowAfterTheTrace) {
                   }),
                   "Could not Extract Keys from Object Path.");
         EXPECT_EQ(moniker.getKeyCount(), 0U);
-        const std::vector<std::string> texts = traces();
+        const std::vector<std::string> texts = takeTraces();
         ASSERT_EQ(texts.size(), viaMoniker ? 2U : 1U);
-        EXPECT_EQ(texts.back(), variable("keyCount", "0"));
+        EXPECT_EQ(texts.back(), keyCountTrace("keyCount", "0"));
     }
 }
 
@@ -301,10 +352,10 @@ TEST_F(ObjectPaths, AreCreatedWithTheirTraces) {
     const std::string list =
         " broker=" + address(broker_.handle()) + " classname=Demo_Class nameSpace=root/cimv2";
     const std::string marker =
-        variable("\"ProviderUtilities::createObjectPath\"", "ProviderUtilities::createObjectPath");
-    EXPECT_EQ(traces(), std::vector<std::string>({entering("createObjectPath", list),
-                                                  variable("classname", "Demo_Class"), marker,
-                                                  exiting("createObjectPath", list)}));
+        pathTrace("\"ProviderUtilities::createObjectPath\"", "ProviderUtilities::createObjectPath");
+    EXPECT_EQ(takeTraces(), std::vector<std::string>({entering("createObjectPath", list),
+                                                      pathTrace("classname", "Demo_Class"), marker,
+                                                      exiting("createObjectPath", list)}));
 
     EXPECT_EQ(ProviderUtilities::getNamespace(
                   ProviderUtilities::createObjectPath(broker_.handle(), "Demo_Class", "")),
@@ -320,13 +371,13 @@ TEST_F(ObjectPaths, ThatTheBrokerRefusesAreNull) {
         forgetLoggerCalls();
         broker_.injectFault("CMPIBrokerEncFT.newObjectPath", fault);
         EXPECT_EQ(ProviderUtilities::createObjectPath(broker_.handle(), "Demo_Class", "root"), nullptr);
-        EXPECT_EQ(traces(), std::vector<std::string>({entering("createObjectPath", list),
-                                                      variable("classname", "Demo_Class"),
-                                                      exiting("createObjectPath", list)}));
+        EXPECT_EQ(takeTraces(), std::vector<std::string>({entering("createObjectPath", list),
+                                                          pathTrace("classname", "Demo_Class"),
+                                                          exiting("createObjectPath", list)}));
     }
     const std::string ended = " broker=" + address(broker_.handle()) + " classname=";
     EXPECT_EQ(ProviderUtilities::createObjectPath(broker_.handle(), nullptr, "root"), nullptr);
-    EXPECT_EQ(traces(),
-              std::vector<std::string>({entering("createObjectPath", ended), variable("classname", "(null)"),
+    EXPECT_EQ(takeTraces(),
+              std::vector<std::string>({entering("createObjectPath", ended), pathTrace("classname", "(null)"),
                                         exiting("createObjectPath", ended)}));
 }

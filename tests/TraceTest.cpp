@@ -3,7 +3,6 @@
 #include "LoggerCalls.h"
 
 #include <gtest/gtest.h>
-#include <sstream>
 #include <stdexcept>
 #include <thread>
 
@@ -13,12 +12,6 @@ const std::string category("Test.Trace");
 
 std::string onLine(const std::string& before, int line, const std::string& after) {
     return before + std::to_string(line) + after;
-}
-
-std::string address(const void* pointer) {
-    std::ostringstream stream;
-    stream << pointer;
-    return stream.str();
 }
 
 // The parameter list of the only trace point that has been passed.

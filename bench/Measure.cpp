@@ -1,0 +1,256 @@
+// The benchmark program: measures each row, and hands the times to Google Benchmark as counters of that row.
+//
+// The logger's two functions are defined here and do nothing, so that each trace point pays for its texts and
+// for two calls through the dynamic linker. So are the heap's entry points, which count.
+//
+// A row is measured in rounds. Each takes one slice of time of the operation, of its floor and of the naive
+// build, one right after the other, and of each the shortest slice counts: whatever else the machine does
+// hits all alike, and a short slice is likely to be spared.
+#include "HVLogger.h"
+#include "Rows.h"
+
+#include <algorithm>
+#include <atomic>
+#include <clocale>
+#include <cstdlib>
+#include <cstring>
+#include <ctime>
+#include <limits>
+#include <memory>
+#include <thread>
+
+// The silent logger
+
+void HVLog::HVLogger::logLevelMessage(const char* /*function*/, const char* /*file*/, int /*line*/,
+                                      const std::string& /*category*/, int /*level*/, char* /*reserved*/,
+                                      int /*reserved1*/, int /*reserved2*/, const std::string& /*text*/) {}
+
+void HVLog::HVLogger::traceLevelMessage(const char* /*function*/, const char* /*file*/, int /*line*/,
+                                        const std::string& /*category*/, int /*level*/, char* /*reserved*/,
+                                        int /*reserved1*/, int /*reserved2*/, const std::string& /*text*/) {}
+
+// The counting heap. `operator new` ends here too.
+
+namespace {
+
+thread_local std::size_t blocksTaken = 0;
+
+} // namespace
+
+extern "C" {
+
+// The C library's own heap, under names that it keeps for this purpose.
+void* __libc_malloc(std::size_t size);                    // NOLINT(bugprone-reserved-identifier,cert-*)
+void* __libc_calloc(std::size_t nmemb, std::size_t size); // NOLINT(bugprone-reserved-identifier,cert-*)
+void* __libc_realloc(void* ptr, std::size_t size);        // NOLINT(bugprone-reserved-identifier,cert-*)
+
+void* malloc(std::size_t size) {
+    ++blocksTaken;
+    return __libc_malloc(size);
+}
+
+void* calloc(std::size_t nmemb, std::size_t size) {
+    ++blocksTaken;
+    return __libc_calloc(nmemb, size);
+}
+
+void* realloc(void* ptr, std::size_t size) {
+    ++blocksTaken;
+    return __libc_realloc(ptr, size);
+}
+
+} // extern "C"
+
+namespace {
+
+// Nanoseconds on a clock. A thread's own clock stands still while the machine does something else, which long
+// slices need; what two threads gain shows on the wall clock alone.
+double now(clockid_t clock) {
+    timespec time{};
+    clock_gettime(clock, &time);
+    return static_cast<double>(time.tv_sec) * 1e9 + static_cast<double>(time.tv_nsec);
+}
+
+double timeOf(const rows::Run& run, std::size_t calls, clockid_t clock) {
+    const double start = now(clock);
+    run(calls);
+    return now(clock) - start;
+}
+
+// Shorter than what a scheduler gives, longer by far than reading the clock takes.
+constexpr double sliceLength = 100'000;
+
+std::size_t callsPerSlice(const rows::Run& run) {
+    std::size_t calls = 1;
+    while (timeOf(run, calls, CLOCK_THREAD_CPUTIME_ID) < sliceLength) {
+        calls *= 2;
+    }
+    return calls;
+}
+
+void waitFor(const std::atomic<bool>& flag) {
+    while (!flag) {
+        std::this_thread::yield(); // the thread that is waited for may need this very processor
+    }
+}
+
+// One side of a row, and its shortest slice.
+class Side {
+public:
+    Side(const rows::Run& run, double units)
+        : run_(run), units_(units), calls_(run ? callsPerSlice(run) : 0) {}
+
+    bool exists() const { return calls_ != 0; }
+    double perUnit() const { return shortest_ / (static_cast<double>(calls_) * units_); }
+
+    double measure(clockid_t clock = CLOCK_THREAD_CPUTIME_ID) {
+        const double time = exists() ? timeOf(run_, calls_, clock) : 0;
+        shortest_ = std::min(shortest_, time);
+        return time;
+    }
+
+    // The same slice on this thread and on another one at once, until both are through. Both wait actively,
+    // since waking a thread takes longer than the slice.
+    double measureOnTwo() {
+        std::atomic<bool> ready{false};
+        std::atomic<bool> go{false};
+        std::atomic<bool> finished{false};
+        std::thread other([&] {
+            run_(calls_); // warms the thread's own heap and buffers
+            ready = true;
+            waitFor(go);
+            run_(calls_);
+            finished = true;
+        });
+        waitFor(ready);
+        const double start = now(CLOCK_MONOTONIC);
+        go = true;
+        run_(calls_);
+        waitFor(finished);
+        const double time = now(CLOCK_MONOTONIC) - start;
+        other.join();
+        shortest_ = std::min(shortest_, time);
+        return time;
+    }
+
+private:
+    const rows::Run& run_;
+    double units_;
+    std::size_t calls_;
+    double shortest_ = std::numeric_limits<double>::infinity();
+};
+
+double allocationsOf(const rows::Row& row) {
+    constexpr std::size_t calls = 16;
+    const std::size_t before = blocksTaken;
+    row.operation(calls);
+    return static_cast<double>(blocksTaken - before) / (calls * row.units);
+}
+
+void measure(benchmark::State& state, const rows::Row& row) {
+    Side operation(row.operation, row.units);
+    Side floor(row.floor, row.floorUnits);
+    Side naive(row.naive, row.units);
+    for ([[maybe_unused]] auto round : state) {
+        state.SetIterationTime((operation.measure() + floor.measure() + naive.measure()) / 1e9);
+    }
+    state.counters["ns"] = operation.perUnit();
+    if (floor.exists()) {
+        state.counters["floor_ns"] = floor.perUnit();
+        state.counters["at_most_floor"] = row.atMostFloor;
+    }
+    if (naive.exists()) {
+        state.counters["naive_ns"] = naive.perUnit();
+        state.counters["times_faster"] = row.timesFaster;
+    }
+    if (row.floorUnits == row.units) { // not of growth
+        state.counters["allocations"] = allocationsOf(row);
+        state.counters["allocations_at_most"] = row.allocations;
+    }
+    state.SetLabel(row.floorName);
+}
+
+// What a second thread brings to a row, and to its floor.
+void measureGain(benchmark::State& state, const rows::Row& row) {
+    Side one(row.operation, row.units);
+    Side two(one);
+    Side floorOne(row.floor, row.floorUnits);
+    Side floorTwo(floorOne);
+    for ([[maybe_unused]] auto round : state) {
+        state.SetIterationTime((one.measure(CLOCK_MONOTONIC) + floorOne.measure(CLOCK_MONOTONIC) +
+                                two.measureOnTwo() + floorTwo.measureOnTwo()) /
+                               1e9);
+    }
+    state.counters["one_ns"] = one.perUnit();
+    state.counters["two_ns"] = two.perUnit() / 2;
+    state.counters["floor_one_ns"] = floorOne.perUnit();
+    state.counters["floor_two_ns"] = floorTwo.perUnit() / 2;
+    state.SetLabel(row.floorName);
+}
+
+// A measurement of a row, as Google Benchmark takes it.
+class RowBenchmark : public benchmark::Fixture {
+public:
+    using Measurement = void(benchmark::State& state, const rows::Row& row);
+
+    RowBenchmark(const std::string& name, Measurement* measurement, const rows::Row& row)
+        : measurement_(measurement), row_(row) {
+        SetName(name.c_str());
+    }
+
+private:
+    void BenchmarkCase(benchmark::State& state) override { measurement_(state, row_); }
+
+    Measurement* measurement_;
+    const rows::Row& row_;
+};
+
+void add(const std::string& name, RowBenchmark::Measurement* measurement, const rows::Row& row,
+         std::size_t rounds) {
+    benchmark::internal::RegisterBenchmarkInternal(new RowBenchmark(name, measurement, row))
+        ->UseManualTime()
+        ->Iterations(static_cast<benchmark::IterationCount>(rounds));
+}
+
+// An option of our own, `--name=number`; the others are Google Benchmark's.
+std::size_t option(int& argc, char** argv, const std::string& name, std::size_t otherwise) {
+    const std::string start = "--" + name + '=';
+    char** const found = std::find_if(argv + 1, argv + argc, [&start](const char* argument) {
+        return std::strncmp(argument, start.c_str(), start.size()) == 0;
+    });
+    if (found == argv + argc) {
+        return otherwise;
+    }
+    const std::size_t value = std::strtoull(*found + start.size(), nullptr, 10);
+    std::move(found + 1, argv + argc, found);
+    --argc;
+    return value;
+}
+
+} // namespace
+
+int main(int argc, char** argv) {
+    if (std::setlocale(LC_CTYPE, "C.UTF-8") == nullptr) {
+        return EXIT_FAILURE;
+    }
+    const std::size_t rounds = option(argc, argv, "rounds", 100);
+    const std::size_t large = option(argc, argv, "large-mib", 64);
+    benchmark::Initialize(&argc, argv);
+    if (benchmark::ReportUnrecognizedArguments(argc, argv)) {
+        return EXIT_FAILURE;
+    }
+    const std::vector<rows::Row> table = rows::all(large << 20U);
+    for (const rows::Row& row : table) {
+        // A slice of the growing rows takes a fraction of a second.
+        const bool growth = row.floorUnits != row.units;
+        add(row.name, measure, row, growth ? std::min<std::size_t>(rounds, 3) : rounds);
+    }
+    for (const rows::Row& row : table) {
+        if (row.onTwoThreads) {
+            // Two processors are free at once more seldom than one.
+            add("two threads: " + row.name, measureGain, row, 3 * rounds);
+        }
+    }
+    benchmark::RunSpecifiedBenchmarks();
+    return EXIT_SUCCESS;
+}

@@ -1,0 +1,124 @@
+// The grammar of MOF: from words to a tree of what is written, not yet of what it means.
+#pragma once
+
+#include "EmbeddedBroker.h"
+#include "MofLexer.h"
+
+#include <optional>
+#include <string>
+#include <variant>
+#include <vector>
+
+namespace oxahv {
+
+struct MofName {
+    std::size_t offset = 0;
+    std::string text;
+};
+
+// A value: its constants, where adjacent texts are one.
+struct MofValue {
+    std::size_t offset = 0;
+    bool isArray = false;
+    std::vector<MofToken> constants;
+};
+
+enum class MofFlavour { enableOverride, disableOverride, restricted, toSubclass, toInstance, translatable };
+
+struct MofQualifier {
+    MofName name;
+    std::optional<MofValue> value;
+    std::vector<MofFlavour> flavours;
+};
+
+// A property, a parameter, or a method without its parameters.
+struct MofElement {
+    std::vector<MofQualifier> qualifiers;
+    CMPIType type = CMPI_null;  // with `CMPI_ARRAY`
+    std::string referenceClass; // of a reference
+    MofName name;
+    std::optional<MofValue> value;
+};
+
+struct MofMethod : MofElement {
+    std::vector<MofElement> parameters;
+};
+
+struct MofClass {
+    std::vector<MofQualifier> qualifiers;
+    MofName name;
+    MofName superclass; // empty when there is none
+    std::vector<MofElement> properties;
+    std::vector<MofMethod> methods;
+};
+
+// Where a qualifier may stand: bits that are combined.
+namespace mofScope {
+constexpr unsigned int schema = 1U << 0U;
+constexpr unsigned int classes = 1U << 1U;
+constexpr unsigned int association = 1U << 2U;
+constexpr unsigned int indication = 1U << 3U;
+constexpr unsigned int qualifier = 1U << 4U;
+constexpr unsigned int property = 1U << 5U;
+constexpr unsigned int reference = 1U << 6U;
+constexpr unsigned int method = 1U << 7U;
+constexpr unsigned int parameter = 1U << 8U;
+constexpr unsigned int any = (1U << 9U) - 1U;
+} // namespace mofScope
+
+struct MofQualifierType {
+    MofName name;
+    CMPIType type = CMPI_null; // with `CMPI_ARRAY`
+    std::optional<MofValue> value;
+    unsigned int scopes = 0;
+    std::vector<MofFlavour> flavours;
+};
+
+struct MofInclude {
+    MofName file;
+};
+
+using MofDeclaration = std::variant<MofClass, MofQualifierType, MofInclude>;
+
+class MofParser {
+public:
+    // Keeps the reference.
+    explicit MofParser(const MofSource& source);
+
+    // The next declaration; nothing behind the last one. Throws BrokerError.
+    std::optional<MofDeclaration> next();
+
+private:
+    [[noreturn]] void failExpecting(const std::string& what) const;
+    MofToken take();
+    bool isSymbol(char symbol) const;
+    bool isWord(std::string_view word) const;
+    bool takeSymbol(char symbol);
+    bool takeWord(std::string_view word);
+    void expectSymbol(char symbol);
+    void expectWord(std::string_view word);
+    MofName readName(const char* what);
+
+    std::optional<MofInclude> readPragma();
+    void skipAlias();
+    void skipInstance();
+    MofQualifierType readQualifierType();
+    unsigned int readScopes();
+    bool takeFlavours(std::vector<MofFlavour>& flavours);
+    std::vector<MofQualifier> readQualifiers();
+    MofQualifier readQualifier();
+    MofClass readClass(std::vector<MofQualifier> qualifiers);
+    void readFeature(MofClass& declared);
+    MofElement readElement();
+    CMPIType readDataType();
+    CMPIType readArraySuffix(CMPIType type);
+    std::vector<MofElement> readParameters();
+    MofValue readValue();
+    MofToken readConstant();
+
+    const MofSource& source_;
+    MofLexer lexer_;
+    MofToken token_; // the one that is looked at, not taken yet
+};
+
+} // namespace oxahv

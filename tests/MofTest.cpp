@@ -1,0 +1,329 @@
+// Classes from MOF: every construct of the language, the errors, and texts that are damaged.
+#include "EmbeddedBroker.h"
+
+#include <algorithm>
+#include <cstdio>
+#include <fstream>
+#include <functional>
+#include <gtest/gtest.h>
+#include <iterator>
+#include <sstream>
+
+using oxahv::BrokerError;
+using oxahv::ClassDeclaration;
+using oxahv::DeclaredValue;
+using oxahv::EmbeddedBroker;
+
+namespace {
+
+const std::string folder = MOF_FIXTURES;
+
+std::string errorOf(const std::function<void()>& operation) {
+    try {
+        operation();
+    } catch (const BrokerError& error) {
+        return error.what();
+    }
+    return "no error";
+}
+
+std::string errorOfText(EmbeddedBroker& broker, const std::string& text) {
+    return errorOf([&] { broker.compileMofText(text, "t.mof"); });
+}
+
+struct Words {
+    std::string operator()(std::monostate /*null*/) const { return "NULL"; }
+    std::string operator()(bool value) const { return value ? "TRUE" : "FALSE"; }
+    std::string operator()(const std::string& value) const {
+        std::string text = "\"";
+        for (const char c : value) { // control characters by their number
+            text += c >= 0 && c < ' ' ? '<' + std::to_string(c) + '>' : std::string(1, c);
+        }
+        return text + '"';
+    }
+    template <class Number>
+    std::string operator()(Number value) const {
+        std::ostringstream text;
+        text << value;
+        return text.str();
+    }
+};
+
+std::string wordsOf(const DeclaredValue& value) {
+    std::string words;
+    for (const auto& element : value.elements) {
+        words += (words.empty() ? "" : " ") + std::visit(Words(), element);
+    }
+    return value.isNull ? "NULL" : (value.type & CMPI_ARRAY) != 0 ? '{' + words + '}' : words;
+}
+
+std::string wordsOf(CMPIType type, const std::string& referenceClass) {
+    return (type & ~CMPI_ARRAY) == CMPI_ref ? referenceClass + " REF" : oxahv::typeName(type);
+}
+
+std::string wordsOf(const oxahv::Qualifiers& qualifiers) {
+    std::string words;
+    for (const auto& qualifier : qualifiers.list()) {
+        words += ' ' + qualifier.name + ':' + oxahv::typeName(qualifier.value.type) + '=' +
+                 wordsOf(qualifier.value);
+        words += qualifier.isOverridable ? "" : "!";
+        words += qualifier.reachesSubclass ? "" : "-";
+        words += qualifier.isTranslatable ? "~" : "";
+    }
+    return words.empty() ? "" : " [" + words.substr(1) + ']';
+}
+
+// A class in lines: its qualifiers, `!` where they may not be overridden, `-` where they do not reach
+// subclasses, `~` where they are translatable; its properties, keys with a star; its methods.
+std::string describe(const EmbeddedBroker& broker, const std::string& name) {
+    const auto brackets = [](CMPIType type) { return (type & CMPI_ARRAY) != 0 ? "[]" : ""; };
+    std::string text = std::string(broker.isAbstract(name) ? " abstract" : "") +
+                       (broker.isAssociation(name) ? " association" : "") +
+                       wordsOf(broker.qualifiersOf(name)) + '\n';
+    for (const auto& property : broker.propertiesOf(name)) {
+        text += wordsOf(property.type, property.referenceClass) + ' ' + property.name +
+                brackets(property.type) + (property.isKey ? "*" : "") +
+                (property.defaultValue.type != CMPI_null ? " = " + wordsOf(property.defaultValue) : "") +
+                wordsOf(property.qualifiers) + '\n';
+    }
+    for (const auto& method : broker.methodsOf(name)) {
+        text += wordsOf(method.returnType, method.returnClass) + ' ' + method.name + "()" +
+                wordsOf(method.qualifiers) + '\n';
+        for (const auto& parameter : method.parameters) {
+            text += std::string(" ") + (parameter.isIn ? " in" : "") + (parameter.isOut ? " out" : "") + ' ' +
+                    wordsOf(parameter.type, parameter.referenceClass) + ' ' + parameter.name +
+                    brackets(parameter.type) + wordsOf(parameter.qualifiers) + '\n';
+        }
+    }
+    return text;
+}
+
+std::string contentOf(const std::string& file) {
+    std::ifstream stream(file, std::ios::binary);
+    return {std::istreambuf_iterator<char>(stream), {}};
+}
+
+// What a slot that asks for a qualifier answers: the value, or the code's name.
+template <class Slot, class... Names>
+std::string answerOf(Slot slot, const CMPIObjectPath* path, Names... names) {
+    CMPIStatus status = {CMPI_RC_ERROR, nullptr};
+    const CMPIData data = slot(path, names..., &status);
+    return status.rc == CMPI_RC_OK ? oxahv::valueText(data) : oxahv::codeName(status.rc);
+}
+
+} // namespace
+
+TEST(Mof, DeclaresEveryConstruct) {
+    EmbeddedBroker broker;
+    broker.compileMof(folder + "/Constructs.mof");
+    std::string text;
+    for (const char* const name : {"Demo_Values", "Demo_Names", "Demo_Base", "Demo_All", "Demo_Derived",
+                                   "Demo_Link", "Demo_LinkToo", "Demo_Event"}) {
+        text += name + describe(broker, name) + '\n';
+    }
+    EXPECT_EQ(text, contentOf(folder + "/Constructs.txt"));
+    EXPECT_TRUE(broker.isA("demo_linktoo", "Demo_Link"));
+    EXPECT_FALSE(broker.isDeclared("Demo_Nowhere"));
+    EXPECT_TRUE(broker.methodsOf("Demo_Nowhere").empty());
+}
+
+TEST(Mof, HasErrorsWithTheirPlaces) {
+    const struct {
+        const char* text;
+        const char* error;
+    } rows[] = {
+        // Words
+        {"\xEF\xBB\xBF@", "1:1: this character cannot stand here"},
+        {"// \u00e9\r\n/* \u00e9 */ @", "2:9: this character cannot stand here"},
+        {"class A {};\n /* open", "2:2: the comment is not closed"},
+        {"class A { string B = \"open\n};", "1:22: the text is not closed"},
+        {"class A { string B = \"\\q\"; };",
+         "1:23: expected b, t, n, f, r, x, a quote or a backslash after this backslash"},
+        {"class A { string B = \"\\",
+         "1:23: expected b, t, n, f, r, x, a quote or a backslash after this backslash"},
+        {"class A { string B = \"\\xD800\"; };", "1:23: this escape sequence stands for no character"},
+        {"class A { string B = \"\\xD800\\x41\"; };", "1:23: this escape sequence stands for no character"},
+        {"class A { string B = \"\\x0\"; };", "1:23: this escape sequence stands for no character"},
+        {"class A { char16 B = 'ab'; };", "1:22: expected one character of 16 bits between the quotes"},
+        {"class A { char16 B = '\xF0\x9F\x98\x80'; };",
+         "1:22: expected one character of 16 bits between the quotes"},
+        {"class A { uint8 B = 0x; };", "1:21: 0x is no number"},
+        {"class A { uint8 B = 12b; };", "1:21: 12b is no number"},
+        {"class A { uint8 B = 089; };", "1:21: 089 is no number"},
+        {"class A { sint8 B = -; };", "1:21: - is no number"},
+        {"class A { real64 B = 1.e5; };", "1:22: 1.e5 is no number"},
+        {"class A { real64 B = 1.5e+; };", "1:22: 1.5e+ is no number"},
+        {"class A { real64 B = 1.0e999; };", "1:22: 1.0e999 does not fit into real64"},
+        {"class A { uint64 B = 18446744073709551616; };",
+         "1:22: 18446744073709551616 does not fit into 64 bits"},
+        // Grammar
+        {"class", "1:6: expected a class name, found the end"},
+        {"class A {}", "1:11: expected ';', found the end"},
+        {"klass A {};", "1:1: expected 'class', 'instance', 'qualifier' or '#pragma', found 'klass'"},
+        {"[Key] qualifier Q : string, scope(any);",
+         "1:7: expected 'class', 'instance', 'qualifier' or '#pragma', found 'qualifier'"},
+        {"class A : { };", "1:11: expected the superclass's name, found '{'"},
+        {"class A as B { };", "1:12: expected an alias such as $name, found 'B'"},
+        {"class A { uint33 B; };", "1:11: 'uint33' is no type, and no 'REF' follows it"},
+        {"class A { string B = C; };", "1:22: expected a value, found 'C'"},
+        {"class A { string B = \"a\" 5; };", "1:26: expected ';', found '5'"},
+        {"class A { string \"B\"; };", "1:18: expected a name, found a text"},
+        {"class A { uint8 B[0]; };", "1:19: expected a size from 1 on, found '0'"},
+        {"class A { A REF B[]; };", "1:18: a reference property cannot be an array"},
+        {"class A { uint8 B(string); };", "1:25: expected a name, found ')'"},
+        {"[] class A {};", "1:2: expected a qualifier's name, found ']'"},
+        {"[Key :] class A {};", "1:7: expected a flavour, found ']'"},
+        {"qualifier Q : string;", "1:21: expected ', scope', found ';'"},
+        {"qualifier Q : A, scope(any);", "1:15: expected a type, found 'A'"},
+        {"qualifier Q : string, scope(all);", "1:29: expected a scope, found 'all'"},
+        {"qualifier Q : string, scope(any), flavor(bitter);", "1:42: expected a flavour, found 'bitter'"},
+        {"qualifier Q : uint8 = 256, scope(any);", "1:23: 256 does not fit into uint8"},
+        {"instance of A {\n { } ;", "1:1: the instance has no end"},
+        {"#progma x", "1:2: expected 'pragma', found 'progma'"},
+        {"#pragma locale (\"x\"", "1:16: the parenthesis is not closed"},
+        {"#pragma include (x)", "1:18: expected a file name in quotes, found 'x'"},
+        // Meaning
+        {"class A { uint8 B = -1; };", "1:21: -1 does not fit into uint8"},
+        {"class A { sint16 B = -32769; };", "1:22: -32769 does not fit into sint16"},
+        {"class A { char16 B = 65536; };", "1:22: 65536 does not fit into char16"},
+        {"class A { real32 B = 1.0e39; };", "1:22: 1.0e39 does not fit into real32"},
+        {"class A { boolean B = 1; };", "1:23: expected a value of type boolean"},
+        {"class A { string B = 1; };", "1:22: expected a value of type string"},
+        {"class A { datetime B = \"now\"; };", "1:24: expected a value of type datetime"},
+        {"class A { uint8 B[] = 1; };", "1:23: expected an array in braces"},
+        {"class A { uint8 B = { 1 }; };", "1:21: expected a value of type uint8"},
+        {"class A { uint8 B[] = {1,\n\"x\"}; };", "2:1: expected a value of type uint8"},
+        {"class A {};\nclass a {};", "2:7: class a is declared already"},
+        {"class Base {};", "1:7: class Base is declared already"},
+        {"class A : Nowhere {};", "1:11: class A: superclass Nowhere is not declared"},
+        {"class A : A {};", "1:11: class A: superclass A is not declared"},
+        {"class A : Base { string X;\n uint8 p[]; };",
+         "2:8: class A: property p is declared as uint8 already"},
+        {"class A { string P; uint8 p; };", "1:27: class A: property p stands twice"},
+        {"class A : Base { string m(); };", "1:25: class A: method m is declared as uint32 already"},
+        {"class A { uint8 M(); uint8 m(); };", "1:28: class A: method m stands twice"},
+        {"class A { uint8 M(uint8 P, uint8 p); };", "1:34: class A: method M: parameter p stands twice"},
+        {"[Key] class A {};", "1:2: qualifier Key cannot stand on a class"},
+        {"[Abstract, Association] class A { [In] A REF B; };",
+         "1:36: qualifier In cannot stand on a reference"},
+        {"class A { [Key, key] string B; };", "1:17: qualifier key stands twice"},
+        {"class A { [Key(\"x\")] string B; };", "1:16: expected a value of type boolean"},
+        {"[Abstract { true }] class A {};", "1:11: expected a value of type boolean"},
+        {"qualifier Q : string[], scope(any); [Q(\"a\")] class A {};", "1:40: expected an array in braces"},
+    };
+    EmbeddedBroker broker;
+    broker.declare(ClassDeclaration("Base").property("P", CMPI_uint8).method("M", CMPI_uint32));
+    for (const auto& row : rows) {
+        EXPECT_EQ(errorOfText(broker, row.text), std::string("t.mof:") + row.error) << row.text;
+    }
+    EXPECT_FALSE(broker.isDeclared("A")) << "a text with an error declares nothing";
+    EXPECT_EQ(errorOfText(broker, "[Q] class A {};"), "no error") << "not even a qualifier";
+}
+
+TEST(Mof, HasErrorsOfFilesWhereTheyAreIncluded) {
+    EmbeddedBroker broker;
+    const auto errorOfFile = [&](const std::string& file) {
+        return errorOf([&] { broker.compileMof(folder + file); });
+    };
+    EXPECT_EQ(errorOfFile("/None.mof"),
+              folder + "/None.mof:1:1: cannot read " + folder + "/None.mof: No such file or directory");
+    EXPECT_EQ(errorOfFile("/sub"),
+              folder + "/sub:1:1: cannot read " + folder + "/sub: it is no regular file");
+    EXPECT_EQ(errorOfFile("/Circle.mof"),
+              folder + "/sub/Circle.mof:2:20: " + folder + "/sub/../Circle.mof includes itself");
+    EXPECT_FALSE(broker.isDeclared("Demo_Circle"));
+    EXPECT_EQ(errorOf([&] {
+                  broker.compileMofText("class A {};\n#pragma include (\"sub/\" \"Faulty.mof\")",
+                                        folder + "/x.mof");
+              }),
+              folder + "/sub/Faulty.mof:3:15: 256 does not fit into uint8");
+    EXPECT_FALSE(broker.hasDeclarations());
+    EXPECT_EQ(errorOfText(broker, "class A {};\n\n  #pragma include (\"none/None.mof\")"),
+              "t.mof:3:20: cannot read none/None.mof: No such file or directory");
+}
+
+// Cut off or damaged at any place, a text is taken or refused, and nothing worse.
+TEST(Mof, OutlivesDamagedTexts) {
+    const std::string whole =
+        contentOf(folder + "/Constructs.mof") + contentOf(folder + "/Qualifiers.mof").substr(3);
+    const std::string name = folder + "/Damaged.mof";
+    const auto tryText = [&](const std::string& text, std::size_t position) {
+        EmbeddedBroker broker;
+        const std::string error = errorOf([&] { broker.compileMofText(text, name); });
+        if (error != "no error") {
+            unsigned int line = 0;
+            unsigned int column = 0;
+            const std::string place = error.substr(std::min(error.size(), name.size()));
+            EXPECT_EQ(error.substr(0, name.size()), name) << position;
+            EXPECT_EQ(std::sscanf(place.c_str(), ":%u:%u: ", &line, &column), 2) << error;
+            EXPECT_TRUE(line > 0 && column > 0) << error;
+            EXPECT_FALSE(broker.hasDeclarations()) << position;
+        }
+        return error;
+    };
+    EXPECT_EQ(tryText(whole, 0), "no error");
+    for (std::size_t i = 0; i < whole.size(); ++i) {
+        tryText(whole.substr(0, i), i);
+        std::string damaged = whole;
+        const int byte = static_cast<unsigned char>(whole[i]);
+        const int replacements[] = {0, byte ^ 0x01, byte ^ 0x10, byte ^ 0x80, '"', '{', '\\'};
+        damaged[i] = static_cast<char>(replacements[i % std::size(replacements)]);
+        tryText(damaged, i);
+    }
+    tryText(std::string(1000000, '['), 0);
+    tryText("instance of A " + std::string(1000000, '{'), 0);
+}
+
+TEST(Mof, IsAskedForByTheQualifierSlots) {
+    EmbeddedBroker broker;
+    oxahv::Request request(broker);
+    const CMPIObjectPath* const path = request.objectPath("root", "demo_derived");
+    const CMPIObjectPathFT& slots = *path->ft;
+    EXPECT_EQ(answerOf(slots.getClassQualifier, path, "Description"), "CMPI_RC_ERR_NOT_SUPPORTED");
+    broker.compileMof(folder + "/Constructs.mof");
+    broker.compileMofText(
+        "[Numbers { 1, NULL }, Real(1.5), Flag(false), Letter('a'), None(NULL)] class Demo_Q {};", "q.mof");
+    const CMPIObjectPath* const q = request.objectPath("root", "Demo_Q");
+    const struct {
+        std::string answer;
+        const char* expected;
+    } rows[] = {
+        {answerOf(slots.getClassQualifier, path, "DESCRIPTION"), "\"A class with all.\""},
+        {answerOf(slots.getClassQualifier, path, "Abstract"), "CMPI_RC_ERR_NOT_FOUND"},
+        {answerOf(slots.getClassQualifier, request.objectPath("root", "Demo_None"), "Abstract"),
+         "CMPI_RC_ERR_INVALID_CLASS"},
+        {answerOf(slots.getClassQualifier, q, "Numbers"), "{1, NULL}"},
+        {answerOf(slots.getClassQualifier, q, "Real"), "1.5"},
+        {answerOf(slots.getClassQualifier, q, "Flag"), "FALSE"},
+        {answerOf(slots.getClassQualifier, q, "Letter"), "97"},
+        {answerOf(slots.getClassQualifier, q, "None"), "NULL"},
+        {answerOf(slots.getPropertyQualifier, path, "state", "Values"), "{\"None\", \"One!\", \"Vendor\"}"},
+        {answerOf(slots.getPropertyQualifier, path, "Name", "Key"), "TRUE"},
+        {answerOf(slots.getPropertyQualifier, path, "Name", "Override"), "CMPI_RC_ERR_NOT_FOUND"},
+        {answerOf(slots.getPropertyQualifier, path, "None", "Key"), "CMPI_RC_ERR_NO_SUCH_PROPERTY"},
+        {answerOf(slots.getMethodQualifier, path, "CHANGE", "description"), "\"own\""},
+        {answerOf(slots.getMethodQualifier, path, "None", "Note"), "CMPI_RC_ERR_METHOD_NOT_FOUND"},
+        {answerOf(slots.getParameterQualifier, path, "Change", "bytes", "In"), "FALSE"},
+        {answerOf(slots.getParameterQualifier, path, "Change", "None", "In"),
+         "CMPI_RC_ERR_INVALID_PARAMETER"},
+        {answerOf(slots.getParameterQualifier, path, "Change", "Text", static_cast<const char*>(nullptr)),
+         "CMPI_RC_ERR_INVALID_PARAMETER"},
+    };
+    for (const auto& row : rows) {
+        EXPECT_EQ(row.answer, row.expected) << &row - rows;
+    }
+}
+
+TEST(Mof, HasBuildersForWhatItBrings) {
+    EmbeddedBroker broker;
+    broker.declare(ClassDeclaration("Base").method("Stop", CMPI_uint8, {{"Hard", CMPI_boolean}}));
+    broker.declare(ClassDeclaration("Demo")
+                       .superclass("Base")
+                       .abstract()
+                       .association()
+                       .reference("End", "Base")
+                       .key("Id", CMPI_uint8));
+    EXPECT_EQ(describe(broker, "Demo"),
+              " abstract association [Abstract:boolean=TRUE- Association:boolean=TRUE]\n"
+              "Base REF End\nuint8 Id* [Key:boolean=TRUE]\nuint8 Stop()\n  in boolean Hard\n");
+}
