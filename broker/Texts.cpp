@@ -126,7 +126,7 @@ std::string arrayText(const Array& array) {
 // A point stands before the fraction, whatever the locale says.
 std::string realText(double value, int digits) {
     std::array<char, 40> text{};
-    const char* const end =
+    char* const end =
         std::to_chars(text.data(), text.data() + text.size(), value, std::chars_format::general, digits).ptr;
     return {text.data(), end};
 }
