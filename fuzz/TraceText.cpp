@@ -76,7 +76,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     fuzz::Input input(data, size);
     // Now and then a mebibyte; it takes its time.
     const auto number = input.number<std::uint16_t>();
-    const unsigned int repeated = number < 0xFF00 ? number % 64U : 0x10000U;
+    const unsigned int repeated = number == 0xFFFF ? 0x10000U : number % 64U;
     const auto line = input.number<unsigned int>();
     const std::string file = input.line();
     const std::string piece = input.rest();

@@ -37,6 +37,8 @@ protected:
         store("text");
     }
 
+    const ThreadLocale plain_{"C"};
+
     void store(const char* text) {
         CMSetProperty(instance_, "Name", text, CMPI_chars);
         CMAddKey(path_, "Name", text, CMPI_chars);
