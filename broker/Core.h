@@ -9,6 +9,7 @@
 #include <array>
 #include <atomic>
 #include <functional>
+#include <map>
 #include <shared_mutex>
 
 namespace oxahv {
@@ -29,11 +30,17 @@ public:
     void tell(const BrokerMessage& message) const;
     void setMessageHandler(std::function<void(const BrokerMessage&)> handler);
 
+    void setContextEntry(const std::string& name, const std::string& text);
+    // Puts the program's entries into a new context.
+    void addContextEntries(Context& context);
+
 private:
     std::array<std::atomic<int>, kindCount>
         counts_{}; // before the owner, whose objects are counted to the last
     mutable std::shared_mutex handlerMutex_;
     std::function<void(const BrokerMessage&)> handler_;
+    std::shared_mutex contextMutex_;
+    std::map<std::string, std::string> contextEntries_;
 
 public:
     CMPIBroker record = {this, &requestTable, &encapsulationTable, &systemTable, &memoryTable};

@@ -140,10 +140,12 @@ void returnData(Result& result, const CMPIValue* value, CMPIType type) {
 
 void returnInstance(Result& result, const CMPIInstance* instance) {
     result.reply.instances.push_back(copyFor<Instance>(result, instance));
+    result.tellProgress();
 }
 
 void returnObjectPath(Result& result, const CMPIObjectPath* path) {
     result.reply.objectPaths.push_back(copyFor<ObjectPath>(result, path));
+    result.tellProgress();
 }
 
 void returnDone(Result& result) {

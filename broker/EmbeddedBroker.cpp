@@ -39,6 +39,18 @@ void EmbeddedBroker::Impl::setMessageHandler(std::function<void(const BrokerMess
     handler_.swap(handler);
 }
 
+void EmbeddedBroker::Impl::setContextEntry(const std::string& name, const std::string& text) {
+    const std::unique_lock<std::shared_mutex> lock(contextMutex_);
+    contextEntries_[name] = text;
+}
+
+void EmbeddedBroker::Impl::addContextEntries(Context& context) {
+    const std::shared_lock<std::shared_mutex> lock(contextMutex_);
+    for (const auto& [name, text] : contextEntries_) {
+        context.values.set(name, Value::text(*this, text));
+    }
+}
+
 EmbeddedBroker::EmbeddedBroker() : impl_(std::make_unique<Impl>()) {}
 EmbeddedBroker::~EmbeddedBroker() = default;
 
@@ -107,6 +119,10 @@ void EmbeddedBroker::host(const std::string& name, const ProviderFactories& fact
 void EmbeddedBroker::load(const std::string& file, const std::string& name,
                           std::vector<std::string> classes) {
     impl_->hosting.load(file, name, std::move(classes));
+}
+
+void EmbeddedBroker::setContextEntry(const std::string& name, const std::string& text) {
+    impl_->setContextEntry(name, text);
 }
 
 void EmbeddedBroker::unload(const std::string& name) {

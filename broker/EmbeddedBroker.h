@@ -353,6 +353,13 @@ public:
      */
     void load(const std::string& file, const std::string& name, std::vector<std::string> classes = {});
     /**
+     * Gives providers an entry of their contexts, as a CIM server's configuration would: it stands in the
+     * context of every factory call and every request that begins from now on.
+     * @param name the entry's name; one that begins with "CMPI" is the standard's.
+     * @param text its value, a `CMPI_string`; takes the place of an earlier one.
+     */
+    void setContextEntry(const std::string& name, const std::string& text);
+    /**
      * Calls the provider's `cleanup`, waits for requests that are inside it, and unloads its library. Not to
      * be called from a request that is inside it.
      * @throws BrokerError when no such provider is hosted.
@@ -436,6 +443,13 @@ public:
     /** The request's context, as provider functions receive it. */
     const CMPIContext* context() const;
 
+    /**
+     * Tells how far the operations of this request have come, while they run.
+     * @param handler called with the number of instances and object paths that the provider has returned so
+     * far, after each of them and on the thread that returned it; null: nobody. It must not throw.
+     */
+    void setProgressHandler(std::function<void(std::size_t results)> handler);
+
     /** A new object path, made through the broker's own slot; null when that refuses. */
     CMPIObjectPath* objectPath(const std::string& nameSpace, const std::string& className);
     /**
@@ -446,6 +460,14 @@ public:
      * @throws BrokerError naming the column (from 1) and what is wrong there.
      */
     CMPIObjectPath* objectPathFromText(const std::string& text, const std::string& nameSpace);
+    /**
+     * The value of a text, written as those in an object path are. A text, date/time or path may stand
+     * without quotes, and is then taken as it is.
+     * @param type the type of the value, no array; `CMPI_null`: what it looks like, as in a path of an
+     * undeclared class, a text when it is neither a number nor `TRUE` or `FALSE`.
+     * @throws BrokerError naming the column (from 1) and what is wrong there.
+     */
+    CMPIData valueFromText(const std::string& text, CMPIType type);
     /** A copy of the path as a client's request would bring it to a provider: its keys as the broker's
      * KeyMode says. */
     CMPIObjectPath* deliver(const CMPIObjectPath* path);

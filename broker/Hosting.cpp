@@ -174,7 +174,8 @@ HostedProvider::~HostedProvider() {
     {
         Owner own(core_); // what the provider makes while it ends
         const Owner::Scope scope(own);
-        const Context context(core_);
+        Context context(core_);
+        core_.addContextEntries(context);
         cleanUp(instance_, &context);
         cleanUp(association_, &context);
         cleanUp(method_, &context);
@@ -188,7 +189,8 @@ HostedProvider::~HostedProvider() {
 // The MI that a factory makes. What the factory throws ends here: its code may be unloaded next.
 template <class MI, class Factory>
 MI* HostedProvider::made(const Factory& factory) const {
-    const CMPIContext* const context = handOut(std::make_unique<Context>(core_));
+    Context* const context = handOut(std::make_unique<Context>(core_));
+    core_.addContextEntries(*context);
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     MI* mi = nullptr;
     try {
@@ -369,6 +371,9 @@ Reply Hosting::request(const CMPIContext* context, const CMPIObjectPath* handle,
         return refused(CMPI_RC_ERR_NOT_SUPPORTED, "no provider serves this for class " + path->className);
     }
     Result result(core_, Owner::current(core_));
+    if (Context* const own = Context::of(context)) {
+        result.progress = std::exchange(own->progress, nullptr);
+    }
     const CMPIObjectPath* const delivered = deliver(handle);
     std::string message;
     const CMPIStatus status =

@@ -404,4 +404,10 @@ std::unique_ptr<Object> Error::clone() const {
     return copy;
 }
 
+CMPIData keep(Core& core, Value value) {
+    auto holder = std::make_unique<Array>(core, value.type(), 0);
+    holder->elements.push_back(std::move(value));
+    return handOut(std::move(holder))->elements.front().data();
+}
+
 } // namespace oxahv

@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <atomic>
+#include <functional>
 #include <memory>
 #include <mutex>
 #include <string>
@@ -244,6 +245,9 @@ public:
     std::unique_ptr<Object> clone() const override;
 
     NamedValues values;
+    // Who wants to know of the results of the request that begins next; null for nobody. Upcalls, which come
+    // under the same context, find it taken.
+    const std::function<void(std::size_t)>* progress = nullptr;
 };
 
 class Enumeration : public RecordedObject<CMPIEnumeration, Kind::enumeration, Enumeration> {
@@ -297,9 +301,17 @@ public:
     Result(Core& core, Owner& itsKeeper) : RecordedObject(core), keeper(itsKeeper) {}
     std::unique_ptr<Object> clone() const override { throw Failure{CMPI_RC_ERR_NOT_SUPPORTED}; }
 
+    // Says that one more has come.
+    void tellProgress() const {
+        if (progress != nullptr && *progress) {
+            (*progress)(reply.instances.size() + reply.objectPaths.size());
+        }
+    }
+
     // Owns what is returned: the provider may return it on a thread whose own objects die before the request.
     Owner& keeper;
     Reply reply;
+    const std::function<void(std::size_t)>* progress = nullptr;
 };
 
 class PropertyList : public RecordedObject<CMPIPropertyList, Kind::other, PropertyList> {
@@ -356,5 +368,8 @@ auto handOut(std::unique_ptr<Class> object) {
     Owner::current(given.core()).adopt(std::move(object));
     return &given;
 }
+
+// A value that belongs to an array of one, which the current owner has.
+CMPIData keep(Core& core, Value value);
 
 } // namespace oxahv

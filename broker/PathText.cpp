@@ -1,11 +1,14 @@
-// Reads object paths from texts.
+// Reads object paths, and single values, from texts.
 
 #include "Core.h"
 #include "DateTimeText.h"
 #include "Integers.h"
 
 #include <cerrno>
+#include <charconv>
+#include <cmath>
 #include <cstdlib>
+#include <limits>
 
 namespace oxahv {
 
@@ -18,7 +21,9 @@ bool isNameCharacter(char c) {
 
 class PathReader {
 public:
-    PathReader(Core& core, const std::string& text) : core_(core), text_(text) {}
+    // `subject` is what complaints call the text.
+    PathReader(Core& core, const std::string& text, const char* subject = "object path")
+        : core_(core), text_(text), subject_(subject) {}
 
     std::unique_ptr<ObjectPath> read(const std::string& defaultNameSpace) {
         const std::string nameSpace = readNameSpace(defaultNameSpace);
@@ -35,9 +40,52 @@ public:
         return path;
     }
 
+    // The whole text is one value.
+    Value readOnlyValue(CMPIType wanted) {
+        if (next() != '"' && isBareText(wanted)) {
+            position_ = text_.size();
+            return textValue(0, text_, wanted);
+        }
+        Value value = readValue(wanted);
+        if (position_ < text_.size()) {
+            fail(position_, "expected nothing behind the value");
+        }
+        return value;
+    }
+
 private:
+    // Whether a text without quotes is itself the value: where a text is wanted, or, when anything is, where
+    // it is neither a number nor TRUE or FALSE.
+    bool isBareText(CMPIType wanted) const {
+        if (wanted != CMPI_null) {
+            return wanted == CMPI_string || wanted == CMPI_dateTime || wanted == CMPI_ref;
+        }
+        const std::size_t digits = text_.find_first_of("+-") == 0 ? 1 : 0;
+        const bool isNumber =
+            digits < text_.size() && text_.find_first_not_of("0123456789", digits) == std::string::npos;
+        return !isNumber && !sameName(text_, "true") && !sameName(text_, "false");
+    }
+
+    Value readReal(CMPIType wanted) {
+        const std::size_t start = position_;
+        CMPIReal64 number = 0;
+        const auto [end, error] = std::from_chars(text_.data() + start, text_.data() + text_.size(), number);
+        const bool fits = wanted == CMPI_real64 || std::abs(number) <= std::numeric_limits<CMPIReal32>::max();
+        if (error != std::errc() || !std::isfinite(number) || !fits) {
+            fail(start, "expected a " + typeName(wanted));
+        }
+        position_ = static_cast<std::size_t>(end - text_.data());
+        CMPIValue value = {};
+        if (wanted == CMPI_real32) {
+            value.real32 = static_cast<CMPIReal32>(number);
+        } else {
+            value.real64 = number;
+        }
+        return Value::number(value, wanted);
+    }
+
     [[noreturn]] void fail(std::size_t position, const std::string& what) const {
-        throw BrokerError("object path, column " + std::to_string(position + 1) + ": " + what);
+        throw BrokerError(std::string(subject_) + ", column " + std::to_string(position + 1) + ": " + what);
     }
 
     char next() const { return position_ < text_.size() ? text_[position_] : '\0'; }
@@ -89,6 +137,14 @@ private:
         const std::size_t start = position_;
         if (next() == '"') {
             return textValue(start, readQuoted(), wanted);
+        }
+        if (wanted == CMPI_real32 || wanted == CMPI_real64) {
+            return readReal(wanted);
+        }
+        if (wanted == CMPI_char16) {
+            Value code = readNumber(CMPI_uint16);
+            code.retype(CMPI_char16);
+            return code;
         }
         if (next() == '-' || next() == '+' || (next() >= '0' && next() <= '9')) {
             return readNumber(wanted);
@@ -193,11 +249,16 @@ private:
 
     Core& core_;
     const std::string& text_;
+    const char* subject_;
     std::size_t position_ = 0;
     std::shared_ptr<const DeclaredClass> declared_;
 };
 
 } // namespace
+
+CMPIData Request::valueFromText(const std::string& text, CMPIType type) {
+    return keep(core(), PathReader(core(), text, "value").readOnlyValue(type));
+}
 
 CMPIObjectPath* Request::objectPathFromText(const std::string& text, const std::string& nameSpace) {
     return handOut(PathReader(core(), text).read(nameSpace));

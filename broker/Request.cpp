@@ -6,6 +6,7 @@ namespace oxahv {
 class Request::Impl {
 public:
     explicit Impl(EmbeddedBroker& broker) : core(broker.impl()) {
+        core.addContextEntries(context);
         CMPIValue flags = {};
         flags.uint32 = 0;
         context.values.set(CMPIInvocationFlags, Value::number(flags, CMPI_uint32));
@@ -18,12 +19,14 @@ public:
         if (target != nullptr) {
             context.values.set(CMPIInitNameSpace, Value::text(core, target->nameSpace));
         }
+        context.progress = &progress;
         return &context;
     }
 
     Core& core;
     Context context{core}; // nobody's: a provider that releases it does no harm
     Owner owner{core};
+    std::function<void(std::size_t)> progress;
     Owner::Scope scope{owner};
 };
 
@@ -37,6 +40,10 @@ EmbeddedBroker::Impl& Request::core() {
 
 const CMPIContext* Request::context() const {
     return &impl_->context;
+}
+
+void Request::setProgressHandler(std::function<void(std::size_t results)> handler) {
+    impl_->progress = std::move(handler);
 }
 
 CMPIObjectPath* Request::objectPath(const std::string& nameSpace, const std::string& className) {

@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <array>
 #include <charconv>
+#include <cmath>
 #include <cstdlib>
 
 namespace oxahv {
@@ -123,12 +124,15 @@ std::string arrayText(const Array& array) {
     return text + "}";
 }
 
-// A point stands before the fraction, whatever the locale says.
-std::string realText(double value, int digits) {
-    std::array<char, 40> text{};
-    char* const end =
-        std::to_chars(text.data(), text.data() + text.size(), value, std::chars_format::general, digits).ptr;
-    return {text.data(), end};
+// The shortest text that reads back as the same number. MOF wants a point in it, whatever the locale says.
+template <class Real>
+std::string realText(Real value) {
+    std::array<char, 40> buffer{};
+    std::string text(buffer.data(), std::to_chars(buffer.data(), buffer.data() + buffer.size(), value).ptr);
+    if (std::isfinite(value) && text.find('.') == std::string::npos) {
+        text.insert(std::min(text.find('e'), text.size()), ".0");
+    }
+    return text;
 }
 
 std::string objectText(const CMPIData& data) {
@@ -174,9 +178,9 @@ std::string valueText(const CMPIData& data) {
     case CMPI_sint64:
         return std::to_string(data.value.sint64);
     case CMPI_real32:
-        return realText(data.value.real32, 9);
+        return realText(data.value.real32);
     case CMPI_real64:
-        return realText(data.value.real64, 17);
+        return realText(data.value.real64);
     case CMPI_chars:
         return quoted(data.value.chars);
     default:

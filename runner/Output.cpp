@@ -16,7 +16,7 @@ std::string textOf(const CMPIString* string) {
     return chars != nullptr ? chars : "";
 }
 
-// The values of an instance or an object path: `count` and `at` are the slots that tell them.
+// The values of an instance, an object path or arguments: `count` and `at` are the slots that tell them.
 template <class Object, class Count, class At>
 std::vector<NamedData> valuesOf(const Object* object, Count count, At at) {
     std::vector<NamedData> values;
@@ -35,6 +35,10 @@ std::vector<NamedData> propertiesOf(const CMPIInstance* instance) {
 
 std::vector<NamedData> keysOf(const CMPIObjectPath* path) {
     return valuesOf(path, CMGetKeyCount, CMGetKeyAt);
+}
+
+std::vector<NamedData> argumentsOf(const CMPIArgs* arguments) {
+    return valuesOf(arguments, CMGetArgCount, CMGetArgAt);
 }
 
 Json jsonOf(const CMPIData& data);
@@ -92,15 +96,19 @@ Json jsonOf(const CMPIData& data) {
     }
 }
 
-Json jsonOf(const CMPIObjectPath* path, const std::vector<NamedData>& values) {
-    Json properties = Json::object();
+Json jsonOf(const std::vector<NamedData>& values) {
+    Json object = Json::object();
     for (const NamedData& value : values) {
-        properties[value.name] = jsonOf(value.data);
+        object[value.name] = jsonOf(value.data);
     }
+    return object;
+}
+
+Json jsonOf(const CMPIObjectPath* path, const std::vector<NamedData>& values) {
     return {{"class", textOf(CMGetClassName(path, nullptr))},
             {"namespace", textOf(CMGetNameSpace(path, nullptr))},
             {"path", oxahv::pathText(path)},
-            {"properties", properties}};
+            {"properties", jsonOf(values)}};
 }
 
 // A provider's texts need not be UTF-8; what is not is replaced.
@@ -141,5 +149,25 @@ void printPaths(std::ostream& out, Format format, const std::vector<CMPIObjectPa
     }
     if (format == Format::json) {
         print(out, array);
+    }
+}
+
+void printMethodResult(std::ostream& out, Format format, const CMPIObjectPath* path,
+                       const std::string& method, const oxahv::Reply& reply) {
+    CMPIData returned = {CMPI_null, CMPI_nullValue, {}};
+    if (!reply.data.empty()) {
+        returned = reply.data.front();
+    }
+    const std::vector<NamedData> arguments = argumentsOf(reply.out);
+    if (format == Format::json) {
+        print(out, Json::array({{{"path", oxahv::pathText(path)},
+                                 {"method", method},
+                                 {"returnValue", jsonOf(returned)},
+                                 {"parameters", jsonOf(arguments)}}}));
+        return;
+    }
+    out << "ReturnValue = " << oxahv::valueText(returned) << ";\n";
+    for (const NamedData& argument : arguments) {
+        out << argument.name << " = " << oxahv::valueText(argument.data) << ";\n";
     }
 }

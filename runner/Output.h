@@ -1,9 +1,10 @@
-// How instances and object paths are printed.
+// How instances, object paths and methods' results are printed.
 #pragma once
 
 #include <EmbeddedBroker.h>
 
 #include <ostream>
+#include <string>
 #include <vector>
 
 enum class Format { mof, json };
@@ -13,3 +14,7 @@ void printInstances(std::ostream& out, Format format, const std::vector<CMPIInst
 
 // As one path a line, or as one JSON array of objects whose properties are the keys.
 void printPaths(std::ostream& out, Format format, const std::vector<CMPIObjectPath*>& paths);
+
+// As MOF-like lines, the return value first, or as a JSON array of one object.
+void printMethodResult(std::ostream& out, Format format, const CMPIObjectPath* path,
+                       const std::string& method, const oxahv::Reply& reply);

@@ -1,5 +1,8 @@
 #include "Runner.h"
 
+#include "Arguments.h"
+#include "Progress.h"
+
 #include <HVLogger.h>
 
 #include <filesystem>
@@ -9,33 +12,74 @@ namespace {
 
 constexpr int providerFailed = 1;
 
-oxahv::Reply enumerateNames(oxahv::Request& request, const Options& options, const std::string& className) {
-    oxahv::Reply reply = request.enumerateInstanceNames(request.objectPath(options.nameSpace, className));
-    if (reply.ok()) {
-        printPaths(std::cout, options.format, reply.objectPaths);
-    }
-    return reply;
+using oxahv::EmbeddedBroker;
+using oxahv::Reply;
+using oxahv::Request;
+
+// Sending requests
+
+Reply enumerateNames(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
+                     const Operands& /*operands*/) {
+    return request.enumerateInstanceNames(target);
 }
 
-oxahv::Reply enumerate(oxahv::Request& request, const Options& options, const std::string& className) {
-    oxahv::Reply reply = request.enumerateInstances(request.objectPath(options.nameSpace, className));
-    if (reply.ok()) {
-        printInstances(std::cout, options.format, reply.instances);
-    }
-    return reply;
+Reply enumerate(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
+                const Operands& /*operands*/) {
+    return request.enumerateInstances(target);
 }
 
-oxahv::Reply getInstance(oxahv::Request& request, const Options& options, const std::string& path) {
-    oxahv::Reply reply = request.getInstance(request.objectPathFromText(path, options.nameSpace));
+Reply getInstance(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
+                  const Operands& /*operands*/) {
+    Reply reply = request.getInstance(target);
     if (reply.ok() && reply.instances.size() != 1) {
         reply.code = CMPI_RC_ERR_FAILED;
         reply.message =
             "the provider returned " + std::to_string(reply.instances.size()) + " instances in place of one";
     }
-    if (reply.ok()) {
-        printInstances(std::cout, options.format, reply.instances);
-    }
     return reply;
+}
+
+Reply associatorNames(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
+                      const Operands& operands) {
+    return request.associatorNames(target, operands.filter);
+}
+
+Reply associators(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
+                  const Operands& operands) {
+    return request.associators(target, operands.filter);
+}
+
+Reply referenceNames(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
+                     const Operands& operands) {
+    return request.referenceNames(target, operands.filter);
+}
+
+Reply references(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
+                 const Operands& operands) {
+    return request.references(target, operands.filter);
+}
+
+Reply callMethod(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* target,
+                 const Operands& operands) {
+    return request.invokeMethod(target, operands.method,
+                                argumentsFrom(broker, request, target, operands.method, operands.arguments));
+}
+
+// Printing what they yield
+
+void printReply(const Options& options, const CMPIObjectPath* target, const Operands& operands, Yields yields,
+                const Reply& reply) {
+    switch (yields) {
+    case Yields::paths:
+        printPaths(std::cout, options.format, reply.objectPaths);
+        break;
+    case Yields::instances:
+        printInstances(std::cout, options.format, reply.instances);
+        break;
+    case Yields::methodResult:
+        printMethodResult(std::cout, options.format, target, operands.method, reply);
+        break;
+    }
 }
 
 // The MI name that a library's file stands for: its stem without "lib". A version behind ".so" is none of it.
@@ -45,8 +89,17 @@ std::string nameOf(const std::string& library) {
     return stem.rfind("lib", 0) == 0 ? stem.substr(3) : stem;
 }
 
+// NAME=TEXT
+void addContextEntry(EmbeddedBroker& broker, const std::string& text) {
+    const std::size_t equals = text.find('=');
+    if (equals == std::string::npos || equals == 0) {
+        throw oxahv::BrokerError("context entry '" + text + "' is not NAME=TEXT");
+    }
+    broker.setContextEntry(text.substr(0, equals), text.substr(equals + 1));
+}
+
 // SLOT:N[:CODE], where the slot's name may not hold a colon.
-void inject(oxahv::EmbeddedBroker& broker, const std::string& text) {
+void inject(EmbeddedBroker& broker, const std::string& text) {
     const std::size_t first = text.find(':');
     const std::size_t second = first != std::string::npos ? text.find(':', first + 1) : std::string::npos;
     const std::string number = first != std::string::npos ? text.substr(first + 1, second - first - 1) : "";
@@ -76,17 +129,34 @@ void showTraces() {
 
 const std::vector<Verb>& verbs() {
     static const std::vector<Verb> all = {
-        {"ein", "CLASS", "enumerate the instance names of a class", enumerateNames},
-        {"ei", "CLASS", "enumerate the instances of a class", enumerate},
-        {"gi", "PATH", "get the instance with an object path", getInstance},
+        {"ein", Target::ofClass, Takes::nothing, Yields::paths, "CLASS: the paths of its instances",
+         enumerateNames},
+        {"ei", Target::ofClass, Takes::nothing, Yields::instances, "CLASS: its instances", enumerate},
+        {"gi", Target::ofInstance, Takes::nothing, Yields::instances, "PATH: the instance", getInstance},
+        {"an", Target::ofInstance, Takes::filter, Yields::paths,
+         "PATH: the paths of the instances associated with it", associatorNames},
+        {"ai", Target::ofInstance, Takes::filter, Yields::instances, "PATH: the instances associated with it",
+         associators},
+        {"rn", Target::ofInstance, Takes::referenceFilter, Yields::paths,
+         "PATH: the paths of the associations that refer to it", referenceNames},
+        {"ri", Target::ofInstance, Takes::referenceFilter, Yields::instances,
+         "PATH: the associations that refer to it", references},
+        {"cm", Target::ofInstance, Takes::method, Yields::methodResult,
+         "PATH METHOD name=value ...: call a method of the instance", callMethod},
     };
     return all;
 }
 
-int run(const Options& options, const Verb& verb, const std::string& operand) {
-    oxahv::EmbeddedBroker broker;
+int run(const Options& options, const Verb& verb, const Operands& operands) {
+    EmbeddedBroker broker;
     if (options.showsTraces) {
         showTraces();
+    }
+    for (const std::string& file : options.mofFiles) {
+        broker.compileMof(file);
+    }
+    for (const std::string& entry : options.contextEntries) {
+        addContextEntry(broker, entry);
     }
     // A name without a folder would be looked for among the system's libraries.
     const std::string file = std::filesystem::absolute(options.library);
@@ -95,12 +165,20 @@ int run(const Options& options, const Verb& verb, const std::string& operand) {
     for (const std::string& fault : options.faults) {
         inject(broker, fault);
     }
-    oxahv::Request request(broker);
-    const oxahv::Reply reply = verb.perform(request, options, operand);
+    Request request(broker);
+    const CMPIObjectPath* const target = verb.target == Target::ofClass
+                                             ? request.objectPath(options.nameSpace, operands.target)
+                                             : request.objectPathFromText(operands.target, options.nameSpace);
+    Reply reply;
+    {
+        const Progress progress(request); // ends before anything is printed
+        reply = verb.perform(broker, request, target, operands);
+    }
     if (!reply.ok()) {
         std::cerr << "oxahv-provider: " << oxahv::codeName(reply.code)
                   << (reply.message.empty() ? "" : ": " + reply.message) << '\n';
         return providerFailed;
     }
+    printReply(options, target, operands, verb.yields, reply);
     return 0;
 }

@@ -15,15 +15,34 @@ struct Options {
     Format format = Format::mof;
     bool showsTraces = false;
     oxahv::KeyMode keyMode = oxahv::KeyMode::exact;
-    std::vector<std::string> faults; // SLOT:N[:CODE]
+    std::vector<std::string> mofFiles;
+    std::vector<std::string> contextEntries; // NAME=TEXT
+    std::vector<std::string> faults;         // SLOT:N[:CODE]
 };
+
+// What stands behind the verb. A verb leaves what it does not take as it is.
+struct Operands {
+    std::string target; // a class or a path
+    oxahv::AssociationFilter filter;
+    std::string method;
+    std::vector<std::string> arguments; // name=value
+};
+
+// What a verb is about: a class's name or an object path.
+enum class Target { ofClass, ofInstance };
+// What it takes beside that.
+enum class Takes { nothing, filter, referenceFilter, method };
+enum class Yields { paths, instances, methodResult };
 
 struct Verb {
     const char* name;
-    const char* operand;
+    Target target;
+    Takes takes;
+    Yields yields;
     const char* help;
-    // Sends the request and prints what it yields.
-    oxahv::Reply (*perform)(oxahv::Request& request, const Options& options, const std::string& operand);
+    // Sends the request.
+    oxahv::Reply (*perform)(oxahv::EmbeddedBroker& broker, oxahv::Request& request,
+                            const CMPIObjectPath* target, const Operands& operands);
 };
 
 // The verbs, in the order in which the help shows them.
@@ -32,4 +51,4 @@ const std::vector<Verb>& verbs();
 // Loads the provider and performs the verb. Prints results on the standard output and errors on the standard
 // error stream. Returns the exit status; throws oxahv::BrokerError for what keeps the request from being
 // sent.
-int run(const Options& options, const Verb& verb, const std::string& operand);
+int run(const Options& options, const Verb& verb, const Operands& operands);

@@ -1,9 +1,12 @@
 // A provider library with factories of one name, and generic ones that refuse every other name but "Generic",
-// "Throws" by an exception.
+// "Throws" by an exception. It returns the paths and arguments that it is given; of class Slow a path takes
+// half a second.
 #include <cmpimacs.h>
 
+#include <chrono>
 #include <cstring>
 #include <exception>
+#include <thread>
 
 static const CMPIBroker* broker;
 
@@ -14,6 +17,12 @@ static CMPIStatus TestCleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) 
 static CMPIStatus TestEnumInstanceNames(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
                                         const CMPIObjectPath* path) {
     CMPIStatus status = CMReturnObjectPath(result, path);
+    if (std::strcmp(CMGetCharsPtr(CMGetClassName(path, nullptr), nullptr), "Slow") == 0) {
+        for (int i = 0; i < 3; ++i) {
+            std::this_thread::sleep_for(std::chrono::milliseconds(500));
+            status = CMReturnObjectPath(result, path);
+        }
+    }
     CMReturnDone(result);
     return status;
 }
@@ -49,7 +58,24 @@ static CMPIStatus TestExecQuery(CMPIInstanceMI*, const CMPIContext*, const CMPIR
     CMReturn(CMPI_RC_ERR_NOT_SUPPORTED);
 }
 
+static CMPIStatus TestMethodCleanup(CMPIMethodMI*, const CMPIContext*, CMPIBoolean) {
+    CMReturn(CMPI_RC_OK);
+}
+
+static CMPIStatus TestInvokeMethod(CMPIMethodMI*, const CMPIContext*, const CMPIResult* result,
+                                   const CMPIObjectPath*, const char*, const CMPIArgs* in, CMPIArgs* out) {
+    CMPIValue count = {};
+    count.uint32 = CMGetArgCount(in, nullptr);
+    for (CMPICount i = 0; i < count.uint32; ++i) {
+        CMPIString* name = nullptr;
+        const CMPIData argument = CMGetArgAt(in, i, &name, nullptr);
+        CMAddArg(out, CMGetCharsPtr(name, nullptr), &argument.value, argument.type);
+    }
+    return CMReturnData(result, &count, CMPI_uint32);
+}
+
 CMInstanceMIStub(Test, TestProvider, broker, )
+CMMethodMIStub(Test, TestProvider, broker, )
 
 namespace {
 

@@ -64,14 +64,19 @@ std::string Host::name() const {
     return line("/proc/sys/kernel/hostname");
 }
 
+std::string Host::operatingSystemName() const {
+    const std::string name = valueOf(std::ifstream(root_ + "/etc/os-release"), "PRETTY_NAME=");
+    return name.empty() ? "Linux" : name;
+}
+
 OperatingSystem Host::operatingSystem() const {
     const std::string memory = root_ + "/proc/meminfo";
     OperatingSystem system;
-    system.name = valueOf(std::ifstream(root_ + "/etc/os-release"), "PRETTY_NAME=");
-    if (system.name.empty()) {
-        system.name = "Linux";
-    }
+    system.name = operatingSystemName();
     system.kernelVersion = line("/proc/sys/kernel/osrelease");
+    if (const auto seconds = numberIn(valueOf(std::ifstream(root_ + "/proc/stat"), "btime "))) {
+        system.bootTime = static_cast<std::time_t>(*seconds);
+    }
     const std::vector<std::string> processes = entries("/proc");
     system.processes = static_cast<unsigned int>(std::count_if(processes.begin(), processes.end(), isNumber));
     system.totalMemory = kibibytes(valueOf(std::ifstream(memory), "MemTotal:"));
@@ -80,24 +85,27 @@ OperatingSystem Host::operatingSystem() const {
     return system;
 }
 
-std::vector<EthernetPort> Host::ethernetPorts() const {
+std::vector<std::string> Host::ethernetPortNames() const {
     constexpr unsigned long long ethernet = 1; // ARPHRD_ETHER
-    std::vector<EthernetPort> ports;
-    for (const std::string& name : entries("/sys/class/net")) {
-        if (number("/sys/class/net/" + name + "/type") == ethernet) {
-            ports.push_back(ethernetPort(name));
-        }
-    }
-    return ports;
+    std::vector<std::string> names = entries("/sys/class/net");
+    const auto isOther = [&](const std::string& name) {
+        return number("/sys/class/net/" + name + "/type") != ethernet;
+    };
+    names.erase(std::remove_if(names.begin(), names.end(), isOther), names.end());
+    return names;
 }
 
 EthernetPort Host::ethernetPort(const std::string& name) const {
+    constexpr unsigned long long permanent = 0; // NET_ADDR_PERM
     const std::string folder = "/sys/class/net/" + name + '/';
     EthernetPort port;
     port.name = name;
     port.address = line(folder + "address");
     port.address.erase(std::remove(port.address.begin(), port.address.end(), ':'), port.address.end());
-    port.isUp = line(folder + "operstate") == "up";
+    port.isAddressPermanent = number(folder + "addr_assign_type") == permanent;
+    port.state = line(folder + "operstate");
+    port.alias = line(folder + "ifalias");
+    port.canWakeSystem = !line(folder + "device/power/wakeup").empty();
     const std::string duplex = line(folder + "duplex");
     if (duplex == "full" || duplex == "half") {
         port.isFullDuplex = duplex == "full";
@@ -107,4 +115,21 @@ EthernetPort Host::ethernetPort(const std::string& name) const {
     }
     port.maximumTransmissionUnit = number(folder + "mtu");
     return port;
+}
+
+std::vector<LoadAverage> Host::loadAverages() const {
+    const std::string text = line("/proc/loadavg"); // "0.20 0.18 0.12 1/80 11206"
+    std::vector<LoadAverage> averages;
+    const char* position = text.data();
+    const char* const end = position + text.size();
+    for (const unsigned short minutes : std::initializer_list<unsigned short>{1, 5, 15}) {
+        double processes = 0;
+        const auto [behind, error] = std::from_chars(position, end, processes);
+        if (error != std::errc()) {
+            break;
+        }
+        averages.push_back({minutes, processes});
+        position = behind != end ? behind + 1 : end;
+    }
+    return averages;
 }

@@ -10,3 +10,8 @@ void setHostRoot(const std::string& root);
 
 extern "C" CMPIInstanceMI* OXAHostProvider_Create_InstanceMI(const CMPIBroker* broker,
                                                              const CMPIContext* context, CMPIStatus* rc);
+extern "C" CMPIAssociationMI* OXAHostProvider_Create_AssociationMI(const CMPIBroker* broker,
+                                                                   const CMPIContext* context,
+                                                                   CMPIStatus* rc);
+extern "C" CMPIMethodMI* OXAHostProvider_Create_MethodMI(const CMPIBroker* broker, const CMPIContext* context,
+                                                         CMPIStatus* rc);

@@ -1,0 +1,51 @@
+#include "AssetTag.h"
+
+#include "HostTime.h"
+
+#include <ProviderUtilities.h>
+#include <utils.h>
+
+#include <algorithm>
+#include <cwctype>
+#include <filesystem>
+#include <mutex>
+
+using TK::Utils;
+
+namespace {
+
+constexpr const char* tagEntry = "AssetTag";
+constexpr const char* dateEntry = "AssetTagDate";
+constexpr const char* countEntry = "AssetTagChanges";
+
+} // namespace
+
+bool isAcceptableAssetTag(const std::string& text) {
+    constexpr std::size_t longest = 64; // MaxLen of the method's parameter
+    std::wstring characters;
+    return TK::ProviderUtilities::ConvertMultiByteToWideChar(text, characters) && !characters.empty() &&
+           characters.size() <= longest &&
+           std::none_of(characters.begin(), characters.end(),
+                        [](wchar_t c) { return std::iswcntrl(static_cast<std::wint_t>(c)) != 0; }) &&
+           TK::ProviderUtilities::ValidateInput(characters, L"");
+}
+
+AssetTag AssetTagFile::read() const {
+    const std::lock_guard<TK::Mutex> lock(TK::_fileMutex);
+    TK::PropertyFile file(path_);
+    return {Utils::ReadStringFromFile(file, tagEntry), Utils::ReadDateFromFile(file, dateEntry),
+            Utils::ReadUint32FromFile(file, countEntry)};
+}
+
+void AssetTagFile::write(const std::string& text) const {
+    const std::lock_guard<TK::Mutex> lock(TK::_fileMutex);
+    const std::filesystem::path folder = std::filesystem::path(path_).parent_path();
+    if (!folder.empty()) {
+        std::filesystem::create_directories(folder);
+    }
+    TK::PropertyFile file(path_);
+    Utils::WriteStringToFile(file, tagEntry, text);
+    Utils::WriteDateToFile(file, dateEntry, localTime(std::time(nullptr)));
+    Utils::WriteUint32ToFile(file, countEntry, Utils::ReadUint32FromFile(file, countEntry) + 1);
+    file.save();
+}

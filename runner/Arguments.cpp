@@ -1,0 +1,118 @@
+#include "Arguments.h"
+
+#include <algorithm>
+#include <optional>
+#include <strings.h>
+
+namespace {
+
+bool sameName(const std::string& a, const std::string& b) {
+    return ::strcasecmp(a.c_str(), b.c_str()) == 0;
+}
+
+struct Argument {
+    std::string name;
+    CMPIType type; // with CMPI_ARRAY for arrays; CMPI_null: what the text looks like
+    std::vector<std::string> texts;
+};
+
+std::string classNameOf(const CMPIObjectPath* path) {
+    const CMPIString* const name = CMGetClassName(path, nullptr);
+    return name != nullptr ? CMGetCharsPtr(name, nullptr) : "";
+}
+
+// Nothing for a class that is not declared.
+std::optional<oxahv::MethodDeclaration> declarationOf(const oxahv::EmbeddedBroker& broker,
+                                                      const std::string& className,
+                                                      const std::string& method) {
+    if (!broker.isDeclared(className)) {
+        return std::nullopt;
+    }
+    for (const oxahv::MethodDeclaration& declared : broker.methodsOf(className)) {
+        if (sameName(declared.name, method)) {
+            return declared;
+        }
+    }
+    throw oxahv::BrokerError("class " + className + " has no method " + method);
+}
+
+// The name as it is declared, and the type.
+Argument argumentOf(const std::optional<oxahv::MethodDeclaration>& method, const std::string& name) {
+    if (!method) {
+        return {name, CMPI_null, {}};
+    }
+    const oxahv::ParameterDeclaration* const parameter = method->find(name);
+    if (parameter == nullptr) {
+        throw oxahv::BrokerError("method " + method->name + " has no parameter " + name);
+    }
+    if (!parameter->isIn) {
+        throw oxahv::BrokerError("parameter " + parameter->name + " of method " + method->name +
+                                 " is an output");
+    }
+    return {parameter->name, parameter->type, {}};
+}
+
+std::vector<Argument> parsed(const std::optional<oxahv::MethodDeclaration>& method,
+                             const std::vector<std::string>& texts) {
+    std::vector<Argument> arguments;
+    for (const std::string& text : texts) {
+        const std::size_t equals = text.find('=');
+        if (equals == std::string::npos || equals == 0) {
+            throw oxahv::BrokerError("argument '" + text + "' is not name=value");
+        }
+        Argument argument = argumentOf(method, text.substr(0, equals));
+        auto known = std::find_if(arguments.begin(), arguments.end(),
+                                  [&](const Argument& other) { return sameName(other.name, argument.name); });
+        if (known == arguments.end()) {
+            known = arguments.insert(arguments.end(), std::move(argument));
+        } else if ((known->type & CMPI_ARRAY) == 0) {
+            throw oxahv::BrokerError("argument " + known->name + " stands twice");
+        }
+        known->texts.push_back(text.substr(equals + 1));
+    }
+    return arguments;
+}
+
+CMPIData valueOf(oxahv::Request& request, const Argument& argument, const std::string& text) {
+    try {
+        return request.valueFromText(text, argument.type & static_cast<CMPIType>(~CMPI_ARRAY));
+    } catch (const oxahv::BrokerError& error) {
+        throw oxahv::BrokerError("argument " + argument.name + ": " + error.what());
+    }
+}
+
+void require(const CMPIStatus& status) {
+    if (status.rc != CMPI_RC_OK) {
+        throw oxahv::BrokerError("the broker took no arguments: " + oxahv::codeName(status.rc));
+    }
+}
+
+CMPIData arrayOf(const oxahv::EmbeddedBroker& broker, oxahv::Request& request, const Argument& argument) {
+    const auto type = static_cast<CMPIType>(argument.type & ~CMPI_ARRAY);
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    CMPIData data = {argument.type, CMPI_goodValue, {}};
+    data.value.array =
+        CMNewArray(broker.handle(), static_cast<CMPICount>(argument.texts.size()), type, &status);
+    require(status);
+    for (CMPICount i = 0; i < argument.texts.size(); ++i) {
+        const CMPIData element = valueOf(request, argument, argument.texts[i]);
+        require(CMSetArrayElementAt(data.value.array, i, &element.value, type));
+    }
+    return data;
+}
+
+} // namespace
+
+CMPIArgs* argumentsFrom(oxahv::EmbeddedBroker& broker, oxahv::Request& request, const CMPIObjectPath* path,
+                        const std::string& method, const std::vector<std::string>& texts) {
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    CMPIArgs* const arguments = CMNewArgs(broker.handle(), &status);
+    require(status);
+    for (const Argument& argument : parsed(declarationOf(broker, classNameOf(path), method), texts)) {
+        const CMPIData data = (argument.type & CMPI_ARRAY) != 0
+                                  ? arrayOf(broker, request, argument)
+                                  : valueOf(request, argument, argument.texts.front());
+        require(CMAddArg(arguments, argument.name.c_str(), &data.value, data.type));
+    }
+    return arguments;
+}
