@@ -155,7 +155,7 @@ TEST_F(Texts, OfDatesAreReadWhenThereIsOne) {
     text = CMNewString(broker_.handle(), "20090307050409.000123-300", nullptr);
     CMPIDateTime date = *CMNewDateTime(broker_.handle(), nullptr);
     CMPIDateTimeFT table = *date.ft;
-    table.getStringFormat = [](const CMPIDateTime* /*date*/, CMPIStatus* status) {
+    table.getStringFormat = [](auto* /*dateTime*/, CMPIStatus* status) {
         *status = {CMPI_RC_ERR_FAILED, nullptr};
         return text;
     };
