@@ -166,8 +166,8 @@ private:
     TK_HIDDEN const KeyComponent& selected(ComponentType type) const;
     TK_HIDDEN unsigned short append(ComponentType type, std::string&& name, std::string&& value);
 
-    bool keySelected;
-    std::uint32_t selectedKey; // below keys.size() while keySelected is true
+    bool keySelected = false;
+    std::uint32_t selectedKey = 0; // below keys.size() while keySelected is true
     std::vector<KeyComponent> keys;
 };
 

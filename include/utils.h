@@ -35,7 +35,7 @@ extern TK_EXPORT Mutex _fileMutex;
 class TK_EXPORT Utils {
 public:
     Utils();
-    ~Utils();
+    ~Utils(); // NOLINT(performance-trivially-destructible): out of line, for those who link against it
 
     /** @name CIM date/time texts
      * Mind the offset: the parser stores the text's minutes, while the formatter reads hours and writes their

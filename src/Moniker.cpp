@@ -1,6 +1,11 @@
 #include "Moniker.h"
 
+#include <array>
+#include <charconv>
+#include <limits>
+#include <locale>
 #include <sstream>
+#include <string_view>
 #include <utility>
 
 namespace TK {
@@ -11,22 +16,58 @@ const char* const notSelected = "Key is not selected.";
 const char* const notReadable =
     "Either the Key is not selected or the value is not compatible with the requested data type.";
 
+// Whether streams write and read plain digits, as std::to_chars and std::from_chars do at a fraction of the
+// cost. Any other global locale may group digits and know other white space.
+bool digitsArePlain() {
+    return std::locale() == std::locale::classic();
+}
+
 // The text of a number as a default stream of the global locale writes it. The stream would swallow a failed
 // allocation and hand out a short text; with badbit raising exceptions it passes std::bad_alloc on instead.
 template <class Number>
 std::string textOf(Number number) {
+    if (digitsArePlain()) {
+        std::array<char, std::numeric_limits<Number>::digits10 + 1>
+            digits; // NOLINT(*-member-init): written next
+        return {digits.data(), std::to_chars(digits.data(), digits.data() + digits.size(), number).ptr};
+    }
     std::ostringstream stream;
     stream.exceptions(std::ios_base::badbit);
     stream << number;
     return stream.str();
 }
 
-// Reads what textOf wrote. A text that holds nothing to read leaves `number` as it is.
-template <class Number>
-void numberOf(const std::string& text, Number& number) {
+// A character is no number to a stream: it writes the byte itself.
+std::string textOf(unsigned char byte) {
+    return {static_cast<char>(byte)};
+}
+
+// Reads a number or character as a default stream of the global locale reads it.
+template <class Value>
+void extract(const std::string& text, Value& value) {
     std::istringstream stream(text);
     stream.exceptions(std::ios_base::badbit);
-    stream >> number;
+    stream >> value;
+}
+
+// Reads what textOf wrote.
+template <class Number>
+void numberOf(const std::string& text, Number& number) {
+    if (digitsArePlain()) {
+        std::from_chars(text.data(), text.data() + text.size(), number);
+    } else {
+        extract(text, number);
+    }
+}
+
+// A stream skips white space, finds nothing behind it, and leaves `byte` as it is.
+void numberOf(const std::string& text, unsigned char& byte) {
+    constexpr std::string_view whiteSpace = " \t\n\v\f\r";
+    if (!digitsArePlain()) {
+        extract(text, byte);
+    } else if (whiteSpace.find(text[0]) == std::string_view::npos) {
+        byte = static_cast<unsigned char>(text[0]);
+    }
 }
 
 } // namespace
@@ -40,9 +81,10 @@ const char* FrameworkException::what() const noexcept {
     return message.c_str();
 }
 
-Moniker::Moniker() : keySelected(false), selectedKey(0) {}
+Moniker::Moniker() = default;
 Moniker::Moniker(const Moniker& other) = default;
-Moniker& Moniker::operator=(const Moniker& other) {
+Moniker& Moniker::operator=(
+    const Moniker& other) { // NOLINT(cert-oop54-cpp,bugprone-unhandled-self-assignment)
     // The list is copied first: when memory runs out, the selection must not be one of a list that never
     // came.
     std::vector<KeyComponent> copy(other.keys);
@@ -129,7 +171,10 @@ const Moniker::KeyComponent& Moniker::selected(ComponentType type) const {
 }
 
 unsigned short Moniker::append(ComponentType type, std::string&& name, std::string&& value) {
-    keys.push_back({type, std::move(name), std::move(value)});
+    KeyComponent& component = keys.emplace_back(); // may throw; what follows does not
+    component.type = type;
+    component.name = std::move(name);
+    component.value = std::move(value);
     const auto position = static_cast<unsigned short>(keys.size() - 1);
     keySelected = true;
     selectedKey = position;

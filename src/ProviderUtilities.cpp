@@ -1,5 +1,6 @@
 #include "ProviderUtilities.h"
 
+#include "ClassIndex.h"
 #include "ClassTable.h"
 #include "CmpiCalls.h"
 #include "Locale.h"
@@ -12,6 +13,7 @@
 #include <array>
 #include <cctype>
 #include <cstddef>
+#include <cstdint>
 #include <cstring>
 #include <cwchar>
 #include <fstream>
@@ -581,17 +583,43 @@ char lowerCase(char c) {
 
 // Of wide characters, those that tolower may be asked about.
 wchar_t lowerCase(wchar_t c) {
-    const auto code = static_cast<unsigned long>(c);
+    const auto code =
+        static_cast<std::uint32_t>(c); // NOLINT(bugprone-signed-char-misuse,cert-str34-c): no char
     return code <= 0xFF ? static_cast<wchar_t>(std::tolower(static_cast<int>(code))) : c;
+}
+
+// Whether a text holds any of the entries, found without folding the text and without looking for all of
+// them: the two words end with a point, and every other entry is one of five symbols or holds one. Only
+// letters have a case, so that symbols can be looked for in the text as it is.
+template <class Char>
+bool holdsDenied(std::basic_string_view<Char> text) {
+    constexpr std::array<Char, 5> symbols = {'<', '%', '$', '\\', ':'};
+    const auto holds = [text](Char symbol) { return text.find(symbol) != text.npos; };
+    if (std::any_of(symbols.begin(), symbols.end(), holds)) {
+        return true;
+    }
+    for (std::size_t point = text.find('.'); point != text.npos; point = text.find('.', point + 1)) {
+        if (point >= 3 && lowerCase(text[point - 3]) == 'w') {
+            const Char second = lowerCase(text[point - 2]);
+            const Char third = lowerCase(text[point - 1]);
+            if ((second == 'w' && third == 'w') || (second == 'a' && third == 'p')) {
+                return true;
+            }
+        }
+    }
+    return false;
 }
 
 template <class Char, std::size_t size>
 bool isAcceptable(std::basic_string<Char>& text, const std::basic_string<Char>& exemption,
                   const std::array<std::basic_string_view<Char>, size>& entries) {
-    std::transform(text.begin(), text.end(), text.begin(), [](Char c) { return lowerCase(c); });
     const auto end = std::find(entries.begin(), entries.end(), exemption);
+    if (end == entries.end()) {
+        return !holdsDenied<Char>(text);
+    }
+    std::transform(text.begin(), text.end(), text.begin(), [](Char c) { return lowerCase(c); });
     return std::none_of(entries.begin(), end, [&text](std::basic_string_view<Char> entry) {
-        return text.find(entry) != std::basic_string<Char>::npos;
+        return text.find(entry) != text.npos;
     });
 }
 
@@ -784,14 +812,36 @@ constexpr std::size_t mainCount = classCount - extensionCount;
 static_assert(classTable[mainCount - 1].id < 180 && classTable[mainCount].id == 180,
               "the extension begins at 180");
 
-// The id of the row with that name, from row `first` up to `last`; the unknown id when there is none.
-unsigned short findClass(const char* name, std::size_t first, std::size_t last) {
-    for (std::size_t row = first; row < last; ++row) {
-        if (ProviderUtilities::textEqual(name, classTable[row].name)) {
-            return classTable[row].id;
-        }
+// The row with that name, by comparing all of them; classCount when there is none.
+std::size_t searchRow(const char* name) {
+    std::size_t row = 0;
+    while (row < classCount && strcasecmp(name, classTable[row].name) != 0) {
+        ++row;
     }
-    return unknownClassId;
+    return row;
+}
+
+bool isAscii(const char* name, std::size_t length) {
+    unsigned char bits = 0;
+    for (std::size_t i = 0; i < length; ++i) {
+        bits |= static_cast<unsigned char>(name[i]);
+    }
+    return bits < 0x80;
+}
+
+// The row with that name, as searchRow finds it. The index folds ASCII alone, while strcasecmp folds as the
+// locale says: in a Turkish one a byte above 0x7F stands for an i. So the row of the index is confirmed by
+// strcasecmp, and a name with such bytes that is not confirmed is searched for.
+std::size_t findRow(const char* name) {
+    const std::size_t length = std::strlen(name);
+    if (length < shortestClassName || length > longestClassName) {
+        return classCount;
+    }
+    const std::size_t row = classIndex.rowOf(name, length);
+    if (row != classCount && strcasecmp(name, classTable[row].name) == 0) {
+        return row;
+    }
+    return isAscii(name, length) ? classCount : searchRow(name);
 }
 
 } // namespace
@@ -800,12 +850,16 @@ unsigned short ProviderUtilities::getClassId(const char* name) {
     if (name == nullptr) {
         return noClassId;
     }
-    const unsigned short id = findClass(name, 0, mainCount);
-    return id != unknownClassId ? id : extend_getClassId(name);
+    const std::size_t row = findRow(name);
+    return row < classCount ? classTable[row].id : unknownClassId;
 }
 
 unsigned short ProviderUtilities::extend_getClassId(const char* name) {
-    return name != nullptr ? findClass(name, mainCount, classCount) : noClassId;
+    if (name == nullptr) {
+        return noClassId;
+    }
+    const std::size_t row = findRow(name);
+    return row < classCount && row >= mainCount ? classTable[row].id : unknownClassId;
 }
 
 unsigned short ProviderUtilities::getClassId(const CMPIObjectPath* objectPath) {

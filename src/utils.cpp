@@ -121,7 +121,8 @@ std::string Utils::stripSpaces(std::string text) {
 }
 
 std::string Utils::addZero(unsigned char count) {
-    return std::string(count, '0');
+    return std::string(count,
+                       '0'); // NOLINT(modernize-return-braced-init-list): braces would list two characters
 }
 
 // Property files
@@ -186,7 +187,7 @@ unsigned int Utils::ReadUint32FromFile(TK::PropertyFile& file, const std::string
 TK::DateTime Utils::ReadDateFromFile(TK::PropertyFile& file, const std::string& key) {
     const std::string text = readText(file, key);
     const bool usable = !text.empty() && text.find(noDate) == std::string::npos;
-    return TK::DateTime(usable ? text : defaultDate, dateTextFormat);
+    return {usable ? text : defaultDate, dateTextFormat};
 }
 
 void Utils::WriteStringToFile(TK::PropertyFile& file, const std::string& key, const std::string& value) {

@@ -1,5 +1,6 @@
 #include "HVMessageBuffer.h"
 
+#include <cstring>
 #include <new>
 
 namespace HVLog {
@@ -9,23 +10,23 @@ HVMessageBuffer::~HVMessageBuffer() = default;
 
 HVMessageBuffer& HVMessageBuffer::operator<<(const char* text) {
     if (stream_) {
-        *stream_ << text;
+        stream_->stream << text;
     } else if (text == nullptr) {
         ended_ = true;
     } else if (!ended_) {
-        sink_.text += text;
+        append(text, std::strlen(text));
     }
     return *this;
 }
 
 HVMessageBuffer::operator std::ostream&() {
     if (!stream_) {
-        stream_.emplace(&sink_);
+        stream_.emplace(*this);
         if (ended_) {
-            stream_->setstate(std::ios_base::badbit);
+            stream_->stream.setstate(std::ios_base::badbit);
         }
     }
-    return *stream_;
+    return stream_->stream;
 }
 
 const std::string& HVMessageBuffer::str(HVMessageBuffer& /*inserted*/) {
@@ -36,24 +37,38 @@ const std::string& HVMessageBuffer::str(std::ostream& /*inserted*/) {
     return take();
 }
 
+void HVMessageBuffer::append(const char* characters, std::size_t count) {
+    if (taken_) {
+        text_.clear();
+        taken_ = false;
+    }
+    // Most messages come in several pieces; they get room for all of them at once.
+    constexpr std::size_t usualSize = 255;
+    if (const std::size_t size = text_.size() + count; size > text_.capacity() && size < usualSize) {
+        text_.reserve(usualSize);
+    }
+    text_.append(characters, count);
+}
+
 const std::string& HVMessageBuffer::take() {
+    append("", 0);
+    taken_ = true;
+    ended_ = false;
     if (stream_) {
         // The stream stays where it is: its user may hold on to it between two messages.
-        stream_->exceptions(std::ios_base::goodbit);
-        stream_->clear();
-        stream_->flags(std::ios_base::skipws | std::ios_base::dec);
-        stream_->precision(6);
-        stream_->width(0);
-        stream_->fill(' ');
+        std::ostream& stream = stream_->stream;
+        stream.exceptions(std::ios_base::goodbit);
+        stream.clear();
+        stream.flags(std::ios_base::skipws | std::ios_base::dec);
+        stream.precision(6);
+        stream.width(0);
+        stream.fill(' ');
+        if (stream_->sink.outOfMemory) {
+            stream_->sink.outOfMemory = false;
+            throw std::bad_alloc();
+        }
     }
-    ended_ = false;
-    taken_.swap(sink_.text);
-    sink_.text.clear();
-    if (sink_.outOfMemory) {
-        sink_.outOfMemory = false;
-        throw std::bad_alloc();
-    }
-    return taken_;
+    return text_;
 }
 
 HVMessageBuffer::Sink::int_type HVMessageBuffer::Sink::overflow(int_type character) {
@@ -70,7 +85,7 @@ std::streamsize HVMessageBuffer::Sink::xsputn(const char* characters, std::strea
 
 bool HVMessageBuffer::Sink::append(const char* characters, std::size_t count) {
     try {
-        text.append(characters, count);
+        buffer_.append(characters, count);
         return true;
     } catch (const std::bad_alloc&) {
         outOfMemory = true;

@@ -50,7 +50,7 @@ public:
      * The argument is the result of the last insertion. It says by its type alone that the insertions are
      * done.
      *
-     * @return the text; it belongs to the buffer and is valid until the next call.
+     * @return the text; it belongs to the buffer and is valid until the next insertion or call.
      * @throws std::bad_alloc also when memory ran out while the text was written through the stream.
      */
     /** @{ */
@@ -59,11 +59,11 @@ public:
     /** @} */
 
 private:
-    // Appends to a string. A stream turns a failed allocation into a state bit and goes on with a short text,
-    // so it is remembered here.
+    // Appends what a stream writes to the text of a buffer. A stream turns a failed allocation into a state
+    // bit and goes on with a short text, so it is remembered here.
     class Sink : public std::streambuf {
     public:
-        std::string text;
+        explicit Sink(HVMessageBuffer& buffer) : buffer_(buffer) {}
         bool outOfMemory = false;
 
     protected:
@@ -72,14 +72,23 @@ private:
 
     private:
         bool append(const char* characters, std::size_t count);
+        HVMessageBuffer& buffer_;
     };
 
+    // Most messages need no stream, and building one costs more than all the rest.
+    struct Stream {
+        explicit Stream(HVMessageBuffer& buffer) : sink(buffer), stream(&sink) {}
+        Sink sink;
+        std::ostream stream;
+    };
+
+    TK_HIDDEN void append(const char* characters, std::size_t count);
     TK_HIDDEN const std::string& take();
 
-    Sink sink_;
-    std::optional<std::ostream> stream_;
+    std::string text_;
+    bool taken_ = false; // the text was handed out: the next insertion begins a new one in its memory
     bool ended_ = false; // by a null text, before there was a stream
-    std::string taken_;
+    std::optional<Stream> stream_;
 };
 
 /**
