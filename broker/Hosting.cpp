@@ -11,8 +11,8 @@ namespace oxahv {
 // A provider with its MIs. It dies with its last user, which may be a request that is inside it.
 class HostedProvider {
 public:
-    HostedProvider(Core& core, std::string name, std::vector<std::string> classes, void* library)
-        : core_(core), name_(std::move(name)), classes_(std::move(classes)), library_(library) {}
+    HostedProvider(Core& core, std::string name, std::vector<std::string> classes)
+        : core_(core), name_(std::move(name)), classes_(std::move(classes)) {}
     ~HostedProvider();
     HostedProvider(const HostedProvider&) = delete;
     HostedProvider& operator=(const HostedProvider&) = delete;
@@ -22,7 +22,9 @@ public:
 
     // Makes the MIs; throws BrokerError when a factory fails.
     void create(const ProviderFactories& factories);
-    // The same from the library's factory functions.
+    // Loads the provider's library, which is unloaded with this object.
+    void open(const std::string& file);
+    // Makes the MIs by the library's factory functions.
     void createFromLibrary(const std::string& file);
 
     bool serves(const Classes& declared, std::string_view className) const;
@@ -49,7 +51,7 @@ private:
     Core& core_;
     std::string name_;
     std::vector<std::string> classes_;
-    void* library_;
+    void* library_ = nullptr;
     CMPIInstanceMI* instance_ = nullptr;
     CMPIAssociationMI* association_ = nullptr;
     CMPIMethodMI* method_ = nullptr;
@@ -86,16 +88,18 @@ const char* orNull(const std::string& text) {
 // Runs a provider's function. What it throws becomes a status: a provider must not take its server along.
 template <class Function>
 CMPIStatus guarded(const Function& function, std::string& message) {
+    CMPIStatus status = {CMPI_RC_ERR_FAILED, nullptr};
     try {
-        const CMPIStatus status = function();
-        message = messageOf(status);
-        return status;
+        status = function();
     } catch (const std::exception& exception) {
         message = std::string("exception: ") + exception.what();
+        return status;
     } catch (...) {
         message = "exception of an unknown kind";
+        return status;
     }
-    return {CMPI_RC_ERR_FAILED, nullptr};
+    message = messageOf(status); // what this throws is not the provider's
+    return status;
 }
 
 Reply refused(CMPIrc code, std::string message = {}) {
@@ -175,7 +179,11 @@ HostedProvider::~HostedProvider() {
         Owner own(core_); // what the provider makes while it ends
         const Owner::Scope scope(own);
         Context context(core_);
-        core_.addContextEntries(context);
+        try {
+            core_.addContextEntries(context);
+        } catch (const std::bad_alloc&) { // NOLINT(bugprone-empty-catch): it ends with the entries there is
+                                          // room for
+        }
         cleanUp(instance_, &context);
         cleanUp(association_, &context);
         cleanUp(method_, &context);
@@ -215,6 +223,13 @@ void HostedProvider::create(const ProviderFactories& factories) {
     make(factories.instance, instance_);
     make(factories.association, association_);
     make(factories.method, method_);
+}
+
+void HostedProvider::open(const std::string& file) {
+    library_ = dlopen(file.c_str(), RTLD_NOW | RTLD_LOCAL);
+    if (library_ == nullptr) {
+        throw BrokerError(std::string("cannot load provider library: ") + dlerror());
+    }
 }
 
 void* HostedProvider::function(const std::string& symbol) const {
@@ -301,18 +316,15 @@ void Hosting::host(const std::string& name, const ProviderFactories& factories,
     if (factories.instance == nullptr && factories.association == nullptr && factories.method == nullptr) {
         throw BrokerError("provider " + name + " has no factory");
     }
-    auto provider = std::make_shared<HostedProvider>(core_, name, std::move(classes), nullptr);
+    auto provider = std::make_shared<HostedProvider>(core_, name, std::move(classes));
     provider->create(factories);
     add(std::move(provider));
 }
 
 void Hosting::load(const std::string& file, const std::string& name, std::vector<std::string> classes) {
     requireFreeName(name);
-    void* const library = dlopen(file.c_str(), RTLD_NOW | RTLD_LOCAL);
-    if (library == nullptr) {
-        throw BrokerError(std::string("cannot load provider library: ") + dlerror());
-    }
-    auto provider = std::make_shared<HostedProvider>(core_, name, std::move(classes), library);
+    auto provider = std::make_shared<HostedProvider>(core_, name, std::move(classes));
+    provider->open(file);
     provider->createFromLibrary(file);
     add(std::move(provider));
 }

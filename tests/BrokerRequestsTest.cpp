@@ -2,8 +2,10 @@
 #include "TestLocales.h"
 
 #include "EmbeddedBroker.h"
+#include "FailingMemory.h"
 
 #include <atomic>
+#include <dlfcn.h>
 #include <functional>
 #include <future>
 #include <gtest/gtest.h>
@@ -188,6 +190,37 @@ TEST_F(ARequest, ReportsWhatTheProviderReports) {
         throw std::runtime_error("lost");
     };
     EXPECT_EQ(request_.getInstance(path("Demo")).code, CMPI_RC_ERR_FAILED);
+}
+
+TEST_F(ARequest, ComesThroughWantOfMemory) {
+    behaviour.serve = [](const CMPIContext*, const CMPIResult*, const CMPIObjectPath*) {
+        CMPIString* const why =
+            CMNewString(behaviour.broker, "a text that does not fit into a string itself", nullptr);
+        return CMPIStatus{CMPI_RC_ERR_ACCESS_DENIED, why};
+    };
+    for (const bool once : {true, false}) {
+        bool isReached = true;
+        for (unsigned int n = 1; isReached; ++n) {
+            SCOPED_TRACE((once ? "allocation " : "allocations from ") + std::to_string(n));
+            EmbeddedBroker broker;
+            broker.setContextEntry("an entry with a long name", "and with a text that is no shorter");
+            once ? failing::allocation(n) : failing::allocationsFrom(n);
+            try {
+                broker.load(TEST_PROVIDER, "TestProvider");
+                Request request(broker);
+                request.enumerateInstances(request.objectPath("root", "Demo"));
+                const Reply reply = request_.getInstance(request_.objectPath("root", "Demo"));
+                broker.unload("TestProvider");
+                isReached = failing::ended();
+                EXPECT_NE(reply.message.rfind("exception", 0), 0U) << "not the provider's: " << reply.message;
+            } catch (const std::bad_alloc&) {
+                isReached = failing::ended();
+            } catch (const BrokerError&) { // of a factory whose status the broker could not make
+                isReached = failing::ended();
+            }
+        }
+        EXPECT_EQ(::dlopen(TEST_PROVIDER, RTLD_NOW | RTLD_NOLOAD), nullptr) << "no library stays behind";
+    }
 }
 
 TEST_F(ARequest, FindsItsProviderByClass) {

@@ -64,7 +64,7 @@ std::string textOf(const CMPIData& data) {
     return text;
 }
 
-std::string textOf(const CMPIInstance* instance) {
+std::string textOf(CMPIInstance* instance) {
     std::string text;
     for (CMPICount i = 0; i < CMGetPropertyCount(instance, nullptr); ++i) {
         CMPIString* name = nullptr;
@@ -74,7 +74,7 @@ std::string textOf(const CMPIInstance* instance) {
     return text;
 }
 
-std::string textOf(const CMPIObjectPath* path) {
+std::string textOf(CMPIObjectPath* path) {
     std::string text = PU::getNamespace(path) + ':' + PU::getClassName(path) + ' ';
     for (CMPICount i = 0; i < CMGetKeyCount(path, nullptr); ++i) {
         CMPIString* name = nullptr;
@@ -117,7 +117,7 @@ std::string textOf(const std::vector<Element>& elements) {
     return text.str();
 }
 
-void addText(std::string& text, const CMPIString* string) {
+void addText(std::string& text, CMPIString* string) {
     text += string != nullptr ? CMGetCharsPtr(string, nullptr) : "NULL";
 }
 

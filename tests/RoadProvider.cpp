@@ -43,7 +43,7 @@ CMPIStatus RoadCleanup(CMPIInstanceMI* /*mi*/, const CMPIContext* /*context*/, C
 CMPIStatus RoadGetInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* /*context*/, const CMPIResult* result,
                            const CMPIObjectPath* path, const char** /*properties*/) try {
     TK_TRACE_ENTERING_PARAMETERS(category, " path=" << path);
-    const CMPIInstance* const instance = roadFor(path);
+    CMPIInstance* const instance = roadFor(path);
     TK_TRACE_EXITING(category);
     return CMReturnInstance(result, instance);
 } catch (const std::exception&) {
