@@ -250,6 +250,7 @@ private:
         if (!digitsArePlain_) {
             // A stream knows how.
             std::ostringstream digits;
+            digits.exceptions(std::ios_base::badbit); // or lack of memory would cut the address short
             digits << pointer;
             return *this << digits.str();
         }

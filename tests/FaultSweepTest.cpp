@@ -15,8 +15,10 @@
 #include <gtest/gtest.h>
 #include <iostream>
 #include <iterator>
+#include <locale>
 #include <sstream>
 #include <string>
+#include <sys/wait.h>
 #include <unistd.h>
 #include <vector>
 
@@ -562,6 +564,42 @@ void expectDocumented(const Scenario& scenario, const Outcome& outcome, const Ou
 
 } // namespace
 
+// What is set up once in a process, at the first text, must not stay half set up. Each attempt is a process
+// of its own.
+TEST_F(TheFaultSweep, FailsEveryAllocationOfTheFirstLocalisedText) {
+    enum Exit { right = 10, rightAtLast, unreached, wrong };
+    int last = right;
+    unsigned int points = 0;
+    for (unsigned int n = 1; last != unreached; ++n) {
+        SCOPED_TRACE(n);
+        const pid_t child = ::fork();
+        if (child == 0) {
+            const std::wstring key = wideText;
+            const char* text = nullptr;
+            failing::allocation(n);
+            try {
+                text = PU::getNLSText(key);
+            } catch (const std::bad_alloc&) {
+                text = nullptr;
+            }
+            const bool isReached = failing::ended();
+            const bool isFirstRight = text != nullptr && TK::make_string(key) == text;
+            const bool isRight = TK::make_string(key) == PU::getNLSText(key);
+            ::_exit(!isRight || (text != nullptr && !isFirstRight) ? wrong
+                    : !isReached                                   ? unreached
+                    : text != nullptr                              ? right
+                                                                   : rightAtLast);
+        }
+        int status = 0;
+        ASSERT_EQ(::waitpid(child, &status, 0), child);
+        ASSERT_TRUE(WIFEXITED(status)) << "ended by signal " << WTERMSIG(status);
+        last = WEXITSTATUS(status);
+        ASSERT_TRUE(last == rightAtLast || last == unreached) << "exit status " << last;
+        points += last != unreached ? 1U : 0U;
+    }
+    EXPECT_GT(points, 5U);
+}
+
 TEST_F(TheFaultSweep, FailsEveryCallOfTheBroker) {
     const struct {
         const char* name;
@@ -677,4 +715,35 @@ TEST_F(TheFaultSweep, FailsEveryCallOfTheLogger) {
     }
     std::cerr << points << " calls of the logger failed\n";
     EXPECT_GT(points, 150U);
+}
+
+// Where a locale groups digits, a stream writes an address, and it must not keep the lack of memory to
+// itself.
+TEST_F(TheFaultSweep, FailsEveryAllocationOfAnAddressInALocaleThatGroups) {
+    struct Grouping : std::numpunct<char> {
+        std::string do_grouping() const override { return "\3"; }
+    };
+    const std::locale before = std::locale::global(std::locale(std::locale::classic(), new Grouping));
+    std::ostringstream expected;
+    expected << static_cast<const void*>(this);
+    std::string traced;
+    traced.reserve(TK::traceBufferSize);
+    HVLog::HVLogger::setSink([&](const HVLog::Message& message) { traced = message.text; });
+    HVLog::HVLogger::setThreshold(0);
+    bool isReached = true;
+    for (unsigned int n = 1; isReached; ++n) {
+        SCOPED_TRACE(n);
+        traced.clear();
+        failing::allocation(n);
+        try {
+            TK_TRACE_ENTERING_PARAMETERS(category, " this=" << this);
+            isReached = failing::ended();
+            EXPECT_FALSE(isReached) << "a failed allocation was swallowed";
+        } catch (const std::bad_alloc&) {
+            isReached = failing::ended();
+        }
+        EXPECT_TRUE(traced.empty() || traced.find(" this=" + expected.str()) != std::string::npos) << traced;
+    }
+    HVLog::HVLogger::reset();
+    std::locale::global(before);
 }
