@@ -174,6 +174,7 @@ int run(const Options& options, const Verb& verb, const Operands& operands) {
         const Progress progress(request); // ends before anything is printed
         reply = verb.perform(broker, request, target, operands);
     }
+    broker.clearFaults(); // they are the request's; what is printed is asked of the broker too
     if (!reply.ok()) {
         std::cerr << "oxahv-provider: " << oxahv::codeName(reply.code)
                   << (reply.message.empty() ? "" : ": " + reply.message) << '\n';

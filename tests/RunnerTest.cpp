@@ -279,3 +279,31 @@ TEST(TheRunner, TellsWhatWentWrongInOneLine) {
               0U);
     EXPECT_EQ(run("--help").status, 0);
 }
+
+// The n-th call of the broker fails, whoever makes it, until the request gets by.
+TEST(TheRunner, EndsInOneLineWhateverCallFails) {
+    const std::string system = quoted(lineOf("ein OXATK_ComputerSystem"));
+    for (const std::string& request :
+         {test + "ein Demo", test + "cm Demo Any A=5 B=x", host + "ei OXATK_ComputerSystem",
+          host + "ri " + system, host + hostClasses + "cm " + system + " SetAssetTag Tag='<'"}) {
+        const Outcome whole = run(request);
+        unsigned int failures = 0;
+        unsigned int wholeInARow = 0;
+        for (unsigned int n = 1; wholeInARow < 30; ++n) {
+            SCOPED_TRACE(request + ", call " + std::to_string(n));
+            const Outcome outcome = run(request + " --fault '*:" + std::to_string(n) + '\'');
+            ASSERT_TRUE(outcome.status == 0 || outcome.status == 1 || outcome.status == 2) << outcome.output;
+            if (outcome.status == 0) {
+                wholeInARow = outcome.output == whole.output ? wholeInARow + 1 : 0;
+            } else {
+                wholeInARow = 0;
+                ++failures;
+                EXPECT_EQ(outcome.output.rfind("oxahv-provider: ", 0), 0U) << outcome.output;
+                EXPECT_EQ(std::count(outcome.output.begin(), outcome.output.end(), '\n'), 1)
+                    << outcome.output;
+                EXPECT_EQ(outcome.output.find("basic_string"), std::string::npos) << outcome.output;
+            }
+        }
+        EXPECT_GT(failures, 1U);
+    }
+}

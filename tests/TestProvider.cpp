@@ -17,7 +17,9 @@ static CMPIStatus TestCleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) 
 static CMPIStatus TestEnumInstanceNames(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
                                         const CMPIObjectPath* path) {
     CMPIStatus status = CMReturnObjectPath(result, path);
-    if (std::strcmp(CMGetCharsPtr(CMGetClassName(path, nullptr), nullptr), "Slow") == 0) {
+    const CMPIString* const name = CMGetClassName(path, nullptr);
+    const char* const chars = name != nullptr ? CMGetCharsPtr(name, nullptr) : nullptr;
+    if (chars != nullptr && std::strcmp(chars, "Slow") == 0) {
         for (int i = 0; i < 3; ++i) {
             std::this_thread::sleep_for(std::chrono::milliseconds(500));
             status = CMReturnObjectPath(result, path);
@@ -69,6 +71,9 @@ static CMPIStatus TestInvokeMethod(CMPIMethodMI*, const CMPIContext*, const CMPI
     for (CMPICount i = 0; i < count.uint32; ++i) {
         CMPIString* name = nullptr;
         const CMPIData argument = CMGetArgAt(in, i, &name, nullptr);
+        if (name == nullptr) {
+            CMReturn(CMPI_RC_ERR_FAILED);
+        }
         CMAddArg(out, CMGetCharsPtr(name, nullptr), &argument.value, argument.type);
     }
     return CMReturnData(result, &count, CMPI_uint32);
