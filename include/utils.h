@@ -113,11 +113,14 @@ public:
      * @throws std::bad_alloc, and what the file throws
      */
     /** @{ */
+    /** The text. */
     static void WriteStringToFile(TK::PropertyFile& file, const std::string& key, const std::string& value);
+    /** The number. */
     static void WriteUint8ToFile(TK::PropertyFile& file, const std::string& key, unsigned char value);
     /** Written as a signed number, so that 4,294,967,295 is stored as -1; ReadUint32FromFile reads it back.
      */
     static void WriteUint32ToFile(TK::PropertyFile& file, const std::string& key, unsigned int value);
+    /** The date, as TK::DateTime's text. */
     static void WriteDateToFile(TK::PropertyFile& file, const std::string& key, const TK::DateTime& value);
     /** @} */
 };

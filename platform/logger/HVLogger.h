@@ -65,9 +65,11 @@ public:
      * @throws what the sink throws.
      */
     /** @{ */
+    /** On Channel::log. */
     static void logLevelMessage(const char* function, const char* file, int line, const std::string& category,
                                 int level, char* reserved, int reserved1, int reserved2,
                                 const std::string& text);
+    /** On Channel::trace. */
     static void traceLevelMessage(const char* function, const char* file, int line,
                                   const std::string& category, int level, char* reserved, int reserved1,
                                   int reserved2, const std::string& text);
