@@ -36,6 +36,7 @@
 // Some CIM servers' CMPI headers use pthread types and `__cdecl` without bringing either.
 #include <pthread.h>
 #ifndef __cdecl
+/** A calling convention that this platform does not have. */
 #define __cdecl // NOLINT(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
 #endif
 #ifndef CMPI_PLATFORM_LINUX_GENERIC_GNU

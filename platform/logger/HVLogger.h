@@ -36,13 +36,13 @@ enum class Channel {
 
 /** One message as a sink sees it. What it points to is valid while the sink runs. */
 struct Message {
-    Channel channel;
-    const char* function; ///< the function's name; may be null
-    const char* file;     ///< the source file's name, without directories; may be null
-    int line;
-    const std::string& category;
-    int level; ///< the level code
-    const std::string& text;
+    Channel channel;             ///< the way that it came
+    const char* function;        ///< the function's name; may be null
+    const char* file;            ///< the source file's name, without directories; may be null
+    int line;                    ///< the line in it
+    const std::string& category; ///< the name of the channel, such as "Hovara.Utils"
+    int level;                   ///< the level code
+    const std::string& text;     ///< the message
 };
 
 /** The logger. All members are static. */
