@@ -59,7 +59,7 @@ namespace oxahv {
 /** What hosting, loading, class declarations and path texts throw; `what()` is one line for a person. */
 class TK_EXPORT BrokerError : public std::runtime_error {
 public:
-    /** @param message the line; copied. */
+    /** An error with a message. @param message the line; copied. */
     explicit BrokerError(const std::string& message);
     /** Copies the message. */
     BrokerError(const BrokerError&) = default;
@@ -95,7 +95,7 @@ class TK_EXPORT Qualifiers {
 public:
     /** None. */
     Qualifiers() = default;
-    /** @param list each name stands in it once. */
+    /** A list. @param list each name stands in it once. */
     explicit Qualifiers(std::vector<QualifierDeclaration> list);
 
     /** The qualifier of a name, in any case; null when there is none. Valid as long as a copy of the list. */
@@ -154,7 +154,7 @@ struct MethodDeclaration {
  */
 class TK_EXPORT ClassDeclaration {
 public:
-    /** @param name the class's name; not empty. */
+    /** A class without superclass, properties and methods. @param name its name; not empty. */
     explicit ClassDeclaration(std::string name);
 
     /** Names the superclass, which must be declared before this class is. */
@@ -284,7 +284,7 @@ struct BrokerMessage {
 
 class Request;
 
-/** The broker. See the top of this file for how to use it. */
+/** The broker. The top of EmbeddedBroker.h tells how to use it. */
 class TK_EXPORT EmbeddedBroker {
 public:
     /** A broker without classes and providers. */

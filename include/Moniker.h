@@ -45,6 +45,7 @@ namespace TK {
 class TK_EXPORT FrameworkException : public std::exception {
 public:
     /**
+     * An exception with a message.
      * @param text the message, NUL-terminated; copied. A null pointer counts as the empty text.
      * @throws std::bad_alloc
      */
@@ -99,7 +100,7 @@ public:
     Moniker& operator=(const Moniker& other);
     ~Moniker();
 
-    /** @return the number of components. Never throws. */
+    /** The number of components. Never throws. */
     unsigned int getKeyCount() const;
 
     /**

@@ -50,7 +50,7 @@
 
 namespace TK {
 
-/** A family of static operations; see the top of this file. */
+/** A family of static operations; the top of ProviderUtilities.h tells what holds for all of them. */
 class TK_EXPORT ProviderUtilities {
 public:
     ProviderUtilities() = delete;
@@ -65,10 +65,10 @@ public:
      */
     static CMPIInstance* createInstance(const CMPIBroker* broker, CMPIObjectPath* objectPath);
 
-    /** @return the class's name; empty when the broker cannot tell it. @throws std::bad_alloc */
+    /** The class's name; empty when the broker cannot tell it. @throws std::bad_alloc */
     static std::string getClassName(const CMPIObjectPath* objectPath);
 
-    /** @return the namespace; empty when the broker cannot tell it. @throws std::bad_alloc */
+    /** The namespace; empty when the broker cannot tell it. @throws std::bad_alloc */
     static std::string getNamespace(const CMPIObjectPath* objectPath);
 
     /**
@@ -352,8 +352,8 @@ public:
      * registry does not know. Names compare as `strcasecmp` (POSIX) does, in the process's locale.
      */
     /** @{ */
-    /** @param name a class's name; may be null. @return its id, 0 for null, 255 for an unknown name. Does not
-     * trace or throw. */
+    /** The id of a class. @param name its name; may be null. @return its id, 0 for null, 255 for an unknown
+     * name. Does not trace or throw. */
     static unsigned short getClassId(const char* name);
 
     /** The same among the extension's classes alone, the ones from 180 on. */

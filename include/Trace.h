@@ -208,7 +208,7 @@ template <class... Pieces>
  */
 class TraceParameters {
 public:
-    /** @param buffer empty; has to outlive this object. */
+    /** An empty list. @param buffer empty; has to outlive this object. */
     explicit TraceParameters(HVLog::HVMessageBuffer& buffer) : buffer_(buffer) {}
 
     /** Appends a C text; a null pointer ends the list. */

@@ -80,7 +80,8 @@ public:
      * return. Not to be called from a sink.
      */
     /** @{ */
-    /** @param sink called for each message; an empty function switches logging off. */
+    /** Hands messages to a function. @param sink called for each message; an empty function switches logging
+     * off. */
     static void setSink(std::function<void(const Message&)> sink);
     /** Writes a line per message to the standard error stream. */
     static void setStderrSink();
