@@ -407,7 +407,7 @@ public:
     /** @} */
 
     /** The implementation; named here for its own sources only. */
-    class Impl;
+    class TK_HIDDEN Impl;
     /** For its own sources too. */
     Impl& impl() { return *impl_; }
 
@@ -540,7 +540,7 @@ public:
     Reply invokeMethod(const CMPIObjectPath* path, const std::string& method, const CMPIArgs* in);
 
 private:
-    class Impl;
+    class TK_HIDDEN Impl;
     TK_HIDDEN EmbeddedBroker::Impl& core();
     std::unique_ptr<Impl> impl_;
 };
