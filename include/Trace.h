@@ -285,11 +285,13 @@ private:
     char list_[traceBufferSize]; // NOLINT(*-member-init): written as far as it is read
 };
 
-/** The text of a parameter list, from the result of its last insertion. */
+/** @name The text of a parameter list, from the result of its last insertion */
 /** @{ */
+/** Of a list that was collected whole; valid as long as the list. */
 inline const char* traceList(HVLog::HVMessageBuffer& /*buffer*/, TraceParameters& inserted) {
     return inserted.text();
 }
+/** Of a list that went through the buffer's stream; belongs to the buffer. */
 inline const char* traceList(HVLog::HVMessageBuffer& buffer, std::ostream& inserted) {
     return buffer.str(inserted).c_str();
 }

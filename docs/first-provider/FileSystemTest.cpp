@@ -107,9 +107,9 @@ TEST_F(FileSystemProvider, LeavesNoObjectBehind) {
 
 // [threads]
 TEST_F(FileSystemProvider, ServesSeveralThreadsAtOnce) {
-    std::vector<std::thread> threads;
-    for (int i = 0; i < 4; ++i) {
-        threads.emplace_back([this] {
+    std::vector<std::thread> threads(4);
+    for (std::thread& thread : threads) {
+        thread = std::thread([this] {
             for (int round = 0; round < 50; ++round) {
                 oxahv::Request request(broker);
                 const auto* path =
