@@ -153,8 +153,8 @@ void writeText(TK::PropertyFile& file, const std::string& key, const std::string
     file.setEntry(make_wstring(key), wideValue);
 }
 
-// strtoul of a system whose unsigned long has 32 bits: a wider one does not notice that a number is too large,
-// and negates more bits than there are.
+// strtoul of a system whose unsigned long has 32 bits: a wider one does not notice that a number is too
+// large, and negates more bits than there are.
 unsigned int toUint32(const char* text) {
     while (std::isspace(static_cast<unsigned char>(*text)) != 0) {
         ++text;

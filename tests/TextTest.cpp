@@ -388,3 +388,35 @@ TEST_F(Texts, OfUsersAreScreened) {
     EXPECT_EQ(strayFoldings, 0);
     EXPECT_TRUE(takeTraces().empty());
 }
+
+// Long texts are looked through block by block: an entry is found wherever it stands, across the blocks'
+// edges too.
+TEST_F(Texts, OfUsersAreScreenedAtAnyLength) {
+    constexpr std::size_t length = 3 * 4096 + 100;
+    const std::string clean = [] {
+        std::string text;
+        while (text.size() < length) {
+            text += "Row w. Rack p. App. aap. wwp. waw. wa. ww ";
+        }
+        text.resize(length);
+        return text;
+    }();
+    const auto accepted = [](const std::string& text) {
+        const bool narrow = ProviderUtilities::ValidateInput(text, "");
+        EXPECT_EQ(ProviderUtilities::ValidateInput(widened<wchar_t>(text), L""), narrow);
+        return narrow;
+    };
+    EXPECT_TRUE(accepted(clean));
+    for (const std::string entry : {"www.", "WaP.", "wWW.", "<", ":"}) {
+        for (std::size_t block = 0; block <= 3; ++block) {
+            for (std::size_t i = 0; i < 20; ++i) {
+                const std::size_t position =
+                    std::min(block * 4096 + i, length) - std::min<std::size_t>(block * 4096, 10);
+                EXPECT_FALSE(accepted(std::string(clean).replace(position, entry.size(), entry)))
+                    << entry << " at " << position;
+            }
+        }
+        EXPECT_FALSE(accepted(std::string(clean).replace(length - entry.size(), entry.size(), entry)))
+            << entry;
+    }
+}
