@@ -395,7 +395,7 @@ public:
     /** @} */
 
     /** The implementation; named here for its own sources only. */
-    class Impl;
+    class TK_HIDDEN Impl;
     Impl& impl() { return *impl_; }
 
 private:
@@ -491,7 +491,7 @@ public:
     Reply invokeMethod(const CMPIObjectPath* path, const std::string& method, const CMPIArgs* in);
 
 private:
-    class Impl;
+    class TK_HIDDEN Impl;
     TK_HIDDEN EmbeddedBroker::Impl& core();
     std::unique_ptr<Impl> impl_;
 };

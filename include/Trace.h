@@ -239,17 +239,16 @@ public:
         return stream() << value;
     }
 
-    /** Hands the list over. For HVMessageBuffer::str, which wants the result of the last insertion. */
-    operator HVLog::HVMessageBuffer&() { // NOLINT(google-explicit-constructor,hicpp-explicit-conversions)
+    /** The list, when all of it was collected here; valid until the next insertion. */
+    const char* text() {
         *end_ = '\0';
-        end_ = list_;
-        return buffer_ << static_cast<const char*>(list_);
+        return list_;
     }
 
 private:
     TraceParameters& address(const void* pointer) {
-        if (std::locale() != std::locale::classic()) {
-            // Another locale may group digits; a stream knows how.
+        if (!digitsArePlain_) {
+            // A stream knows how.
             std::ostringstream digits;
             digits << pointer;
             return *this << digits.str();
@@ -263,7 +262,7 @@ private:
     }
 
     std::ostream& stream() {
-        std::ostream& stream = static_cast<HVLog::HVMessageBuffer&>(*this);
+        std::ostream& stream = buffer_ << text();
         if (ended_) {
             stream.setstate(std::ios_base::badbit);
         }
@@ -271,10 +270,21 @@ private:
     }
 
     HVLog::HVMessageBuffer& buffer_;
-    bool ended_ = false; // by a null text
+    bool digitsArePlain_ = std::locale() == std::locale::classic(); // another locale may group them
+    bool ended_ = false;                                            // by a null text
     char* end_ = list_;
     char list_[traceBufferSize]; // NOLINT(*-member-init): written as far as it is read
 };
+
+/** The text of a parameter list, from the result of its last insertion. */
+/** @{ */
+inline const char* traceList(HVLog::HVMessageBuffer& /*buffer*/, TraceParameters& inserted) {
+    return inserted.text();
+}
+inline const char* traceList(HVLog::HVMessageBuffer& buffer, std::ostream& inserted) {
+    return buffer.str(inserted).c_str();
+}
+/** @} */
 
 /** The part of a path after its last slash; a constant for a constant path. */
 constexpr const char* traceFileName(const char* path) {
@@ -322,17 +332,17 @@ inline const char* traceValue(const std::string& value) {
     } while (false)
 
 /** A trace point with parameter list. Used by the macros below alone. */
-#define TK_TRACE_PARAMETERS_(category, insertions, type)                                               \
-    do {                                                                                               \
-        constexpr const char* tkTraceFile = ::TK::traceFileName(__FILE__);                             \
-        ::HVLog::HVMessageBuffer tkTraceParameters;                                                    \
-        ::HVLog::HVMessageBuffer tkTraceMessage;                                                       \
-        TK_TRACE_POINT_(                                                                               \
-            category, ::TK::parametersLevelCode,                                                       \
-            ::TK::tracepara(                                                                           \
-                __func__, tkTraceFile, __LINE__,                                                       \
-                tkTraceParameters.str(::TK::TraceParameters(tkTraceParameters) << insertions).c_str(), \
-                type));                                                                                \
+#define TK_TRACE_PARAMETERS_(category, insertions, type)                                                    \
+    do {                                                                                                    \
+        constexpr const char* tkTraceFile = ::TK::traceFileName(__FILE__);                                  \
+        ::HVLog::HVMessageBuffer tkTraceParameters;                                                         \
+        ::HVLog::HVMessageBuffer tkTraceMessage;                                                            \
+        TK_TRACE_POINT_(                                                                                    \
+            category, ::TK::parametersLevelCode,                                                            \
+            ::TK::tracepara(                                                                                \
+                __func__, tkTraceFile, __LINE__,                                                            \
+                ::TK::traceList(tkTraceParameters, ::TK::TraceParameters(tkTraceParameters) << insertions), \
+                type));                                                                                     \
     } while (false)
 
 /**
