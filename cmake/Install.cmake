@@ -1,12 +1,20 @@
 # What an installed copy holds: the libraries and their headers, a CMake package and pkg-config files.
 
-set(oxahv_targets
-    oxahvexport oxahvcmpi oxahvlibrarycmpi
-    oxahvcommon oxahvlocale oxahvlogger
-    oxahvproviderutilities oxahvbroker)
-install(TARGETS ${oxahv_targets}
-    EXPORT oxahvproviderutilities-targets
-    LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} COMPONENT runtime NAMELINK_COMPONENT development)
+# Components: runtime is the library; common, locale and logger are the stand-ins, each by itself, since an agent's own
+# library takes its place; broker the embedded broker; development and broker_development what is built with; runner,
+# example and documentation.
+
+# Installs a shared library, and what links against it finds it by: oxahv_install_library(TARGET COMPONENT DEVELOPMENT EXPORT).
+function(oxahv_install_library target component development export)
+    install(TARGETS ${target} EXPORT ${export}
+        LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} COMPONENT ${component} NAMELINK_COMPONENT ${development})
+endfunction()
+install(TARGETS oxahvexport oxahvcmpi oxahvlibrarycmpi EXPORT oxahvproviderutilities-targets)
+foreach(name common locale logger)
+    oxahv_install_library(oxahv${name} ${name} development oxahvproviderutilities-targets)
+endforeach()
+oxahv_install_library(oxahvproviderutilities runtime development oxahvproviderutilities-targets)
+oxahv_install_library(oxahvbroker broker broker_development oxahvbroker-targets)
 
 set(oxahv_include ${CMAKE_INSTALL_INCLUDEDIR}/oxahv)
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/ ${PROJECT_SOURCE_DIR}/export/
@@ -20,11 +28,13 @@ install(DIRECTORY
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/cmpi/
     DESTINATION ${oxahv_include}/cmpi COMPONENT development FILES_MATCHING PATTERN "*.h")
 install(FILES ${PROJECT_SOURCE_DIR}/broker/EmbeddedBroker.h
-    DESTINATION ${oxahv_include}/broker COMPONENT development)
+    DESTINATION ${oxahv_include}/broker COMPONENT broker_development)
 
 set(oxahv_package_dir ${CMAKE_INSTALL_LIBDIR}/cmake/oxahvproviderutilities)
 install(EXPORT oxahvproviderutilities-targets
     NAMESPACE oxahv:: DESTINATION ${oxahv_package_dir} COMPONENT development)
+install(EXPORT oxahvbroker-targets
+    NAMESPACE oxahv:: DESTINATION ${oxahv_package_dir} COMPONENT broker_development)
 configure_package_config_file(
     ${PROJECT_SOURCE_DIR}/cmake/oxahvproviderutilities-config.cmake.in
     ${PROJECT_BINARY_DIR}/oxahvproviderutilities-config.cmake
@@ -48,6 +58,14 @@ else()
 endif()
 foreach(name oxahvproviderutilities oxahvbroker)
     configure_file(${PROJECT_SOURCE_DIR}/cmake/${name}.pc.in ${PROJECT_BINARY_DIR}/${name}.pc @ONLY)
-    install(FILES ${PROJECT_BINARY_DIR}/${name}.pc
-        DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig COMPONENT development)
 endforeach()
+install(FILES ${PROJECT_BINARY_DIR}/oxahvproviderutilities.pc
+    DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig COMPONENT development)
+install(FILES ${PROJECT_BINARY_DIR}/oxahvbroker.pc
+    DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig COMPONENT broker_development)
+
+# The example is documentation too: a provider to start from.
+install(FILES ${PROJECT_SOURCE_DIR}/README.md ${PROJECT_SOURCE_DIR}/CHANGELOG.md
+    DESTINATION ${CMAKE_INSTALL_DOCDIR} COMPONENT documentation)
+install(DIRECTORY ${PROJECT_SOURCE_DIR}/examples
+    DESTINATION ${CMAKE_INSTALL_DOCDIR} COMPONENT documentation)

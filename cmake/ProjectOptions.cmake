@@ -17,8 +17,21 @@ if(PROJECT_IS_TOP_LEVEL)
     endif()
 endif()
 
-# An installed copy finds its libraries beside itself, wherever it lies.
-set(CMAKE_INSTALL_RPATH "$ORIGIN;$ORIGIN/../${CMAKE_INSTALL_LIBDIR}")
+# An installed copy finds its libraries from where it lies, so that it can be moved; in the system's own folder the dynamic
+# linker finds them. Paths in the build tree are relative too: a file does not depend on where it was built.
+include(GNUInstallDirs)
+set(CMAKE_BUILD_RPATH_USE_ORIGIN ON)
+set(oxahv_system_folders ${CMAKE_C_IMPLICIT_LINK_DIRECTORIES} ${CMAKE_CXX_IMPLICIT_LINK_DIRECTORIES})
+# The run path of what is installed into `folder`, for its target's property INSTALL_RPATH.
+function(oxahv_run_path variable folder)
+    set(${variable} "" PARENT_SCOPE)
+    if(NOT CMAKE_INSTALL_FULL_LIBDIR IN_LIST oxahv_system_folders)
+        file(RELATIVE_PATH way ${folder} ${CMAKE_INSTALL_FULL_LIBDIR})
+        string(REGEX REPLACE "/$" "" way "$ORIGIN/${way}")
+        set(${variable} "${way}" PARENT_SCOPE)
+    endif()
+endfunction()
+oxahv_run_path(CMAKE_INSTALL_RPATH ${CMAKE_INSTALL_FULL_LIBDIR})
 
 set(OXAHV_SANITIZE "" CACHE STRING "Sanitizers to build with, for example address,undefined")
 
@@ -41,8 +54,10 @@ function(oxahv_target_defaults target)
     target_compile_options(${target} PRIVATE
         ${oxahv_warnings}
         ${oxahv_hardening}
-        # Source names in traces and assertions do not depend on where the tree lies.
-        -fmacro-prefix-map=${PROJECT_SOURCE_DIR}/=)
+        # Source names in traces, assertions and debug information do not depend on where tree and build lie. Debuggers
+        # find the sources when they are started in the tree.
+        -ffile-prefix-map=${PROJECT_SOURCE_DIR}/=
+        -ffile-prefix-map=${CMAKE_BINARY_DIR}=.)
     target_link_options(${target} PRIVATE -Wl,-z,relro,-z,now,-z,noexecstack)
     if(OXAHV_SANITIZE)
         target_compile_options(${target} PRIVATE -fsanitize=${OXAHV_SANITIZE} -fno-sanitize-recover=all -fno-omit-frame-pointer)

@@ -1,0 +1,69 @@
+// A small provider, with the function that the README shows.
+#include <ProviderUtilities.h>
+#include <Trace.h>
+#include <cmpimacs.h>
+
+#include <exception>
+
+static const CMPIBroker* broker;
+static const std::string category("Demo.Port");
+
+// README begins
+CMPIStatus PortGetInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+                           const CMPIObjectPath* path, const char**) try {
+    using TK::ProviderUtilities;
+    TK_TRACE_ENTERING_PARAMETERS(category, " path=" << path);
+    TK::Moniker keys;
+    ProviderUtilities::transformObjectPathToMoniker(path, keys);
+    std::string name;
+    if (!ProviderUtilities::getKeyProperty(path, "DeviceID", name) || name != "eth0") {
+        CMReturn(CMPI_RC_ERR_NOT_FOUND);
+    }
+    CMPIObjectPath* reply = ProviderUtilities::createObjectPath(broker, "OXATK_EthernetPort",
+                                                                ProviderUtilities::getNamespace(path));
+    ProviderUtilities::transformMonikerToObjectPath(keys, &reply);
+    CMPIInstance* port = ProviderUtilities::createInstance(broker, reply);
+    ProviderUtilities::setProperty(port, "ElementName", name);
+    ProviderUtilities::setProperty(port, "Speed", 1'000'000'000ULL);
+    TK_TRACE_EXITING(category);
+    return CMReturnInstance(result, port);
+} catch (const std::exception&) {
+    CMReturn(CMPI_RC_ERR_FAILED);
+}
+// README ends
+
+static CMPIStatus PortCleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
+    CMReturn(CMPI_RC_OK);
+}
+
+static CMPIStatus PortEnumInstanceNames(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
+                                        const CMPIObjectPath*) {
+    CMReturn(CMPI_RC_ERR_NOT_SUPPORTED);
+}
+
+static CMPIStatus PortEnumInstances(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
+                                    const CMPIObjectPath*, const char**) {
+    CMReturn(CMPI_RC_ERR_NOT_SUPPORTED);
+}
+
+static CMPIStatus PortCreateInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
+                                     const CMPIObjectPath*, const CMPIInstance*) {
+    CMReturn(CMPI_RC_ERR_NOT_SUPPORTED);
+}
+
+static CMPIStatus PortModifyInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
+                                     const CMPIObjectPath*, const CMPIInstance*, const char**) {
+    CMReturn(CMPI_RC_ERR_NOT_SUPPORTED);
+}
+
+static CMPIStatus PortDeleteInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
+                                     const CMPIObjectPath*) {
+    CMReturn(CMPI_RC_ERR_NOT_SUPPORTED);
+}
+
+static CMPIStatus PortExecQuery(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*,
+                                const char*, const char*) {
+    CMReturn(CMPI_RC_ERR_NOT_SUPPORTED);
+}
+
+CMInstanceMIStub(Port, DemoPort, broker, )
