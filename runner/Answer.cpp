@@ -1,6 +1,7 @@
 #include "Answer.h"
 
 #include <algorithm>
+#include <strings.h>
 
 namespace {
 
@@ -19,7 +20,7 @@ NamedData valuesOf(const Object* object, Count count, At at, const std::string& 
     for (CMPICount i = 0; i < size; ++i) {
         CMPIString* name = nullptr;
         const CMPIData data = at(object, i, &name, nullptr);
-        values[lowerCase(textOf(name))] = plainOf(data, nameSpace);
+        values[textOf(name)] = plainOf(data, nameSpace);
     }
     return values;
 }
@@ -32,7 +33,7 @@ Result resultOf(const CMPIObjectPath* path, const std::string& nameSpace) {
     const std::string own = lowerCase(textOf(CMGetNameSpace(path, nullptr)));
     result.identity = (own != lowerCase(nameSpace) ? own : "") + ':' + lowerCase(result.className);
     for (const auto& [name, key] : result.keys) {
-        result.identity += ',' + name + '=' + key.identity;
+        result.identity += ',' + lowerCase(name) + '=' + key.identity;
     }
     return result;
 }
@@ -75,6 +76,15 @@ PlainData plainOf(const CMPIData& data, const std::string& nameSpace) {
 
 } // namespace
 
+bool NameLess::operator()(const std::string& a, const std::string& b) const {
+    return ::strcasecmp(a.c_str(), b.c_str()) < 0;
+}
+
+bool hasValue(const NamedData& values, const std::string& name) {
+    const auto found = values.find(name);
+    return found != values.end() && !found->second.isNull;
+}
+
 bool operator==(const PlainData& a, const PlainData& b) {
     return a.type == b.type && a.isNull == b.isNull && a.identity == b.identity;
 }
@@ -102,6 +112,10 @@ std::string lowerCase(std::string text) {
     std::transform(text.begin(), text.end(), text.begin(),
                    [](char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c; });
     return text;
+}
+
+std::string wordsOf(const Answer& answer) {
+    return oxahv::codeName(answer.code) + (answer.message.empty() ? "" : ": " + answer.message);
 }
 
 bool isUtf8(const std::string& text) {

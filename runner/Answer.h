@@ -19,8 +19,11 @@ struct PlainData {
 
 bool operator==(const PlainData& a, const PlainData& b);
 
-// By name in lower case: names are one whatever their case.
-using NamedData = std::map<std::string, PlainData>;
+// Names are one whatever their case.
+struct NameLess {
+    bool operator()(const std::string& a, const std::string& b) const;
+};
+using NamedData = std::map<std::string, PlainData, NameLess>;
 
 // An instance or an object path.
 struct Result {
@@ -46,6 +49,12 @@ struct Answer {
 Answer answerOf(const oxahv::Reply& reply, const std::string& nameSpace);
 
 std::string lowerCase(std::string text);
+
+// Whether there is a value of that name that is not NULL.
+bool hasValue(const NamedData& values, const std::string& name);
+
+// "CMPI_RC_ERR_FAILED: text"
+std::string wordsOf(const Answer& answer);
 
 // Whether the text is UTF-8: no overlong forms, surrogates or numbers beyond U+10FFFF.
 bool isUtf8(const std::string& text);

@@ -18,7 +18,8 @@ struct Argument {
 
 std::string classNameOf(const CMPIObjectPath* path) {
     const CMPIString* const name = CMGetClassName(path, nullptr);
-    return name != nullptr ? CMGetCharsPtr(name, nullptr) : "";
+    const char* const chars = name != nullptr ? CMGetCharsPtr(name, nullptr) : nullptr;
+    return chars != nullptr ? chars : ""; // a fault can strike the command's own calls too
 }
 
 // Nothing for a class that is not declared.

@@ -23,11 +23,12 @@ bool isOfReferences(const Query& query) {
 void Associations::run(bool isThorough) {
     const Replies references = askBoth("ri", "rn", {});
     if (references.objects && references.objects->ok()) {
-        knowsWays_ = true;
+        knowsWays_ = references.areSame;
         readWays(*references.objects);
     }
     const Replies associated = askBoth("ai", "an", {});
-    compareWithWays("an", associated.names, {});
+    knowsWays_ = knowsWays_ && associated.areSame;
+    knowsWays_ = compareWithWays("an", associated.names, {}); // else a filter's results say nothing
     if (client_.broker().isAssociation(client_.task().className)) {
         checkOwnEnds();
     }
@@ -66,6 +67,7 @@ void Associations::readWays(const Answer& references) {
             }
         }
         if (!isHere) {
+            knowsWays_ = false;
             client_.find(CheckKind::associationEnd, request, association.path);
         }
     }
@@ -182,7 +184,7 @@ bool Associations::passesClass(const std::string& className, const std::string& 
 
 bool Associations::passes(const Way& way, const AssociationFilter& filter) const {
     const auto isRole = [](const std::string& wanted, const std::string& role) {
-        return wanted.empty() || lowerCase(wanted) == role;
+        return wanted.empty() || lowerCase(wanted) == lowerCase(role);
     };
     return passesClass(way.associationClass, filter.associationClass) &&
            passesClass(way.otherClass, filter.resultClass) && isRole(filter.role, way.role) &&
@@ -205,7 +207,7 @@ std::optional<Answer> Associations::ask(const char* verb, const AssociationFilte
         return std::nullopt;
     }
     if (!answer->ok()) {
-        client_.find(CheckKind::failed, request, std::string(verb) + ": " + wordsOf(*answer));
+        client_.fail(request, verb, *answer);
         return std::nullopt;
     }
     for (const Result& result : answer->results) {
@@ -221,7 +223,8 @@ Associations::Replies Associations::askBoth(const char* objects, const char* nam
     if (replies.objects && replies.names) {
         const std::string difference =
             differenceOf(replies.objects->results, objects, replies.names->results, names);
-        if (!difference.empty()) {
+        replies.areSame = difference.empty();
+        if (!replies.areSame) {
             client_.find(CheckKind::associationsDiffer, textOf(query(objects, filter)), difference);
         }
     }
@@ -229,10 +232,10 @@ Associations::Replies Associations::askBoth(const char* objects, const char* nam
 }
 
 // What the ways say that the filter lets through. Without filter, a difference is no filter's.
-void Associations::compareWithWays(const char* verb, const std::optional<Answer>& answer,
+bool Associations::compareWithWays(const char* verb, const std::optional<Answer>& answer,
                                    const AssociationFilter& filter) {
     if (!knowsWays_ || !answer) {
-        return;
+        return knowsWays_;
     }
     const Query asked = query(verb, filter);
     AssociationFilter wanted = filter;
@@ -256,4 +259,5 @@ void Associations::compareWithWays(const char* verb, const std::optional<Answer>
         client_.find(isNone(filter) ? CheckKind::associationsDiffer : CheckKind::filter, textOf(asked),
                      difference);
     }
+    return difference.empty();
 }

@@ -27,6 +27,7 @@ private:
     struct Replies {
         std::optional<Answer> objects;
         std::optional<Answer> names;
+        bool areSame = true;
     };
 
     void readWays(const Answer& references);
@@ -41,7 +42,7 @@ private:
     Query query(const char* verb, const oxahv::AssociationFilter& filter) const;
     std::optional<Answer> ask(const char* verb, const oxahv::AssociationFilter& filter);
     Replies askBoth(const char* objects, const char* names, const oxahv::AssociationFilter& filter);
-    void compareWithWays(const char* verb, const std::optional<Answer>& answer,
+    bool compareWithWays(const char* verb, const std::optional<Answer>& answer,
                          const oxahv::AssociationFilter& filter);
 
     Client& client_;

@@ -47,6 +47,11 @@ constexpr Refusal refusals[] = {
     {".newDateTimeFromChars", CMPI_RC_ERR_INVALID_PARAMETER, CheckKind::date, dateText},
 };
 
+// What the broker answers for a provider that throws.
+bool isException(const Answer& answer) {
+    return answer.code == CMPI_RC_ERR_FAILED && answer.message.rfind("exception", 0) == 0;
+}
+
 bool isStandard(CMPIrc code) {
     return oxahv::codeName(code) != "CMPI_RC_" + std::to_string(static_cast<int>(code));
 }
@@ -109,8 +114,7 @@ std::optional<Answer> Client::ask(const Query& query) {
     if (answer.ok() && !answer.isDone) {
         find(CheckKind::notDone, text, query.verb->name + std::string(" does not call returnDone"));
     }
-    asked_.push_back({query, answer.code, std::move(calls)});
-    checkLeftOver(query, before);
+    asked_.push_back({query, answer.code, std::move(calls), checkLeftOver(query, before)});
     return answer;
 }
 
@@ -135,6 +139,12 @@ void Client::doing(const std::string& name, const std::function<void()>& work) {
     tracked(name, work);
 }
 
+void Client::fail(const std::string& request, const std::string& what, const Answer& answer) {
+    if (isStandard(answer.code) && !isException(answer)) {
+        find(CheckKind::failed, request, what + ": " + wordsOf(answer));
+    }
+}
+
 void Client::find(CheckKind kind, const std::string& request, const std::string& text) {
     if (reports_) {
         tell({Message::Kind::finding, 0, "", {kind, task_.className, task_.pass, request, text}});
@@ -145,7 +155,7 @@ void Client::checkCode(const std::string& request, const Answer& answer) {
     if (!isStandard(answer.code)) {
         find(CheckKind::notACode, request, "the answer is " + std::to_string(static_cast<int>(answer.code)));
     }
-    if (answer.code == CMPI_RC_ERR_FAILED && answer.message.rfind("exception", 0) == 0) {
+    if (isException(answer)) {
         find(CheckKind::exception, request, answer.message);
     }
 }
@@ -161,9 +171,9 @@ void Client::checkCalls(const std::string& request, const std::vector<ProviderCa
 }
 
 // A provider may keep what it made for a first request; it makes no more for the second.
-void Client::checkLeftOver(const Query& query, std::size_t before) {
+bool Client::checkLeftOver(const Query& query, std::size_t before) {
     if (broker_.liveObjects().total() <= before) {
-        return;
+        return false;
     }
     const std::size_t kept = broker_.liveObjects().total();
     askPlainly(query);
@@ -173,4 +183,5 @@ void Client::checkLeftOver(const Query& query, std::size_t before) {
              query.verb->name + (" leaves " + std::to_string(left - kept)) +
                  (left - kept == 1 ? " object" : " objects"));
     }
+    return left > kept;
 }

@@ -47,6 +47,7 @@ public:
         Query query;
         CMPIrc code;
         std::vector<ProviderCall> calls;
+        bool leavesObjects = false;
     };
 
     // Without `reports`, what is found is not told: another pass has told it.
@@ -67,6 +68,8 @@ public:
     // Does what is no query, such as the provider's end, under a name.
     void doing(const std::string& name, const std::function<void()>& work);
 
+    // A request that had to succeed did not. What is wrong with the answer itself has been told.
+    void fail(const std::string& request, const std::string& what, const Answer& answer);
     void find(CheckKind kind, const std::string& request, const std::string& text);
     void tell(const Message& message) { output_.send(lineOf(message)); }
 
@@ -75,7 +78,7 @@ private:
     auto tracked(const std::string& text, Work work);
     void checkCode(const std::string& request, const Answer& answer);
     void checkCalls(const std::string& request, const std::vector<ProviderCall>& calls);
-    void checkLeftOver(const Query& query, std::size_t before);
+    bool checkLeftOver(const Query& query, std::size_t before);
 
     oxahv::EmbeddedBroker& broker_;
     const Options& options_;

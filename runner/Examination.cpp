@@ -76,12 +76,20 @@ std::string absentPath(const std::vector<PropertyDeclaration>& properties, const
     return separator == ',' ? path : "";
 }
 
-std::set<std::string> namesOf(const NamedData& values) {
-    std::set<std::string> names;
-    for (const auto& [name, value] : values) {
-        names.insert(name);
-    }
-    return names;
+// A property that only one of two instances has a value of; empty if there is none.
+std::string onlyIn(const NamedData& one, const NamedData& other) {
+    const auto found = std::find_if(one.begin(), one.end(), [&](const auto& property) {
+        return !property.second.isNull && !hasValue(other, property.first);
+    });
+    return found != one.end() ? found->first : "";
+}
+
+std::string propertyDifference(const Result& got, const Result& listed) {
+    const std::string one = onlyIn(got.properties, listed.properties);
+    const std::string other = onlyIn(listed.properties, got.properties);
+    return !one.empty()     ? "only gi has a value of " + one
+           : !other.empty() ? "only ei has a value of " + other
+                            : "";
 }
 
 const Result* findResult(const std::vector<Result>& results, const std::string& identity) {
@@ -103,9 +111,8 @@ void checkKeys(Client& client, const std::string& request, const Result& result)
         if (!property.isKey) {
             continue;
         }
-        const std::string name = lowerCase(property.name);
-        const auto key = result.keys.find(name);
-        const auto value = result.properties.find(name);
+        const auto key = result.keys.find(property.name);
+        const auto value = result.properties.find(property.name);
         if (key == result.keys.end()) {
             client.find(CheckKind::keyMissing, request, "key " + property.name);
         } else if (key->second.isNull || (value != result.properties.end() && value->second.isNull)) {
@@ -119,10 +126,6 @@ void checkKeys(Client& client, const std::string& request, const Result& result)
 bool isRefusal(CMPIrc code) {
     return code == CMPI_RC_ERR_NOT_SUPPORTED || code == CMPI_RC_ERR_INVALID_CLASS ||
            code == CMPI_RC_ERR_INVALID_NAMESPACE;
-}
-
-std::string wordsOf(const Answer& answer) {
-    return oxahv::codeName(answer.code) + (answer.message.empty() ? "" : ": " + answer.message);
 }
 
 void checkResult(Client& client, const std::string& request, const Result& result,
@@ -164,7 +167,7 @@ std::string differenceOf(const std::vector<Result>& first, const std::string& fi
 void checkMethodResult(Client& client, const Query& query, const Answer& answer) {
     const std::string request = textOf(query);
     if (!answer.ok()) {
-        client.find(CheckKind::failed, request, "method " + query.operands.method + ": " + wordsOf(answer));
+        client.fail(request, "method " + query.operands.method, answer);
         return;
     }
     const auto methods = client.broker().methodsOf(client.task().className);
@@ -225,7 +228,7 @@ bool Examination::enumerate() {
     const auto take = [&](const char* verb, const std::optional<Answer>& answer, Results& results) {
         const std::string request = textOf(queryOf(verb, className));
         if (answer && !answer->ok() && !isRefusal(answer->code)) {
-            client_.find(CheckKind::failed, request, wordsOf(*answer));
+            client_.fail(request, verb, *answer);
         }
         if (!answer || !answer->ok()) {
             return false;
@@ -278,7 +281,7 @@ void Examination::lookUp(const Result& name) {
     if (!answer->ok()) {
         const std::optional<Results> now = list(hasNames_ ? "ein" : "ei");
         if (!now || findResult(*now, name.identity) != nullptr) { // it is still there
-            client_.find(CheckKind::failed, request, "gi of a listed name: " + wordsOf(*answer));
+            client_.fail(request, "gi of a listed name", *answer);
         }
         return;
     }
@@ -296,22 +299,17 @@ void Examination::lookUp(const Result& name) {
     }
 }
 
+// A value may have come or gone meanwhile.
 void Examination::compareProperties(const std::string& request, const Result& got) {
     const Result* const listed = findResult(instances_, got.identity);
-    if (listed == nullptr) {
+    if (listed == nullptr || propertyDifference(got, *listed).empty()) {
         return;
     }
-    const std::set<std::string> one = namesOf(got.properties);
-    const std::set<std::string> other = namesOf(listed->properties);
-    for (const std::string& name : one) {
-        if (other.count(name) == 0) {
-            client_.find(CheckKind::getDiffers, request, "only gi yields property " + name);
-        }
-    }
-    for (const std::string& name : other) {
-        if (one.count(name) == 0) {
-            client_.find(CheckKind::getDiffers, request, "only ei yields property " + name);
-        }
+    const std::optional<Results> now = list("ei");
+    const Result* const again = now ? findResult(*now, got.identity) : nullptr;
+    const std::string difference = again != nullptr ? propertyDifference(got, *again) : "";
+    if (!difference.empty()) {
+        client_.find(CheckKind::getDiffers, request, difference);
     }
 }
 
@@ -337,7 +335,7 @@ void Examination::askForProperties() {
     std::vector<std::vector<std::string>> lists = {{"NoSuchProperty"}, {}};
     const Result& example = instances_.front();
     for (const PropertyDeclaration& property : client_.broker().propertiesOf(example.className)) {
-        if (!property.isKey && example.properties.count(lowerCase(property.name)) != 0) {
+        if (!property.isKey && hasValue(example.properties, property.name)) {
             lists.push_back({property.name});
             break;
         }
@@ -359,28 +357,36 @@ void Examination::checkList(const Query& query, const std::vector<std::string>& 
         return;
     }
     if (!answer->ok()) {
-        client_.find(CheckKind::failed, request,
-                     query.verb->name + (" with a property list: " + wordsOf(*answer)));
+        client_.fail(request, query.verb->name + std::string(" with a property list"), *answer);
         return;
     }
     for (const Result& result : answer->results) {
         const Result* const whole = findResult(instances_, result.identity);
         for (const std::string& name : wanted) {
-            const bool isThere = result.properties.count(lowerCase(name)) != 0;
-            if (whole != nullptr && whole->properties.count(lowerCase(name)) != 0 && !isThere) {
+            if (whole != nullptr && hasValue(whole->properties, name) && !hasValue(result.properties, name)) {
                 client_.find(CheckKind::propertyList, request, "property " + name);
             }
         }
-        for (const auto& [name, value] : result.properties) {
-            const bool isWanted = std::any_of(wanted.begin(), wanted.end(), [&](const std::string& other) {
-                return lowerCase(other) == name;
-            });
-            if (!isWanted && result.keys.count(name) == 0) {
-                client_.find(CheckKind::listIgnored, request,
-                             query.verb->name + (" yields property " + name));
-            }
+        if (yieldsMore(result, wanted)) {
+            client_.find(CheckKind::listIgnored, request,
+                         query.verb->name + std::string(" yields more than the list"));
         }
     }
+}
+
+// NULLs do no harm: some brokers fill instances with them.
+bool Examination::yieldsMore(const Result& result, const std::vector<std::string>& wanted) const {
+    const auto properties = client_.broker().propertiesOf(result.className);
+    const auto isExpected = [&](const std::string& name) {
+        const auto isName = [&](const std::string& other) { return lowerCase(other) == lowerCase(name); };
+        return std::any_of(wanted.begin(), wanted.end(), isName) ||
+               std::any_of(properties.begin(), properties.end(), [&](const PropertyDeclaration& property) {
+                   return property.isKey && isName(property.name);
+               });
+    };
+    return std::any_of(result.properties.begin(), result.properties.end(), [&](const auto& property) {
+        return !property.second.isNull && !isExpected(property.first);
+    });
 }
 
 void Examination::callMethods() {

@@ -22,6 +22,7 @@ private:
     void compareProperties(const std::string& request, const Result& got);
     void lookUpAbsent();
     void askForProperties();
+    bool yieldsMore(const Result& result, const std::vector<std::string>& wanted) const;
     void checkList(const Query& query, const std::vector<std::string>& wanted);
     void callMethods();
 
@@ -32,7 +33,7 @@ private:
     Results instances_;
 };
 
-// Looks at one result of a query for `className`: class, keys, texts. Empty text of a class: any.
+// Looks at one result of a query for `className`: class, keys, texts. An empty name: any class.
 void checkResult(Client& client, const std::string& request, const Result& result,
                  const std::string& className);
 
@@ -48,6 +49,3 @@ void checkMethodResult(Client& client, const Query& query, const Answer& answer)
 
 // Whether a provider may answer so to say that it does not do such a thing.
 bool isRefusal(CMPIrc code);
-
-// "CMPI_RC_ERR_FAILED: text"
-std::string wordsOf(const Answer& answer);
