@@ -214,7 +214,8 @@ CheckReport CheckRun::run() {
                                       [](const CheckedClass& checked) { return checked.isServed; });
     if (!isServed && report_.findings.empty()) {
         throw BrokerError("the provider serves none of the classes; its answer for " +
-                          report_.classes.front().name + " is " + report_.classes.front().answer);
+                          report_.classes.front().name + " is " + report_.classes.front().answer +
+                          "; name its MOF files with --mof");
     }
     return std::move(report_);
 }

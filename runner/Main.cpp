@@ -14,35 +14,39 @@ namespace {
 constexpr int usageFailed = 2;
 
 constexpr const char* footer =
-    R"(A PATH is Class.Key="text",Number=3; a namespace and a colon may stand before it, \" and \\ stand for a quote and
-a backslash. VERB --help tells more of a verb. Exit status: 0; 1 when the provider answered with an error, or check
-found something; 2 for wrong usage, and for files and libraries that cannot be used.
+    R"(A PATH is Class.Key="text",Number=3; a namespace and a colon may stand before it, \" and \\ stand
+for a quote and a backslash. VERB --help tells more of a verb. Exit status: 0; 1 when the provider
+answered with an error, or check found something; 2 for wrong usage, and for files and libraries
+that cannot be used.
 
   oxahv-provider --library ./libDemoPort.so --output json ei Demo_Port
   oxahv-provider --library ./libDemoPort.so gi 'Demo_Port.Name="eth0"'
-  oxahv-provider --library ./libDemoPort.so --mof Demo.mof cm 'Demo_Port.Name="eth0"' SetSpeed Speed=1000
-  oxahv-provider --library ./libDemoPort.so --fault CMPIObjectPathFT.addKey:2:ERR_FAILED ein Demo_Port
+  oxahv-provider --library ./libDemoPort.so --mof Demo.mof cm Demo_Port.Number=3 SetSpeed Speed=1000
+  oxahv-provider --library ./libDemoPort.so --fault CMPIObjectPathFT.addKey:2 ein Demo_Port
   oxahv-provider --library ./libDemoPort.so --mof Demo.mof check)";
 
 constexpr const char* resultFooter =
-    R"(Results go to the standard output, and only when the whole request succeeded. With --output json they are an
-array of objects {"class", "namespace", "path", "properties"}.)";
+    R"(Results go to the standard output, and only when the whole request succeeded. With --output json
+they are an array of objects {"class", "namespace", "path", "properties"}.)";
 
 constexpr const char* checkFooter =
-    R"(Does with each class what clients do: names, instances, each of them by its name, one that does not exist, property
-lists, associations from both ends with every filter, methods; and compares all with the class's declaration. Then
-again with untyped keys, from several threads at once, and with the broker's calls failing in turn (of each slot the
-first 100, and the last). The provider runs in child processes: a crash or a hang is a finding. JSON is an array of
-one object {"library", "provider", "passes", "requests", "classes", "findings"}; a finding is {"check", "severity",
+    R"(Does with each class what clients do: names, instances, each by its name, one that does not exist,
+property lists, associations from both ends with every filter, methods; and compares all with the
+class's declaration. Then again with untyped keys, from several threads at once, and with the
+broker's calls failing in turn: of each slot the first 100 of a request, and the last. The provider
+runs in child processes: a crash or a hang is a finding. JSON is an array of one object {"library",
+"provider", "passes", "requests", "classes", "findings"}; a finding is {"check", "severity",
 "class", "pass", "request", "text", "count"}. Exit status 1 when there are findings.
 
   oxahv-provider --library ./libDemoPort.so --mof Demo.mof check --class Demo_Port
-  oxahv-provider --library ./libDemoPort.so --mof Demo.mof check --method 'Demo_Port.SetSpeed Speed=1000')";
+  oxahv-provider --library ./libDemoPort.so --mof Demo.mof check --method 'Demo_Port.Reset Mode=1')";
 
 constexpr const char* methodFooter =
-    R"(With --mof, the class's declaration tells which parameters there are and of what type. Of an array, each
-name=value adds an element. Without declaration a value is a number, TRUE or FALSE where it looks like one, and a text
-otherwise. A text may stand in double quotes, and has to where it looks like a number.)";
+    R"(With --mof, the class's declaration tells which parameters there are and of what type. Of an
+array, each name=value adds an element. Without declaration a value is a number, TRUE or FALSE where
+it looks like one, and a text otherwise. A text may stand in double quotes, and has to where it
+looks like a number. With --output json the result is an array of one object {"path", "method",
+"returnValue", "parameters"}.)";
 
 // The options that are words on the command line and something else behind it.
 struct Words {
@@ -78,7 +82,7 @@ void addOptions(CLI::App& app, Options& options, Words& words) {
         ->type_name("NAME=TEXT")
         ->allow_extra_args(false);
     app.add_option("--fault", options.faults,
-                   "fail the N-th call of a broker's slot, with ERR_FAILED or CODE; repeatable")
+                   "fail the N-th call of a slot, with ERR_FAILED or CODE; repeatable")
         ->type_name("SLOT:N[:CODE]")
         ->allow_extra_args(false);
 }
@@ -151,8 +155,9 @@ void addCheck(CLI::App& app, CheckOptions& options) {
         ->type_name("CLASS")
         ->allow_extra_args(false);
     command
-        ->add_option("--method", options.methods, "call this method too, of the first instance; repeatable")
-        ->type_name("'CLASS.METHOD name=value ...'")
+        ->add_option("--method", options.methods,
+                     "call CLASS.METHOD name=value ... of the first instance; repeatable")
+        ->type_name("CALL")
         ->allow_extra_args(false);
     command->add_option("--threads", options.threads, "how many threads send requests at once")
         ->check(CLI::Range(1U, 256U).description(""))

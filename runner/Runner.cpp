@@ -111,7 +111,12 @@ void inject(EmbeddedBroker& broker, const std::string& text) {
     if (second != std::string::npos) {
         fault.code = oxahv::codeFromName(text.substr(second + 1));
     }
-    broker.injectFault(text.substr(0, first), fault);
+    try {
+        broker.injectFault(text.substr(0, first), fault);
+    } catch (const oxahv::BrokerError& error) {
+        throw oxahv::BrokerError(std::string(error.what()) +
+                                 "; name it by table and member, as CMPIObjectPathFT.addKey");
+    }
 }
 
 // Every message reaches the logger twice; one of the two is shown.
@@ -148,8 +153,14 @@ const std::vector<Verb>& verbs() {
 
 CMPIObjectPath* targetOf(Request& request, const Options& options, const Verb& verb,
                          const Operands& operands) {
-    return verb.target == Target::ofClass ? request.objectPath(options.nameSpace, operands.target)
-                                          : request.objectPathFromText(operands.target, options.nameSpace);
+    if (verb.target == Target::ofClass) {
+        return request.objectPath(options.nameSpace, operands.target);
+    }
+    try {
+        return request.objectPathFromText(operands.target, options.nameSpace);
+    } catch (const oxahv::BrokerError& error) {
+        throw oxahv::BrokerError(std::string(error.what()) + "; write it as Class.Key=\"text\",Number=3");
+    }
 }
 
 std::string providerName(const Options& options) {
@@ -170,7 +181,18 @@ void prepare(EmbeddedBroker& broker, const Options& options) {
 
 // A name without a folder would be looked for among the system's libraries.
 void loadProvider(EmbeddedBroker& broker, const Options& options) {
-    broker.load(std::filesystem::absolute(options.library), providerName(options));
+    const std::string name = providerName(options);
+    try {
+        broker.load(std::filesystem::absolute(options.library), name);
+    } catch (const oxahv::BrokerError& error) {
+        const std::string message = error.what();
+        const bool isLoaded = message.rfind("cannot load", 0) != 0;
+        const bool isFile = std::filesystem::is_regular_file(options.library);
+        throw oxahv::BrokerError(message +
+                                 (isLoaded ? "; is " + name + " its MI name? Else give it with --provider"
+                                  : isFile ? "; ldd shows what the library needs and what it lacks"
+                                           : "; give the path of the provider's library with --library"));
+    }
 }
 
 int run(const Options& options, const Verb& verb, const Operands& operands) {

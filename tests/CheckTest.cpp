@@ -188,7 +188,8 @@ TEST(TheCheck, SaysWhatKeepsItFromChecking) {
          "check puts faults and key modes on the provider itself: leave --fault and --keys out"},
         {RUNNER " --library " HOST_PROVIDER " --mof " FAULTY_MOF " check",
          "the provider serves none of the classes; its answer for Faulty_Absent is "
-         "CMPI_RC_ERR_INVALID_CLASS: this provider does not serve class Faulty_Absent"},
+         "CMPI_RC_ERR_INVALID_CLASS: this provider does not serve class Faulty_Absent; name its MOF files "
+         "with --mof"},
     };
     for (const auto& c : cases) {
         const Outcome outcome = run(c.arguments + " 2>&1");
