@@ -114,6 +114,10 @@ std::string lowerCase(std::string text) {
     return text;
 }
 
+std::string typeText(CMPIType type) {
+    return oxahv::typeName(type) + ((type & CMPI_ARRAY) != 0 ? "[]" : "");
+}
+
 std::string wordsOf(const Answer& answer) {
     return oxahv::codeName(answer.code) + (answer.message.empty() ? "" : ": " + answer.message);
 }
@@ -122,14 +126,14 @@ bool isUtf8(const std::string& text) {
     struct Form {
         unsigned char first; // the range of the first byte
         unsigned char last;
-        unsigned int length;
         unsigned char secondFirst; // the range of the second
         unsigned char secondLast;
+        unsigned int length;
     };
     constexpr Form forms[] = {
-        {0x00, 0x7f, 1, 0x80, 0xbf}, {0xc2, 0xdf, 2, 0x80, 0xbf}, {0xe0, 0xe0, 3, 0xa0, 0xbf},
-        {0xe1, 0xec, 3, 0x80, 0xbf}, {0xed, 0xed, 3, 0x80, 0x9f}, {0xee, 0xef, 3, 0x80, 0xbf},
-        {0xf0, 0xf0, 4, 0x90, 0xbf}, {0xf1, 0xf3, 4, 0x80, 0xbf}, {0xf4, 0xf4, 4, 0x80, 0x8f}};
+        {0x00, 0x7f, 0x80, 0xbf, 1}, {0xc2, 0xdf, 0x80, 0xbf, 2}, {0xe0, 0xe0, 0xa0, 0xbf, 3},
+        {0xe1, 0xec, 0x80, 0xbf, 3}, {0xed, 0xed, 0x80, 0x9f, 3}, {0xee, 0xef, 0x80, 0xbf, 3},
+        {0xf0, 0xf0, 0x90, 0xbf, 4}, {0xf1, 0xf3, 0x80, 0xbf, 4}, {0xf4, 0xf4, 0x80, 0x8f, 4}};
     const auto byteAt = [&](std::size_t i) { return static_cast<unsigned char>(text[i]); };
     for (std::size_t i = 0; i < text.size();) {
         const Form* const form = std::find_if(std::begin(forms), std::end(forms), [&](const Form& f) {

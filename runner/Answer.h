@@ -53,6 +53,9 @@ std::string lowerCase(std::string text);
 // Whether there is a value of that name that is not NULL.
 bool hasValue(const NamedData& values, const std::string& name);
 
+// "uint8", "uint8[]"
+std::string typeText(CMPIType type);
+
 // "CMPI_RC_ERR_FAILED: text"
 std::string wordsOf(const Answer& answer);
 

@@ -158,7 +158,7 @@ void Associations::runFilters() {
     }
 }
 
-// A declared class from which the class derives, the nearest to the root; empty if none.
+// A declared class from which the class derives; empty if none.
 std::string Associations::superclass(const std::string& className) const {
     for (const std::string& other : client_.broker().declaredClasses()) {
         if (lowerCase(other) != lowerCase(className) && client_.broker().isA(className, other)) {
@@ -168,10 +168,11 @@ std::string Associations::superclass(const std::string& className) const {
     return "";
 }
 
-// A declared class that neither the class nor a class of the other ways derives from; empty if none.
+// A declared class that neither is above nor below the class; empty if none.
 std::string Associations::unrelatedClass(const std::string& className) const {
     for (const std::string& other : client_.broker().declaredClasses()) {
-        if (!client_.broker().isA(className, other) && !client_.broker().isA(other, className)) {
+        const bool isBelow = passesClass(other, className);
+        if (!isBelow && !client_.broker().isA(className, other)) {
             return other;
         }
     }
@@ -202,7 +203,7 @@ Query Associations::query(const char* verb, const AssociationFilter& filter) con
 std::optional<Answer> Associations::ask(const char* verb, const AssociationFilter& filter) {
     const Query asked = query(verb, filter);
     const std::string request = textOf(asked);
-    const std::optional<Answer> answer = client_.ask(asked);
+    std::optional<Answer> answer = client_.ask(asked);
     if (!answer || isRefusal(answer->code)) {
         return std::nullopt;
     }

@@ -7,10 +7,6 @@ namespace {
 using Json = nlohmann::json;
 using oxahv::BrokerError;
 
-std::string typeText(CMPIType type) {
-    return oxahv::typeName(type) + ((type & CMPI_ARRAY) != 0 ? "[]" : "");
-}
-
 bool endsWith(const std::string& text, const std::string& end) {
     return text.size() >= end.size() && text.compare(text.size() - end.size(), end.size(), end) == 0;
 }

@@ -9,10 +9,6 @@ namespace {
 
 using oxahv::PropertyDeclaration;
 
-std::string typeText(CMPIType type) {
-    return oxahv::typeName(type) + ((type & CMPI_ARRAY) != 0 ? "[]" : "");
-}
-
 bool isInteger(CMPIType type) {
     return (type & (CMPI_UINT | CMPI_ARRAY)) == CMPI_UINT; // signed ones have the bit too
 }
@@ -38,8 +34,8 @@ std::string absentKey(const PlainData& key, const std::vector<Result>& names, co
     // A reference to an instance whose last key, a text, is another. In a text within a text, \" stands for
     // ".
     if (isQuoted && key.type == CMPI_ref && key.text.size() > 2 &&
-        key.text.compare(key.text.size() - 3, 3, "\\\"\"") == 0) {
-        return key.text.substr(0, key.text.size() - 3) + "-absent\\\"\"";
+        key.text.compare(key.text.size() - 3, 3, R"(\"")") == 0) {
+        return key.text.substr(0, key.text.size() - 3) + R"(-absent\"")";
     }
     return "";
 }
@@ -98,6 +94,18 @@ const Result* findResult(const std::vector<Result>& results, const std::string& 
     return found != results.end() ? &*found : nullptr;
 }
 
+// The path of a result that the others lack; empty if there is none.
+std::string onlyAmong(const std::vector<Result>& results, const std::vector<Result>& others) {
+    std::set<std::string> identities;
+    for (const Result& other : others) {
+        identities.insert(other.identity);
+    }
+    const auto found = std::find_if(results.begin(), results.end(), [&](const Result& result) {
+        return identities.count(result.identity) == 0;
+    });
+    return found != results.end() ? found->path : "";
+}
+
 void checkTexts(Client& client, const std::string& request, const char* what, const NamedData& values) {
     for (const auto& [name, value] : values) {
         if (!value.isUtf8) {
@@ -150,17 +158,11 @@ void checkDuplicates(Client& client, const std::string& request, const std::vect
 
 std::string differenceOf(const std::vector<Result>& first, const std::string& firstName,
                          const std::vector<Result>& second, const std::string& secondName) {
-    for (const Result& result : first) {
-        if (findResult(second, result.identity) == nullptr) {
-            return "only among " + firstName + ": " + result.path;
-        }
-    }
-    for (const Result& result : second) {
-        if (findResult(first, result.identity) == nullptr) {
-            return "only among " + secondName + ": " + result.path;
-        }
-    }
-    return "";
+    const std::string onlyFirst = onlyAmong(first, second);
+    const std::string onlySecond = onlyAmong(second, first);
+    return !onlyFirst.empty()    ? "only among " + firstName + ": " + onlyFirst
+           : !onlySecond.empty() ? "only among " + secondName + ": " + onlySecond
+                                 : "";
 }
 
 // Only what the broker lets through is of a declared type: it takes output arguments as they come.

@@ -153,6 +153,24 @@ TEST(TheCheck, FindsNothingInTheExample) {
                              "OXATK_NumericSensor", "OXATK_OperatingSystem", "OXATK_RunningOS"}));
 }
 
+TEST(TheCheck, FindsCrashesOutsideOfRequests) {
+    const struct {
+        const char* when;
+        const char* text;
+        bool isServed;
+    } cases[] = {{"load", "loading the provider: killed by signal 9 (Killed)", false},
+                 {"end", "the provider's cleanup: killed by signal 9 (Killed)", true}};
+    for (const auto& c : cases) {
+        const Outcome outcome = run(faulty + "--output json --context Crash=" + c.when +
+                                    " check --class Faulty_None --class Faulty_Date");
+        EXPECT_EQ(outcome.status, 1);
+        const Json report = Json::parse(outcome.output)[0];
+        EXPECT_EQ(report["findings"][0]["text"], c.text);
+        EXPECT_EQ(report["findings"].size(), c.isServed ? 3U : 1U) << "what can be checked is checked";
+        EXPECT_EQ(report["classes"][1]["served"], c.isServed);
+    }
+}
+
 TEST(TheCheck, PrintsATableWithColoursOnATerminalAlone) {
     const std::string command = faulty + "check --class Faulty_NotDone --class Faulty_Date";
     const Outcome outcome = run(command);

@@ -255,6 +255,18 @@ void associatorsOfEnd(const CMPIResult* result, const Target& target) {
     done(target, result);
 }
 
+// What the context wants the provider to do: to crash when it is loaded, or at its end.
+bool crashesAtEnd = false;
+
+void obey(const CMPIContext* context) {
+    const CMPIData wanted = CMGetContextEntry(context, "Crash", nullptr);
+    const std::string when = wanted.type == CMPI_string ? textOf(wanted.value.string) : "";
+    if (when == "load") {
+        std::raise(SIGKILL);
+    }
+    crashesAtEnd = when == "end";
+}
+
 template <class Work>
 CMPIStatus answer(const CMPIObjectPath* path, Work work) {
     try {
@@ -270,6 +282,9 @@ CMPIStatus answer(const CMPIObjectPath* path, Work work) {
 // The function tables
 
 static CMPIStatus FaultyCleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
+    if (crashesAtEnd) {
+        std::raise(SIGKILL);
+    }
     CMReturn(CMPI_RC_OK);
 }
 
@@ -385,6 +400,14 @@ static CMPIStatus FaultyInvokeMethod(CMPIMethodMI*, const CMPIContext*, const CM
     });
 }
 
-CMInstanceMIStub(Faulty, FaultyProvider, broker, )
+CMInstanceMIStub(Faulty, FaultyInstances, broker, )
 CMAssociationMIStub(Faulty, FaultyProvider, broker, )
 CMMethodMIStub(Faulty, FaultyProvider, broker, )
+
+// The stub does not show the context to its hook.
+extern "C" CMPI_EXPORT CMPIInstanceMI* FaultyProvider_Create_InstanceMI(const CMPIBroker* theBroker,
+                                                                        const CMPIContext* context,
+                                                                        CMPIStatus* status) {
+    obey(context);
+    return FaultyInstances_Create_InstanceMI(theBroker, context, status);
+}
