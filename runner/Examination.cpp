@@ -31,8 +31,7 @@ std::string absentKey(const PlainData& key, const std::vector<Result>& names, co
     if (isQuoted && key.type != CMPI_ref && key.type != CMPI_dateTime) {
         return key.text.substr(0, key.text.size() - 1) + "-absent\"";
     }
-    // A reference to an instance whose last key, a text, is another. In a text within a text, \" stands for
-    // ".
+    // A reference to an instance whose last key, a text, is another. Within a text, \" stands for a quote.
     if (isQuoted && key.type == CMPI_ref && key.text.size() > 2 &&
         key.text.compare(key.text.size() - 3, 3, R"(\"")") == 0) {
         return key.text.substr(0, key.text.size() - 3) + R"(-absent\"")";
