@@ -915,7 +915,7 @@ void addRequest(Table& table) {
 
 void addGrowth(Table& table, std::size_t large) {
     // Caches and pages fresh from the system have their price; what is not linear would show a thousandfold.
-    constexpr double most = 6;
+    constexpr double most = 10;
     constexpr double manyKeys = 65535;
     const auto toMoniker = [](const CMPIObjectPath* path) {
         return [path] {

@@ -59,8 +59,11 @@ namespace oxahv {
 /** What hosting, loading, class declarations and path texts throw; `what()` is one line for a person. */
 class TK_EXPORT BrokerError : public std::runtime_error {
 public:
+    /** An error with a message. @param message the line; copied. */
     explicit BrokerError(const std::string& message);
+    /** Copies the message. */
     BrokerError(const BrokerError&) = default;
+    /** Copies the message. */
     BrokerError& operator=(const BrokerError&) = default;
     ~BrokerError() override;
 };
@@ -72,15 +75,15 @@ using PlainValue = std::variant<std::monostate, bool, unsigned long long, long l
 /** A value in a declaration: a property's default, or a qualifier's. */
 struct DeclaredValue {
     CMPIType type = CMPI_null; ///< with `CMPI_ARRAY` for arrays; `CMPI_null`: there is no value
-    bool isNull = true;
+    bool isNull = true;        ///< whether the value is NULL
     /** One of a single value, any number of an array, none where the value is NULL. */
     std::vector<PlainValue> elements;
 };
 
 /** A qualifier of a class, property, method or parameter. */
 struct QualifierDeclaration {
-    std::string name;
-    DeclaredValue value;
+    std::string name;          ///< as declared
+    DeclaredValue value;       ///< TRUE where MOF gives none
     bool isOverridable = true; ///< flavour EnableOverride; kept only, no override is refused
     bool reachesSubclass =
         true; ///< flavour ToSubclass; without it only the declaring class has the qualifier
@@ -90,7 +93,9 @@ struct QualifierDeclaration {
 /** The qualifiers of one element, in order. A constant list: copies share it. */
 class TK_EXPORT Qualifiers {
 public:
+    /** None. */
     Qualifiers() = default;
+    /** A list. @param list each name stands in it once. */
     explicit Qualifiers(std::vector<QualifierDeclaration> list);
 
     /** The qualifier of a name, in any case; null when there is none. Valid as long as a copy of the list. */
@@ -108,12 +113,12 @@ private:
 
 /** One property of a class. */
 struct PropertyDeclaration {
-    std::string name;          ///< as declared
-    CMPIType type = CMPI_null; ///< with `CMPI_ARRAY` for arrays; `CMPI_ref` for references
-    bool isKey = false;
+    std::string name;             ///< as declared
+    CMPIType type = CMPI_null;    ///< with `CMPI_ARRAY` for arrays; `CMPI_ref` for references
+    bool isKey = false;           ///< whether it names instances
     std::string referenceClass{}; ///< of a reference: the class that it leads to; empty if none is said
     DeclaredValue defaultValue{}; ///< of type `CMPI_null` when none is declared
-    Qualifiers qualifiers{};
+    Qualifiers qualifiers{};      ///< its own
 };
 
 /** One parameter of a method. */
@@ -123,7 +128,7 @@ struct ParameterDeclaration {
     std::string referenceClass{}; ///< of a reference: the class that it leads to; empty if none is said
     bool isIn = true;             ///< a qualifier In decides, where there is one
     bool isOut = false;           ///< a qualifier Out decides, where there is one
-    Qualifiers qualifiers{};
+    Qualifiers qualifiers{};      ///< its own
 };
 
 /** One method of a class. */
@@ -132,7 +137,7 @@ struct MethodDeclaration {
     CMPIType returnType = CMPI_null;                ///< `CMPI_ref` for references
     std::vector<ParameterDeclaration> parameters{}; ///< in order
     std::string returnClass{};                      ///< of a reference: the class that it leads to
-    Qualifiers qualifiers{};
+    Qualifiers qualifiers{};                        ///< its own
 
     /** The parameter of a name, in any case; null when there is none. */
     TK_EXPORT const ParameterDeclaration* find(std::string_view parameter) const;
@@ -149,7 +154,7 @@ struct MethodDeclaration {
  */
 class TK_EXPORT ClassDeclaration {
 public:
-    /** @param name the class's name; not empty. */
+    /** A class without superclass, properties and methods. @param name its name; not empty. */
     explicit ClassDeclaration(std::string name);
 
     /** Names the superclass, which must be declared before this class is. */
@@ -177,7 +182,9 @@ public:
     /** Adds a method with all that can be said of it. */
     ClassDeclaration& method(MethodDeclaration method);
 
+    /** The class's name. */
     const std::string& name() const { return name_; }
+    /** The superclass's name; empty when it has none. */
     const std::string& superclass() const { return superclass_; }
     /** Whether the class itself says that it is an association. */
     bool isAssociation() const;
@@ -238,17 +245,18 @@ struct Call {
 
 /** How many objects of each kind are alive in a broker. */
 struct LiveObjects {
-    std::size_t instances = 0;
-    std::size_t objectPaths = 0;
-    std::size_t arguments = 0;
-    std::size_t strings = 0;
-    std::size_t arrays = 0;
-    std::size_t dateTimes = 0;
-    std::size_t enumerations = 0;
-    std::size_t contexts = 0;
-    std::size_t results = 0;
-    std::size_t others = 0; ///< errors, property lists, filters, select expressions
+    std::size_t instances = 0;    ///< `CMPIInstance`
+    std::size_t objectPaths = 0;  ///< `CMPIObjectPath`
+    std::size_t arguments = 0;    ///< `CMPIArgs`
+    std::size_t strings = 0;      ///< `CMPIString`
+    std::size_t arrays = 0;       ///< `CMPIArray`
+    std::size_t dateTimes = 0;    ///< `CMPIDateTime`
+    std::size_t enumerations = 0; ///< `CMPIEnumeration`
+    std::size_t contexts = 0;     ///< `CMPIContext`
+    std::size_t results = 0;      ///< `CMPIResult`
+    std::size_t others = 0;       ///< errors, property lists, filters, select expressions
 
+    /** All of them. */
     std::size_t total() const {
         return instances + objectPaths + arguments + strings + arrays + dateTimes + enumerations + contexts +
                results + others;
@@ -258,24 +266,28 @@ struct LiveObjects {
 /** The MI factory functions of a provider that is linked into the program; a kind that it lacks stays null.
  */
 struct ProviderFactories {
+    /** `NAME_Create_InstanceMI`. */
     CMPIInstanceMI* (*instance)(const CMPIBroker*, const CMPIContext*, CMPIStatus*) = nullptr;
+    /** `NAME_Create_AssociationMI`. */
     CMPIAssociationMI* (*association)(const CMPIBroker*, const CMPIContext*, CMPIStatus*) = nullptr;
+    /** `NAME_Create_MethodMI`. */
     CMPIMethodMI* (*method)(const CMPIBroker*, const CMPIContext*, CMPIStatus*) = nullptr;
 };
 
 /** A broker message or trace that a provider wrote through the broker's `logMessage` and `trace` slots. */
 struct BrokerMessage {
-    bool isTrace = false;
-    int severityOrLevel = 0;
-    std::string component; ///< the id or component argument
-    std::string text;
+    bool isTrace = false;    ///< written by `trace`; else by `logMessage`
+    int severityOrLevel = 0; ///< a `CMPILevel` of a trace, else a `CMPISeverity`
+    std::string component;   ///< the id or component argument
+    std::string text;        ///< the text
 };
 
 class Request;
 
-/** The broker. See the top of this file for how to use it. */
+/** The broker. The top of EmbeddedBroker.h tells how to use it. */
 class TK_EXPORT EmbeddedBroker {
 public:
+    /** A broker without classes and providers. */
     EmbeddedBroker();
     /** Calls `cleanup` of every hosted provider, unloads the loaded ones, and frees every object that is
      * left. */
@@ -397,7 +409,8 @@ public:
     /** @} */
 
     /** The implementation; named here for its own sources only. */
-    class Impl;
+    class TK_HIDDEN Impl;
+    /** For its own sources too. */
     Impl& impl() { return *impl_; }
 
 private:
@@ -414,15 +427,16 @@ struct Reply {
     std::vector<CMPIData> data;               ///< returned by returnData; a method's return value
     CMPIArgs* out = nullptr;                  ///< a method's output arguments
     bool done = false;                        ///< whether the provider called returnDone
+    /** Whether the code is `CMPI_RC_OK`. */
     bool ok() const { return code == CMPI_RC_OK; }
 };
 
 /** Filters of an association request; an empty text is no filter. */
 struct AssociationFilter {
-    std::string associationClass;
-    std::string resultClass;
-    std::string role;
-    std::string resultRole;
+    std::string associationClass; ///< only by associations of this class; for references: not looked at
+    std::string resultClass;      ///< only instances of this class; for references: of the association
+    std::string role;             ///< only where the path is the value of this reference
+    std::string resultRole;       ///< only what is the value of this reference; for references: not looked at
 };
 
 /**
@@ -437,7 +451,9 @@ struct AssociationFilter {
  */
 class TK_EXPORT Request {
 public:
+    /** Begins a request. @param broker has to outlive it. */
     explicit Request(EmbeddedBroker& broker);
+    /** Frees what the broker made for the request. */
     ~Request();
     Request(const Request&) = delete;
     Request& operator=(const Request&) = delete;
@@ -474,26 +490,59 @@ public:
      * KeyMode says. */
     CMPIObjectPath* deliver(const CMPIObjectPath* path);
 
-    /** @param properties the property list; null is none. */
+    /** @name Operations of instances
+     * @param classPath a path whose namespace and class count.
+     * @param path names the instance.
+     * @param properties the property list; null is none.
+     */
+    /** @{ */
+    /** All instances of a class. */
     Reply enumerateInstances(const CMPIObjectPath* classPath,
                              const std::vector<std::string>* properties = nullptr);
+    /** The paths of all instances of a class. */
     Reply enumerateInstanceNames(const CMPIObjectPath* classPath);
+    /** One instance. */
     Reply getInstance(const CMPIObjectPath* path, const std::vector<std::string>* properties = nullptr);
+    /** Makes an instance; the reply holds its path. */
     Reply createInstance(const CMPIObjectPath* classPath, const CMPIInstance* instance);
+    /** Changes an instance, with a property list the listed properties alone. */
     Reply modifyInstance(const CMPIObjectPath* path, const CMPIInstance* instance,
                          const std::vector<std::string>* properties = nullptr);
+    /** Deletes an instance. */
     Reply deleteInstance(const CMPIObjectPath* path);
+    /** The instances that a query selects. */
     Reply execQuery(const CMPIObjectPath* classPath, const std::string& query, const std::string& language);
+    /** @} */
+
+    /** @name Operations of associations
+     * @param path names the instance at one end.
+     * @param filter which of the associations count.
+     * @param properties the property list; null is none.
+     */
+    /** @{ */
+    /** The instances at the other ends. */
     Reply associators(const CMPIObjectPath* path, const AssociationFilter& filter = {},
                       const std::vector<std::string>* properties = nullptr);
+    /** The paths of the instances at the other ends. */
     Reply associatorNames(const CMPIObjectPath* path, const AssociationFilter& filter = {});
+    /** The associations themselves. */
     Reply references(const CMPIObjectPath* path, const AssociationFilter& filter = {},
                      const std::vector<std::string>* properties = nullptr);
+    /** The paths of the associations themselves. */
     Reply referenceNames(const CMPIObjectPath* path, const AssociationFilter& filter = {});
+    /** @} */
+
+    /**
+     * Calls a method.
+     * @param path names the instance, or the class of a static method.
+     * @param method the method's name.
+     * @param in its input arguments.
+     * @return the return value is in Reply::data, output arguments are in Reply::out.
+     */
     Reply invokeMethod(const CMPIObjectPath* path, const std::string& method, const CMPIArgs* in);
 
 private:
-    class Impl;
+    class TK_HIDDEN Impl;
     TK_HIDDEN EmbeddedBroker::Impl& core();
     std::unique_ptr<Impl> impl_;
 };

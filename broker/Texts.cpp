@@ -124,7 +124,7 @@ std::string arrayText(const Array& array) {
     return text + "}";
 }
 
-// The shortest text that reads back as the same number. MOF wants a point in it.
+// The shortest text that reads back as the same number. MOF wants a point in it, whatever the locale says.
 template <class Real>
 std::string realText(Real value) {
     std::array<char, 40> buffer{};

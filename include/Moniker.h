@@ -45,6 +45,7 @@ namespace TK {
 class TK_EXPORT FrameworkException : public std::exception {
 public:
     /**
+     * An exception with a message.
      * @param text the message, NUL-terminated; copied. A null pointer counts as the empty text.
      * @throws std::bad_alloc
      */
@@ -99,7 +100,7 @@ public:
     Moniker& operator=(const Moniker& other);
     ~Moniker();
 
-    /** @return the number of components. Never throws. */
+    /** The number of components. Never throws. */
     unsigned int getKeyCount() const;
 
     /**
@@ -136,10 +137,15 @@ public:
      * @throws std::bad_alloc
      */
     /** @{ */
+    /** Of a `COMPONENT_STRING`. */
     void getValue(std::string& value) const;
+    /** Of a `COMPONENT_UINT8`. */
     void getValue(unsigned char& value) const;
+    /** Of a `COMPONENT_UINT16`. */
     void getValue(unsigned short& value) const;
+    /** Of a `COMPONENT_UINT32`. */
     void getValue(unsigned int& value) const;
+    /** Of a `COMPONENT_UINT64`. */
     void getValue(unsigned long long& value) const;
     /** @} */
 
@@ -154,10 +160,15 @@ public:
      * @throws std::bad_alloc
      */
     /** @{ */
+    /** As a `COMPONENT_STRING`. */
     unsigned short addKey(std::string name, const std::string& value);
+    /** As a `COMPONENT_UINT8`. */
     unsigned short addKey(std::string name, unsigned char value);
+    /** As a `COMPONENT_UINT16`. */
     unsigned short addKey(std::string name, unsigned short value);
+    /** As a `COMPONENT_UINT32`. */
     unsigned short addKey(std::string name, unsigned int value);
+    /** As a `COMPONENT_UINT64`. */
     unsigned short addKey(std::string name, unsigned long long value);
     /** @} */
 

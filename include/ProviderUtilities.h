@@ -36,6 +36,7 @@
 // Some CIM servers' CMPI headers use pthread types and `__cdecl` without bringing either.
 #include <pthread.h>
 #ifndef __cdecl
+/** A calling convention that this platform does not have. */
 #define __cdecl // NOLINT(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
 #endif
 #ifndef CMPI_PLATFORM_LINUX_GENERIC_GNU
@@ -49,7 +50,7 @@
 
 namespace TK {
 
-/** A family of static operations; see the top of this file. */
+/** A family of static operations; the top of ProviderUtilities.h tells what holds for all of them. */
 class TK_EXPORT ProviderUtilities {
 public:
     ProviderUtilities() = delete;
@@ -64,10 +65,10 @@ public:
      */
     static CMPIInstance* createInstance(const CMPIBroker* broker, CMPIObjectPath* objectPath);
 
-    /** @return the class's name; empty when the broker cannot tell it. @throws std::bad_alloc */
+    /** The class's name; empty when the broker cannot tell it. @throws std::bad_alloc */
     static std::string getClassName(const CMPIObjectPath* objectPath);
 
-    /** @return the namespace; empty when the broker cannot tell it. @throws std::bad_alloc */
+    /** The namespace; empty when the broker cannot tell it. @throws std::bad_alloc */
     static std::string getNamespace(const CMPIObjectPath* objectPath);
 
     /**
@@ -88,13 +89,21 @@ public:
      * @param value the value; a text needs to live during the call only.
      */
     /** @{ */
+    /** As `CMPI_uint8`. */
     static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, unsigned char value);
+    /** As `CMPI_uint16`. */
     static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, unsigned short value);
+    /** As `CMPI_uint32`. */
     static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, unsigned int value);
+    /** As `CMPI_uint64`. */
     static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, unsigned long long value);
+    /** As `CMPI_chars`. */
     static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, const char* value);
+    /** As `CMPI_string`. */
     static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, CMPIString* value);
+    /** As `CMPI_chars`. */
     static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, const std::string& value);
+    /** As `CMPI_ref`. */
     static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, CMPIObjectPath* value);
     /** @} */
 
@@ -108,17 +117,29 @@ public:
      * @param value the value; a text needs to live during the call only and is not changed.
      */
     /** @{ */
+    /** As `CMPI_ref`. */
     static void setProperty(CMPIInstance* instance, const char* name, CMPIObjectPath* value);
+    /** As `CMPI_uint8`. */
     static void setProperty(CMPIInstance* instance, const char* name, unsigned char value);
+    /** As `CMPI_uint16`. */
     static void setProperty(CMPIInstance* instance, const char* name, unsigned short value);
+    /** As `CMPI_uint32`. */
     static void setProperty(CMPIInstance* instance, const char* name, unsigned int value);
+    /** As `CMPI_uint64`. */
     static void setProperty(CMPIInstance* instance, const char* name, unsigned long long value);
+    /** As `CMPI_sint16`. */
     static void setProperty(CMPIInstance* instance, const char* name, short value);
+    /** As `CMPI_real32`. */
     static void setProperty(CMPIInstance* instance, const char* name, float value);
+    /** As `CMPI_real64`. */
     static void setProperty(CMPIInstance* instance, const char* name, double value);
+    /** As `CMPI_chars`. */
     static void setProperty(CMPIInstance* instance, const char* name, const char* value);
+    /** As `CMPI_string`. */
     static void setProperty(CMPIInstance* instance, const char* name, CMPIString* value);
+    /** As `CMPI_chars`. */
     static void setProperty(CMPIInstance* instance, const char* name, std::string& value);
+    /** As `CMPI_boolean`. */
     static void setProperty(CMPIInstance* instance, const char* name, bool value);
     /** @} */
 
@@ -133,17 +154,27 @@ public:
      * @throws std::bad_alloc from the form for `std::string`
      */
     /** @{ */
+    /** A text key, as the broker's own string. */
     static bool getKeyProperty(const CMPIObjectPath* objectPath, const char* name, CMPIString** out);
+    /** A reference key. */
     static bool getKeyProperty(const CMPIObjectPath* objectPath, const char* name, CMPIObjectPath** out);
+    /** A text key, copied. */
     static bool getKeyProperty(const CMPIObjectPath* objectPath, const char* name, std::string& out);
 
+    /** A property of CIM type `uint16`. */
     static bool getProperty(const CMPIInstance* instance, const char* name, unsigned short& out);
+    /** A property of CIM type `uint32`. */
     static bool getProperty(const CMPIInstance* instance, const char* name, unsigned int& out);
+    /** A property of CIM type `boolean`. */
     static bool getProperty(const CMPIInstance* instance, const char* name, bool& out);
+    /** A text property, as the broker's own string. */
     static bool getProperty(const CMPIInstance* instance, const char* name, CMPIString** out);
 
+    /** A argument of CIM type `uint16`. */
     static bool getProperty(const CMPIArgs* args, const char* name, unsigned short& out);
+    /** A argument of CIM type `uint32`. */
     static bool getProperty(const CMPIArgs* args, const char* name, unsigned int& out);
+    /** A argument of CIM type `boolean`. */
     static bool getProperty(const CMPIArgs* args, const char* name, bool& out);
     /** @} */
 
@@ -179,10 +210,15 @@ public:
      * @throws std::bad_alloc
      */
     /** @{ */
+    /** A text argument. */
     static bool getProperty(const CMPIArgs* args, const char* name, std::wstring& out);
+    /** A text property. */
     static bool getProperty(const CMPIInstance* instance, const char* name, std::wstring& out);
+    /** A text key. */
     static bool getKeyProperty(const CMPIObjectPath* objectPath, const char* name, std::wstring& out);
+    /** A text key, as `CMPI_chars`. */
     static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, const std::wstring& value);
+    /** A text property, as `CMPI_chars`; `value` is not changed. */
     static void setProperty(CMPIInstance* instance, const char* name, std::wstring& value);
     /** @} */
 
@@ -200,17 +236,22 @@ public:
      * @throws std::bad_alloc what a getter has appended until then stays
      */
     /** @{ */
+    /** As `CMPI_uint8A`. */
     static void setProperty(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
                             std::vector<unsigned char>& value);
+    /** As `CMPI_uint16A`. */
     static void setProperty(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
                             std::vector<unsigned short>& value);
+    /** As `CMPI_stringA`. */
     static void setProperty(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
                             std::vector<std::string>& value);
-    /** A text that the locale cannot convert becomes an empty one. **Traces every text**, whatever the
-     * property. */
+    /** As `CMPI_stringA`. A text that the locale cannot convert becomes an empty one. **Traces every text**,
+     * whatever the property. */
     static void setProperty(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
                             std::vector<std::wstring>& value);
+    /** A property of CIM type `uint16[]`. */
     static bool getProperty(const CMPIInstance* instance, const char* name, std::vector<unsigned short>& out);
+    /** A property of CIM type `string[]`. */
     static bool getProperty(const CMPIInstance* instance, const char* name, std::vector<std::string>& out);
     /** @} */
 
@@ -311,8 +352,8 @@ public:
      * registry does not know. Names compare as `strcasecmp` (POSIX) does, in the process's locale.
      */
     /** @{ */
-    /** @param name a class's name; may be null. @return its id, 0 for null, 255 for an unknown name. Does not
-     * trace or throw. */
+    /** The id of a class. @param name its name; may be null. @return its id, 0 for null, 255 for an unknown
+     * name. Does not trace or throw. */
     static unsigned short getClassId(const char* name);
 
     /** The same among the extension's classes alone, the ones from 180 on. */

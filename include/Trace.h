@@ -68,10 +68,12 @@ enum MessageType {
 /** Size of a message buffer in bytes, the terminating NUL included. */
 constexpr std::size_t traceBufferSize = 512;
 
-/** The level codes that the trace points hand to the logger. */
-constexpr int parametersLevelCode = 3000;
-constexpr int flowLevelCode = 4000;
-constexpr int messageLevelCode = 6000;
+/** @name Level codes that the trace points hand to the logger */
+/** @{ */
+constexpr int parametersLevelCode = 3000; ///< entry and exit with parameters
+constexpr int flowLevelCode = 4000;       ///< entry, exit and variables
+constexpr int messageLevelCode = 6000;    ///< messages
+/** @} */
 
 /** @name Putting a text together
  * The pieces of a trace's text, copied one behind the other: what `snprintf` would make of them, at a
@@ -80,6 +82,7 @@ constexpr int messageLevelCode = 6000;
  * and returns where the next piece begins.
  */
 /** @{ */
+/** A text of known size. */
 [[gnu::always_inline]] inline char* tracePiece(char* to, const char* end, const char* text,
                                                std::size_t size) {
     const auto room = static_cast<std::size_t>(end - to);
@@ -90,12 +93,14 @@ constexpr int messageLevelCode = 6000;
     std::memcpy(to, text, size);
     return to + size;
 }
+/** A C text; null appears as "(null)". */
 [[gnu::always_inline]] inline char* tracePiece(char* to, const char* end, const char* text) {
     if (text == nullptr) {
         text = "(null)";
     }
     return tracePiece(to, end, text, std::strlen(text));
 }
+/** A number in decimal digits. */
 inline char* tracePiece(char* to, const char* end, int number) {
     char digits[std::numeric_limits<int>::digits10 + 2]; // NOLINT(*-member-init): written next
     const char* const last = std::to_chars(digits, digits + sizeof digits, number).ptr;
@@ -127,7 +132,7 @@ template <class... Pieces>
 
 /**
  * Entry, exit or message.
- * @param subject the function's name; for #MESSAGE the message's text.
+ * @param subject the function's name; for `MESSAGE` the message's text.
  * @return the text; empty for a value outside the enumeration.
  */
 [[gnu::always_inline]] inline TK_EXPORT char* trace(const char* subject, const char* file, unsigned int line,
@@ -173,7 +178,7 @@ template <class... Pieces>
  * Entry or exit with the operation's parameters.
  * @param function the function's name.
  * @param parameters the parameter list; it starts with a blank.
- * @param type #ENTERING or #EXITING.
+ * @param type `ENTERING` or `EXITING`.
  * @return the text; empty for any other `type`.
  */
 [[gnu::always_inline]] inline TK_EXPORT char* tracepara(const char* function, const char* file,
@@ -203,9 +208,10 @@ template <class... Pieces>
  */
 class TraceParameters {
 public:
-    /** @param buffer empty; has to outlive this object. */
+    /** An empty list. @param buffer empty; has to outlive this object. */
     explicit TraceParameters(HVLog::HVMessageBuffer& buffer) : buffer_(buffer) {}
 
+    /** Appends a C text; a null pointer ends the list. */
     [[gnu::always_inline]] TraceParameters& operator<<(const char* text) {
         if (text == nullptr) {
             ended_ = true;
@@ -215,13 +221,15 @@ public:
         return *this;
     }
 
-    // What follows a NUL would be cut off where the list is read as a C string.
+    /** Appends a text. What follows a NUL would be cut off where the list is read as a C string: the list
+     * ends there. */
     TraceParameters& operator<<(const std::string& text) {
         *this << text.c_str();
         ended_ = ended_ || std::strlen(text.c_str()) != text.size();
         return *this;
     }
 
+    /** Appends the text that a pointer to characters leads to, of any other pointer the address. */
     template <class T, std::enable_if_t<!std::is_function_v<T>, int> = 0>
     [[gnu::always_inline]] decltype(auto) operator<<(T* pointer) {
         using Pointee = std::remove_cv_t<T>;
@@ -234,22 +242,22 @@ public:
         }
     }
 
+    /** Appends any other value, as a standard stream writes it. */
     template <class T, std::enable_if_t<!std::is_pointer_v<T> && !std::is_array_v<T>, int> = 0>
     std::ostream& operator<<(const T& value) {
         return stream() << value;
     }
 
-    /** Hands the list over. For HVMessageBuffer::str, which wants the result of the last insertion. */
-    operator HVLog::HVMessageBuffer&() { // NOLINT(google-explicit-constructor,hicpp-explicit-conversions)
+    /** The list, when all of it was collected here; valid until the next insertion. */
+    const char* text() {
         *end_ = '\0';
-        end_ = list_;
-        return buffer_ << static_cast<const char*>(list_);
+        return list_;
     }
 
 private:
     TraceParameters& address(const void* pointer) {
-        if (std::locale() != std::locale::classic()) {
-            // Another locale may group digits; a stream knows how.
+        if (!digitsArePlain_) {
+            // A stream knows how.
             std::ostringstream digits;
             digits << pointer;
             return *this << digits.str();
@@ -263,7 +271,7 @@ private:
     }
 
     std::ostream& stream() {
-        std::ostream& stream = static_cast<HVLog::HVMessageBuffer&>(*this);
+        std::ostream& stream = buffer_ << text();
         if (ended_) {
             stream.setstate(std::ios_base::badbit);
         }
@@ -271,10 +279,23 @@ private:
     }
 
     HVLog::HVMessageBuffer& buffer_;
-    bool ended_ = false; // by a null text
+    bool digitsArePlain_ = std::locale() == std::locale::classic(); // another locale may group them
+    bool ended_ = false;                                            // by a null text
     char* end_ = list_;
     char list_[traceBufferSize]; // NOLINT(*-member-init): written as far as it is read
 };
+
+/** @name The text of a parameter list, from the result of its last insertion */
+/** @{ */
+/** Of a list that was collected whole; valid as long as the list. */
+inline const char* traceList(HVLog::HVMessageBuffer& /*buffer*/, TraceParameters& inserted) {
+    return inserted.text();
+}
+/** Of a list that went through the buffer's stream; belongs to the buffer. */
+inline const char* traceList(HVLog::HVMessageBuffer& buffer, std::ostream& inserted) {
+    return buffer.str(inserted).c_str();
+}
+/** @} */
 
 /** The part of a path after its last slash; a constant for a constant path. */
 constexpr const char* traceFileName(const char* path) {
@@ -289,13 +310,16 @@ constexpr const char* traceFileName(const char* path) {
 
 /** @name The value of a VARIABLE trace: 32 bits for a number, a `bool` or an enumeration, else a text. */
 /** @{ */
+/** The lower 32 bits of a number. */
 template <class Number, std::enable_if_t<std::is_integral_v<Number> || std::is_enum_v<Number>, int> = 0>
 constexpr unsigned int traceValue(Number value) {
     return static_cast<unsigned int>(value);
 }
+/** A C text. */
 constexpr const char* traceValue(const char* value) {
     return value;
 }
+/** A text, as far as its first NUL. */
 inline const char* traceValue(const std::string& value) {
     return value.c_str();
 }
@@ -322,17 +346,17 @@ inline const char* traceValue(const std::string& value) {
     } while (false)
 
 /** A trace point with parameter list. Used by the macros below alone. */
-#define TK_TRACE_PARAMETERS_(category, insertions, type)                                               \
-    do {                                                                                               \
-        constexpr const char* tkTraceFile = ::TK::traceFileName(__FILE__);                             \
-        ::HVLog::HVMessageBuffer tkTraceParameters;                                                    \
-        ::HVLog::HVMessageBuffer tkTraceMessage;                                                       \
-        TK_TRACE_POINT_(                                                                               \
-            category, ::TK::parametersLevelCode,                                                       \
-            ::TK::tracepara(                                                                           \
-                __func__, tkTraceFile, __LINE__,                                                       \
-                tkTraceParameters.str(::TK::TraceParameters(tkTraceParameters) << insertions).c_str(), \
-                type));                                                                                \
+#define TK_TRACE_PARAMETERS_(category, insertions, type)                                                    \
+    do {                                                                                                    \
+        constexpr const char* tkTraceFile = ::TK::traceFileName(__FILE__);                                  \
+        ::HVLog::HVMessageBuffer tkTraceParameters;                                                         \
+        ::HVLog::HVMessageBuffer tkTraceMessage;                                                            \
+        TK_TRACE_POINT_(                                                                                    \
+            category, ::TK::parametersLevelCode,                                                            \
+            ::TK::tracepara(                                                                                \
+                __func__, tkTraceFile, __LINE__,                                                            \
+                ::TK::traceList(tkTraceParameters, ::TK::TraceParameters(tkTraceParameters) << insertions), \
+                type));                                                                                     \
     } while (false)
 
 /**

@@ -27,7 +27,7 @@
 
 namespace TK {
 
-/** A family of static operations; see the top of this file. */
+/** A family of static operations; the top of Utility.h tells what holds for all of them. */
 class TK_EXPORT CUtility {
 public:
     CUtility() = delete;

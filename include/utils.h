@@ -31,7 +31,8 @@ namespace TK {
  * it. */
 extern TK_EXPORT Mutex _fileMutex;
 
-/** A family of static operations; see the top of this file. No object of it is ever needed. */
+/** A family of static operations; the top of utils.h tells what holds for all of them. No object of it is
+ * ever needed. */
 class TK_EXPORT Utils {
 public:
     Utils();
@@ -74,7 +75,7 @@ public:
      */
     static std::string stripSpaces(std::string text);
 
-    /** @return `count` characters "0". @throws std::bad_alloc */
+    /** As many characters "0" as are asked for. @throws std::bad_alloc */
     static std::string addZero(unsigned char count);
     /** @} */
 
@@ -113,11 +114,14 @@ public:
      * @throws std::bad_alloc, and what the file throws
      */
     /** @{ */
+    /** The text. */
     static void WriteStringToFile(TK::PropertyFile& file, const std::string& key, const std::string& value);
+    /** The number. */
     static void WriteUint8ToFile(TK::PropertyFile& file, const std::string& key, unsigned char value);
     /** Written as a signed number, so that 4,294,967,295 is stored as -1; ReadUint32FromFile reads it back.
      */
     static void WriteUint32ToFile(TK::PropertyFile& file, const std::string& key, unsigned int value);
+    /** The date, as TK::DateTime's text. */
     static void WriteDateToFile(TK::PropertyFile& file, const std::string& key, const TK::DateTime& value);
     /** @} */
 };

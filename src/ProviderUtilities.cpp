@@ -404,8 +404,9 @@ public:
     ArrayFilling(const CMPIBroker* broker, std::size_t size, CMPIType elementType)
         : broker_(broker), size_(static_cast<CMPICount>(size)), elementType_(elementType) {
         if (size_ != 0) {
-            CMPIArray* const array = cmpi::newArray(broker, size_, elementType, status_);
-            array_ = cmpi::failed(status_) ? nullptr : array;
+            CMPIStatus status;
+            CMPIArray* const array = cmpi::newArray(broker, size_, elementType, status);
+            array_ = cmpi::failed(status) ? nullptr : array;
         }
     }
 
@@ -422,8 +423,9 @@ public:
 
     // A string that the broker does not make ends the filling like an element that it does not take.
     CMPIString* newString(const std::string& text) {
-        CMPIString* const string = cmpi::newString(broker_, text.c_str(), status_);
-        return cmpi::failed(status_) ? nullptr : string;
+        CMPIStatus status;
+        CMPIString* const string = cmpi::newString(broker_, text.c_str(), status);
+        return cmpi::failed(status) ? nullptr : string;
     }
     void put(CMPIString* string) {
         refused_ = string == nullptr;
@@ -446,14 +448,12 @@ public:
 
 private:
     void putValue(CMPIValue& value) {
-        status_ = cmpi::setElementAt(array_, next_++, &value, elementType_);
-        refused_ = cmpi::failed(status_);
+        refused_ = cmpi::failed(cmpi::setElementAt(array_, next_++, &value, elementType_));
     }
 
     const CMPIBroker* broker_;
     CMPICount size_;
     CMPIType elementType_;
-    CMPIStatus status_{};
     CMPIArray* array_ = nullptr;
     CMPICount next_ = 0;
     bool refused_ = false;
@@ -588,24 +588,86 @@ wchar_t lowerCase(wchar_t c) {
     return code <= 0xFF ? static_cast<wchar_t>(std::tolower(static_cast<int>(code))) : c;
 }
 
-// Whether a text holds any of the entries, found without folding the text and without looking for all of
-// them: the two words end with a point, and every other entry is one of five symbols or holds one. Only
-// letters have a case, so that symbols can be looked for in the text as it is.
-template <class Char>
-bool holdsDenied(std::basic_string_view<Char> text) {
-    constexpr std::array<Char, 5> symbols = {'<', '%', '$', '\\', ':'};
-    const auto holds = [text](Char symbol) { return text.find(symbol) != text.npos; };
-    if (std::any_of(symbols.begin(), symbols.end(), holds)) {
-        return true;
-    }
-    for (std::size_t point = text.find('.'); point != text.npos; point = text.find('.', point + 1)) {
-        if (point >= 3 && lowerCase(text[point - 3]) == 'w') {
-            const Char second = lowerCase(text[point - 2]);
-            const Char third = lowerCase(text[point - 1]);
+// A word of the list ends with a point, behind one of two letters.
+constexpr std::size_t wordLength = 4;
+
+// Whether a word ends in a text at a position from `first` on.
+bool endsWord(std::string_view text, std::size_t first) {
+    for (std::size_t point = text.find('.', first); point != text.npos; point = text.find('.', point + 1)) {
+        if (point >= wordLength - 1 && lowerCase(text[point - 3]) == 'w') {
+            const char second = lowerCase(text[point - 2]);
+            const char third = lowerCase(text[point - 1]);
             if ((second == 'w' && third == 'w') || (second == 'a' && third == 'p')) {
                 return true;
             }
         }
+    }
+    return false;
+}
+
+// Whether a word may end in a block of a text, which is not the text's beginning. There is no branch in it,
+// so that compilers look at many characters at once: texts of many sentences have many points, but few behind
+// these letters. No locale folds another character to one of them.
+constexpr std::size_t blockSize = 4096;
+bool mayEndWord(const char* block) {
+    char found = 0;
+    for (std::size_t i = 0; i < blockSize; ++i) {
+        const char before = static_cast<char>(block[i - 1] | 0x20);
+        found = static_cast<char>(found | ((block[i] == '.') & ((before == 'w') | (before == 'p'))));
+    }
+    return found != 0;
+}
+
+// Whether a text holds any of the entries, found without folding it and without looking for all of them:
+// every entry but the two words is one of five symbols or holds one. Only letters have a case, so that
+// symbols can be looked for in the text as it is.
+bool holdsDenied(std::string_view text) {
+    constexpr std::string_view symbols = "<%$\\:";
+    const auto holds = [text](char symbol) { return text.find(symbol) != text.npos; };
+    if (std::any_of(symbols.begin(), symbols.end(), holds)) {
+        return true;
+    }
+    std::size_t position = 1;
+    for (; position + blockSize <= text.size(); position += blockSize) {
+        if (mayEndWord(text.data() + position) && endsWord(text.substr(0, position + blockSize), position)) {
+            return true;
+        }
+    }
+    return endsWord(text, position);
+}
+
+// A byte for each wide character: NUL, which no entry holds, for those above U+00FF. Negative ones, which are
+// no characters, would need a second comparison for each; they are looked for all together.
+void makeNarrow(std::wstring_view text, char* narrow) {
+    std::int32_t all = 0;
+    for (std::size_t i = 0; i < text.size(); ++i) {
+        const auto code = static_cast<std::int32_t>(text[i]);
+        all |= code;
+        narrow[i] = static_cast<char>(code <= 0xFF ? code : 0);
+    }
+    if (all < 0) {
+        std::transform(text.begin(), text.end(), narrow, [](wchar_t c) {
+            const auto code = static_cast<std::int32_t>(c);
+            return static_cast<char>(code >= 0 && code <= 0xFF ? code : 0);
+        });
+    }
+}
+
+// The same for wide text, block by block. Each begins with the end of the one before, where a word may have
+// begun.
+bool holdsDenied(std::wstring_view text) {
+    std::array<char, wordLength - 1 + blockSize> block{};
+    std::size_t kept = 0;
+    while (!text.empty()) {
+        const std::size_t size = std::min(text.size(), blockSize);
+        makeNarrow(text.substr(0, size), block.data() + kept);
+        const std::string_view narrow(block.data(), kept + size);
+        if (holdsDenied(narrow)) {
+            return true;
+        }
+        kept = std::min(narrow.size(), wordLength - 1);
+        std::copy_n(narrow.end() - kept, kept, block.begin());
+        text.remove_prefix(size);
     }
     return false;
 }
@@ -615,7 +677,7 @@ bool isAcceptable(std::basic_string<Char>& text, const std::basic_string<Char>& 
                   const std::array<std::basic_string_view<Char>, size>& entries) {
     const auto end = std::find(entries.begin(), entries.end(), exemption);
     if (end == entries.end()) {
-        return !holdsDenied<Char>(text);
+        return !holdsDenied(std::basic_string_view<Char>(text));
     }
     std::transform(text.begin(), text.end(), text.begin(), [](Char c) { return lowerCase(c); });
     return std::none_of(entries.begin(), end, [&text](std::basic_string_view<Char> entry) {

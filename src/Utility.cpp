@@ -3,6 +3,7 @@
 #include "Trace.h"
 
 #include <array>
+#include <climits>
 #include <cstdlib>
 #include <cstring>
 #include <cwchar>
@@ -34,7 +35,8 @@ bool convert(const std::string& in, std::wstring& out) {
 // found no room for a whole character. The state is our own, because the one behind a null pointer belongs to
 // all threads of the process.
 bool convert(const std::wstring& in, std::string& out) {
-    std::array<char, 4096> block; // NOLINT(cppcoreguidelines-pro-type-member-init): the C library fills it
+    std::array<char, 4096 + MB_LEN_MAX>
+        block; // NOLINT(cppcoreguidelines-pro-type-member-init): the C library fills it
     std::mbstate_t state{};
     const wchar_t* rest = in.c_str();
     while (rest != nullptr) {

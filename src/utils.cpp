@@ -9,7 +9,9 @@
 #include <charconv>
 #include <cstddef>
 #include <cstdlib>
+#include <cstring>
 #include <limits>
+#include <system_error>
 
 namespace TK {
 
@@ -47,9 +49,18 @@ constexpr int minutesPerHour = 60;
 // begins.
 template <class Number>
 Number read(const std::string& text, Field field) {
-    std::array<char, millisecondField.width + 1> digits{};
-    text.copy(digits.data(), field.width, field.position);
-    return static_cast<Number>(std::strtol(digits.data(), nullptr, 10));
+    std::array<char, millisecondField.width + 1> characters{};
+    const std::size_t size = text.copy(characters.data(), field.width, field.position);
+    // Most fields are digits alone; what else there may be in one, strtol knows.
+    long number = 0;
+    for (std::size_t i = 0; i < size; ++i) {
+        if (characters[i] < '0' || characters[i] > '9') {
+            number = std::strtol(characters.data(), nullptr, 10);
+            break;
+        }
+        number = number * 10 + (characters[i] - '0');
+    }
+    return static_cast<Number>(number);
 }
 
 template <class Number>
@@ -142,8 +153,8 @@ void writeText(TK::PropertyFile& file, const std::string& key, const std::string
     file.setEntry(make_wstring(key), wideValue);
 }
 
-// strtoul of a system whose unsigned long has 32 bits. Wider, it would not notice that a number is too large,
-// and would negate more bits than there are.
+// strtoul of a system whose unsigned long has 32 bits: a wider one does not notice that a number is too
+// large, and negates more bits than there are.
 unsigned int toUint32(const char* text) {
     while (std::isspace(static_cast<unsigned char>(*text)) != 0) {
         ++text;
@@ -153,13 +164,12 @@ unsigned int toUint32(const char* text) {
         ++text;
     }
     if (std::isdigit(static_cast<unsigned char>(*text)) == 0) {
-        return 0; // the wide one would skip blanks and take a sign here once more
+        return 0;
     }
-    const unsigned long long magnitude = std::strtoull(text, nullptr, 10);
-    if (magnitude > std::numeric_limits<unsigned int>::max()) {
+    unsigned int number = 0;
+    if (std::from_chars(text, text + std::strlen(text), number).ec != std::errc()) {
         return std::numeric_limits<unsigned int>::max();
     }
-    const auto number = static_cast<unsigned int>(magnitude);
     return negative ? 0U - number : number;
 }
 

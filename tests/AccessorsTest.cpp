@@ -255,7 +255,7 @@ TEST_F(Accessors, DoNotTakeAValueThatComesWithAnError) {
     static CMPIString* name = nullptr;
     name = data.value.string;
     CMPIObjectPathFT table = *path_->ft;
-    table.getClassName = [](const CMPIObjectPath* /*path*/, CMPIStatus* status) {
+    table.getClassName = [](auto* /*path*/, CMPIStatus* status) {
         *status = {CMPI_RC_ERR_FAILED, nullptr};
         return name;
     };

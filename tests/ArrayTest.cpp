@@ -18,6 +18,8 @@ std::vector<oxahv::Fault> failuresAt(unsigned int call) {
 
 class Arrays : public BrokerTest {
 protected:
+    const ThreadLocale plain_{"C"};
+
     // The property's elements, those that are NULL as "-"; "none" when there is no array of that type.
     Strings elements(CMPIType elementType) {
         const CMPIData data = CMGetProperty(instance_, "Name", nullptr);

@@ -1,4 +1,6 @@
 // Requests through the broker: providers, faults, records, modes, threads.
+#include "TestLocales.h"
+
 #include "EmbeddedBroker.h"
 
 #include <atomic>
@@ -659,4 +661,7 @@ TEST(TheTexts, NameCodesAndValues) {
     EXPECT_EQ(oxahv::valueText({CMPI_real64, 0, value}), "1.0e+300");
     value.real32 = -3;
     EXPECT_EQ(oxahv::valueText({CMPI_real32, 0, value}), "-3.0");
+    value.real64 = 0.1;
+    const ThreadLocale german("de_DE.ISO-8859-1"); // which writes 0,1
+    EXPECT_EQ(oxahv::valueText({CMPI_real64, 0, value}), "0.1");
 }

@@ -52,9 +52,10 @@ public:
     CMPIString* handle() { return &string_; }
 
 private:
-    template <class Chars>
-    void setGetter(Chars* (*CMPIStringFT::*getter)(const CMPIString*, CMPIStatus*)) {
-        table_.*getter = [](const CMPIString* /*string*/, CMPIStatus* status) -> Chars* {
+    // The headers of CIM servers differ in what is const.
+    template <class Chars, class Handle>
+    void setGetter(Chars* (*CMPIStringFT::*getter)(Handle*, CMPIStatus*)) {
+        table_.*getter = [](Handle* /*string*/, CMPIStatus* status) -> Chars* {
             static char characters[] = "characters";
             *status = {CMPI_RC_ERR_FAILED, nullptr};
             return characters;

@@ -157,7 +157,7 @@ TEST_F(ClassRegistry, TakesANameThatCameWithAnError) {
     static StringWithAnError name(CMNewString(broker_.handle(), "text", nullptr));
     const CMPIObjectPath* const real = request_.objectPath("root/cimv2", "OXATK_Fan");
     CMPIObjectPathFT table = *real->ft;
-    table.getClassName = [](const CMPIObjectPath* /*path*/, CMPIStatus* status) {
+    table.getClassName = [](auto* /*path*/, CMPIStatus* status) {
         *status = {CMPI_RC_OK, nullptr};
         return name.handle();
     };

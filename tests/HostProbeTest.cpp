@@ -96,6 +96,7 @@ TEST(TheHost, OffersVirtualMachinesWithADeviceAndWithoutTheServer) {
 
 TEST(LocalisedTexts, AreInTheLanguageAndTheEncodingOfTheThread) {
     ::unsetenv("LANGUAGE");
+    const ThreadLocale plain("C");
     const std::wstring key = L"The asset tag holds characters that are not allowed.";
     EXPECT_STREQ(ProviderUtilities::getNLSText(key), "The asset tag holds characters that are not allowed.");
     {

@@ -44,6 +44,7 @@ const char* const detailsPath = "root/cimv2:OXATK_AssetIDDetails.InstanceID=\"OX
 class TheHostProvider : public testing::Test {
 public:
     TheHostProvider() {
+        std::setlocale(LC_MESSAGES, "C"); // whatever the environment's language: texts are compared
         write("/proc/sys/kernel/hostname", "machine");
         write("/proc/sys/kernel/osrelease", "6.1.0-test");
         write("/proc/stat", "cpu 1 2\nbtime 1700000000\nprocesses 1");
@@ -240,7 +241,7 @@ TEST_F(TheHostProvider, ReadsNumberKeysOfEveryUnsignedWidth) {
 }
 
 TEST_F(TheHostProvider, LeavesTheServersLocaleAsItIs) {
-    ASSERT_STREQ(std::setlocale(LC_CTYPE, nullptr), "C");
+    const std::string before = std::setlocale(LC_ALL, nullptr);
     ASSERT_EQ(::uselocale(nullptr), LC_GLOBAL_LOCALE);
     broker_.setKeyMode(KeyMode::untyped);
     EXPECT_NE(textOf(request_.getInstance(path(osPath))).find("Caption=\"Prüf-OS \\\\ 1 €\""),
@@ -254,6 +255,7 @@ TEST_F(TheHostProvider, LeavesTheServersLocaleAsItIs) {
     EXPECT_EQ(setTag("ä"), "0");
     EXPECT_EQ(::uselocale(LC_GLOBAL_LOCALE), own);
     ::freelocale(own);
+    EXPECT_EQ(std::setlocale(LC_ALL, nullptr), before);
 }
 
 TEST_F(TheHostProvider, LeadsFromOneSideOfTheAssociationToTheOther) {

@@ -26,8 +26,11 @@ const std::wstring german = L"Das Inventarkennzeichen enth\u00E4lt unzul\u00E4ss
 } // namespace
 
 TEST(TheLanguage, IsThatOfTheThreadsMessages) {
-    EXPECT_EQ(Locale::getLanguageId(), "en");
-    EXPECT_EQ(localised(english), english);
+    {
+        const ThreadLocale locale("C");
+        EXPECT_EQ(Locale::getLanguageId(), "en");
+        EXPECT_EQ(localised(english), english);
+    }
     {
         const ThreadLocale locale("de_DE.UTF-8");
         EXPECT_EQ(Locale::getLanguageId(), "de_DE");

@@ -1,4 +1,6 @@
 // Classes from MOF: every construct of the language, the errors, and texts that are damaged.
+#include "TestLocales.h"
+
 #include "EmbeddedBroker.h"
 
 #include <algorithm>
@@ -221,6 +223,7 @@ TEST(Mof, HasErrorsWithTheirPlaces) {
 }
 
 TEST(Mof, HasErrorsOfFilesWhereTheyAreIncluded) {
+    const ThreadLocale english("C"); // the system's words for its errors
     EmbeddedBroker broker;
     const auto errorOfFile = [&](const std::string& file) {
         return errorOf([&] { broker.compileMof(folder + file); });

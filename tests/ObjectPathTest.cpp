@@ -223,12 +223,11 @@ public:
         count_ = count;
         type_ = type;
         code_ = code;
-        table_.getKeyCount = [](const CMPIObjectPath* /*path*/, CMPIStatus* status) {
+        table_.getKeyCount = [](auto* /*path*/, CMPIStatus* status) {
             *status = {CMPI_RC_OK, nullptr};
             return count_;
         };
-        table_.getKeyAt = [](const CMPIObjectPath* /*path*/, CMPICount /*index*/, CMPIString** keyName,
-                             CMPIStatus* status) {
+        table_.getKeyAt = [](auto* /*path*/, CMPICount /*index*/, CMPIString** keyName, CMPIStatus* status) {
             *status = {code_, nullptr};
             *keyName = name_;
             CMPIData data = {};

@@ -218,6 +218,7 @@ TEST_F(APropertyFile, KeepsWhatAChangeDoesNotTouch) {
         {"", set(L"\uFEFF#", L"\t= a\tb\x1B "), "\\u{feff}\\#=\\t= a\\tb\\u{1b}\\s\n"},
         {"a =", set(L"a", L"= #"), "a == #"},
         {"a=x\r\r\n\r\n", set(L"b", L"1"), "a=x\r\r\n\r\nb=1\r\n"},
+        {"a=x\r", set(L"b", L"1"), "a=x\r\r\nb=1\n"},
     };
     for (const auto& row : rows) {
         EXPECT_EQ(changed(row.before, row.change), row.after);

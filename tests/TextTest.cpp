@@ -1,5 +1,6 @@
 // Texts: what the accessors do at each step that can fail, and which texts of users are refused.
 #include "BrokerTest.h"
+#include "Obvious.h"
 #include "TestLocales.h"
 
 #include <algorithm>
@@ -35,6 +36,8 @@ protected:
         CMAddArg(args_, "Null", nullptr, CMPI_string);
         store("text");
     }
+
+    const ThreadLocale plain_{"C"};
 
     void store(const char* text) {
         CMSetProperty(instance_, "Name", text, CMPI_chars);
@@ -152,7 +155,7 @@ TEST_F(Texts, OfDatesAreReadWhenThereIsOne) {
     text = CMNewString(broker_.handle(), "20090307050409.000123-300", nullptr);
     CMPIDateTime date = *CMNewDateTime(broker_.handle(), nullptr);
     CMPIDateTimeFT table = *date.ft;
-    table.getStringFormat = [](const CMPIDateTime* /*date*/, CMPIStatus* status) {
+    table.getStringFormat = [](auto* /*dateTime*/, CMPIStatus* status) {
         *status = {CMPI_RC_ERR_FAILED, nullptr};
         return text;
     };
@@ -299,30 +302,9 @@ TEST_F(Texts, AreConvertedUnlessEmpty) {
 
 namespace {
 
-const std::array<std::string, 12> entries = {"<",    "http:", "https:", "%",     "$", "\\\\",
-                                             "www.", "wap.",  "ftp:",   "sftp:", ":", "\\"};
-
-template <class Char>
-std::basic_string<Char> widened(const std::string& text) {
-    return {text.begin(), text.end()};
-}
-
-// The screen, the obvious way.
-template <class Char>
-bool isAcceptable(std::basic_string<Char> text, const std::basic_string<Char>& exemption) {
-    for (Char& character : text) {
-        character = character >= 'A' && character <= 'Z' ? static_cast<Char>(character + 32) : character;
-    }
-    for (const std::string& entry : entries) {
-        if (exemption == widened<Char>(entry)) {
-            return true;
-        }
-        if (text.find(widened<Char>(entry)) != std::basic_string<Char>::npos) {
-            return false;
-        }
-    }
-    return true;
-}
+using obvious::entries;
+using obvious::isAcceptable;
+using obvious::widened;
 
 // Random texts over an alphabet, with every exemption and some that are none.
 template <class Char>
@@ -405,4 +387,36 @@ TEST_F(Texts, OfUsersAreScreened) {
     EXPECT_GT(foldings, 100000);
     EXPECT_EQ(strayFoldings, 0);
     EXPECT_TRUE(takeTraces().empty());
+}
+
+// Long texts are looked through block by block: an entry is found wherever it stands, across the blocks'
+// edges too.
+TEST_F(Texts, OfUsersAreScreenedAtAnyLength) {
+    constexpr std::size_t length = 3 * 4096 + 100;
+    const std::string clean = [] {
+        std::string text;
+        while (text.size() < length) {
+            text += "Row w. Rack p. App. aap. wwp. waw. wa. ww ";
+        }
+        text.resize(length);
+        return text;
+    }();
+    const auto accepted = [](const std::string& text) {
+        const bool narrow = ProviderUtilities::ValidateInput(text, "");
+        EXPECT_EQ(ProviderUtilities::ValidateInput(widened<wchar_t>(text), L""), narrow);
+        return narrow;
+    };
+    EXPECT_TRUE(accepted(clean));
+    for (const std::string entry : {"www.", "WaP.", "wWW.", "<", ":"}) {
+        for (std::size_t block = 0; block <= 3; ++block) {
+            for (std::size_t i = 0; i < 20; ++i) {
+                const std::size_t position =
+                    std::min(block * 4096 + i, length) - std::min<std::size_t>(block * 4096, 10);
+                EXPECT_FALSE(accepted(std::string(clean).replace(position, entry.size(), entry)))
+                    << entry << " at " << position;
+            }
+        }
+        EXPECT_FALSE(accepted(std::string(clean).replace(length - entry.size(), entry.size(), entry)))
+            << entry;
+    }
 }

@@ -81,6 +81,8 @@ private:
 class ATextConversion : public testing::Test {
 protected:
     ATextConversion() { forgetLoggerCalls(); }
+
+    const ThreadLocale plain_{"C"};
 };
 
 } // namespace

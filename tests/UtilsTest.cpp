@@ -2,6 +2,7 @@
 #include "utils.h"
 
 #include "LoggerCalls.h"
+#include "Obvious.h"
 #include "TestLocales.h"
 
 #include <cstdio>
@@ -19,59 +20,9 @@ using TK::Utils;
 
 namespace {
 
-DateTime date(unsigned short year, unsigned char month, unsigned char day, unsigned char hour,
-              unsigned char minute, unsigned char second, unsigned int millisecond, short offset) {
-    DateTime result;
-    result.setYear(year);
-    result.setMonth(month);
-    result.setDay(day);
-    result.setHour(hour);
-    result.setMinute(minute);
-    result.setSecond(second);
-    result.setMillisecond(millisecond);
-    result.setOffset(offset);
-    return result;
-}
-
-// The number at the beginning of some characters, as the C standard words strtol, written out.
-long numberIn(const std::string& characters) {
-    std::size_t i = 0;
-    while (i < characters.size() &&
-           (characters[i] == ' ' || (characters[i] >= '\t' && characters[i] <= '\r'))) {
-        ++i;
-    }
-    const bool negative = i < characters.size() && characters[i] == '-';
-    i += negative || (i < characters.size() && characters[i] == '+') ? 1 : 0;
-    long number = 0;
-    for (; i < characters.size() && characters[i] >= '0' && characters[i] <= '9'; ++i) {
-        number = number * 10 + (characters[i] - '0');
-    }
-    return negative ? -number : number;
-}
-
-// What a CIM text of 21 characters and more stands for.
-DateTime parsed(const std::string& text) {
-    const auto field = [&text](std::size_t position, std::size_t width) {
-        return numberIn(text.substr(position, width));
-    };
-    const auto year = static_cast<unsigned short>(field(0, 4));
-    const auto month = static_cast<unsigned char>(field(4, 2));
-    const auto day = static_cast<unsigned char>(field(6, 2));
-    return date(year != 0 ? year : 1970, month != 0 ? month : 1, day != 0 ? day : 1,
-                static_cast<unsigned char>(field(8, 2)), static_cast<unsigned char>(field(10, 2)),
-                static_cast<unsigned char>(field(12, 2)), static_cast<unsigned int>(field(15, 6)),
-                static_cast<short>(field(21, 4)));
-}
-
-std::string formatted(const DateTime& value) {
-    const int minutes = value.getOffset() * 60;
-    char text[64];
-    std::snprintf(text, sizeof text, "%04d%02d%02d%02d%02d%02d.%06u%c%03d",
-                  value.getYear() != 0 ? value.getYear() : 1970, value.getMonth() != 0 ? value.getMonth() : 1,
-                  value.getDay() != 0 ? value.getDay() : 1, value.getHour(), value.getMinute(),
-                  value.getSecond(), value.getMillisecond(), minutes < 0 ? '-' : '+', std::abs(minutes));
-    return text;
-}
+using obvious::date;
+using obvious::formatted;
+using obvious::parsed;
 
 class CimDates : public testing::Test {
 protected:

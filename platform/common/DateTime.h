@@ -48,26 +48,39 @@ public:
     operator std::string() const; // NOLINT(google-explicit-constructor,hicpp-explicit-conversions): callers
                                   // assign dates to texts
 
-    /** @name Fields
-     * The offset is the local time's distance from UTC in minutes; what the other numbers mean, their names
-     * say.
-     */
+    /** @name Fields */
     /** @{ */
+    /** The year. */
     unsigned short getYear() const;
+    /** The month, January being 1. */
     unsigned char getMonth() const;
+    /** The day of the month, from 1. */
     unsigned char getDay() const;
+    /** The hour, from 0. */
     unsigned char getHour() const;
+    /** The minute, from 0. */
     unsigned char getMinute() const;
+    /** The second, from 0. */
     unsigned char getSecond() const;
+    /** The millisecond, from 0. */
     unsigned int getMillisecond() const;
+    /** The local time's distance from UTC in minutes. */
     short getOffset() const;
+    /** Sets it. */
     void setYear(unsigned short year);
+    /** Sets it. */
     void setMonth(unsigned char month);
+    /** Sets it. */
     void setDay(unsigned char day);
+    /** Sets it. */
     void setHour(unsigned char hour);
+    /** Sets it. */
     void setMinute(unsigned char minute);
+    /** Sets it. */
     void setSecond(unsigned char second);
+    /** Sets it. */
     void setMillisecond(unsigned int millisecond);
+    /** Sets it. */
     void setOffset(short offset);
     /** @} */
 
@@ -86,7 +99,9 @@ private:
  * Two dates are equal when their eight fields are: one point in time written with two offsets is two dates.
  */
 /** @{ */
+/** Whether all fields are equal. */
 TK_EXPORT bool operator==(const DateTime& left, const DateTime& right);
+/** Whether a field differs. */
 TK_EXPORT bool operator!=(const DateTime& left, const DateTime& right);
 /** @} */
 

@@ -108,8 +108,12 @@ std::string PropertyFile::bytes() const {
     std::string bytes = content_.mark;
     for (const Line& line : content_.lines) {
         bytes += line.text;
-        // A last line without end needs one when it is the last no more.
-        bytes += line.end.empty() && &line != &content_.lines.back() ? lineEnd() : line.end;
+        bytes += line.end;
+        // A last line without end needs one when it is the last no more; a carriage return in its place must
+        // not become half of it.
+        if (line.end.empty() && &line != &content_.lines.back()) {
+            bytes += !line.text.empty() && line.text.back() == '\r' ? "\r\n" : lineEnd();
+        }
     }
     return bytes;
 }

@@ -1,5 +1,6 @@
 #include "StringConversion.h"
 
+#include <algorithm>
 #include <array>
 #include <climits>
 #include <cwchar>
@@ -34,6 +35,13 @@ bool isAscii(wchar_t character) {
     return character >= 0 && character < 0x80;
 }
 
+// The part of a text, most often all of it, that needs no conversion.
+template <class Text>
+std::size_t plainSize(const Text& text, bool plain) {
+    const auto end = plain ? std::find_if_not(text.begin(), text.end(), isAscii) : text.begin();
+    return static_cast<std::size_t>(end - text.begin());
+}
+
 } // namespace
 
 // Both directions convert the terminating NUL too: it brings a stateful encoding back to its initial state
@@ -41,11 +49,15 @@ bool isAscii(wchar_t character) {
 
 std::string make_string(const std::wstring& text) {
     const bool plain = asciiIsPlain();
-    std::string result;
+    const std::size_t start = plainSize(text, plain);
+    std::string result(text.data(), text.data() + start);
+    if (start == text.size()) {
+        return result;
+    }
     result.reserve(text.size() + 1);
     std::array<char, MB_LEN_MAX> bytes{};
     std::mbstate_t state{};
-    for (std::size_t i = 0; i <= text.size(); ++i) {
+    for (std::size_t i = start; i <= text.size(); ++i) {
         if (plain && isAscii(text[i])) {
             result += static_cast<char>(text[i]);
             continue;
@@ -72,11 +84,15 @@ std::string make_string(const char* text) {
 
 std::wstring make_wstring(const std::string& text) {
     const bool plain = asciiIsPlain();
-    std::wstring result;
+    const std::size_t start = plainSize(text, plain);
+    std::wstring result(text.data(), text.data() + start);
+    if (start == text.size()) {
+        return result;
+    }
     result.reserve(text.size() + 1);
     const char* const end = text.data() + text.size() + 1;
     std::mbstate_t state{};
-    for (const char* position = text.data(); position != end;) {
+    for (const char* position = text.data() + start; position != end;) {
         if (plain && isAscii(static_cast<unsigned char>(*position))) {
             result += static_cast<wchar_t>(*position++);
             continue;

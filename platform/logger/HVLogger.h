@@ -36,13 +36,13 @@ enum class Channel {
 
 /** One message as a sink sees it. What it points to is valid while the sink runs. */
 struct Message {
-    Channel channel;
-    const char* function; ///< the function's name; may be null
-    const char* file;     ///< the source file's name, without directories; may be null
-    int line;
-    const std::string& category;
-    int level; ///< the level code
-    const std::string& text;
+    Channel channel;             ///< the way that it came
+    const char* function;        ///< the function's name; may be null
+    const char* file;            ///< the source file's name, without directories; may be null
+    int line;                    ///< the line in it
+    const std::string& category; ///< the name of the channel, such as "Hovara.Utils"
+    int level;                   ///< the level code
+    const std::string& text;     ///< the message
 };
 
 /** The logger. All members are static. */
@@ -65,9 +65,11 @@ public:
      * @throws what the sink throws.
      */
     /** @{ */
+    /** On Channel::log. */
     static void logLevelMessage(const char* function, const char* file, int line, const std::string& category,
                                 int level, char* reserved, int reserved1, int reserved2,
                                 const std::string& text);
+    /** On Channel::trace. */
     static void traceLevelMessage(const char* function, const char* file, int line,
                                   const std::string& category, int level, char* reserved, int reserved1,
                                   int reserved2, const std::string& text);
@@ -78,7 +80,8 @@ public:
      * return. Not to be called from a sink.
      */
     /** @{ */
-    /** @param sink called for each message; an empty function switches logging off. */
+    /** Hands messages to a function. @param sink called for each message; an empty function switches logging
+     * off. */
     static void setSink(std::function<void(const Message&)> sink);
     /** Writes a line per message to the standard error stream. */
     static void setStderrSink();

@@ -54,7 +54,9 @@ public:
      * @throws std::bad_alloc also when memory ran out while the text was written through the stream.
      */
     /** @{ */
+    /** After a last insertion that was a C string. */
     const std::string& str(HVMessageBuffer& inserted);
+    /** After any other last insertion. */
     const std::string& str(std::ostream& inserted);
     /** @} */
 

@@ -1,0 +1,34 @@
+// MOF texts: what compiles, compiles again to the same answer; what does not is refused with the place of the
+// error.
+#include "Fuzz.h"
+
+#include "EmbeddedBroker.h"
+
+namespace {
+
+// What a text is answered with: nothing, or the error. Files that it includes are not to be found.
+std::string compiled(const std::string& text) {
+    oxahv::EmbeddedBroker broker;
+    try {
+        broker.compileMofText(text, "/nowhere/text.mof");
+    } catch (const oxahv::BrokerError& error) {
+        return error.what();
+    }
+    return "";
+}
+
+} // namespace
+
+extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
+    fuzz::Input input(data, size);
+    const std::string text = input.rest();
+    const std::string error = compiled(text);
+    FUZZ_REQUIRE(compiled(text) == error);
+    if (!error.empty()) {
+        int line = 0;
+        int column = 0;
+        FUZZ_REQUIRE(std::sscanf(error.c_str(), "/nowhere/text.mof:%d:%d: ", &line, &column) == 2);
+        FUZZ_REQUIRE(line > 0 && column > 0);
+    }
+    return 0;
+}
