@@ -7,6 +7,7 @@
 
 #include <iostream>
 #include <sstream>
+#include <stdexcept>
 #include <string>
 
 namespace {
@@ -172,7 +173,8 @@ void addCheck(CLI::App& app, CheckOptions& options) {
     command->group("Verbs");
 }
 
-int parseAndRun(CLI::App& app, int argc, char** argv) {
+int parseAndRun(int argc, char** argv) {
+    CLI::App app("Loads a CMPI provider and sends it a request, as a CIM server would.", "oxahv-provider");
     Options options;
     Words words;
     Operands operands;
@@ -186,7 +188,13 @@ int parseAndRun(CLI::App& app, int argc, char** argv) {
     app.get_formatter()->label("SUBCOMMAND", "VERB");
     app.require_subcommand(1);
     app.footer(footer);
-    app.parse(argc, argv);
+    try {
+        app.parse(argc, argv);
+    } catch (const CLI::Success& help) { // or the version
+        return app.exit(help);
+    } catch (const CLI::ParseError& error) {
+        throw std::runtime_error(std::string(error.what()) + "; oxahv-provider --help shows the usage");
+    }
     words.putInto(options);
     if (app.got_subcommand("check")) {
         return runCheck(options, checkOptions);
@@ -202,14 +210,8 @@ int parseAndRun(CLI::App& app, int argc, char** argv) {
 } // namespace
 
 int main(int argc, char** argv) {
-    CLI::App app("Loads a CMPI provider and sends it a request, as a CIM server would.", "oxahv-provider");
     try {
-        return parseAndRun(app, argc, argv);
-    } catch (const CLI::Success& help) { // or the version
-        return app.exit(help);
-    } catch (const CLI::ParseError& error) {
-        std::cerr << "oxahv-provider: " << error.what() << "; oxahv-provider --help shows the usage\n";
-        return usageFailed;
+        return parseAndRun(argc, argv);
     } catch (const std::exception& exception) {
         std::cerr << "oxahv-provider: " << exception.what() << '\n';
         return usageFailed;

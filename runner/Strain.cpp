@@ -88,6 +88,7 @@ Answers askAll(Client& client, const std::vector<Query>& queries) {
 std::vector<Answers> askAtOnce(Client& client, const std::vector<Query>& queries) {
     std::vector<Answers> all(client.task().threads);
     std::vector<std::thread> threads;
+    threads.reserve(all.size());
     for (Answers& answers : all) {
         threads.emplace_back([&] { answers = askAll(client, queries); });
     }

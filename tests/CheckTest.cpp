@@ -266,7 +266,7 @@ TEST(Completion, OffersVerbsClassesAndValues) {
         {"--mof " MOF_FOLDER "/OXAHost.mof check --class OXATK_R", {"OXATK_RunningOS"}},
         {"--output j", {"json"}},
         {"--keys \"\"", {"exact", "untyped", "chars"}},
-        {"--mof " MOF_FOLDER "/OXAH", {MOF_FOLDER "/OXAHost.mof"}},
+        {"--mof " MOF_FOLDER "/CIMS", {MOF_FOLDER "/CIMSuperclasses.mof"}},
         {"--namespace e", {""}},
     };
     for (const auto& c : cases) {
