@@ -272,6 +272,14 @@ const QualifierType* Declarations::findQualifier(std::string_view name) const {
     return found != qualifiers_.end() ? &found->second : nullptr;
 }
 
+std::vector<std::string> Declarations::classNames() const {
+    std::vector<std::string> names;
+    for (const auto& [folded, declared] : classes_) {
+        names.push_back(declared->name);
+    }
+    return names;
+}
+
 void Classes::declare(const ClassDeclaration& declaration) {
     const std::lock_guard<std::mutex> changing(changing_);
     const std::unique_lock<std::shared_mutex> lock(mutex_);
@@ -294,6 +302,11 @@ std::shared_ptr<const DeclaredClass> Classes::find(std::string_view name) const 
     }
     const std::shared_lock<std::shared_mutex> lock(mutex_);
     return declarations_.find(name);
+}
+
+std::vector<std::string> Classes::names() const {
+    const std::shared_lock<std::shared_mutex> lock(mutex_);
+    return declarations_.classNames();
 }
 
 bool Classes::isA(std::string_view className, std::string_view ancestor) const {

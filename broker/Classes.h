@@ -60,6 +60,7 @@ public:
     // Null for what is not declared.
     std::shared_ptr<const DeclaredClass> find(std::string_view name) const;
     const QualifierType* findQualifier(std::string_view name) const;
+    std::vector<std::string> classNames() const;
     bool anyClass() const { return !classes_.empty(); }
 
 private:
@@ -77,6 +78,7 @@ public:
     bool any() const { return any_.load(std::memory_order_acquire); }
     // Null for a class that is not declared.
     std::shared_ptr<const DeclaredClass> find(std::string_view name) const;
+    std::vector<std::string> names() const;
     bool isA(std::string_view className, std::string_view ancestor) const;
 
 private:

@@ -79,6 +79,10 @@ bool EmbeddedBroker::isDeclared(const std::string& className) const {
     return impl_->classes.find(className) != nullptr;
 }
 
+std::vector<std::string> EmbeddedBroker::declaredClasses() const {
+    return impl_->classes.names();
+}
+
 std::vector<PropertyDeclaration> EmbeddedBroker::propertiesOf(const std::string& className) const {
     const auto declared = impl_->classes.find(className);
     return declared != nullptr ? declared->properties : std::vector<PropertyDeclaration>();

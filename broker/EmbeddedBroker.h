@@ -331,6 +331,8 @@ public:
     bool hasDeclarations() const;
     /** Whether the class is declared. */
     bool isDeclared(const std::string& className) const;
+    /** The names of all declared classes, in the order of their letters. */
+    std::vector<std::string> declaredClasses() const;
     /** All properties of a declared class, inherited ones first; empty for one that is not declared. */
     std::vector<PropertyDeclaration> propertiesOf(const std::string& className) const;
     /** All methods of a declared class, inherited ones first; empty for one that is not declared. */

@@ -1,6 +1,7 @@
 #include "Arguments.h"
 
 #include <algorithm>
+#include <iterator>
 #include <optional>
 #include <strings.h>
 
@@ -19,7 +20,17 @@ struct Argument {
 std::string classNameOf(const CMPIObjectPath* path) {
     const CMPIString* const name = CMGetClassName(path, nullptr);
     const char* const chars = name != nullptr ? CMGetCharsPtr(name, nullptr) : nullptr;
-    return chars != nullptr ? chars : "";
+    return chars != nullptr ? chars : ""; // a fault can strike the command's own calls too
+}
+
+// What there is, for a message about what there is not.
+template <class Declaration>
+std::string namesOf(const std::vector<Declaration>& declarations) {
+    std::string names;
+    for (const Declaration& declared : declarations) {
+        names += (names.empty() ? "" : ", ") + declared.name;
+    }
+    return names.empty() ? "none" : names;
 }
 
 // Nothing for a class that is not declared.
@@ -34,7 +45,8 @@ std::optional<oxahv::MethodDeclaration> declarationOf(const oxahv::EmbeddedBroke
             return declared;
         }
     }
-    throw oxahv::BrokerError("class " + className + " has no method " + method);
+    throw oxahv::BrokerError("class " + className + " has no method " + method + "; it has " +
+                             namesOf(broker.methodsOf(className)));
 }
 
 // The name as it is declared, and the type.
@@ -44,11 +56,15 @@ Argument argumentOf(const std::optional<oxahv::MethodDeclaration>& method, const
     }
     const oxahv::ParameterDeclaration* const parameter = method->find(name);
     if (parameter == nullptr) {
-        throw oxahv::BrokerError("method " + method->name + " has no parameter " + name);
+        std::vector<oxahv::ParameterDeclaration> inputs;
+        std::copy_if(method->parameters.begin(), method->parameters.end(), std::back_inserter(inputs),
+                     [](const oxahv::ParameterDeclaration& declared) { return declared.isIn; });
+        throw oxahv::BrokerError("method " + method->name + " has no parameter " + name + "; it has " +
+                                 namesOf(inputs));
     }
     if (!parameter->isIn) {
         throw oxahv::BrokerError("parameter " + parameter->name + " of method " + method->name +
-                                 " is an output");
+                                 " is an output; leave it out");
     }
     return {parameter->name, parameter->type, {}};
 }
@@ -67,7 +83,8 @@ std::vector<Argument> parsed(const std::optional<oxahv::MethodDeclaration>& meth
         if (known == arguments.end()) {
             known = arguments.insert(arguments.end(), std::move(argument));
         } else if ((known->type & CMPI_ARRAY) == 0) {
-            throw oxahv::BrokerError("argument " + known->name + " stands twice");
+            throw oxahv::BrokerError("argument " + known->name +
+                                     " stands twice; only an array takes several values");
         }
         known->texts.push_back(text.substr(equals + 1));
     }

@@ -1,10 +1,13 @@
 // oxahv-provider: the command line.
 
+#include "Check.h"
 #include "Runner.h"
 
 #include <CLI/CLI.hpp>
 
 #include <iostream>
+#include <sstream>
+#include <stdexcept>
 #include <string>
 
 namespace {
@@ -12,22 +15,39 @@ namespace {
 constexpr int usageFailed = 2;
 
 constexpr const char* footer =
-    R"(Results go to the standard output, and only when the whole request succeeded. A PATH is
-Class.Key="text",Number=3; a namespace and a colon may stand before it; \" and \\ stand for a quote and a backslash.
-JSON is an array of objects: {"class", "namespace", "path", "properties"}; of a method's call one of
-{"path", "method", "returnValue", "parameters"}. Exit status: 0; 1 when the provider answered with an error, its
-CMPI code on the standard error stream; 2 for wrong usage, and for files and libraries that cannot be used.
-VERB --help tells more of a verb.
+    R"(A PATH is Class.Key="text",Number=3; a namespace and a colon may stand before it, \" and \\ stand
+for a quote and a backslash. VERB --help tells more of a verb. Exit status: 0; 1 when the provider
+answered with an error, or check found something; 2 for wrong usage, and for files and libraries
+that cannot be used.
 
   oxahv-provider --library ./libDemoPort.so --output json ei Demo_Port
   oxahv-provider --library ./libDemoPort.so gi 'Demo_Port.Name="eth0"'
-  oxahv-provider --library ./libDemoPort.so --mof Demo.mof cm 'Demo_Port.Name="eth0"' SetSpeed Speed=1000
-  oxahv-provider --library ./libDemoPort.so --fault CMPIObjectPathFT.addKey:2:ERR_FAILED ein Demo_Port)";
+  oxahv-provider --library ./libDemoPort.so --mof Demo.mof cm Demo_Port.Number=3 SetSpeed Speed=1000
+  oxahv-provider --library ./libDemoPort.so --fault CMPIObjectPathFT.addKey:2 ein Demo_Port
+  oxahv-provider --library ./libDemoPort.so --mof Demo.mof check)";
+
+constexpr const char* resultFooter =
+    R"(Results go to the standard output, and only when the whole request succeeded. With --output json
+they are an array of objects {"class", "namespace", "path", "properties"}.)";
+
+constexpr const char* checkFooter =
+    R"(Does with each class what clients do: names, instances, each by its name, one that does not exist,
+property lists, associations from both ends with every filter, methods; and compares all with the
+class's declaration. Then again with untyped keys, from several threads at once, and with the
+broker's calls failing in turn: of each slot the first 100 of a request, and the last. The provider
+runs in child processes: a crash or a hang is a finding. JSON is an array of one object {"library",
+"provider", "passes", "requests", "classes", "findings"}; a finding is {"check", "severity",
+"class", "pass", "request", "text", "count"}. Exit status 1 when there are findings.
+
+  oxahv-provider --library ./libDemoPort.so --mof Demo.mof check --class Demo_Port
+  oxahv-provider --library ./libDemoPort.so --mof Demo.mof check --method 'Demo_Port.Reset Mode=1')";
 
 constexpr const char* methodFooter =
-    R"(With --mof, the class's declaration tells which parameters there are and of what type. Of an array, each
-name=value adds an element. Without declaration a value is a number, TRUE or FALSE where it looks like one, and a text
-otherwise. A text may stand in double quotes, and has to where it looks like a number.)";
+    R"(With --mof, the class's declaration tells which parameters there are and of what type. Of an
+array, each name=value adds an element. Without declaration a value is a number, TRUE or FALSE where
+it looks like one, and a text otherwise. A text may stand in double quotes, and has to where it
+looks like a number. With --output json the result is an array of one object {"path", "method",
+"returnValue", "parameters"}.)";
 
 // The options that are words on the command line and something else behind it.
 struct Words {
@@ -63,7 +83,7 @@ void addOptions(CLI::App& app, Options& options, Words& words) {
         ->type_name("NAME=TEXT")
         ->allow_extra_args(false);
     app.add_option("--fault", options.faults,
-                   "fail the N-th call of a broker's slot, with ERR_FAILED or CODE; repeatable")
+                   "fail the N-th call of a slot, with ERR_FAILED or CODE; repeatable")
         ->type_name("SLOT:N[:CODE]")
         ->allow_extra_args(false);
 }
@@ -86,6 +106,24 @@ void addFilters(CLI::App& command, Takes takes, oxahv::AssociationFilter& filter
     }
 }
 
+// Names with commas between them; none in an empty text.
+std::vector<std::string> namesIn(const std::string& text) {
+    std::vector<std::string> names;
+    std::istringstream stream(text);
+    for (std::string name; std::getline(stream, name, ',');) {
+        names.push_back(name);
+    }
+    return names;
+}
+
+void addPropertyList(CLI::App& command, Operands& operands) {
+    command
+        .add_option_function<std::string>(
+            "--properties", [&](const std::string& text) { operands.properties = namesIn(text); },
+            "only these properties, beside the keys")
+        ->type_name("NAME,...");
+}
+
 void addVerb(CLI::App& app, const Verb& verb, Operands& operands) {
     const bool isOfClass = verb.target == Target::ofClass;
     CLI::App* const command = app.add_subcommand(verb.name, verb.help);
@@ -101,11 +139,42 @@ void addVerb(CLI::App& app, const Verb& verb, Operands& operands) {
         command->add_option("name=value", operands.arguments, "an input argument")->type_name("");
         command->footer(methodFooter);
     }
+    if (verb.yields == Yields::instances || verb.yields == Yields::oneInstance) {
+        addPropertyList(*command, operands);
+    }
+    if (verb.takes != Takes::method) {
+        command->footer(resultFooter);
+    }
     command->fallthrough();
     command->group("Verbs");
 }
 
-int parseAndRun(CLI::App& app, int argc, char** argv) {
+void addCheck(CLI::App& app, CheckOptions& options) {
+    CLI::App* const command = app.add_subcommand("check", "find out what the provider does wrong");
+    command
+        ->add_option("--class", options.classes, "check this class; else all that --mof declares; repeatable")
+        ->type_name("CLASS")
+        ->allow_extra_args(false);
+    command
+        ->add_option("--method", options.methods,
+                     "call CLASS.METHOD name=value ... of the first instance; repeatable")
+        ->type_name("CALL")
+        ->allow_extra_args(false);
+    command->add_option("--threads", options.threads, "how many threads send requests at once")
+        ->check(CLI::Range(1U, 256U).description(""))
+        ->type_name("N")
+        ->capture_default_str();
+    command->add_option("--timeout", options.timeoutSeconds, "how long a request may take")
+        ->check(CLI::Range(1U, 86400U).description(""))
+        ->type_name("SECONDS")
+        ->capture_default_str();
+    command->footer(checkFooter);
+    command->fallthrough();
+    command->group("Verbs");
+}
+
+int parseAndRun(int argc, char** argv) {
+    CLI::App app("Loads a CMPI provider and sends it a request, as a CIM server would.", "oxahv-provider");
     Options options;
     Words words;
     Operands operands;
@@ -113,11 +182,23 @@ int parseAndRun(CLI::App& app, int argc, char** argv) {
     for (const Verb& verb : verbs()) {
         addVerb(app, verb, operands);
     }
+    CheckOptions checkOptions;
+    addCheck(app, checkOptions);
+    app.set_version_flag("--version", "oxahv-provider " OXAHV_VERSION);
     app.get_formatter()->label("SUBCOMMAND", "VERB");
     app.require_subcommand(1);
     app.footer(footer);
-    app.parse(argc, argv);
+    try {
+        app.parse(argc, argv);
+    } catch (const CLI::Success& help) { // or the version
+        return app.exit(help);
+    } catch (const CLI::ParseError& error) {
+        throw std::runtime_error(std::string(error.what()) + "; oxahv-provider --help shows the usage");
+    }
     words.putInto(options);
+    if (app.got_subcommand("check")) {
+        return runCheck(options, checkOptions);
+    }
     for (const Verb& verb : verbs()) {
         if (app.got_subcommand(verb.name)) {
             return run(options, verb, operands);
@@ -129,11 +210,8 @@ int parseAndRun(CLI::App& app, int argc, char** argv) {
 } // namespace
 
 int main(int argc, char** argv) {
-    CLI::App app("Loads a CMPI provider and sends it a request, as a CIM server would.", "oxahv-provider");
     try {
-        return parseAndRun(app, argc, argv);
-    } catch (const CLI::CallForHelp& help) {
-        return app.exit(help);
+        return parseAndRun(argc, argv);
     } catch (const std::exception& exception) {
         std::cerr << "oxahv-provider: " << exception.what() << '\n';
         return usageFailed;

@@ -18,25 +18,23 @@ using oxahv::Request;
 
 // Sending requests
 
+const std::vector<std::string>* listOf(const Operands& operands) {
+    return operands.properties ? &*operands.properties : nullptr;
+}
+
 Reply enumerateNames(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
                      const Operands& /*operands*/) {
     return request.enumerateInstanceNames(target);
 }
 
 Reply enumerate(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
-                const Operands& /*operands*/) {
-    return request.enumerateInstances(target);
+                const Operands& operands) {
+    return request.enumerateInstances(target, listOf(operands));
 }
 
 Reply getInstance(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
-                  const Operands& /*operands*/) {
-    Reply reply = request.getInstance(target);
-    if (reply.ok() && reply.instances.size() != 1) {
-        reply.code = CMPI_RC_ERR_FAILED;
-        reply.message =
-            "the provider returned " + std::to_string(reply.instances.size()) + " instances in place of one";
-    }
-    return reply;
+                  const Operands& operands) {
+    return request.getInstance(target, listOf(operands));
 }
 
 Reply associatorNames(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
@@ -46,7 +44,7 @@ Reply associatorNames(EmbeddedBroker& /*broker*/, Request& request, const CMPIOb
 
 Reply associators(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
                   const Operands& operands) {
-    return request.associators(target, operands.filter);
+    return request.associators(target, operands.filter, listOf(operands));
 }
 
 Reply referenceNames(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
@@ -56,7 +54,7 @@ Reply referenceNames(EmbeddedBroker& /*broker*/, Request& request, const CMPIObj
 
 Reply references(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
                  const Operands& operands) {
-    return request.references(target, operands.filter);
+    return request.references(target, operands.filter, listOf(operands));
 }
 
 Reply callMethod(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* target,
@@ -74,6 +72,7 @@ void printReply(const Options& options, const CMPIObjectPath* target, const Oper
         printPaths(std::cout, options.format, reply.objectPaths);
         break;
     case Yields::instances:
+    case Yields::oneInstance:
         printInstances(std::cout, options.format, reply.instances);
         break;
     case Yields::methodResult:
@@ -112,7 +111,12 @@ void inject(EmbeddedBroker& broker, const std::string& text) {
     if (second != std::string::npos) {
         fault.code = oxahv::codeFromName(text.substr(second + 1));
     }
-    broker.injectFault(text.substr(0, first), fault);
+    try {
+        broker.injectFault(text.substr(0, first), fault);
+    } catch (const oxahv::BrokerError& error) {
+        throw oxahv::BrokerError(std::string(error.what()) +
+                                 "; name it by table and member, as CMPIObjectPathFT.addKey");
+    }
 }
 
 // Every message reaches the logger twice; one of the two is shown.
@@ -132,7 +136,7 @@ const std::vector<Verb>& verbs() {
         {"ein", Target::ofClass, Takes::nothing, Yields::paths, "CLASS: the paths of its instances",
          enumerateNames},
         {"ei", Target::ofClass, Takes::nothing, Yields::instances, "CLASS: its instances", enumerate},
-        {"gi", Target::ofInstance, Takes::nothing, Yields::instances, "PATH: the instance", getInstance},
+        {"gi", Target::ofInstance, Takes::nothing, Yields::oneInstance, "PATH: the instance", getInstance},
         {"an", Target::ofInstance, Takes::filter, Yields::paths,
          "PATH: the paths of the instances associated with it", associatorNames},
         {"ai", Target::ofInstance, Takes::filter, Yields::instances, "PATH: the instances associated with it",
@@ -147,8 +151,23 @@ const std::vector<Verb>& verbs() {
     return all;
 }
 
-int run(const Options& options, const Verb& verb, const Operands& operands) {
-    EmbeddedBroker broker;
+CMPIObjectPath* targetOf(Request& request, const Options& options, const Verb& verb,
+                         const Operands& operands) {
+    if (verb.target == Target::ofClass) {
+        return request.objectPath(options.nameSpace, operands.target);
+    }
+    try {
+        return request.objectPathFromText(operands.target, options.nameSpace);
+    } catch (const oxahv::BrokerError& error) {
+        throw oxahv::BrokerError(std::string(error.what()) + "; write it as Class.Key=\"text\",Number=3");
+    }
+}
+
+std::string providerName(const Options& options) {
+    return options.provider.empty() ? nameOf(options.library) : options.provider;
+}
+
+void prepare(EmbeddedBroker& broker, const Options& options) {
     if (options.showsTraces) {
         showTraces();
     }
@@ -158,23 +177,45 @@ int run(const Options& options, const Verb& verb, const Operands& operands) {
     for (const std::string& entry : options.contextEntries) {
         addContextEntry(broker, entry);
     }
-    // A name without a folder would be looked for among the system's libraries.
-    const std::string file = std::filesystem::absolute(options.library);
-    broker.load(file, options.provider.empty() ? nameOf(options.library) : options.provider);
+}
+
+// A name without a folder would be looked for among the system's libraries.
+void loadProvider(EmbeddedBroker& broker, const Options& options) {
+    const std::string name = providerName(options);
+    try {
+        broker.load(std::filesystem::absolute(options.library), name);
+    } catch (const oxahv::BrokerError& error) {
+        const std::string message = error.what();
+        const bool isLoaded = message.rfind("cannot load", 0) != 0;
+        const bool isFile = std::filesystem::is_regular_file(options.library);
+        throw oxahv::BrokerError(message +
+                                 (isLoaded ? "; is " + name + " its MI name? Else give it with --provider"
+                                  : isFile ? "; ldd shows what the library needs and what it lacks"
+                                           : "; give the path of the provider's library with --library"));
+    }
+}
+
+int run(const Options& options, const Verb& verb, const Operands& operands) {
+    EmbeddedBroker broker;
+    prepare(broker, options);
+    loadProvider(broker, options);
     broker.setKeyMode(options.keyMode);
     for (const std::string& fault : options.faults) {
         inject(broker, fault);
     }
     Request request(broker);
-    const CMPIObjectPath* const target = verb.target == Target::ofClass
-                                             ? request.objectPath(options.nameSpace, operands.target)
-                                             : request.objectPathFromText(operands.target, options.nameSpace);
+    const CMPIObjectPath* const target = targetOf(request, options, verb, operands);
     Reply reply;
     {
         const Progress progress(request); // ends before anything is printed
         reply = verb.perform(broker, request, target, operands);
     }
     broker.clearFaults(); // they are the request's; what is printed is asked of the broker too
+    if (reply.ok() && verb.yields == Yields::oneInstance && reply.instances.size() != 1) {
+        reply.code = CMPI_RC_ERR_FAILED;
+        reply.message =
+            "the provider returned " + std::to_string(reply.instances.size()) + " instances in place of one";
+    }
     if (!reply.ok()) {
         std::cerr << "oxahv-provider: " << oxahv::codeName(reply.code)
                   << (reply.message.empty() ? "" : ": " + reply.message) << '\n';

@@ -5,6 +5,7 @@
 
 #include <EmbeddedBroker.h>
 
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -24,6 +25,7 @@ struct Options {
 struct Operands {
     std::string target; // a class or a path
     oxahv::AssociationFilter filter;
+    std::optional<std::vector<std::string>> properties; // the property list
     std::string method;
     std::vector<std::string> arguments; // name=value
 };
@@ -32,7 +34,7 @@ struct Operands {
 enum class Target { ofClass, ofInstance };
 // What it takes beside that.
 enum class Takes { nothing, filter, referenceFilter, method };
-enum class Yields { paths, instances, methodResult };
+enum class Yields { paths, instances, oneInstance, methodResult };
 
 struct Verb {
     const char* name;
@@ -47,6 +49,19 @@ struct Verb {
 
 // The verbs, in the order in which the help shows them.
 const std::vector<Verb>& verbs();
+
+// The path that the verb is about. Throws oxahv::BrokerError for a text that is none.
+CMPIObjectPath* targetOf(oxahv::Request& request, const Options& options, const Verb& verb,
+                         const Operands& operands);
+
+// The MI name: the option, or what the library's file stands for.
+std::string providerName(const Options& options);
+
+// Gives the broker the classes and the context entries. Throws oxahv::BrokerError.
+void prepare(oxahv::EmbeddedBroker& broker, const Options& options);
+
+// Loads the provider. Throws oxahv::BrokerError.
+void loadProvider(oxahv::EmbeddedBroker& broker, const Options& options);
 
 // Loads the provider and performs the verb. Prints results on the standard output and errors on the standard
 // error stream. Returns the exit status; throws oxahv::BrokerError for what keeps the request from being

@@ -7,6 +7,7 @@
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
 #include <pty.h>
+#include <sstream>
 #include <string>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -33,6 +34,7 @@ Outcome run(const std::string& arguments, const std::string& redirection = "2>&1
 
 const std::string host = "--library " HOST_PROVIDER " ";
 const std::string test = "--library " TEST_PROVIDER " ";
+const std::string usage = "; oxahv-provider --help shows the usage";
 const std::string hostClasses = "--mof " MOF_FOLDER "/CIMSuperclasses.mof --mof " MOF_FOLDER "/OXAHost.mof ";
 
 // A file that is gone at the end.
@@ -54,6 +56,15 @@ private:
 std::string lineOf(const std::string& arguments) {
     const std::string output = run(host + arguments).output;
     return output.substr(0, output.find('\n'));
+}
+
+std::size_t widthOf(const std::string& text) {
+    std::size_t width = 0;
+    std::istringstream stream(text);
+    for (std::string line; std::getline(stream, line);) {
+        width = std::max(width, line.size());
+    }
+    return width;
 }
 
 std::string quoted(const std::string& word) {
@@ -173,12 +184,15 @@ TEST(TheRunner, CallsMethodsAsTheClassDeclaresThem) {
               nlohmann::json::parse(R"([{"path": "root/cimv2:Demo", "method": "Echo", "returnValue": 2,
                                          "parameters": {"Small": 7, "Texts": ["x"]}}])"));
 
-    expectFailure(call + "Other", 2, "class Demo has no method Other");
+    expectFailure(call + "Other", 2, "class Demo has no method Other; it has Echo");
     expectFailure(call + "Echo Text", 2, "argument 'Text' is not name=value");
     expectFailure(call + "Echo =x", 2, "argument '=x' is not name=value");
-    expectFailure(call + "Echo Txt=x", 2, "method Echo has no parameter Txt");
-    expectFailure(call + "Echo Result=x", 2, "parameter Result of method Echo is an output");
-    expectFailure(call + "Echo Text=x text=y", 2, "argument Text stands twice");
+    expectFailure(call + "Echo Txt=x", 2,
+                  "method Echo has no parameter Txt; it has Text, Small, Signed, Real, Flag, Numbers, Texts, "
+                  "When, Other");
+    expectFailure(call + "Echo Result=x", 2, "parameter Result of method Echo is an output; leave it out");
+    expectFailure(call + "Echo Text=x text=y", 2,
+                  "argument Text stands twice; only an array takes several values");
     expectFailure(call + "Echo Small=256", 2, "argument Small: value, column 1: 256 does not fit into uint8");
     expectFailure(
         call + "Echo Small=x", 2,
@@ -237,14 +251,17 @@ TEST(TheRunner, ShowsProgressOnATerminalAlone) {
 TEST(TheRunner, ExplainsItselfOnAScreen) {
     const std::string help = run("--help").output;
     EXPECT_LE(std::count(help.begin(), help.end(), '\n'), 40);
-    for (const char* const verb : {"ein", "ei", "gi", "an", "ai", "rn", "ri", "cm"}) {
+    EXPECT_LE(widthOf(help), 100U);
+    for (const char* const verb : {"ein", "ei", "gi", "an", "ai", "rn", "ri", "cm", "check"}) {
         EXPECT_NE(help.find(std::string("\n  ") + verb + "  "), std::string::npos) << verb;
         const Outcome own = run(std::string(verb) + " --help");
         EXPECT_EQ(own.status, 0);
+        EXPECT_LE(std::count(own.output.begin(), own.output.end(), '\n'), 24) << verb;
+        EXPECT_LE(widthOf(own.output), 100U) << verb;
         EXPECT_NE(own.output.find(std::string("Usage: oxahv-provider ") + verb), std::string::npos);
     }
     expectFailure(host + "rn X --assoc-class Y", 2,
-                  "The following arguments were not expected: Y --assoc-class");
+                  "The following arguments were not expected: Y --assoc-class" + usage);
 }
 
 TEST(TheRunner, TellsWhatWentWrongInOneLine) {
@@ -263,20 +280,28 @@ TEST(TheRunner, TellsWhatWentWrongInOneLine) {
                   "CMPI_RC_ERR_ACCESS_DENIED: the broker did not take the result");
 
     expectFailure(host + "--fault here ein X", 2, "fault 'here' is not SLOT:N[:CODE] with N from 1 on");
-    expectFailure(host + "--fault nothing:1 ein X", 2, "there is no slot nothing");
-    expectFailure(host + "gi 'Demo.Key=\"'", 2, "object path, column 10: the quote is not closed");
+    expectFailure(host + "--fault nothing:1 ein X", 2,
+                  "there is no slot nothing; name it by table and member, as CMPIObjectPathFT.addKey");
+    expectFailure(host + "gi 'Demo.Key=\"'", 2,
+                  "object path, column 10: the quote is not closed; write it as Class.Key=\"text\",Number=3");
     expectFailure("--library " NO_PROVIDER " ein X", 2,
                   "library " NO_PROVIDER " has no factory for a provider oxahvlogger, such as "
-                  "oxahvlogger_Create_InstanceMI");
+                  "oxahvlogger_Create_InstanceMI; is oxahvlogger its MI name? Else give it with --provider");
     expectFailure(test + "--provider Other ein X", 2,
-                  "provider Other: its factory answered CMPI_RC_ERR_NOT_FOUND");
-    expectFailure(host + "ein", 2, "CLASS is required");
-    expectFailure("ein X", 2, "--library is required");
-    expectFailure(host + "--output xml ein X", 2, "--output: xml not in {mof,json}");
+                  "provider Other: its factory answered CMPI_RC_ERR_NOT_FOUND; is Other its MI name? Else "
+                  "give it with --provider");
+    expectFailure(host + "ein", 2, "CLASS is required" + usage);
+    expectFailure("ein X", 2, "--library is required" + usage);
+    expectFailure(host + "--output xml ein X", 2, "--output: xml not in {mof,json}" + usage);
     const Outcome missing = run("--library /nowhere/libX.so ein X");
     EXPECT_EQ(missing.status, 2);
     EXPECT_EQ(missing.output.rfind("oxahv-provider: cannot load provider library: /nowhere/libX.so: ", 0),
               0U);
+    EXPECT_NE(missing.output.find("; give the path of the provider's library with --library\n"),
+              std::string::npos);
+    const File file("no library");
+    EXPECT_NE(run("--library " + file.path() + " ein X").output.find("; ldd shows what the library needs"),
+              std::string::npos);
     EXPECT_EQ(run("--help").status, 0);
 }
 

@@ -1,0 +1,63 @@
+// A provider's answer as plain values, to be kept and compared when the request is gone.
+#pragma once
+
+#include <EmbeddedBroker.h>
+
+#include <map>
+#include <string>
+#include <vector>
+
+struct PlainData {
+    CMPIType type = CMPI_null;
+    bool isNull = true;
+    bool isUtf8 = true;          // whether all its texts are
+    std::string text;            // as MOF writes it
+    std::string identity;        // of a reference: the identity of the path, else the text
+    std::string referredClass{}; // of a reference: the class of the path
+    std::string referredPath{};  // and the path, as a command line takes it
+};
+
+bool operator==(const PlainData& a, const PlainData& b);
+
+// Names are one whatever their case.
+struct NameLess {
+    bool operator()(const std::string& a, const std::string& b) const;
+};
+using NamedData = std::map<std::string, PlainData, NameLess>;
+
+// An instance or an object path.
+struct Result {
+    std::string className;
+    std::string path;     // as a command line takes it
+    std::string identity; // the same for all paths of one instance, whatever their order of keys
+    NamedData keys;
+    NamedData properties; // of an instance
+};
+
+struct Answer {
+    CMPIrc code = CMPI_RC_OK;
+    std::string message;
+    bool isDone = false;
+    std::vector<Result> results;
+    std::vector<PlainData> data; // a method's return value
+    NamedData out;               // and its output arguments
+
+    bool ok() const { return code == CMPI_RC_OK; }
+};
+
+// Copies a reply. A namespace that is missing or `nameSpace` is no part of an identity.
+Answer answerOf(const oxahv::Reply& reply, const std::string& nameSpace);
+
+std::string lowerCase(std::string text);
+
+// Whether there is a value of that name that is not NULL.
+bool hasValue(const NamedData& values, const std::string& name);
+
+// "uint8", "uint8[]"
+std::string typeText(CMPIType type);
+
+// "CMPI_RC_ERR_FAILED: text"
+std::string wordsOf(const Answer& answer);
+
+// Whether the text is UTF-8: no overlong forms, surrogates or numbers beyond U+10FFFF.
+bool isUtf8(const std::string& text);

@@ -1,0 +1,335 @@
+#include "Check.h"
+
+#include "Examination.h"
+#include "Strain.h"
+
+#include <algorithm>
+#include <chrono>
+#include <iostream>
+#include <map>
+#include <unistd.h>
+
+namespace {
+
+using oxahv::BrokerError;
+using oxahv::EmbeddedBroker;
+using oxahv::KeyMode;
+
+struct Pass {
+    const char* name;
+    KeyMode keyMode;
+    bool reports; // what any request shows; the passes after the first two look for something else
+    void (*strain)(Client& client);
+};
+constexpr Pass passes[] = {
+    {"exact keys", KeyMode::exact, true, nullptr},
+    {"untyped keys", KeyMode::untyped, true, nullptr},
+    {"threads", KeyMode::exact, false, strainByThreads},
+    {"faults", KeyMode::exact, false, strainByFaults},
+};
+
+// In the child
+
+constexpr const char* loading = "loading the provider";
+constexpr const char* cleaningUp = "the provider's cleanup";
+
+void endProvider(Client& client, std::size_t before) {
+    if (client.task().skipped.count(cleaningUp) != 0) {
+        return;
+    }
+    client.doing(cleaningUp, [&] { client.broker().unload(providerName(client.options())); });
+    const std::size_t after = client.broker().liveObjects().total();
+    if (after > before) {
+        client.find(CheckKind::leftOver, cleaningUp,
+                    "objects left at the end: " + std::to_string(after - before));
+    }
+}
+
+void runTask(EmbeddedBroker& broker, const Options& options, const CheckTask& task, const Pass& pass,
+             ChildOutput& output) {
+    Client client(broker, options, task, output, pass.reports);
+    const std::size_t before = broker.liveObjects().total();
+    try {
+        client.doing(loading, [&] { loadProvider(broker, options); });
+        broker.setKeyMode(pass.keyMode);
+        Examination(client).run();
+        client.setReports(true);
+        if (pass.strain != nullptr) {
+            pass.strain(client);
+        } else {
+            endProvider(client, before);
+        }
+    } catch (const std::exception& exception) {
+        client.tell({Message::Kind::unusable, 0, exception.what()});
+    }
+}
+
+// In the parent
+
+// One line on a terminal, over and over, once the check takes longer than a second.
+class Ticker {
+public:
+    ~Ticker() {
+        if (isShown_) {
+            std::cerr << "\r\033[K" << std::flush;
+        }
+    }
+    Ticker() = default;
+    Ticker(const Ticker&) = delete;
+    Ticker& operator=(const Ticker&) = delete;
+
+    void show(const std::string& text) {
+        const auto now = std::chrono::steady_clock::now();
+        if (isTerminal_ && now >= due_) {
+            due_ = now + std::chrono::milliseconds(200);
+            isShown_ = true;
+            std::cerr << "\r\033[K" << text.substr(0, 79) << std::flush;
+        }
+    }
+
+private:
+    bool isTerminal_ = ::isatty(STDERR_FILENO) == 1;
+    bool isShown_ = false;
+    std::chrono::steady_clock::time_point due_ = std::chrono::steady_clock::now() + std::chrono::seconds(1);
+};
+
+class CheckRun {
+public:
+    CheckRun(const Options& options, const CheckOptions& checkOptions)
+        : options_(options), checkOptions_(checkOptions) {
+        prepare(broker_, options_);
+        report_.library = options_.library;
+        report_.provider = providerName(options_);
+    }
+
+    CheckReport run();
+
+private:
+    std::vector<std::string> classNames() const;
+    MethodCall methodCall(const std::string& text) const;
+    void runClass(std::size_t position, std::size_t count);
+    void runPass(const Pass& pass, CheckTask& task, CheckedClass& checked);
+    bool runOnce(const Pass& pass, CheckTask& task, CheckedClass& checked);
+    void receive(const Message& message, CheckedClass& checked);
+    void reportEnd(const ChildResult& result, CheckTask& task);
+
+    const Options& options_;
+    const CheckOptions& checkOptions_;
+    EmbeddedBroker broker_; // has the classes; only children load the provider
+    std::vector<MethodCall> methods_;
+    CheckReport report_;
+    bool canLoad_ = true;
+    Ticker ticker_;
+    std::string place_;                         // for the ticker
+    std::map<std::size_t, std::string> atWork_; // the child's requests that have begun and not ended
+};
+
+std::vector<std::string> CheckRun::classNames() const {
+    std::vector<std::string> names;
+    for (const std::string& name : checkOptions_.classes) {
+        if (!broker_.isDeclared(name)) {
+            throw BrokerError("class " + name + " is not declared; name its MOF file with --mof");
+        }
+        names.push_back(name);
+    }
+    if (!names.empty()) {
+        return names;
+    }
+    for (const std::string& name : broker_.declaredClasses()) {
+        if (!broker_.isAbstract(name)) {
+            names.push_back(name);
+        }
+    }
+    if (names.empty()) {
+        throw BrokerError("no class to check: name MOF files that declare the provider's classes with --mof");
+    }
+    return names;
+}
+
+// The words of a text, at spaces that stand outside double quotes.
+std::vector<std::string> wordsIn(const std::string& text) {
+    std::vector<std::string> words;
+    bool isInWord = false;
+    bool isQuoted = false;
+    for (const char c : text) {
+        isQuoted = c == '"' ? !isQuoted : isQuoted;
+        if (c == ' ' && !isQuoted) {
+            isInWord = false;
+            continue;
+        }
+        if (!isInWord) {
+            words.emplace_back();
+        }
+        isInWord = true;
+        words.back() += c;
+    }
+    return words;
+}
+
+MethodCall CheckRun::methodCall(const std::string& text) const {
+    std::vector<std::string> words = wordsIn(text);
+    const std::size_t point = words.empty() ? std::string::npos : words.front().find('.');
+    if (point == std::string::npos) {
+        throw BrokerError("method '" + text + "' is not CLASS.METHOD name=value ...");
+    }
+    MethodCall call = {
+        words.front().substr(0, point), words.front().substr(point + 1), {words.begin() + 1, words.end()}};
+    const auto methods = broker_.methodsOf(call.className);
+    const bool isDeclared = std::any_of(methods.begin(), methods.end(), [&](const auto& method) {
+        return lowerCase(method.name) == lowerCase(call.method);
+    });
+    if (!isDeclared) {
+        throw BrokerError("method '" + text + "': no class that --mof declares has it");
+    }
+    return call;
+}
+
+CheckReport CheckRun::run() {
+    for (const std::string& text : checkOptions_.methods) {
+        methods_.push_back(methodCall(text));
+    }
+    for (const Pass& pass : passes) {
+        report_.passes.emplace_back(pass.name);
+    }
+    for (const std::string& name : classNames()) {
+        report_.classes.push_back({name, false, 0, ""});
+    }
+    for (const MethodCall& call : methods_) {
+        const bool isChecked =
+            std::any_of(report_.classes.begin(), report_.classes.end(), [&](const CheckedClass& checked) {
+                return lowerCase(checked.name) == lowerCase(call.className);
+            });
+        if (!isChecked) {
+            throw BrokerError("method " + call.className + '.' + call.method +
+                              " is of no class that is checked; name the class with --class");
+        }
+    }
+    for (std::size_t i = 0; i < report_.classes.size(); ++i) {
+        runClass(i, report_.classes.size());
+        if (!canLoad_) {
+            return std::move(report_);
+        }
+    }
+    const bool isServed = std::any_of(report_.classes.begin(), report_.classes.end(),
+                                      [](const CheckedClass& checked) { return checked.isServed; });
+    if (!isServed && report_.findings.empty()) {
+        throw BrokerError("the provider serves none of the classes; its answer for " +
+                          report_.classes.front().name + " is " + report_.classes.front().answer +
+                          "; name its MOF files with --mof");
+    }
+    return std::move(report_);
+}
+
+void CheckRun::runClass(std::size_t position, std::size_t count) {
+    CheckedClass& checked = report_.classes[position];
+    CheckTask task;
+    task.className = checked.name;
+    task.isNamed = !checkOptions_.classes.empty();
+    task.threads = checkOptions_.threads;
+    for (const MethodCall& call : methods_) {
+        if (lowerCase(call.className) == lowerCase(checked.name)) {
+            task.methods.push_back(call);
+        }
+    }
+    for (const Pass& pass : passes) {
+        place_ = '[' + std::to_string(position + 1) + '/' + std::to_string(count) + "] " + pass.name + ": ";
+        task.pass = pass.name;
+        runPass(pass, task, checked);
+        if (!checked.isServed) {
+            break;
+        }
+    }
+}
+
+// Each time that a child ends early or hangs, the request that did it is left out and the pass run again.
+void CheckRun::runPass(const Pass& pass, CheckTask& task, CheckedClass& checked) {
+    constexpr int mostAttempts = 20;
+    for (int attempt = 0; attempt < mostAttempts; ++attempt) {
+        const bool isFinished = runOnce(pass, task, checked);
+        canLoad_ = task.skipped.count(loading) == 0;
+        if (isFinished || !canLoad_) {
+            return;
+        }
+    }
+    report_.findings.add({CheckKind::crash, task.className, task.pass, "",
+                          "the pass was given up after " + std::to_string(mostAttempts) +
+                              " crashes and hangs; what follows is not checked"});
+}
+
+bool CheckRun::runOnce(const Pass& pass, CheckTask& task, CheckedClass& checked) {
+    atWork_.clear();
+    std::cout.flush();
+    const ChildResult result =
+        runInChild([&](ChildOutput& output) { runTask(broker_, options_, task, pass, output); },
+                   [&](const std::string& line) { receive(messageOf(line), checked); },
+                   std::chrono::seconds(checkOptions_.timeoutSeconds));
+    if (result.end == ChildEnd::finished) {
+        return true;
+    }
+    reportEnd(result, task);
+    return false;
+}
+
+void CheckRun::receive(const Message& message, CheckedClass& checked) {
+    switch (message.kind) {
+    case Message::Kind::begin:
+        ++report_.requests;
+        atWork_[message.number] = message.text;
+        ticker_.show(place_ + message.text);
+        break;
+    case Message::Kind::end:
+        atWork_.erase(message.number);
+        break;
+    case Message::Kind::finding:
+        report_.findings.add(message.finding);
+        break;
+    case Message::Kind::classServed:
+        checked.isServed = true;
+        checked.instances = std::max(checked.instances, message.number);
+        break;
+    case Message::Kind::classRefused:
+        checked.answer = message.text;
+        break;
+    case Message::Kind::unusable:
+        throw BrokerError(message.text);
+    }
+}
+
+// What a request does, without its operands: what ends the provider in one way is one finding.
+std::string briefly(const std::string& request) {
+    const std::size_t fault = request.find(" --fault ");
+    const std::string verb = request.substr(0, request.find(' '));
+    const bool isVerb = verb.size() == 2 || verb == "ein";
+    if (!isVerb || fault == std::string::npos) {
+        return isVerb ? verb : request;
+    }
+    const std::size_t slot = fault + std::string(" --fault ").size();
+    return verb + " with " + request.substr(slot, request.rfind(':') - slot) + " failing";
+}
+
+// Of several threads' requests, each may be the one that did it.
+void CheckRun::reportEnd(const ChildResult& result, CheckTask& task) {
+    std::string requests;
+    for (const auto& [number, text] : atWork_) {
+        requests += (requests.empty() ? "" : " | ") + text;
+        task.skipped.insert(text);
+    }
+    const bool isCrash = result.end == ChildEnd::crashed;
+    const std::string what =
+        isCrash ? result.text : "no answer for " + std::to_string(checkOptions_.timeoutSeconds) + " s";
+    report_.findings.add({isCrash ? CheckKind::crash : CheckKind::hang, task.className, task.pass, requests,
+                          atWork_.empty() ? what : briefly(atWork_.begin()->second) + ": " + what});
+}
+
+} // namespace
+
+int runCheck(const Options& options, const CheckOptions& checkOptions) {
+    if (!options.faults.empty() || options.keyMode != KeyMode::exact) {
+        throw BrokerError(
+            "check puts faults and key modes on the provider itself: leave --fault and --keys out");
+    }
+    const CheckReport report = CheckRun(options, checkOptions).run();
+    const bool isColoured = ::isatty(STDOUT_FILENO) == 1 && std::getenv("NO_COLOR") == nullptr;
+    printReport(std::cout, options.format, report, isColoured);
+    return report.findings.empty() ? 0 : 1;
+}

@@ -1,0 +1,18 @@
+// The check of a provider: which classes in which passes, each in a child process.
+#pragma once
+
+#include "Runner.h"
+
+#include <string>
+#include <vector>
+
+struct CheckOptions {
+    std::vector<std::string> classes; // empty: all concrete ones
+    std::vector<std::string> methods; // CLASS.METHOD name=value ...
+    unsigned int threads = 4;
+    unsigned int timeoutSeconds = 30; // for one request
+};
+
+// Checks the provider and prints the report on the standard output. Returns the exit status, 1 when anything
+// is found; throws oxahv::BrokerError for what makes the check impossible.
+int runCheck(const Options& options, const CheckOptions& checkOptions);

@@ -1,0 +1,183 @@
+#include "Client.h"
+
+#include <nlohmann/json.hpp>
+
+namespace {
+
+using Json = nlohmann::json;
+using oxahv::BrokerError;
+
+bool endsWith(const std::string& text, const std::string& end) {
+    return text.size() >= end.size() && text.compare(text.size() - end.size(), end.size(), end) == 0;
+}
+
+// Calls that the broker refuses show what the provider gives it, whether or not it minds the refusal.
+struct Refusal {
+    const char* member;
+    CMPIrc code;
+    CheckKind kind;
+    std::string (*text)(const oxahv::Call& call);
+};
+
+std::string propertyText(const oxahv::Call& call) {
+    return "property " + call.name;
+}
+std::string typedText(const oxahv::Call& call) {
+    return "property " + call.name + " is set as " + typeText(call.type);
+}
+std::string classText(const oxahv::Call& /*call*/) {
+    return "an instance is made of a class that is not declared";
+}
+std::string dateText(const oxahv::Call& call) {
+    return '\'' + call.name + '\'';
+}
+
+constexpr Refusal refusals[] = {
+    {".setProperty", CMPI_RC_ERR_NO_SUCH_PROPERTY, CheckKind::undeclared, propertyText},
+    {".setPropertyWithOrigin", CMPI_RC_ERR_NO_SUCH_PROPERTY, CheckKind::undeclared, propertyText},
+    {".addKey", CMPI_RC_ERR_NO_SUCH_PROPERTY, CheckKind::undeclared, propertyText},
+    {".setProperty", CMPI_RC_ERR_TYPE_MISMATCH, CheckKind::type, typedText},
+    {".setPropertyWithOrigin", CMPI_RC_ERR_TYPE_MISMATCH, CheckKind::type, typedText},
+    {".addKey", CMPI_RC_ERR_TYPE_MISMATCH, CheckKind::type, typedText},
+    {".newInstance", CMPI_RC_ERR_INVALID_CLASS, CheckKind::undeclared, classText},
+    {".newDateTimeFromChars", CMPI_RC_ERR_INVALID_PARAMETER, CheckKind::date, dateText},
+};
+
+// What the broker answers for a provider that throws.
+bool isException(const Answer& answer) {
+    return answer.code == CMPI_RC_ERR_FAILED && answer.message.rfind("exception", 0) == 0;
+}
+
+bool isStandard(CMPIrc code) {
+    return oxahv::codeName(code) != "CMPI_RC_" + std::to_string(static_cast<int>(code));
+}
+
+} // namespace
+
+std::string lineOf(const Message& message) {
+    const Finding& finding = message.finding;
+    const Json json = {static_cast<int>(message.kind),
+                       message.number,
+                       message.text,
+                       static_cast<int>(finding.kind),
+                       finding.className,
+                       finding.pass,
+                       finding.request,
+                       finding.text};
+    return json.dump(-1, ' ', false, Json::error_handler_t::replace);
+}
+
+Message messageOf(const std::string& line) {
+    const Json json = Json::parse(line);
+    Message message;
+    message.kind = static_cast<Message::Kind>(json[0].get<int>());
+    message.number = json[1];
+    message.text = json[2];
+    message.finding = {static_cast<CheckKind>(json[3].get<int>()), json[4], json[5], json[6], json[7]};
+    return message;
+}
+
+// Tells the parent what is begun before it begins, so that it knows what was at work when the process ends.
+template <class Work>
+auto Client::tracked(const std::string& text, Work work) {
+    struct End {
+        Client& client;
+        std::size_t number;
+        ~End() { client.tell({Message::Kind::end, number, ""}); }
+    };
+    const std::size_t number = ++number_;
+    tell({Message::Kind::begin, number, text});
+    const End end = {*this, number};
+    return work();
+}
+
+std::optional<Answer> Client::ask(const Query& query) {
+    const std::string text = textOf(query);
+    if (task_.skipped.count(text) != 0) {
+        return std::nullopt;
+    }
+    const std::size_t before = broker_.liveObjects().total();
+    std::vector<ProviderCall> calls;
+    Answer answer;
+    try {
+        answer = tracked(text, [&] { return sendRecorded(broker_, options_, query, calls); });
+    } catch (const BrokerError& error) {
+        find(CheckKind::failed, text, std::string("the request cannot be made: ") + error.what());
+        return std::nullopt;
+    }
+    checkCode(text, answer);
+    checkCalls(text, calls);
+    if (answer.ok() && !answer.isDone) {
+        find(CheckKind::notDone, text, query.verb->name + std::string(" does not call returnDone"));
+    }
+    asked_.push_back({query, answer.code, std::move(calls), checkLeftOver(query, before)});
+    return answer;
+}
+
+std::optional<Answer> Client::askPlainly(const Query& query, const FailingCall* failing) {
+    std::string text = textOf(query);
+    if (failing != nullptr) {
+        text += " --fault " + failing->slot + ':' + std::to_string(failing->number);
+    }
+    if (task_.skipped.count(text) != 0) {
+        return std::nullopt;
+    }
+    try {
+        Answer answer = tracked(text, [&] { return send(broker_, options_, query, failing); });
+        checkCode(text, answer);
+        return answer;
+    } catch (const BrokerError&) { // the call that fails is one of the client's own
+        return std::nullopt;
+    }
+}
+
+void Client::doing(const std::string& name, const std::function<void()>& work) {
+    tracked(name, work);
+}
+
+void Client::fail(const std::string& request, const std::string& what, const Answer& answer) {
+    if (isStandard(answer.code) && !isException(answer)) {
+        find(CheckKind::failed, request, what + ": " + wordsOf(answer));
+    }
+}
+
+void Client::find(CheckKind kind, const std::string& request, const std::string& text) {
+    if (reports_) {
+        tell({Message::Kind::finding, 0, "", {kind, task_.className, task_.pass, request, text}});
+    }
+}
+
+void Client::checkCode(const std::string& request, const Answer& answer) {
+    if (!isStandard(answer.code)) {
+        find(CheckKind::notACode, request, "the answer is " + std::to_string(static_cast<int>(answer.code)));
+    }
+    if (isException(answer)) {
+        find(CheckKind::exception, request, answer.message);
+    }
+}
+
+void Client::checkCalls(const std::string& request, const std::vector<ProviderCall>& calls) {
+    for (const ProviderCall& made : calls) {
+        for (const Refusal& refusal : refusals) {
+            if (made.call.code == refusal.code && endsWith(made.call.slot, refusal.member)) {
+                find(refusal.kind, request, refusal.text(made.call));
+            }
+        }
+    }
+}
+
+// A provider may keep what it made for a first request; it makes no more for the second.
+bool Client::checkLeftOver(const Query& query, std::size_t before) {
+    if (broker_.liveObjects().total() <= before) {
+        return false;
+    }
+    const std::size_t kept = broker_.liveObjects().total();
+    askPlainly(query);
+    const std::size_t left = broker_.liveObjects().total();
+    if (left > kept) {
+        find(CheckKind::leftOver, textOf(query),
+             query.verb->name + (" leaves " + std::to_string(left - kept)) +
+                 (left - kept == 1 ? " object" : " objects"));
+    }
+    return left > kept;
+}

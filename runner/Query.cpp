@@ -1,0 +1,150 @@
+#include "Query.h"
+
+#include <algorithm>
+#include <cctype>
+#include <map>
+
+namespace {
+
+// A word of a shell's command line.
+std::string quoted(const std::string& word) {
+    const bool isPlain = !word.empty() && std::all_of(word.begin(), word.end(), [](unsigned char c) {
+        return c >= 0x80 || std::isalnum(c) != 0 ||
+               std::string_view("_./:=,-+").find(static_cast<char>(c)) != std::string_view::npos;
+    });
+    if (isPlain) {
+        return word;
+    }
+    std::string result = "'";
+    for (const char c : word) {
+        result += c == '\'' ? "'\\''" : std::string(1, c);
+    }
+    return result + '\'';
+}
+
+std::string joined(const std::vector<std::string>& words) {
+    std::string result;
+    for (const std::string& word : words) {
+        result += (result.empty() ? "" : ",") + word;
+    }
+    return result;
+}
+
+struct Option {
+    const char* name;
+    const std::string oxahv::AssociationFilter::*value;
+};
+constexpr Option filterOptions[] = {{"--assoc-class", &oxahv::AssociationFilter::associationClass},
+                                    {"--result-class", &oxahv::AssociationFilter::resultClass},
+                                    {"--role", &oxahv::AssociationFilter::role},
+                                    {"--result-role", &oxahv::AssociationFilter::resultRole}};
+
+// Takes faults and the record away, whatever happens.
+class Hooked {
+public:
+    Hooked(oxahv::EmbeddedBroker& broker, const FailingCall* failing, bool isRecorded)
+        : broker_(broker), isFailing_(failing != nullptr), isRecorded_(isRecorded) {
+        if (failing != nullptr) {
+            oxahv::Fault fault;
+            fault.firstCall = failing->number;
+            broker_.injectFault(failing->slot, fault);
+        }
+        if (isRecorded_) {
+            broker_.startRecording();
+        }
+    }
+    ~Hooked() { end(); }
+    Hooked(const Hooked&) = delete;
+    Hooked& operator=(const Hooked&) = delete;
+
+    std::vector<oxahv::Call> calls() {
+        return isRecorded_ ? broker_.stopRecording() : std::vector<oxahv::Call>();
+    }
+    void end() {
+        if (isFailing_) {
+            broker_.clearFaults();
+        }
+        if (isRecorded_) {
+            broker_.stopRecording();
+        }
+        isFailing_ = false;
+        isRecorded_ = false;
+    }
+
+private:
+    oxahv::EmbeddedBroker& broker_;
+    bool isFailing_;
+    bool isRecorded_;
+};
+
+Answer sendHooked(oxahv::EmbeddedBroker& broker, const Options& options, const Query& query,
+                  const FailingCall* failing, std::vector<ProviderCall>* calls) {
+    Hooked hooked(broker, failing, calls != nullptr);
+    oxahv::Request request(broker);
+    const CMPIObjectPath* const target = targetOf(request, options, *query.verb, query.operands);
+    std::map<std::string, unsigned int> counts;
+    if (calls != nullptr) {
+        for (const oxahv::Call& call : broker.stopRecording()) {
+            ++counts[call.slot];
+        }
+        broker.startRecording();
+    }
+    const oxahv::Reply reply = query.verb->perform(broker, request, target, query.operands);
+    for (oxahv::Call& call : hooked.calls()) {
+        const unsigned int number = ++counts[call.slot];
+        calls->push_back({std::move(call), number});
+    }
+    hooked.end(); // before the reply is read, which takes slots too
+    return answerOf(reply, options.nameSpace);
+}
+
+} // namespace
+
+Query queryOf(const std::string& verb, Operands operands) {
+    const auto found = std::find_if(verbs().begin(), verbs().end(),
+                                    [&](const Verb& candidate) { return verb == candidate.name; });
+    return {&*found, std::move(operands)};
+}
+
+Query queryOf(const std::string& verb, const std::string& target) {
+    Operands operands;
+    operands.target = target;
+    return queryOf(verb, std::move(operands));
+}
+
+std::string textOf(const Query& query) {
+    const Operands& operands = query.operands;
+    std::string text = query.verb->name + (' ' + quoted(operands.target));
+    if (!operands.method.empty()) {
+        text += ' ' + quoted(operands.method);
+    }
+    for (const std::string& argument : operands.arguments) {
+        text += ' ' + quoted(argument);
+    }
+    for (const Option& option : filterOptions) {
+        const std::string& value = operands.filter.*option.value;
+        text += value.empty() ? "" : std::string(" ") + option.name + ' ' + quoted(value);
+    }
+    if (operands.properties) {
+        text += " --properties " + quoted(joined(*operands.properties));
+    }
+    return text;
+}
+
+std::string shapeOf(const Query& query) {
+    std::string shape = query.verb->name + (' ' + query.operands.method);
+    for (const Option& option : filterOptions) {
+        shape += (query.operands.filter.*option.value).empty() ? '-' : '+';
+    }
+    return shape + (query.operands.properties ? '+' : '-');
+}
+
+Answer send(oxahv::EmbeddedBroker& broker, const Options& options, const Query& query,
+            const FailingCall* failing) {
+    return sendHooked(broker, options, query, failing, nullptr);
+}
+
+Answer sendRecorded(oxahv::EmbeddedBroker& broker, const Options& options, const Query& query,
+                    std::vector<ProviderCall>& calls) {
+    return sendHooked(broker, options, query, nullptr, &calls);
+}

@@ -1,0 +1,45 @@
+// One request of a check, and how it is sent.
+#pragma once
+
+#include "Answer.h"
+#include "Runner.h"
+
+#include <optional>
+#include <string>
+#include <vector>
+
+struct Query {
+    const Verb* verb;
+    Operands operands;
+};
+
+// A query of the verb of that name.
+Query queryOf(const std::string& verb, Operands operands);
+Query queryOf(const std::string& verb, const std::string& target);
+
+// The verb and its operands, as the shell takes them behind the command's options.
+std::string textOf(const Query& query);
+
+// What a query without the values of its operands is: queries of one shape go the same way through a
+// provider.
+std::string shapeOf(const Query& query);
+
+// A slot's call that fails: the `--fault` of the command line.
+struct FailingCall {
+    std::string slot;
+    unsigned int number = 1;
+};
+
+// A slot's call that the provider made. The number counts all calls of the slot from the request's beginning.
+struct ProviderCall {
+    oxahv::Call call;
+    unsigned int number = 1;
+};
+
+// Sends the query. Throws oxahv::BrokerError when it cannot be sent. Thread-safe without a failing call.
+Answer send(oxahv::EmbeddedBroker& broker, const Options& options, const Query& query,
+            const FailingCall* failing = nullptr);
+
+// The same, and notes the calls of slots. For one thread at a time.
+Answer sendRecorded(oxahv::EmbeddedBroker& broker, const Options& options, const Query& query,
+                    std::vector<ProviderCall>& calls);

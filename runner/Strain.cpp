@@ -1,0 +1,207 @@
+#include "Strain.h"
+
+#include <algorithm>
+#include <map>
+#include <set>
+#include <thread>
+
+namespace {
+
+// Threads
+
+using Answers = std::vector<std::optional<Answer>>;
+
+// What differs between two answers to a query. `values` are what may change by itself as well.
+struct Difference {
+    std::set<std::string> structure;
+    std::set<std::string> values;
+};
+
+std::map<std::string, const Result*> byIdentity(const Answer& answer) {
+    std::map<std::string, const Result*> results;
+    for (const Result& result : answer.results) {
+        results[result.identity] = &result;
+    }
+    return results;
+}
+
+void compareValues(const std::string& where, const NamedData& one, const NamedData& other,
+                   Difference& difference) {
+    for (const auto& [name, value] : one) {
+        const auto found = other.find(name);
+        if (found == other.end() || !(found->second == value)) {
+            difference.values.insert(where + name);
+        }
+    }
+    for (const auto& [name, value] : other) {
+        if (one.count(name) == 0) {
+            difference.values.insert(where + name);
+        }
+    }
+}
+
+Difference differenceOf(const Answer& one, const Answer& other) {
+    Difference difference;
+    if (one.code != other.code) {
+        difference.structure.insert(oxahv::codeName(one.code) + " in place of " +
+                                    oxahv::codeName(other.code));
+        return difference;
+    }
+    const auto ours = byIdentity(one);
+    const auto theirs = byIdentity(other);
+    if (ours.size() != theirs.size() || one.results.size() != other.results.size()) {
+        difference.structure.insert(std::to_string(one.results.size()) + " results in place of " +
+                                    std::to_string(other.results.size()));
+        return difference;
+    }
+    for (const auto& [identity, result] : ours) {
+        const auto found = theirs.find(identity);
+        if (found == theirs.end()) {
+            difference.structure.insert("result " + result->path);
+        } else {
+            compareValues(result->path + ": property ", result->properties, found->second->properties,
+                          difference);
+        }
+    }
+    compareValues("output argument ", one.out, other.out, difference);
+    if (!(one.data == other.data)) {
+        difference.values.insert("the return value");
+    }
+    return difference;
+}
+
+std::set<std::string> without(const std::set<std::string>& all, const std::set<std::string>& excepted) {
+    std::set<std::string> rest;
+    std::set_difference(all.begin(), all.end(), excepted.begin(), excepted.end(),
+                        std::inserter(rest, rest.end()));
+    return rest;
+}
+
+Answers askAll(Client& client, const std::vector<Query>& queries) {
+    Answers answers;
+    for (const Query& query : queries) {
+        answers.push_back(client.askPlainly(query));
+    }
+    return answers;
+}
+
+std::vector<Answers> askAtOnce(Client& client, const std::vector<Query>& queries) {
+    std::vector<Answers> all(client.task().threads);
+    std::vector<std::thread> threads;
+    threads.reserve(all.size());
+    for (Answers& answers : all) {
+        threads.emplace_back([&] { answers = askAll(client, queries); });
+    }
+    for (std::thread& thread : threads) {
+        thread.join();
+    }
+    return all;
+}
+
+// What differs of a query, beyond what differs of itself between the two times that one thread asked.
+using Differences = std::map<std::size_t, Difference>;
+
+Differences oneRound(Client& client, const std::vector<Query>& queries) {
+    const Answers before = askAll(client, queries);
+    const std::vector<Answers> atOnce = askAtOnce(client, queries);
+    const Answers after = askAll(client, queries);
+    Differences differences;
+    for (std::size_t i = 0; i < queries.size(); ++i) {
+        if (!before[i] || !after[i]) {
+            continue;
+        }
+        const Difference itself = differenceOf(*before[i], *after[i]);
+        for (const Answers& answers : atOnce) {
+            if (answers[i]) {
+                const Difference found = differenceOf(*answers[i], *before[i]);
+                if (itself.structure.empty()) {
+                    differences[i].structure.insert(found.structure.begin(), found.structure.end());
+                }
+                const std::set<std::string> values = without(found.values, itself.values);
+                differences[i].values.insert(values.begin(), values.end());
+            }
+        }
+    }
+    return differences;
+}
+
+// Faults
+
+constexpr unsigned int mostOfASlot = 100;
+
+// A call that gives something back is not made to fail: what is left over then would be the broker's fault.
+bool canFail(const std::string& slot) {
+    const std::string member = slot.substr(slot.find('.') + 1);
+    return member != "release" && member.rfind("free", 0) != 0 && member != "detachThread";
+}
+
+std::vector<FailingCall> failingCalls(const std::vector<ProviderCall>& calls) {
+    std::map<std::string, unsigned int> last;
+    for (const ProviderCall& made : calls) {
+        last[made.call.slot] = made.number;
+    }
+    std::map<std::string, unsigned int> counts;
+    std::vector<FailingCall> failing;
+    for (const ProviderCall& made : calls) {
+        const std::string& slot = made.call.slot;
+        const bool isFewest = ++counts[slot] <= mostOfASlot || made.number == last[slot];
+        if (canFail(slot) && isFewest) {
+            failing.push_back({slot, made.number});
+        }
+    }
+    return failing;
+}
+
+void failEach(Client& client, const Client::Asked& asked) {
+    const auto live = [&] { return client.broker().liveObjects().total(); };
+    for (const FailingCall& failing : failingCalls(asked.calls)) {
+        const std::size_t before = live();
+        client.askPlainly(asked.query, &failing);
+        const std::size_t kept = live();
+        if (kept <= before) {
+            continue;
+        }
+        client.askPlainly(asked.query, &failing);
+        if (live() > kept) {
+            client.find(CheckKind::leftOver,
+                        textOf(asked.query) + " --fault " + failing.slot + ':' +
+                            std::to_string(failing.number),
+                        asked.query.verb->name + (" leaves objects when " + failing.slot + " fails"));
+        }
+    }
+}
+
+} // namespace
+
+// A value that is different once may have changed; one that is different twice has not.
+void strainByThreads(Client& client) {
+    std::vector<Query> queries;
+    for (const Client::Asked& asked : client.asked()) {
+        queries.push_back(asked.query);
+    }
+    const Differences first = oneRound(client, queries);
+    const bool hasValues = std::any_of(first.begin(), first.end(),
+                                       [](const auto& entry) { return !entry.second.values.empty(); });
+    Differences second = hasValues ? oneRound(client, queries) : Differences();
+    for (const auto& [index, difference] : first) {
+        for (const std::string& text : difference.structure) {
+            client.find(CheckKind::threadsDiffer, textOf(queries[index]), text);
+        }
+        for (const std::string& text : difference.values) {
+            if (second[index].values.count(text) != 0) {
+                client.find(CheckKind::threadsDiffer, textOf(queries[index]), text);
+            }
+        }
+    }
+}
+
+void strainByFaults(Client& client) {
+    std::set<std::string> shapes;
+    const std::vector<Client::Asked> all = client.asked();
+    for (const Client::Asked& asked : all) {
+        const std::string shape = shapeOf(asked.query) + oxahv::codeName(asked.code);
+        if (!asked.leavesObjects && shapes.insert(shape).second) {
+            failEach(client, asked);
+        }
+    }
+}
