@@ -168,12 +168,11 @@ std::string Associations::superclass(const std::string& className) const {
     return "";
 }
 
-// A declared class that neither is above nor below the class; empty if none.
-std::string Associations::unrelatedClass(const std::string& className) const {
-    for (const std::string& other : client_.broker().declaredClasses()) {
-        const bool isBelow = passesClass(other, className);
-        if (!isBelow && !client_.broker().isA(className, other)) {
-            return other;
+// A declared class that is neither above nor below the wanted one; empty if none.
+std::string Associations::unrelatedClass(const std::string& wanted) const {
+    for (const std::string& declared : client_.broker().declaredClasses()) {
+        if (!passesClass(declared, wanted) && !passesClass(wanted, declared)) {
+            return declared;
         }
     }
     return "";

@@ -35,7 +35,7 @@ private:
     void checkOtherEnds();
     void runFilters();
     std::vector<oxahv::AssociationFilter> filters() const;
-    std::string unrelatedClass(const std::string& className) const;
+    std::string unrelatedClass(const std::string& wanted) const;
     std::string superclass(const std::string& className) const;
     bool passes(const Way& way, const oxahv::AssociationFilter& filter) const;
     bool passesClass(const std::string& className, const std::string& filter) const;

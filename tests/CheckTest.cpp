@@ -100,7 +100,7 @@ const std::map<std::string, Texts> expectedFindings = {
 } // namespace
 
 TEST(TheCheck, FindsEachFault) {
-    std::string command = faulty + "--output json check --timeout 2 --method Faulty_MethodResult.Call "
+    std::string command = faulty + "--output json check --timeout 5 --method Faulty_MethodResult.Call "
                                    "--method Faulty_None.Call";
     for (const auto& [name, findings] : expectedFindings) {
         command += " --class Faulty_" + name;
