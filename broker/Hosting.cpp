@@ -88,15 +88,16 @@ const char* orNull(const std::string& text) {
 // Runs a provider's function. What it throws becomes a status: a provider must not take its server along.
 template <class Function>
 CMPIStatus guarded(const Function& function, std::string& message) {
-    CMPIStatus status = {CMPI_RC_ERR_FAILED, nullptr};
+    constexpr CMPIStatus thrown = {CMPI_RC_ERR_FAILED, nullptr};
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
     try {
         status = function();
     } catch (const std::exception& exception) {
         message = std::string("exception: ") + exception.what();
-        return status;
+        return thrown;
     } catch (...) {
         message = "exception of an unknown kind";
-        return status;
+        return thrown;
     }
     message = messageOf(status); // what this throws is not the provider's
     return status;
