@@ -146,7 +146,7 @@ void EmbeddedBroker::clearFaults() {
 }
 
 std::vector<std::string> EmbeddedBroker::slotNames() {
-    return std::vector<std::string>(std::begin(slots), std::end(slots));
+    return {std::begin(slots), std::end(slots)};
 }
 
 void EmbeddedBroker::startRecording() {

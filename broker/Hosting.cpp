@@ -132,7 +132,7 @@ Value widest(const Value& value) {
         wide.uint64 = data.value.uint32;
         break;
     case CMPI_sint8:
-        wide.sint64 = data.value.sint8;
+        wide.sint64 = data.value.sint8; // NOLINT(bugprone-signed-char-misuse,cert-str34-c): a number
         type = CMPI_sint64;
         break;
     case CMPI_sint16:
@@ -272,7 +272,7 @@ bool HostedProvider::serves(const Classes& declared, std::string_view className)
                        [&](const std::string& served) { return declared.isA(className, served); });
 }
 
-Hosting::~Hosting() {
+Hosting::~Hosting() { // NOLINT(bugprone-exception-escape): nothing that it names is missing
     // In the order in which they came; each may still send requests to those after it.
     while (!providers_.empty()) {
         take(providers_.front()->name());

@@ -30,7 +30,7 @@ private:
 class Hosting {
 public:
     explicit Hosting(EmbeddedBroker::Impl& core) : core_(core) {}
-    ~Hosting();
+    ~Hosting(); // NOLINT(bugprone-exception-escape): see there
     Hosting(const Hosting&) = delete;
     Hosting& operator=(const Hosting&) = delete;
 
@@ -62,14 +62,14 @@ public:
                        const CMPIArgs* in);
 
     // A copy of a path with its keys as the broker's KeyMode says; the current owner's.
-    CMPIObjectPath* deliver(const CMPIObjectPath* path) const;
+    CMPIObjectPath* deliver(const CMPIObjectPath* handle) const;
 
 private:
     template <class MI>
     std::shared_ptr<HostedProvider> find(const ObjectPath& path,
                                          std::string_view associationClass = {}) const;
     template <class MI, class Function>
-    Reply request(const CMPIContext* context, const CMPIObjectPath* path, const Function& function,
+    Reply request(const CMPIContext* context, const CMPIObjectPath* handle, const Function& function,
                   std::string_view associationClass = {});
     void add(std::shared_ptr<HostedProvider> provider);
     std::shared_ptr<HostedProvider> take(const std::string& name);

@@ -82,7 +82,7 @@ CMPIrc codeFromName(const std::string& name) {
     }
     const bool isNumber = !wanted.empty() && wanted.size() < 4 &&
                           wanted.find_first_not_of("0123456789") == std::string_view::npos;
-    const int number = isNumber ? std::atoi(std::string(wanted).c_str()) : -1;
+    const int number = isNumber ? std::stoi(std::string(wanted)) : -1;
     if (number < 0 || number > CMPI_RC_ERROR) {
         throw BrokerError("there is no CMPI return code " + name);
     }

@@ -83,8 +83,8 @@ const char* FrameworkException::what() const noexcept {
 
 Moniker::Moniker() = default;
 Moniker::Moniker(const Moniker& other) = default;
-Moniker& Moniker::operator=(
-    const Moniker& other) { // NOLINT(cert-oop54-cpp,bugprone-unhandled-self-assignment)
+// NOLINTNEXTLINE(cert-oop54-cpp,bugprone-unhandled-self-assignment): a moniker may be assigned to itself
+Moniker& Moniker::operator=(const Moniker& other) {
     // The list is copied first: when memory runs out, the selection must not be one of a list that never
     // came.
     std::vector<KeyComponent> copy(other.keys);

@@ -581,11 +581,16 @@ char lowerCase(char c) {
     return static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
 }
 
+// A wide character's code; negative for some of those that are no characters.
+std::int32_t codeOf(wchar_t c) {
+    // NOLINTNEXTLINE(bugprone-signed-char-misuse,cert-str34-c): wchar_t is no char
+    return static_cast<std::int32_t>(c);
+}
+
 // Of wide characters, those that tolower may be asked about.
 wchar_t lowerCase(wchar_t c) {
-    const auto code =
-        static_cast<std::uint32_t>(c); // NOLINT(bugprone-signed-char-misuse,cert-str34-c): no char
-    return code <= 0xFF ? static_cast<wchar_t>(std::tolower(static_cast<int>(code))) : c;
+    const std::int32_t code = codeOf(c);
+    return code >= 0 && code <= 0xFF ? static_cast<wchar_t>(std::tolower(code)) : c;
 }
 
 // A word of the list ends with a point, behind one of two letters.
@@ -593,7 +598,8 @@ constexpr std::size_t wordLength = 4;
 
 // Whether a word ends in a text at a position from `first` on.
 bool endsWord(std::string_view text, std::size_t first) {
-    for (std::size_t point = text.find('.', first); point != text.npos; point = text.find('.', point + 1)) {
+    for (std::size_t point = text.find('.', first); point != std::string_view::npos;
+         point = text.find('.', point + 1)) {
         if (point >= wordLength - 1 && lowerCase(text[point - 3]) == 'w') {
             const char second = lowerCase(text[point - 2]);
             const char third = lowerCase(text[point - 1]);
@@ -623,7 +629,7 @@ bool mayEndWord(const char* block) {
 // symbols can be looked for in the text as it is.
 bool holdsDenied(std::string_view text) {
     constexpr std::string_view symbols = "<%$\\:";
-    const auto holds = [text](char symbol) { return text.find(symbol) != text.npos; };
+    const auto holds = [text](char symbol) { return text.find(symbol) != std::string_view::npos; };
     if (std::any_of(symbols.begin(), symbols.end(), holds)) {
         return true;
     }
@@ -641,13 +647,13 @@ bool holdsDenied(std::string_view text) {
 void makeNarrow(std::wstring_view text, char* narrow) {
     std::int32_t all = 0;
     for (std::size_t i = 0; i < text.size(); ++i) {
-        const auto code = static_cast<std::int32_t>(text[i]);
+        const std::int32_t code = codeOf(text[i]);
         all |= code;
         narrow[i] = static_cast<char>(code <= 0xFF ? code : 0);
     }
     if (all < 0) {
         std::transform(text.begin(), text.end(), narrow, [](wchar_t c) {
-            const auto code = static_cast<std::int32_t>(c);
+            const std::int32_t code = codeOf(c);
             return static_cast<char>(code >= 0 && code <= 0xFF ? code : 0);
         });
     }
@@ -681,7 +687,7 @@ bool isAcceptable(std::basic_string<Char>& text, const std::basic_string<Char>& 
     }
     std::transform(text.begin(), text.end(), text.begin(), [](Char c) { return lowerCase(c); });
     return std::none_of(entries.begin(), end, [&text](std::basic_string_view<Char> entry) {
-        return text.find(entry) != text.npos;
+        return text.find(entry) != std::string_view::npos;
     });
 }
 

@@ -132,8 +132,8 @@ std::string Utils::stripSpaces(std::string text) {
 }
 
 std::string Utils::addZero(unsigned char count) {
-    return std::string(count,
-                       '0'); // NOLINT(modernize-return-braced-init-list): braces would list two characters
+    // NOLINTNEXTLINE(modernize-return-braced-init-list): braces would list two characters
+    return std::string(count, '0');
 }
 
 // Property files

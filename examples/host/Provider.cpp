@@ -19,7 +19,7 @@ std::mutex settingsMutex;
 
 struct Settings {
     std::string hostRoot;
-    std::string stateFile = OXAHOST_STATE_FILE;
+    std::string stateFile{OXAHOST_STATE_FILE};
 };
 
 // Guarded by the mutex.
