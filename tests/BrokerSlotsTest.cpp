@@ -188,10 +188,16 @@ private:
     const Request* request_ = nullptr;
 };
 
+// Compiled for the arguments alone that are handles.
+template <class Type, class Target>
+Type constCast(const Target* object) {
+    return const_cast<Type>(object);
+}
+
 template <class Type>
 Type EverySlot::argument() {
     using Target = std::remove_const_t<std::remove_pointer_t<Type>>;
-    const auto made = [](auto* object) { return const_cast<Type>(static_cast<const Target*>(object)); };
+    const auto made = [](auto* object) { return constCast<Type>(static_cast<const Target*>(object)); };
     if constexpr (std::is_same_v<Target, CMPIBroker>) {
         return made(broker);
     } else if constexpr (std::is_same_v<Type, CMPIStatus*>) {

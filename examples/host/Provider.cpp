@@ -19,7 +19,8 @@ std::mutex settingsMutex;
 
 struct Settings {
     std::string hostRoot;
-    std::string stateFile{OXAHOST_STATE_FILE};
+    // NOLINTNEXTLINE(readability-redundant-string-init): a build may leave it empty
+    std::string stateFile = OXAHOST_STATE_FILE;
 };
 
 // Guarded by the mutex.
