@@ -1,5 +1,6 @@
 // The runner's check of a provider, as a shell would start it: on one that does everything wrong, and on one
 // that does nothing wrong.
+#include <algorithm>
 #include <array>
 #include <csignal>
 #include <cstdio>
@@ -10,7 +11,6 @@
 #include <map>
 #include <nlohmann/json.hpp>
 #include <pty.h>
-#include <regex>
 #include <set>
 #include <sstream>
 #include <string>
@@ -124,9 +124,7 @@ TEST(TheCheck, FindsEachFault) {
     for (const auto& [name, findings] : expectedFindings) {
         EXPECT_EQ(found[name], findings) << "Faulty_" << name;
     }
-    EXPECT_EQ(
-        run("sh -c \"" + std::regex_replace(faulty + crash, std::regex("\""), "\\\"") + "\" 2>&1").status,
-        128 + SIGKILL)
+    EXPECT_EQ(run(faulty + crash + " 2>/dev/null; exit $?").status, 128 + SIGKILL)
         << "the request does on the command line what it did in the check: " << crash;
 }
 
@@ -235,16 +233,15 @@ Texts offered(const std::string& words) {
 } // namespace
 
 TEST(Completion, OffersWhatTheHelpShows) {
-    const std::regex option("--[a-z][-a-z]*");
     for (const std::string verb : {"", "ein", "ei", "gi", "an", "ai", "rn", "ri", "cm", "check"}) {
         std::string help = run(RUNNER " " + verb + " --help").output;
         help.resize(std::min(help.size(), help.find("Exit status"))); // examples follow
         Texts shown;
         std::istringstream stream(help);
         for (std::string line; std::getline(stream, line);) {
-            std::smatch match;
-            if (line.rfind("  -", 0) == 0 && std::regex_search(line, match, option)) {
-                shown.insert(match.str());
+            const std::size_t begin = line.find("--");
+            if (line.rfind("  -", 0) == 0 && begin != std::string::npos) {
+                shown.insert(line.substr(begin, line.find_first_of(" ,", begin) - begin));
             }
         }
         EXPECT_GE(shown.size(), verb.empty() ? 9U : 1U);
@@ -274,5 +271,6 @@ TEST(Completion, OffersVerbsClassesAndValues) {
     }
     const Outcome version = run(RUNNER " --version");
     EXPECT_EQ(version.status, 0);
-    EXPECT_TRUE(std::regex_match(version.output, std::regex("oxahv-provider [0-9]+\\.[0-9]+\\.[0-9]+\n")));
+    EXPECT_EQ(version.output.rfind("oxahv-provider ", 0), 0U);
+    EXPECT_EQ(std::count(version.output.begin(), version.output.end(), '.'), 2);
 }
