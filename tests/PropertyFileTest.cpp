@@ -70,24 +70,22 @@ static_assert(!std::is_copy_constructible_v<PropertyFile> && !std::is_copy_assig
 } // namespace
 
 TEST_F(APropertyFile, GivesBackEveryKeyAndValue) {
-    const std::wstring nasty[] = {
-        L"",
-        L" ",
-        L"\n",
-        L"\\u{41}",
-        L"==a = b==",
-        L"#",
-        L"# not",
-        L" ends ",
-        L"\u00A0\u00A0",
-        L"\x7F\x1B[0m\b",
-        L"\u0085\u2028\u2029",
-        L"\uFEFFkey",
-        L"\u00FC\u20AC\U0001F600\U0010FFFF",
-        L"\xDFFF\xD800",
-        std::wstring(1, static_cast<wchar_t>(0x110000)),
-        std::wstring(1, static_cast<wchar_t>(-1)),
-    };
+    const std::wstring nasty[] = {L"",
+                                  L" ",
+                                  L"\n",
+                                  L"\\u{41}",
+                                  L"==a = b==",
+                                  L"#",
+                                  L"# not",
+                                  L" ends ",
+                                  L"\u00A0\u00A0",
+                                  L"\x7F\x1B[0m\b",
+                                  L"\u0085\u2028\u2029",
+                                  L"\uFEFFkey",
+                                  L"\u00FC\u20AC\U0001F600\U0010FFFF",
+                                  L"\xDFFF\xD800",
+                                  std::wstring(1, static_cast<wchar_t>(0x110000)),
+                                  std::wstring(1, static_cast<wchar_t>(-1))};
     std::map<std::wstring, std::wstring> expected = {{std::wstring(L"nul\0key", 7), L"value"}};
     for (const std::wstring& key : nasty) {
         for (const std::wstring& value : nasty) {
