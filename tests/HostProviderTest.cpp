@@ -164,8 +164,6 @@ TEST_F(TheHostProvider, ShowsTheMachine) {
     broker_.compileMof(MOF_FOLDER "/OXAHost.mof");
     const std::string noTag = textOf(request_.getInstance(path(detailsPath)));
     ASSERT_EQ(setTag("tag"), "0");
-    const std::string system =
-        R"(Name="machine" EnabledState=2 CreationClassName="OXATK_ComputerSystem" NameFormat="HostName" )";
     const std::string device =
         R"(SystemCreationClassName="OXATK_ComputerSystem" SystemName="machine" CreationClassName=)";
     const auto sensor = [&](const std::string& minutes, const std::string& reading) {
@@ -173,7 +171,8 @@ TEST_F(TheHostProvider, ShowsTheMachine) {
                device + "\"OXATK_NumericSensor\" SensorNumber=" + minutes + " Reading=" + reading + ' ';
     };
     const std::pair<const char*, std::string> cases[] = {
-        {"oxatk_computersystem", R"(ElementName="Computer system machine" )" + system},
+        {"oxatk_computersystem", R"(ElementName="Computer system machine" Name="machine" EnabledState=2 )"
+                                 R"(CreationClassName="OXATK_ComputerSystem" NameFormat="HostName" )"},
         {"OXATK_OperatingSystem",
          R"(Caption="Prüf-OS \\ 1 €" ElementName="Operating system machine" Name="Prüf-OS \\ 1 €" )"
          R"(OperationalStatus={2} StatusDescriptions={"running"} EnabledState=2 )"

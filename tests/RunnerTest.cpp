@@ -186,6 +186,7 @@ TEST(TheRunner, TellsWhatWentWrongInOneLine) {
         {2, host + "gi 'Demo.Key=\"'",
          "object path, column 10: the quote is not closed; write it as Class.Key=\"text\",Number=3"},
         {2, host + "--context x ein X", "context entry 'x' is not NAME=TEXT"},
+        {2, host + "--context =x ein X", "context entry '=x' is not NAME=TEXT"},
         {2, "--library " NO_PROVIDER " ein X",
          "library " NO_PROVIDER " has no factory for a provider oxahvlogger, such as "
          "oxahvlogger_Create_InstanceMI; is oxahvlogger its MI name? Else give it with --provider"},
