@@ -5,6 +5,7 @@
 
 #include <chrono>
 #include <csignal>
+#include <cstddef>
 #include <stdexcept>
 #include <string>
 #include <strings.h>
