@@ -44,7 +44,7 @@ const std::map<std::string, std::string> expectedFindings = {
     {"AssociationEnd", "association-end "},
     {"AssociationOneSided", "one-sided "},
     {"AssociationFilter", "filter filter filter filter "},
-    {"MethodResult", "method-result method-result "},
+    {"MethodResult", "method-result method-result method-result "},
     {"ThreadsDiffer", "threads-differ@threads "},
     {"LeftOver", "left-over left-over "},
     {"LeftOverInFault", "left-over@faults left-over@faults "},
@@ -53,7 +53,7 @@ const std::map<std::string, std::string> expectedFindings = {
 
 std::string faultyClasses() {
     std::string text = "[Abstract] class Faulty_Base { [Key] string Name; string Text; uint32 Number;"
-                       " datetime When; uint32 Call(); };"
+                       " datetime When; uint32 Call([In(false), Out] uint8 Result); };"
                        "[Abstract] class Faulty_End : Faulty_Base {};"
                        "[Association, Abstract] class Faulty_Link {"
                        " [Key] Faulty_Base REF Near; [Key] Faulty_End REF Far; };"

@@ -310,6 +310,7 @@ static CMPIStatus FaultyInvokeMethod(CMPIMethodMI*, const CMPIContext*, const CM
         require(CMReturnData(result, &value, isFaulty ? CMPI_uint16 : CMPI_uint32));
         if (isFaulty) {
             require(CMAddArg(out, "Nothing", &value, CMPI_uint32));
+            require(CMAddArg(out, "Result", &value, CMPI_uint32));
         }
     });
 }

@@ -294,6 +294,7 @@ TEST_F(TheHostProvider, WritesDatesAsTheSameInstant) {
 
 TEST_F(TheHostProvider, AnswersWhatItCannotDoWithItsCode) {
     EXPECT_EQ(codeOf("OXATK_EthernetPort.DeviceID=\"eth0\""), CMPI_RC_ERR_NOT_FOUND);
+    EXPECT_EQ(codeOf(portPath + ",Other=1"), CMPI_RC_ERR_NOT_FOUND);
     std::string other = systemPath;
     other.replace(other.rfind("machine"), 7, "others");
     EXPECT_EQ(codeOf(other), CMPI_RC_ERR_NOT_FOUND);
