@@ -321,6 +321,7 @@ TEST_F(TheHostProvider, AnswersWhatItCannotDoWithItsCode) {
     EXPECT_EQ(request_.invokeMethod(port, "SetAssetTag", argument("x")).code, CMPI_RC_ERR_METHOD_NOT_FOUND);
     EXPECT_TRUE(setTag(request_, "x", "setassettag").ok());
     CMPIData number = {CMPI_uint64, CMPI_goodValue, {}};
+    number.value.uint64 = 5;
     EXPECT_EQ(request_.invokeMethod(path(systemPath), "SetAssetTag", argument(number)).message,
               "The asset tag is missing.");
 
