@@ -40,12 +40,16 @@ inline std::string selectedKey(const TK::Moniker& moniker) {
     }
 }
 
-// All keys, a blank behind each, and the selected one.
-inline std::string textOf(TK::Moniker moniker) {
-    const std::string selected = " > " + selectedKey(moniker);
+// All keys, a blank behind each.
+inline std::string keysOf(TK::Moniker moniker) {
     std::string text;
     for (unsigned int i = 0; moniker.selectKey(i); ++i) {
         text += selectedKey(moniker) + ' ';
     }
-    return text + selected;
+    return text;
+}
+
+// The same, and the selected key.
+inline std::string textOf(const TK::Moniker& moniker) {
+    return keysOf(moniker) + " > " + selectedKey(moniker);
 }
