@@ -28,6 +28,22 @@ std::string textOf(const Value& value) {
     }
 }
 
+// The getter of a value from an object, told apart by their types.
+template <class Object, class Value>
+bool get(const Object* from, const char* name, Value& out) {
+    if constexpr (std::is_same_v<Object, CMPIObjectPath> && std::is_pointer_v<Value>) {
+        return PU::getKeyProperty(from, name, &out);
+    } else if constexpr (std::is_same_v<Object, CMPIObjectPath>) {
+        return PU::getKeyProperty(from, name, out);
+    } else if constexpr (std::is_pointer_v<Value>) {
+        return PU::getProperty(from, name, &out);
+    } else if constexpr (std::is_same_v<Object, CMPIInstance> && std::is_same_v<Value, std::string>) {
+        return PU::getProperty(from, name, out, name == std::string("Date"));
+    } else {
+        return PU::getProperty(from, name, out);
+    }
+}
+
 // An operation that reads something: the calls of the broker that it makes one by one, what it traces behind
 // them, and its result; when a call fails, it makes no other, and `failure` is its result.
 struct Reading {
@@ -65,80 +81,43 @@ protected:
     }
 
     // The row of a getter that reads a value by a name.
-    template <class Value, class Get>
-    Reading getter(const char* slot, const char* name, const std::string& value, const Get& get,
+    template <class Value, class Object>
+    Reading getter(const Object* const& from, const char* slot, const char* name, const std::string& value,
                    const std::string& moreCalls = "", const std::string& traces = "") {
-        const auto read = [get](const char* wanted) {
+        const auto read = [&from](const char* wanted) {
             const Value before{};
             Value out = before;
-            const bool isRead = get(wanted, out);
+            const bool isRead = get(from, wanted, out);
             return isRead ? textOf(out) : out == before ? untouched : "changed";
         };
         return {slot + std::string(" ") + name + '\n' + moreCalls, traces, value, read, name};
     }
-    template <class Value>
-    Reading ofInstance(const char* name, const std::string& value, const std::string& moreCalls = "",
-                       const std::string& traces = "") {
-        const auto get = [this](const char* wanted, Value& out) {
-            if constexpr (std::is_pointer_v<Value>) {
-                return PU::getProperty(fromInstance_, wanted, &out);
-            } else if constexpr (std::is_same_v<Value, std::string>) {
-                return PU::getProperty(fromInstance_, wanted, out, false);
-            } else {
-                return PU::getProperty(fromInstance_, wanted, out);
-            }
-        };
-        return getter<Value>("getProperty", name, value, get, moreCalls, traces);
-    }
-    template <class Value>
-    Reading ofArgs(const char* name, const std::string& value, const std::string& moreCalls = "",
-                   const std::string& traces = "") {
-        const auto get = [this](const char* wanted, Value& out) {
-            return PU::getProperty(fromArgs_, wanted, out);
-        };
-        return getter<Value>("getArg", name, value, get, moreCalls, traces);
-    }
-    template <class Value>
-    Reading ofPath(const char* name, const std::string& value, const std::string& moreCalls = "",
-                   const std::string& traces = "") {
-        const auto get = [this](const char* wanted, Value& out) {
-            if constexpr (std::is_pointer_v<Value>) {
-                return PU::getKeyProperty(fromPath_, wanted, &out);
-            } else {
-                return PU::getKeyProperty(fromPath_, wanted, out);
-            }
-        };
-        return getter<Value>("getKey", name, value, get, moreCalls, traces);
-    }
-
     std::vector<Reading> plainGetters() {
-        return {ofInstance<unsigned short>("Short", "60000"),
-                ofInstance<unsigned int>("Int", "4000000000"),
-                ofInstance<bool>("Flag", "1"),
-                ofInstance<CMPIString*>("Text", "\"text\""),
-                ofArgs<unsigned short>("Short", "60000"),
-                ofArgs<unsigned int>("Int", "4000000000"),
-                ofArgs<bool>("Flag", "1"),
-                ofPath<CMPIString*>("Text", "\"text\""),
-                ofPath<CMPIObjectPath*>("Path", "root:Other")};
+        return {getter<unsigned short>(fromInstance_, "getProperty", "Short", "60000"),
+                getter<unsigned int>(fromInstance_, "getProperty", "Int", "4000000000"),
+                getter<bool>(fromInstance_, "getProperty", "Flag", "1"),
+                getter<CMPIString*>(fromInstance_, "getProperty", "Text", "\"text\""),
+                getter<unsigned short>(fromArgs_, "getArg", "Short", "60000"),
+                getter<unsigned int>(fromArgs_, "getArg", "Int", "4000000000"),
+                getter<bool>(fromArgs_, "getArg", "Flag", "1"),
+                getter<CMPIString*>(fromPath_, "getKey", "Text", "\"text\""),
+                getter<CMPIObjectPath*>(fromPath_, "getKey", "Path", "root:Other")};
     }
     std::vector<Reading> wideGetters(const std::string& value, const std::string& traces) {
-        return {ofInstance<std::wstring>("Text", value, "getCharPtr\n", traces),
-                ofArgs<std::wstring>("Text", value, "getCharPtr\n", traces),
-                ofPath<std::wstring>("Text", value, "getCharPtr\n", traces)};
+        return {getter<std::wstring>(fromInstance_, "getProperty", "Text", value, "getCharPtr\n", traces),
+                getter<std::wstring>(fromArgs_, "getArg", "Text", value, "getCharPtr\n", traces),
+                getter<std::wstring>(fromPath_, "getKey", "Text", value, "getCharPtr\n", traces)};
     }
     std::vector<Reading> textGetters() {
         std::vector<Reading> all = wideGetters("text", passing(utility, "AStringToWString"));
-        all.push_back(ofInstance<std::string>("Text", "text", "getCharPtr\n"));
-        all.push_back(ofPath<std::string>("Text", "text", "getCharPtr\n"));
-        all.push_back(ofArgs<std::string>("Text", "text", "getCharPtr\n")); // the last
+        all.push_back(getter<std::string>(fromInstance_, "getProperty", "Text", "text", "getCharPtr\n"));
+        all.push_back(getter<std::string>(fromPath_, "getKey", "Text", "text", "getCharPtr\n"));
+        all.push_back(getter<std::string>(fromArgs_, "getArg", "Text", "text", "getCharPtr\n")); // the last
         return all;
     }
     Reading dateGetter() {
-        const auto get = [this](const char* name, std::string& out) {
-            return PU::getProperty(fromInstance_, name, out, true);
-        };
-        return getter<std::string>("getProperty", "Date", dateText, get, "getStringFormat\ngetCharPtr\n");
+        return getter<std::string>(fromInstance_, "getProperty", "Date", dateText,
+                                   "getStringFormat\ngetCharPtr\n");
     }
 
     // What a reading does in the face of the faults that are injected.
