@@ -3,8 +3,6 @@
 #include "Obvious.h"
 #include "TestLocales.h"
 
-#include <algorithm>
-#include <array>
 #include <atomic>
 #include <dlfcn.h>
 #include <random>
@@ -71,11 +69,11 @@ void checkScreen(const std::basic_string<Char>& alphabet) {
     for (int round = 0; round < 5000; ++round) {
         std::basic_string<Char> text;
         for (std::size_t parts = random() % 5; parts > 0; --parts) {
-            if (random() % 8 == 0) { // an entry, perhaps with a letter cut off and one in upper case
+            if (random() % 8 == 0) { // an entry, perhaps with a letter cut off and some in upper case
                 std::string entry = entries[random() % entries.size()].substr(random() % 8 == 0 ? 1 : 0);
-                std::transform(entry.begin(), entry.end(), entry.begin(), [&random](char c) {
-                    return random() % 2 == 0 && c >= 'a' && c <= 'z' ? static_cast<char>(c - 32) : c;
-                });
+                for (char& c : entry) {
+                    c = random() % 2 == 0 && c >= 'a' && c <= 'z' ? static_cast<char>(c - 32) : c;
+                }
                 text += widened<Char>(entry);
             } else {
                 text.append(1 + random() % 2, alphabet[random() % alphabet.size()]);
@@ -118,14 +116,11 @@ TEST_F(Texts, OfUsersAreScreened) {
 // edges too.
 TEST_F(Texts, OfUsersAreScreenedAtAnyLength) {
     constexpr std::size_t length = 3 * 4096 + 100;
-    const std::string clean = [] {
-        std::string text;
-        while (text.size() < length) {
-            text += "Row w. Rack p. App. aap. wwp. waw. wa. ww ";
-        }
-        text.resize(length);
-        return text;
-    }();
+    std::string clean;
+    while (clean.size() < length) {
+        clean += "Row w. Rack p. App. aap. wwp. waw. wa. ww ";
+    }
+    clean.resize(length);
     const auto accepted = [](const std::string& text) {
         const bool narrow = ProviderUtilities::ValidateInput(text, "");
         EXPECT_EQ(ProviderUtilities::ValidateInput(widened<wchar_t>(text), L""), narrow);
@@ -133,15 +128,11 @@ TEST_F(Texts, OfUsersAreScreenedAtAnyLength) {
     };
     EXPECT_TRUE(accepted(clean));
     for (const std::string entry : {"www.", "WaP.", "wWW.", "<", ":"}) {
-        for (std::size_t block = 0; block <= 3; ++block) {
-            for (std::size_t i = 0; i < 20; ++i) {
-                const std::size_t position =
-                    std::min(block * 4096 + i, length) - std::min<std::size_t>(block * 4096, 10);
+        for (std::size_t position = 0; position + entry.size() <= length; ++position) {
+            if ((position + 10) % 4096 < 20 || position + entry.size() == length) {
                 EXPECT_FALSE(accepted(std::string(clean).replace(position, entry.size(), entry)))
                     << entry << " at " << position;
             }
         }
-        EXPECT_FALSE(accepted(std::string(clean).replace(length - entry.size(), entry.size(), entry)))
-            << entry;
     }
 }

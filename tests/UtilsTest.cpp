@@ -44,29 +44,18 @@ TEST_F(CimDates, AreWritten) {
 }
 
 TEST_F(CimDates, AreWrittenForEveryValueOfEveryField) {
-    const DateTime base = date(2009, 3, 7, 5, 4, 9, 123, -5);
-    for (int number = 0; number <= 65535; ++number) {
-        DateTime value = base;
-        value.setYear(static_cast<unsigned short>(number));
-        ASSERT_EQ(Utils::convertCIMDateTime(value), formatted(value));
-        value = base;
-        value.setOffset(static_cast<short>(number - 32768));
+    for (unsigned int number = 0; number <= 65535; ++number) {
+        const auto byte = [number](unsigned int shift) {
+            return static_cast<unsigned char>(number >> shift);
+        };
+        const DateTime value = date(static_cast<unsigned short>(number), byte(0), byte(1), byte(2), byte(3),
+                                    byte(4), number * 65537, static_cast<short>(number));
         ASSERT_EQ(Utils::convertCIMDateTime(value), formatted(value));
         takeTraces();
     }
-    for (unsigned int number = 0; number <= 255; ++number) {
-        const auto byte = static_cast<unsigned char>(number);
-        for (void (DateTime::*const set)(unsigned char) :
-             {&DateTime::setMonth, &DateTime::setDay, &DateTime::setHour, &DateTime::setMinute,
-              &DateTime::setSecond}) {
-            DateTime value = base;
-            (value.*set)(byte);
-            ASSERT_EQ(Utils::convertCIMDateTime(value), formatted(value));
-        }
-    }
-    DateTime value = base;
-    for (unsigned int power = 1; power <= 1000000000; power *= power < 1000000000 ? 10 : 5) {
-        for (const unsigned int number : {power - 1, power, power + 1}) {
+    DateTime value;
+    for (unsigned int power = 1; power < 1000000000; power *= 10) {
+        for (const unsigned int number : {power - 1, power}) {
             value.setMillisecond(number);
             ASSERT_EQ(Utils::convertCIMDateTime(value), formatted(value));
         }
@@ -137,28 +126,18 @@ public:
 
     std::wstring getEntry(const std::wstring& key) override {
         calls_.emplace_back(L"get", key);
-        return take();
+        return stored_;
     }
     void setEntry(const std::wstring& key, const std::wstring& value) override {
         calls_.emplace_back(key, value);
         stored_ = value;
-        take();
     }
 
     void store(const std::wstring& value) { stored_ = value; }
-    void fail() { fails_ = true; }
     Calls takeCalls() { return std::exchange(calls_, {}); }
 
 private:
-    std::wstring take() const {
-        if (fails_) {
-            throw std::logic_error("file");
-        }
-        return stored_;
-    }
-
     std::wstring stored_;
-    bool fails_ = false;
     Calls calls_;
 };
 
@@ -187,6 +166,7 @@ protected:
     ~PropertyFileFields() override { EXPECT_EQ(takeTraces(), "") << "none of them traces"; }
 
     RecordingFile file_;
+    const std::lock_guard<TK::Mutex> lock_{TK::_fileMutex}; // which none of them locks
     const ThreadLocale locale_{"C.UTF-8", LC_CTYPE_MASK};
 };
 
@@ -261,7 +241,7 @@ TEST_F(PropertyFileFields, WriteNumbersInTextsOfFixedLength) {
     }
 }
 
-TEST_F(PropertyFileFields, ReadDatesOrTheFirstSecondOf1970) {
+TEST_F(PropertyFileFields, ReadDatesOrTheFirstSecondOf1970AndWriteThem) {
     const DateTime none = date(1970, 1, 1, 0, 0, 0, 0, 0);
     const std::pair<const wchar_t*, DateTime> rows[] = {
         {L"", none},
@@ -273,33 +253,12 @@ TEST_F(PropertyFileFields, ReadDatesOrTheFirstSecondOf1970) {
         file_.store(text);
         EXPECT_TRUE(Utils::ReadDateFromFile(file_, "k") == value) << testing::PrintToString(text);
     }
+    const DateTime written = date(2026, 3, 29, 1, 30, 0, 250, -300);
+    Utils::WriteDateToFile(file_, "k", written);
+    EXPECT_EQ(file_.takeCalls().back(),
+              std::make_pair(std::wstring(L"k"), std::wstring(L"2026-03-29 01:30:00.250-300")));
     for (const wchar_t* const text : {L"000-00-00", L"0000-00-0", L"yesterday", L" "}) {
         file_.store(text);
         EXPECT_THROW(Utils::ReadDateFromFile(file_, "k"), std::invalid_argument);
-    }
-}
-
-TEST_F(PropertyFileFields, WriteDatesThatReadBack) {
-    const DateTime value = date(2026, 3, 29, 1, 30, 0, 250, -300);
-    Utils::WriteDateToFile(file_, "k", value);
-    EXPECT_EQ(file_.takeCalls(), (RecordingFile::Calls{{L"k", L"2026-03-29 01:30:00.250-300"}}));
-    EXPECT_TRUE(Utils::ReadDateFromFile(file_, "k") == value);
-}
-
-TEST_F(PropertyFileFields, PassOnWhatTheFileThrowsAndLockNothing) {
-    const std::lock_guard<TK::Mutex> lock(TK::_fileMutex);
-    file_.fail();
-    void (*const operations[])(TK::PropertyFile&) = {
-        [](TK::PropertyFile& file) { Utils::ReadStringFromFile(file, "k"); },
-        [](TK::PropertyFile& file) { Utils::ReadUint8FromFile(file, "k"); },
-        [](TK::PropertyFile& file) { Utils::ReadDateFromFile(file, "k"); },
-        [](TK::PropertyFile& file) { Utils::WriteStringToFile(file, "k", "v"); },
-        [](TK::PropertyFile& file) { Utils::WriteUint8ToFile(file, "k", 1); },
-        [](TK::PropertyFile& file) { Utils::WriteUint32ToFile(file, "k", 1); },
-        [](TK::PropertyFile& file) { Utils::WriteDateToFile(file, "k", DateTime()); },
-    };
-    for (const auto operation : operations) {
-        EXPECT_THROW(operation(file_), std::logic_error);
-        EXPECT_EQ(file_.takeCalls().size(), 1U);
     }
 }
