@@ -35,12 +35,6 @@ private:
     std::string folder_;
 };
 
-std::wstring wideText(const std::string& bytes) {
-    std::wstring text(bytes.size() / sizeof(wchar_t), L'\0');
-    std::memcpy(text.data(), bytes.data(), text.size() * sizeof(wchar_t));
-    return text;
-}
-
 std::wstring untilNul(const std::wstring& text) {
     return text.c_str();
 }
@@ -50,8 +44,8 @@ std::wstring untilNul(const std::wstring& text) {
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     static const ScratchFile scratch;
     fuzz::Input input(data, size);
-    const std::wstring key = wideText(input.line());
-    const std::wstring value = wideText(input.line());
+    const std::wstring key = fuzz::wide(input.line());
+    const std::wstring value = fuzz::wide(input.line());
     const std::string bytes = input.rest();
 
     // What nobody changes stays byte for byte.
