@@ -304,16 +304,17 @@ TEST_F(ARequest, DeliversKeysAsTheModeSays) {
                         .key("R", CMPI_ref)
                         .key("B", CMPI_boolean));
     const char* const text = "root:Demo.U=200,S=-5,T=\"t\",R=\"Demo.U=1\",B=TRUE";
-    const std::pair<KeyMode, const char*> rows[] = {
-        {KeyMode::exact, "uint8 sint16 string reference boolean "},
-        {KeyMode::untyped, "uint64 sint64 string reference boolean "},
-        {KeyMode::chars, "uint8 sint16 chars reference boolean "}};
+    const std::pair<KeyMode, std::vector<CMPIType>> rows[] = {
+        {KeyMode::exact, {CMPI_uint8, CMPI_sint16, CMPI_string, CMPI_ref, CMPI_boolean}},
+        {KeyMode::untyped, {CMPI_uint64, CMPI_sint64, CMPI_string, CMPI_ref, CMPI_boolean}},
+        {KeyMode::chars, {CMPI_uint8, CMPI_sint16, CMPI_chars, CMPI_ref, CMPI_boolean}},
+    };
     for (const auto& [mode, expected] : rows) {
         broker_.setKeyMode(mode);
-        std::string types;
+        std::vector<CMPIType> types;
         serve = [&](const CMPIContext*, const CMPIResult* result, const CMPIObjectPath* p) {
             for (CMPICount i = 0; i < CMGetKeyCount(p, nullptr); ++i) {
-                types += oxahv::typeName(CMGetKeyAt(p, i, nullptr, nullptr).type) + ' ';
+                types.push_back(CMGetKeyAt(p, i, nullptr, nullptr).type);
             }
             CMReturnObjectPath(result, p);
             return CMReturnInstance(result, CMNewInstance(broker, p, nullptr));
@@ -386,7 +387,7 @@ TEST_F(ARequest, CanBeLeftToAThreadThatIsAttached) {
         CMPIContext* const prepared = broker->bft->prepareAttachThread(broker, context);
         std::thread([&] {
             EXPECT_EQ(broker->bft->attachThread(broker, prepared).rc, CMPI_RC_OK);
-            const int before = broker_.liveObjects().strings;
+            const std::size_t before = broker_.liveObjects().strings;
             CMNewString(broker, "text", nullptr);
             EXPECT_EQ(broker_.liveObjects().strings, before + 1);
             CMReturnInstance(result, CMNewInstance(broker, p, nullptr));
