@@ -496,10 +496,6 @@ TEST(Hosting, ServesAProviderThatIsWrittenInC) {
               "\"20240229120000.000000+000\"");
     EXPECT_TRUE(CMIsNullValue(CMGetProperty(all.instances[0], "Text", nullptr))) << "not asked for";
 
-    const Reply associates = request.associators(path, {"", "demo", "Role", ""});
-    EXPECT_EQ(oxahv::valueText(CMGetProperty(associates.instances.at(0), "Text", nullptr)), "\"Role\"");
-    EXPECT_TRUE(request.associators(path, {"", "Other", "", ""}).instances.empty());
-
     CMPIArgs* const in = CMNewArgs(own.handle(), nullptr);
     CMAddArg(in, "In", "value", CMPI_chars);
     const Reply method = request.invokeMethod(path, "Name", in);
