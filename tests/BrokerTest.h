@@ -11,17 +11,20 @@
 #include <tuple>
 #include <vector>
 
-// A broker's object that answers every name with one value and one status, as no correct broker would.
-template <class Object, class Table>
+// A broker's object one of whose getters has one answer and one status, as no correct broker's would.
+template <class Object, class Table, class Answer = CMPIData>
 class Answering {
 public:
-    template <class Handle>
-    Answering(const Object* real, CMPIData (*Table::*getter)(Handle*, const char*, CMPIStatus*),
-              const CMPIData& data, CMPIrc code)
+    template <class Handle, class... Rest>
+    Answering(const Object* real, Answer (*Table::*getter)(Handle*, Rest...), const Answer& answer,
+              CMPIrc code)
         : table_(*real->ft), object_(*real) {
         object_.ft = &table_;
-        table_.*getter = &answer<Handle>;
-        data_ = data;
+        table_.*getter = [](Handle* /*object*/, Rest... rest) {
+            *std::get<CMPIStatus*>(std::make_tuple(rest...)) = {code_, nullptr};
+            return answer_;
+        };
+        answer_ = answer;
         code_ = code;
     }
     Answering(const Answering&) = delete;
@@ -30,40 +33,23 @@ public:
     Object* handle() { return &object_; }
 
 private:
-    template <class Handle>
-    static CMPIData answer(Handle* /*object*/, const char* /*name*/, CMPIStatus* status) {
-        *status = {code_, nullptr};
-        return data_;
-    }
-
     Table table_;
     Object object_;
-    static inline CMPIData data_;
+    static inline Answer answer_;
     static inline CMPIrc code_;
 };
 
+// The headers of CIM servers differ in whether the characters are const.
+using Characters = decltype(CMPIStringFT().getCharPtr(nullptr, nullptr));
+
 // A string whose characters come with a status that is no success.
-class StringWithAnError {
+class StringWithAnError : public Answering<CMPIString, CMPIStringFT, Characters> {
 public:
-    explicit StringWithAnError(const CMPIString* real) : table_(*real->ft), string_(*real) {
-        string_.ft = &table_;
-        setGetter(&CMPIStringFT::getCharPtr);
-    }
-    CMPIString* handle() { return &string_; }
+    explicit StringWithAnError(const CMPIString* real)
+        : Answering(real, &CMPIStringFT::getCharPtr, characters_, CMPI_RC_ERR_FAILED) {}
 
 private:
-    // The headers of CIM servers differ in what is const.
-    template <class Chars, class Handle>
-    void setGetter(Chars* (*CMPIStringFT::*getter)(Handle*, CMPIStatus*)) {
-        table_.*getter = [](Handle* /*string*/, CMPIStatus* status) -> Chars* {
-            static char characters[] = "characters";
-            *status = {CMPI_RC_ERR_FAILED, nullptr};
-            return characters;
-        };
-    }
-
-    CMPIStringFT table_;
-    CMPIString string_;
+    static inline char characters_[] = "characters";
 };
 
 // A broker that makes every object and reports an error nevertheless.

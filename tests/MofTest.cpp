@@ -6,7 +6,6 @@
 #include <algorithm>
 #include <cstdio>
 #include <fstream>
-#include <functional>
 #include <gtest/gtest.h>
 #include <iterator>
 #include <sstream>
@@ -20,7 +19,8 @@ namespace {
 
 const std::string folder = MOF_FIXTURES;
 
-std::string errorOf(const std::function<void()>& operation) {
+template <class Operation>
+std::string errorOf(const Operation& operation) {
     try {
         operation();
     } catch (const BrokerError& error) {
@@ -313,7 +313,9 @@ TEST(Mof, IsAskedForByTheQualifierSlots) {
 
 TEST(Mof, HasBuildersForWhatItBrings) {
     EmbeddedBroker broker;
-    broker.declare(ClassDeclaration("Base").method("Stop", CMPI_uint8, {{"Hard", CMPI_boolean}}));
+    broker.declare(ClassDeclaration("Base")
+                       .property("Id", CMPI_uint8)
+                       .method("Stop", CMPI_uint8, {{"Hard", CMPI_boolean}}));
     broker.declare(ClassDeclaration("Demo")
                        .superclass("Base")
                        .abstract()
@@ -322,5 +324,5 @@ TEST(Mof, HasBuildersForWhatItBrings) {
                        .key("Id", CMPI_uint8));
     EXPECT_EQ(describe(broker, "Demo"),
               " abstract association [Abstract:boolean=TRUE- Association:boolean=TRUE]\n"
-              "Base REF End\nuint8 Id* [Key:boolean=TRUE]\nuint8 Stop()\n  in boolean Hard\n");
+              "uint8 Id* [Key:boolean=TRUE]\nBase REF End\nuint8 Stop()\n  in boolean Hard\n");
 }
