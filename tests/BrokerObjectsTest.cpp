@@ -118,10 +118,11 @@ TEST_F(ABroker, ChecksInstancesAgainstTheirClass) {
 TEST_F(ABroker, LetsOnlyKeysAndWantedPropertiesThroughAFilter) {
     CMPIObjectPath* const path = request_.objectPath("root", "Demo");
     CMAddKey(path, "Id", "x", CMPI_chars);
-    CMPIInstance* const instance = CMNewInstance(handle_, path, nullptr);
+    CMPIInstance* instance = CMNewInstance(handle_, path, nullptr);
     CMSetProperty(instance, "Before", "x", CMPI_chars);
     const char* wanted[] = {"wanted", nullptr};
     CMSetPropertyFilter(instance, wanted, nullptr);
+    instance = CMClone(instance, nullptr);
     EXPECT_EQ(CMSetProperty(instance, "Wanted", "x", CMPI_chars).rc, CMPI_RC_OK);
     EXPECT_EQ(CMSetProperty(instance, "Other", "x", CMPI_chars).rc, CMPI_RC_OK);
     CMSetProperty(instance, "Id", "y", CMPI_chars);

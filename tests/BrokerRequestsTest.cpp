@@ -295,20 +295,24 @@ TEST_F(ARequest, DeliversKeysAsTheModeSays) {
                         .key("U", CMPI_uint8)
                         .key("S", CMPI_sint16)
                         .key("T", CMPI_string)
-                        .key("R", CMPI_ref)
-                        .key("B", CMPI_boolean));
-    const char* const text = "root:Demo.U=200,S=-5,T=\"t\",R=\"Demo.U=1\",B=TRUE";
+                        .key("B", CMPI_boolean)
+                        .key("R", CMPI_ref));
+    const char* const text = "root:Demo.U=200,S=-5,T=\"t\",B=TRUE,R=\"Demo.U=1\"";
     const std::pair<KeyMode, std::vector<CMPIType>> rows[] = {
-        {KeyMode::exact, {CMPI_uint8, CMPI_sint16, CMPI_string, CMPI_ref, CMPI_boolean}},
-        {KeyMode::untyped, {CMPI_uint64, CMPI_sint64, CMPI_string, CMPI_ref, CMPI_boolean}},
-        {KeyMode::chars, {CMPI_uint8, CMPI_sint16, CMPI_chars, CMPI_ref, CMPI_boolean}},
+        {KeyMode::exact, {CMPI_uint8, CMPI_sint16, CMPI_string, CMPI_boolean, CMPI_ref, CMPI_uint8}},
+        {KeyMode::untyped, {CMPI_uint64, CMPI_sint64, CMPI_string, CMPI_boolean, CMPI_ref, CMPI_uint64}},
+        {KeyMode::chars, {CMPI_uint8, CMPI_sint16, CMPI_chars, CMPI_boolean, CMPI_ref, CMPI_uint8}},
     };
     for (const auto& [mode, expected] : rows) {
         broker_.setKeyMode(mode);
         std::vector<CMPIType> types;
         serve = [&](const CMPIContext*, const CMPIResult* result, const CMPIObjectPath* p) {
             for (CMPICount i = 0; i < CMGetKeyCount(p, nullptr); ++i) {
-                types.push_back(CMGetKeyAt(p, i, nullptr, nullptr).type);
+                const CMPIData key = CMGetKeyAt(p, i, nullptr, nullptr);
+                types.push_back(key.type);
+                if (key.type == CMPI_ref) {
+                    types.push_back(CMGetKeyAt(key.value.ref, 0, nullptr, nullptr).type);
+                }
             }
             CMReturnObjectPath(result, p);
             return CMReturnInstance(result, CMNewInstance(broker, p, nullptr));
@@ -497,9 +501,11 @@ TEST(Hosting, LetsAProviderSendRequestsWhileItEnds) {
         const CMPIObjectPath* const path = CMNewObjectPath(broker, "root", "Other", nullptr);
         broker->bft->enumerateInstanceNames(broker, context, path, &status);
         answers.push_back(status.rc);
+        EXPECT_FALSE(CMIsNullValue(CMGetContextEntry(context, "StateFile", nullptr)));
     };
     {
         EmbeddedBroker own;
+        own.setContextEntry("StateFile", "/a/file");
         own.host("Ending", {createInstanceMI}, {"Ending"});
         own.load(TEST_PROVIDER, "TestProvider", {"Other"});
         own.unload("Ending");
