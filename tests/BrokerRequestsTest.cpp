@@ -247,6 +247,7 @@ TEST_F(ARequest, ReadsValuesAndPathsAndSaysWhatIsWrongWithThem) {
     } values[] = {
         {"12", CMPI_null, "uint64 12"},
         {"-12", CMPI_null, "sint64 -12"},
+        {"-0", CMPI_uint8, "uint8 0"},
         {"True", CMPI_null, "boolean TRUE"},
         {"-", CMPI_null, "string \"-\""},
         {"", CMPI_null, "string \"\""},
@@ -377,6 +378,7 @@ TEST_F(ARequest, CanBeLeftToAThreadThatIsAttached) {
         CMPIContext* const prepared = broker->bft->prepareAttachThread(broker, context);
         std::thread([&] {
             EXPECT_EQ(broker->bft->attachThread(broker, prepared).rc, CMPI_RC_OK);
+            EXPECT_FALSE(CMIsNullValue(CMGetContextEntry(prepared, CMPIInitNameSpace, nullptr)));
             const std::size_t before = broker_.liveObjects().strings;
             CMNewString(broker, "text", nullptr);
             EXPECT_EQ(broker_.liveObjects().strings, before + 1);

@@ -1,5 +1,7 @@
 // Every slot of every table that takes a handle: with each argument null in turn, and while memory runs out
 // at each allocation in turn. No call may crash, throw, leak, or report success that it did not have.
+#include "CmpiSlots.h"
+
 #include "EmbeddedBroker.h"
 #include "FailingMemory.h"
 
@@ -192,9 +194,14 @@ class EverySlot : public testing::Test {
 protected:
     EverySlot() { broker_.host("Provider", {createProvider}); }
 
-    template <class... Slots>
-    void sweep(Slots... slots) {
-        (sweepOne(untyped(slots)), ...);
+    template <class Table, auto... slots>
+    void sweep(const Table* table, Slots<slots...> /*all*/) {
+        (sweepOne(untyped(table->*slots)), ...);
+    }
+    template <class Table, class List>
+    void sweepObject(const Table* table, List slots) {
+        sweep(table, Slots<&Table::release, &Table::clone>());
+        sweep(table, slots);
     }
 
     EmbeddedBroker broker_;
@@ -246,66 +253,25 @@ private:
 
 TEST_F(EverySlot, SurvivesNullArgumentsAndWantOfMemory) {
     const Request request(broker_);
-    const auto* const bft = broker->bft;
-    sweep(bft->prepareAttachThread, bft->attachThread, bft->detachThread, bft->deliverIndication,
-          bft->enumerateInstanceNames, bft->getInstance, bft->createInstance, bft->modifyInstance,
-          bft->deleteInstance, bft->execQuery, bft->enumerateInstances, bft->associators,
-          bft->associatorNames, bft->references, bft->referenceNames, bft->invokeMethod, bft->setProperty,
-          bft->getProperty, bft->enumerateInstancesFiltered, bft->associatorsFiltered,
-          bft->referencesFiltered);
-    const auto* const eft = broker->eft;
-    sweep(eft->newInstance, eft->newObjectPath, eft->newArgs, eft->newString, eft->newArray, eft->newDateTime,
-          eft->newDateTimeFromBinary, eft->newDateTimeFromChars, eft->newSelectExp, eft->classPathIsA,
-          eft->toString, eft->isOfType, eft->getType, eft->getMessage, eft->logMessage, eft->trace,
-          eft->newCMPIError, eft->openMessageFile, eft->closeMessageFile, eft->getMessage2,
-          eft->newPropertyList, eft->newStringCP, eft->newEnumerationFilter);
-    const auto* const mft = broker->mft;
-    sweep(mft->mark, mft->release, mft->cmpiMalloc, mft->cmpiCalloc, mft->cmpiRealloc, mft->cmpiStrDup,
-          mft->cmpiFree, mft->freeInstance, mft->freeObjectPath, mft->freeArgs, mft->freeString,
-          mft->freeArray, mft->freeDateTime, mft->freeSelectExp, mft->freeChars);
-    const auto* const ctx = request.context()->ft;
-    sweep(ctx->release, ctx->clone, ctx->getEntry, ctx->getEntryAt, ctx->getEntryCount, ctx->addEntry);
-    insideProvider = [this] {
-        const auto* const ft = result->ft;
-        sweep(ft->release, ft->clone, ft->returnData, ft->returnInstance, ft->returnObjectPath,
-              ft->returnDone, ft->returnError);
-    };
     const CMPIObjectPath* const path = CMNewObjectPath(broker, "root", "Demo", nullptr);
-    broker->bft->enumerateInstanceNames(broker, request.context(), path, nullptr);
-    const auto* const string = CMNewString(broker, "", nullptr)->ft;
-    sweep(string->release, string->clone, string->getCharPtr, string->newCharsCP);
-    const auto* const array = CMNewArray(broker, 0, CMPI_uint8, nullptr)->ft;
-    sweep(array->release, array->clone, array->getSize, array->getSimpleType, array->getElementAt,
-          array->setElementAt);
-    const auto* const enumeration =
-        broker->bft->enumerateInstanceNames(broker, request.context(), path, nullptr)->ft;
-    sweep(enumeration->release, enumeration->clone, enumeration->getNext, enumeration->hasNext,
-          enumeration->toArray);
-    const auto* const instance = CMNewInstance(broker, path, nullptr)->ft;
-    sweep(instance->release, instance->clone, instance->getProperty, instance->getPropertyAt,
-          instance->getPropertyCount, instance->setProperty, instance->getObjectPath,
-          instance->setPropertyFilter, instance->setObjectPath, instance->setPropertyWithOrigin);
-    const auto* const op = path->ft;
-    sweep(op->release, op->clone, op->setNameSpace, op->getNameSpace, op->setHostname, op->getHostname,
-          op->setClassName, op->getClassName, op->addKey, op->getKey, op->getKeyAt, op->getKeyCount,
-          op->setNameSpaceFromObjectPath, op->setHostAndNameSpaceFromObjectPath, op->getClassQualifier,
-          op->getPropertyQualifier, op->getMethodQualifier, op->getParameterQualifier, op->toString);
-    const auto* const args = CMNewArgs(broker, nullptr)->ft;
-    sweep(args->release, args->clone, args->addArg, args->getArg, args->getArgAt, args->getArgCount);
-    const auto* const date = CMNewDateTime(broker, nullptr)->ft;
-    sweep(date->release, date->clone, date->getBinaryFormat, date->getStringFormat, date->isInterval);
-    const auto* const error =
-        eft->newCMPIError(broker, "", "", "", ErrorSevLow, ErrorProbCauseOther, CMPI_RC_OK, nullptr)->ft;
-    sweep(error->release, error->clone, error->getErrorType, error->getOtherErrorType, error->getOwningEntity,
-          error->getMessageID, error->getMessage, error->getPerceivedSeverity, error->getProbableCause,
-          error->getProbableCauseDescription, error->getRecommendedActions, error->getErrorSource,
-          error->getErrorSourceFormat, error->getOtherErrorSourceFormat, error->getCIMStatusCode,
-          error->getCIMStatusCodeDescription, error->getMessageArguments, error->setErrorType,
-          error->setOtherErrorType, error->setProbableCauseDescription, error->setRecommendedActions,
-          error->setErrorSource, error->setErrorSourceFormat, error->setOtherErrorSourceFormat,
-          error->setCIMStatusCodeDescription, error->setMessageArguments);
-    const auto* const list = eft->newPropertyList(broker, nullptr, nullptr)->ft;
-    sweep(list->release, list->clone, list->isPropertyInList, list->getProperties);
+    const auto enumerate = [&] {
+        return broker->bft->enumerateInstanceNames(broker, request.context(), path, nullptr);
+    };
+    sweep(broker->bft, RequestSlots());
+    sweep(broker->eft, EncapsulationSlots());
+    sweep(broker->mft, MemorySlots());
+    sweepObject(request.context()->ft, ContextSlots());
+    insideProvider = [this] { sweepObject(result->ft, ResultSlots()); };
+    enumerate();
+    sweepObject(CMNewString(broker, "", nullptr)->ft, StringSlots());
+    sweepObject(CMNewArray(broker, 0, CMPI_uint8, nullptr)->ft, ArraySlots());
+    sweepObject(enumerate()->ft, EnumerationSlots());
+    sweepObject(CMNewInstance(broker, path, nullptr)->ft, InstanceSlots());
+    sweepObject(path->ft, ObjectPathSlots());
+    sweepObject(CMNewArgs(broker, nullptr)->ft, ArgsSlots());
+    sweepObject(CMNewDateTime(broker, nullptr)->ft, DateTimeSlots());
+    sweepObject(made<CMPIError>()->ft, ErrorSlots());
+    sweepObject(made<CMPIPropertyList>()->ft, PropertyListSlots());
     EXPECT_EQ(swept_, EmbeddedBroker::slotNames().size());
     EXPECT_GT(failures_, 50U) << "the program's own operator new is not in use";
 }

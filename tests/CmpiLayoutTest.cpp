@@ -1,6 +1,8 @@
 // What a CIM server and a provider that were compiled apart must agree on: sizes, offsets and codes of CMPI,
 // as the standard fixes them on a 64-bit machine. All of it is checked by the compiler, for the version it is
 // compiled with.
+#include "CmpiSlots.h"
+
 #include <cmpidt.h>
 #include <cmpift.h>
 #include <cmpimacs.h>
@@ -131,18 +133,6 @@ MEMBER(CMPIBroker, mft, 32, CMPI_CONST_SINCE_210 CMPIBrokerMemFT*);
 #endif
 static_assert(sizeof(CMPIBroker) == byVersion(32, 40, 40));
 
-// The slots that a version has added to a list.
-#if CMPI_VERSION >= 200
-#define SINCE_200(...) , __VA_ARGS__
-#else
-#define SINCE_200(...)
-#endif
-#if CMPI_VERSION >= 210
-#define SINCE_210(...) , __VA_ARGS__
-#else
-#define SINCE_210(...)
-#endif
-
 // A value of each type that a table holds, to be told from none.
 template <class Type>
 constexpr Type some = 1;
@@ -164,7 +154,7 @@ constexpr auto some<Return (*)(Parameters..., ...)> = &variadicFunction<Return, 
 // Whether a table consists of these members in this order. As every slot is as wide as a pointer, the size
 // leaves each of them one offset.
 template <class Table, class... Types>
-constexpr bool consistsOf(std::size_t size, Types Table::*... members) {
+constexpr bool areAll(Types Table::*... members) {
     std::size_t next = 0;
     const auto isNext = [&next](auto member) {
         std::size_t i = 0;
@@ -172,132 +162,61 @@ constexpr bool consistsOf(std::size_t size, Types Table::*... members) {
         ++next;
         return table.*member != std::decay_t<decltype(table.*member)>{};
     };
-    return sizeof(Table) == size && (isNext(members) && ...);
+    return (isNext(members) && ...);
+}
+template <class Table, auto... slots, class... Heads>
+constexpr bool consistsOf(std::size_t size, Slots<slots...> /*behind the heads*/, Heads Table::*... heads) {
+    return sizeof(Table) == size && areAll(heads..., slots...);
 }
 
-template <class Record, class Table>
+template <class Record>
+using TableOf = std::remove_const_t<std::remove_pointer_t<decltype(Record::ft)>>;
+
+template <class Record>
 constexpr bool isRecord() {
     return offsetof(Record, hdl) == 0 && offsetof(Record, ft) == 8 && sizeof(Record) == 16 &&
            are<CMPI_CONST_SINCE_210 void*, decltype(Record::hdl)> &&
-           are<CMPI_CONST_SINCE_210 Table*, decltype(Record::ft)>;
+           are<CMPI_CONST_SINCE_210 TableOf<Record>*, decltype(Record::ft)> &&
+           are<CMPIVersion, decltype(TableOf<Record>::ftVersion)>;
 }
 
-// Whether an object's table consists of what all have, and these slots.
-template <class Record, class Table, class... Slots>
-constexpr bool isObject(std::size_t size, Slots Table::*... slots) {
-    return isRecord<Record, Table>() && are<CMPIVersion, decltype(Table::ftVersion)> &&
-           consistsOf(size, &Table::ftVersion, &Table::release, &Table::clone, slots...);
+template <class Record, class List>
+constexpr bool isObject(std::size_t size, List slots) {
+    using Table = TableOf<Record>;
+    return isRecord<Record>() && consistsOf(size, slots, &Table::ftVersion, &Table::release, &Table::clone);
 }
 
-template <class Record, class Table, class... Slots>
-constexpr bool isMi(std::size_t size, Slots Table::*... slots) {
-    return isRecord<Record, Table>() && are<int, decltype(Table::ftVersion), decltype(Table::miVersion)> &&
-           consistsOf(size, &Table::ftVersion, &Table::miVersion, &Table::miName, &Table::cleanup, slots...);
+template <class Record, class List>
+constexpr bool isMi(std::size_t size, List slots) {
+    using Table = TableOf<Record>;
+    return isRecord<Record>() && are<int, decltype(Table::miVersion)> &&
+           consistsOf(size, slots, &Table::ftVersion, &Table::miVersion, &Table::miName, &Table::cleanup);
 }
 
-static_assert(consistsOf(
-    byVersion(160, 160, 184), &CMPIBrokerFT::brokerCapabilities, &CMPIBrokerFT::brokerVersion,
-    &CMPIBrokerFT::brokerName, &CMPIBrokerFT::prepareAttachThread, &CMPIBrokerFT::attachThread,
-    &CMPIBrokerFT::detachThread, &CMPIBrokerFT::deliverIndication, &CMPIBrokerFT::enumerateInstanceNames,
-    &CMPIBrokerFT::getInstance, &CMPIBrokerFT::createInstance, &CMPIBrokerFT::modifyInstance,
-    &CMPIBrokerFT::deleteInstance, &CMPIBrokerFT::execQuery, &CMPIBrokerFT::enumerateInstances,
-    &CMPIBrokerFT::associators, &CMPIBrokerFT::associatorNames, &CMPIBrokerFT::references,
-    &CMPIBrokerFT::referenceNames, &CMPIBrokerFT::invokeMethod, &CMPIBrokerFT::setProperty,
-    &CMPIBrokerFT::getProperty SINCE_210(&CMPIBrokerFT::enumerateInstancesFiltered,
-                                         &CMPIBrokerFT::associatorsFiltered,
-                                         &CMPIBrokerFT::referencesFiltered)));
-static_assert(consistsOf(
-    byVersion(136, 168, 192), &CMPIBrokerEncFT::ftVersion, &CMPIBrokerEncFT::newInstance,
-    &CMPIBrokerEncFT::newObjectPath, &CMPIBrokerEncFT::newArgs, &CMPIBrokerEncFT::newString,
-    &CMPIBrokerEncFT::newArray, &CMPIBrokerEncFT::newDateTime, &CMPIBrokerEncFT::newDateTimeFromBinary,
-    &CMPIBrokerEncFT::newDateTimeFromChars, &CMPIBrokerEncFT::newSelectExp, &CMPIBrokerEncFT::classPathIsA,
-    &CMPIBrokerEncFT::toString, &CMPIBrokerEncFT::isOfType, &CMPIBrokerEncFT::getType,
-    &CMPIBrokerEncFT::getMessage, &CMPIBrokerEncFT::logMessage,
-    &CMPIBrokerEncFT::trace SINCE_200(&CMPIBrokerEncFT::newCMPIError, &CMPIBrokerEncFT::openMessageFile,
-                                      &CMPIBrokerEncFT::closeMessageFile, &CMPIBrokerEncFT::getMessage2)
-        SINCE_210(&CMPIBrokerEncFT::newPropertyList, &CMPIBrokerEncFT::newStringCP,
-                  &CMPIBrokerEncFT::newEnumerationFilter)));
-static_assert(consistsOf(
-    byVersion(168, 168, 200), &CMPIBrokerExtFT::ftVersion, &CMPIBrokerExtFT::resolveFileName,
-    &CMPIBrokerExtFT::newThread, &CMPIBrokerExtFT::joinThread, &CMPIBrokerExtFT::exitThread,
-    &CMPIBrokerExtFT::cancelThread, &CMPIBrokerExtFT::threadSleep, &CMPIBrokerExtFT::threadOnce,
-    &CMPIBrokerExtFT::createThreadKey, &CMPIBrokerExtFT::destroyThreadKey,
-    &CMPIBrokerExtFT::getThreadSpecific, &CMPIBrokerExtFT::setThreadSpecific, &CMPIBrokerExtFT::newMutex,
-    &CMPIBrokerExtFT::destroyMutex, &CMPIBrokerExtFT::lockMutex, &CMPIBrokerExtFT::unlockMutex,
-    &CMPIBrokerExtFT::newCondition, &CMPIBrokerExtFT::destroyCondition, &CMPIBrokerExtFT::condWait,
-    &CMPIBrokerExtFT::timedCondWait,
-    &CMPIBrokerExtFT::signalCondition SINCE_210(&CMPIBrokerExtFT::destroyMutex2, &CMPIBrokerExtFT::lockMutex2,
-                                                &CMPIBrokerExtFT::unlockMutex2,
-                                                &CMPIBrokerExtFT::destroyCondition2)));
-static_assert(consistsOf(byVersion(120, 120, 128), &CMPIBrokerMemFT::ftVersion, &CMPIBrokerMemFT::mark,
-                         &CMPIBrokerMemFT::release, &CMPIBrokerMemFT::cmpiMalloc,
-                         &CMPIBrokerMemFT::cmpiCalloc, &CMPIBrokerMemFT::cmpiRealloc,
-                         &CMPIBrokerMemFT::cmpiStrDup, &CMPIBrokerMemFT::cmpiFree,
-                         &CMPIBrokerMemFT::freeInstance, &CMPIBrokerMemFT::freeObjectPath,
-                         &CMPIBrokerMemFT::freeArgs, &CMPIBrokerMemFT::freeString,
-                         &CMPIBrokerMemFT::freeArray, &CMPIBrokerMemFT::freeDateTime,
-                         &CMPIBrokerMemFT::freeSelectExp SINCE_210(&CMPIBrokerMemFT::freeChars)));
-static_assert(isObject<CMPIContext>(56, &CMPIContextFT::getEntry, &CMPIContextFT::getEntryAt,
-                                    &CMPIContextFT::getEntryCount, &CMPIContextFT::addEntry));
-static_assert(isObject<CMPIResult>(byVersion(56, 64, 64), &CMPIResultFT::returnData,
-                                   &CMPIResultFT::returnInstance, &CMPIResultFT::returnObjectPath,
-                                   &CMPIResultFT::returnDone SINCE_200(&CMPIResultFT::returnError)));
-static_assert(isObject<CMPIString>(byVersion(32, 32, 40),
-                                   &CMPIStringFT::getCharPtr SINCE_210(&CMPIStringFT::newCharsCP)));
-static_assert(isObject<CMPIArray>(56, &CMPIArrayFT::getSize, &CMPIArrayFT::getSimpleType,
-                                  &CMPIArrayFT::getElementAt, &CMPIArrayFT::setElementAt));
-static_assert(isObject<CMPIEnumeration>(48, &CMPIEnumerationFT::getNext, &CMPIEnumerationFT::hasNext,
-                                        &CMPIEnumerationFT::toArray));
-static_assert(isObject<CMPIInstance>(
-    byVersion(80, 88, 88), &CMPIInstanceFT::getProperty, &CMPIInstanceFT::getPropertyAt,
-    &CMPIInstanceFT::getPropertyCount, &CMPIInstanceFT::setProperty, &CMPIInstanceFT::getObjectPath,
-    &CMPIInstanceFT::setPropertyFilter,
-    &CMPIInstanceFT::setObjectPath SINCE_200(&CMPIInstanceFT::setPropertyWithOrigin)));
-static_assert(isObject<CMPIObjectPath>(
-    160, &CMPIObjectPathFT::setNameSpace, &CMPIObjectPathFT::getNameSpace, &CMPIObjectPathFT::setHostname,
-    &CMPIObjectPathFT::getHostname, &CMPIObjectPathFT::setClassName, &CMPIObjectPathFT::getClassName,
-    &CMPIObjectPathFT::addKey, &CMPIObjectPathFT::getKey, &CMPIObjectPathFT::getKeyAt,
-    &CMPIObjectPathFT::getKeyCount, &CMPIObjectPathFT::setNameSpaceFromObjectPath,
-    &CMPIObjectPathFT::setHostAndNameSpaceFromObjectPath, &CMPIObjectPathFT::getClassQualifier,
-    &CMPIObjectPathFT::getPropertyQualifier, &CMPIObjectPathFT::getMethodQualifier,
-    &CMPIObjectPathFT::getParameterQualifier, &CMPIObjectPathFT::toString));
-static_assert(isObject<CMPIArgs>(56, &CMPIArgsFT::addArg, &CMPIArgsFT::getArg, &CMPIArgsFT::getArgAt,
-                                 &CMPIArgsFT::getArgCount));
-static_assert(isObject<CMPIDateTime>(48, &CMPIDateTimeFT::getBinaryFormat, &CMPIDateTimeFT::getStringFormat,
-                                     &CMPIDateTimeFT::isInterval));
-static_assert(isObject<CMPIError>(
-    216, &CMPIErrorFT::getErrorType, &CMPIErrorFT::getOtherErrorType, &CMPIErrorFT::getOwningEntity,
-    &CMPIErrorFT::getMessageID, &CMPIErrorFT::getMessage, &CMPIErrorFT::getPerceivedSeverity,
-    &CMPIErrorFT::getProbableCause, &CMPIErrorFT::getProbableCauseDescription,
-    &CMPIErrorFT::getRecommendedActions, &CMPIErrorFT::getErrorSource, &CMPIErrorFT::getErrorSourceFormat,
-    &CMPIErrorFT::getOtherErrorSourceFormat, &CMPIErrorFT::getCIMStatusCode,
-    &CMPIErrorFT::getCIMStatusCodeDescription, &CMPIErrorFT::getMessageArguments, &CMPIErrorFT::setErrorType,
-    &CMPIErrorFT::setOtherErrorType, &CMPIErrorFT::setProbableCauseDescription,
-    &CMPIErrorFT::setRecommendedActions, &CMPIErrorFT::setErrorSource, &CMPIErrorFT::setErrorSourceFormat,
-    &CMPIErrorFT::setOtherErrorSourceFormat, &CMPIErrorFT::setCIMStatusCodeDescription,
-    &CMPIErrorFT::setMessageArguments));
+static_assert(consistsOf(byVersion(160, 160, 184), RequestSlots(), &CMPIBrokerFT::brokerCapabilities,
+                         &CMPIBrokerFT::brokerVersion, &CMPIBrokerFT::brokerName));
+static_assert(consistsOf(byVersion(136, 168, 192), EncapsulationSlots(), &CMPIBrokerEncFT::ftVersion));
+static_assert(consistsOf(byVersion(168, 168, 200), SystemSlots(), &CMPIBrokerExtFT::ftVersion));
+static_assert(consistsOf(byVersion(120, 120, 128), MemorySlots(), &CMPIBrokerMemFT::ftVersion));
+static_assert(isObject<CMPIContext>(56, ContextSlots()));
+static_assert(isObject<CMPIResult>(byVersion(56, 64, 64), ResultSlots()));
+static_assert(isObject<CMPIString>(byVersion(32, 32, 40), StringSlots()));
+static_assert(isObject<CMPIArray>(56, ArraySlots()));
+static_assert(isObject<CMPIEnumeration>(48, EnumerationSlots()));
+static_assert(isObject<CMPIInstance>(byVersion(80, 88, 88), InstanceSlots()));
+static_assert(isObject<CMPIObjectPath>(160, ObjectPathSlots()));
+static_assert(isObject<CMPIArgs>(56, ArgsSlots()));
+static_assert(isObject<CMPIDateTime>(48, DateTimeSlots()));
+static_assert(isObject<CMPIError>(216, ErrorSlots()));
 #if CMPI_VERSION >= 210
-static_assert(isObject<CMPIPropertyList>(40, &CMPIPropertyListFT::isPropertyInList,
-                                         &CMPIPropertyListFT::getProperties));
-static_assert(isObject<CMPIEnumerationFilter>(32, &CMPIEnumerationFilterFT::match));
+static_assert(isObject<CMPIPropertyList>(40, PropertyListSlots()));
+static_assert(isObject<CMPIEnumerationFilter>(32, EnumerationFilterSlots()));
 #endif
-static_assert(isMi<CMPIInstanceMI>(
-    byVersion(80, 80, 88), &CMPIInstanceMIFT::enumerateInstanceNames, &CMPIInstanceMIFT::enumerateInstances,
-    &CMPIInstanceMIFT::getInstance, &CMPIInstanceMIFT::createInstance, &CMPIInstanceMIFT::modifyInstance,
-    &CMPIInstanceMIFT::deleteInstance,
-    &CMPIInstanceMIFT::execQuery SINCE_210(&CMPIInstanceMIFT::enumerateInstancesFiltered)));
-static_assert(isMi<CMPIAssociationMI>(
-    byVersion(56, 56, 72), &CMPIAssociationMIFT::associators, &CMPIAssociationMIFT::associatorNames,
-    &CMPIAssociationMIFT::references,
-    &CMPIAssociationMIFT::referenceNames SINCE_210(&CMPIAssociationMIFT::associatorsFiltered,
-                                                   &CMPIAssociationMIFT::referencesFiltered)));
-static_assert(isMi<CMPIMethodMI>(32, &CMPIMethodMIFT::invokeMethod));
-static_assert(isMi<CMPIPropertyMI>(40, &CMPIPropertyMIFT::setProperty, &CMPIPropertyMIFT::getProperty));
-static_assert(isMi<CMPIIndicationMI>(72, &CMPIIndicationMIFT::authorizeFilter, &CMPIIndicationMIFT::mustPoll,
-                                     &CMPIIndicationMIFT::activateFilter,
-                                     &CMPIIndicationMIFT::deActivateFilter,
-                                     &CMPIIndicationMIFT::enableIndications,
-                                     &CMPIIndicationMIFT::disableIndications));
+static_assert(isMi<CMPIInstanceMI>(byVersion(80, 80, 88), InstanceMISlots()));
+static_assert(isMi<CMPIAssociationMI>(byVersion(56, 56, 72), AssociationMISlots()));
+static_assert(isMi<CMPIMethodMI>(32, MethodMISlots()));
+static_assert(isMi<CMPIPropertyMI>(40, PropertyMISlots()));
+static_assert(isMi<CMPIIndicationMI>(72, IndicationMISlots()));
 
 // What a slot takes is held by the broker's functions and the provider in C, which do not compile with other
 // types. A number that it returns would be converted.
