@@ -388,7 +388,7 @@ public:
     /**
      * Makes a slot fail. Several faults at one slot count the same calls.
      * @param slot table and member, as "CMPIObjectPathFT.getKeyAt", or the member alone where only one table
-     * has it.
+     * has it; "*" is any slot, and counts the calls of all of them together.
      * @throws BrokerError when there is no such slot, or the member alone is in several tables.
      */
     void injectFault(const std::string& slot, const Fault& fault);

@@ -34,10 +34,12 @@ constexpr const char* checkFooter =
     R"(Does with each class what clients do: names, instances, each by its name, one that does not exist,
 property lists, associations from both ends with every filter, methods; and compares all with the
 class's declaration. Then again with untyped keys, from several threads at once, and with the
-broker's calls failing in turn: of each slot the first 100 of a request, and the last. The provider
-runs in child processes: a crash or a hang is a finding. JSON is an array of one object {"library",
-"provider", "passes", "requests", "classes", "findings"}; a finding is {"check", "severity",
-"class", "pass", "request", "text", "count"}. Exit status 1 when there are findings.
+broker's calls failing in turn: of each slot the first 100 of a request, and the last. A method
+that --method names is called many times so, and does its work each time: name none that must not
+be repeated. The provider runs in child processes: a crash or a hang is a finding. JSON is an array
+of one object {"library", "provider", "passes", "requests", "classes", "findings"}; a finding is
+{"check", "severity", "class", "pass", "request", "text", "count"}. Exit status 1 when there are
+findings.
 
   oxahv-provider --library ./libDemoPort.so --mof Demo.mof check --class Demo_Port
   oxahv-provider --library ./libDemoPort.so --mof Demo.mof check --method 'Demo_Port.Reset Mode=1')";

@@ -15,7 +15,6 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
-#include <cwchar>
 #include <fstream>
 #include <iostream>
 #include <string_view>

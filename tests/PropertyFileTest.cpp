@@ -4,10 +4,8 @@
 #include <csignal>
 #include <filesystem>
 #include <fstream>
-#include <functional>
 #include <gtest/gtest.h>
 #include <map>
-#include <random>
 #include <sstream>
 #include <sys/resource.h>
 #include <sys/stat.h>
@@ -34,36 +32,29 @@ protected:
 
     void write(const std::string& content) const { std::ofstream(path(), std::ios::binary) << content; }
 
-    std::string content(const std::string& name = "file") const {
-        std::ifstream file(path(name), std::ios::binary);
+    std::string content() const {
         std::ostringstream content;
-        content << file.rdbuf();
+        content << std::ifstream(path(), std::ios::binary).rdbuf();
         return content.str();
     }
 
-    // What the file holds after a change to it.
-    std::string changed(const std::string& before, const std::function<void(PropertyFile&)>& change) const {
-        write(before);
-        PropertyFile file(path());
-        change(file);
-        file.save();
-        return content();
-    }
-
-    std::size_t filesInFolder() const {
-        return static_cast<std::size_t>(std::distance(fs::directory_iterator(folder_), {}));
-    }
+    std::ptrdiff_t filesInFolder() const { return std::distance(fs::directory_iterator(folder_), {}); }
 
     fs::path folder_;
 };
 
-int failureOf(const std::function<void()>& operation) {
+template <class Operation>
+int failureOf(const Operation& operation) {
     try {
         operation();
         return 0;
     } catch (const std::system_error& failure) {
         return failure.code().value();
     }
+}
+
+int savingFailure(PropertyFile& file) {
+    return failureOf([&] { file.save(); });
 }
 
 std::string damageOf(const PropertyFile& file) {
@@ -74,62 +65,36 @@ std::string damageOf(const PropertyFile& file) {
     return all;
 }
 
-const std::wstring nasty[] = {
-    L"",
-    L" ",
-    L"\t",
-    L"\n",
-    L"\r\n",
-    L"\\",
-    L"\\n",
-    L"\\u{41}",
-    L"=",
-    L"==a = b==",
-    L"#",
-    L"# no comment",
-    L"!",
-    L" both ends ",
-    L"\u00A0\u00A0",
-    L"a  b",
-    L"\x7F\x1B[0m\b",
-    L"\u0085\u2028\u2029",
-    L"\uFEFF",
-    L"\uFEFFkey",
-    L"\u00FC\u20AC\U0001F600\U0010FFFF",
-    L"\xD800",
-    L"\xDFFF\xD800",
-    std::wstring(1, static_cast<wchar_t>(0x110000)),
-    std::wstring(1, static_cast<wchar_t>(0x7FFFFFFF)),
-    std::wstring(1, static_cast<wchar_t>(-1)),
-};
-
 static_assert(!std::is_copy_constructible_v<PropertyFile> && !std::is_copy_assignable_v<PropertyFile>);
 
 } // namespace
 
 TEST_F(APropertyFile, GivesBackEveryKeyAndValue) {
-    std::map<std::wstring, std::wstring> expected;
+    const std::wstring nasty[] = {L"",
+                                  L" ",
+                                  L"\n",
+                                  L"\\u{41}",
+                                  L"==a = b==",
+                                  L"#",
+                                  L"# not",
+                                  L" ends ",
+                                  L"\u00A0\u00A0",
+                                  L"\x7F\x1B[0m\b",
+                                  L"\u0085\u2028\u2029",
+                                  L"\uFEFFkey",
+                                  L"\u00FC\u20AC\U0001F600\U0010FFFF",
+                                  L"\xDFFF\xD800",
+                                  std::wstring(1, static_cast<wchar_t>(0x110000)),
+                                  std::wstring(1, static_cast<wchar_t>(-1))};
+    std::map<std::wstring, std::wstring> expected = {{std::wstring(L"nul\0key", 7), L"value"}};
     for (const std::wstring& key : nasty) {
         for (const std::wstring& value : nasty) {
             expected[key + L'k' + value] = value + L'v' + key;
             expected[value] = key;
         }
     }
-    expected[std::wstring(L"nul\0key", 7)] = L"value";
     for (int code = 1; code < 0x3000; ++code) {
         expected[std::wstring(1, static_cast<wchar_t>(code))] = std::wstring(2, static_cast<wchar_t>(code));
-    }
-    std::mt19937 random(6);
-    const std::wstring alphabet = L"a =#\\\n\r\t\u00FC\U0001F600\xD912u{}";
-    for (int i = 0; i < 2000; ++i) {
-        const auto any = [&] {
-            std::wstring text;
-            for (auto left = random() % 8; left > 0; --left) {
-                text += alphabet[random() % alphabet.size()];
-            }
-            return text;
-        };
-        expected[any()] = any();
     }
     PropertyFile file(path());
     for (const auto& [key, value] : expected) {
@@ -143,22 +108,6 @@ TEST_F(APropertyFile, GivesBackEveryKeyAndValue) {
         ASSERT_EQ(file.getEntry(key), value) << testing::PrintToString(key);
         ASSERT_EQ(again.getEntry(key), value) << testing::PrintToString(key);
     }
-    again.save();
-    EXPECT_EQ(static_cast<std::size_t>(
-                  std::count(std::istreambuf_iterator<char>(std::ifstream(path()).rdbuf()), {}, '\n')),
-              expected.size());
-}
-
-TEST_F(APropertyFile, CutsAValueAtItsFirstNulAndKnowsNoMissingKey) {
-    PropertyFile file;
-    file.setEntry(L"number", std::wstring(L"42\0\0\0\0", 6));
-    file.setEntry(L"nothing", std::wstring(L"\0x", 2));
-    EXPECT_EQ(file.getEntry(L"number"), L"42");
-    EXPECT_EQ(file.getEntry(L"nothing"), L"");
-    EXPECT_EQ(file.getEntry(L"missing"), L"");
-    file.save();
-    file.load();
-    EXPECT_EQ(file.getEntry(L"number"), L"42"); // without a path there is nothing to load
 }
 
 TEST_F(APropertyFile, IsReadAsPeopleWriteIt) {
@@ -173,19 +122,13 @@ TEST_F(APropertyFile, IsReadAsPeopleWriteIt) {
           "=no key\n"
           R"(\#escaped\s\=\u{1f600}\u{0000041}=\t\\\n\r\s)"
           "\n"
-          "wide=\xC3\xBC\xF0\x9F\x98\x80\n"
-          "last=without end");
+          "last=without end \xC3\xBC\xF0\x9F\x98\x80");
     PropertyFile file(path());
     const std::pair<const wchar_t*, const wchar_t*> rows[] = {
-        {L"first", L"1"},
-        {L"key with blanks", L"a = b"},
-        {L"twice", L"2"},
-        {L"empty", L""},
-        {L"", L"no key"},
-        {L"#escaped =\U0001F600A", L"\t\\\n\r "},
-        {L"wide", L"\u00FC\U0001F600"},
-        {L"last", L"without end"},
-        {L"# comment", L""},
+        {L"first", L"1"},    {L"key with blanks", L"a = b"},
+        {L"twice", L"2"},    {L"empty", L""},
+        {L"", L"no key"},    {L"#escaped =\U0001F600A", L"\t\\\n\r "},
+        {L"# comment", L""}, {L"last", L"without end \u00FC\U0001F600"},
     };
     for (const auto& [key, value] : rows) {
         EXPECT_EQ(file.getEntry(key), value) << testing::PrintToString(std::wstring(key));
@@ -194,34 +137,33 @@ TEST_F(APropertyFile, IsReadAsPeopleWriteIt) {
 }
 
 TEST_F(APropertyFile, KeepsWhatAChangeDoesNotTouch) {
-    const auto set = [](const wchar_t* key, const wchar_t* value) {
-        return [=](PropertyFile& file) { file.setEntry(key, value); };
-    };
     const struct {
         std::string before;
-        std::function<void(PropertyFile&)> change;
+        std::wstring key;
+        std::wstring value;
         std::string after;
     } rows[] = {
-        {"# c\n\n b = 1 \r\na=2\n", set(L"b", L"3"), "# c\n\n b = 3\r\na=2\n"},
-        {"# c\n\n b = \\u{31} \r\na=2", set(L"b", L"1"), "# c\n\n b = \\u{31} \r\na=2"},
-        {"a=1\nb=2\na=3\n", set(L"a", L"4"), "a=1\nb=2\na=4\n"},
-        {"a=1\r\nb=2", set(L"c", L"3"), "a=1\r\nb=2\r\nc=3\r\n"},
-        {"a=1\nb=2\r\n", set(L"c", L"3"), "a=1\nb=2\r\nc=3\n"},
-        {"a", set(L"c", L"3"), "a\nc=3\n"},
+        {"# c\n\n b = 1 \r\na=2\n", L"b", L"3", "# c\n\n b = 3\r\na=2\n"},
+        {"# c\n\n b = \\u{31} \r\na=2", L"b", L"1", "# c\n\n b = \\u{31} \r\na=2"},
+        {"a=1\nb=2\na=3\n", L"a", L"4", "a=1\nb=2\na=4\n"},
+        {"a=1\r\nb=2", L"c", L"3", "a=1\r\nb=2\r\nc=3\r\n"},
+        {"a=1\nb=2\r\n", L"c", L"3", "a=1\nb=2\r\nc=3\n"},
         {"\xEF\xBB\xBF"
          "a=1",
-         set(L"a", L""),
+         L"a", L"",
          "\xEF\xBB\xBF"
          "a="},
-        {"", set(L"a", L"1"), "a=1\n"},
-        {"\xEF\xBB\xBF", [](PropertyFile&) {}, "\xEF\xBB\xBF"},
-        {"", set(L"\uFEFF#", L"\t= a\tb\x1B "), "\\u{feff}\\#=\\t= a\\tb\\u{1b}\\s\n"},
-        {"a =", set(L"a", L"= #"), "a == #"},
-        {"a=x\r\r\n\r\n", set(L"b", L"1"), "a=x\r\r\n\r\nb=1\r\n"},
-        {"a=x\r", set(L"b", L"1"), "a=x\r\r\nb=1\n"},
+        {"", L"\uFEFF#", L"\t= a\tb\x1B ", "\\u{feff}\\#=\\t= a\\tb\\u{1b}\\s\n"},
+        {"", L"a", std::wstring(L"42\0\0", 4), "a=42\n"},
+        {"a =", L"a", L"= #", "a == #"},
+        {"a=x\r", L"b", L"1", "a=x\r\r\nb=1\n"},
     };
     for (const auto& row : rows) {
-        EXPECT_EQ(changed(row.before, row.change), row.after);
+        write(row.before);
+        PropertyFile file(path());
+        file.setEntry(row.key, row.value);
+        file.save();
+        EXPECT_EQ(content(), row.after);
     }
 }
 
@@ -236,33 +178,22 @@ TEST_F(APropertyFile, ReportsDamagedLinesAndWritesThemBackAsTheyAre) {
                                 "a=\\u{\n"
                                 "a=\\u{}\n"
                                 "a=\\u{000000041}\n"
-                                "a=\\u41\n"
-                                "a=\\u{-1}\n"
+                                "a=\\u41}\n"
                                 "a=\\u{0x41}\n"
                                 "a=\xC0\xAF\n"
                                 "a=\xED\xA0\x80\n"
                                 "a=\xF4\x90\x80\x80\n"s +
                                 "a=\0\n"s + "\\";
-    const std::string after = changed(damaged, [](PropertyFile& file) {
-        EXPECT_EQ(damageOf(file), "1 no equals sign\n3 not UTF-8\n4 not UTF-8\n5 unknown escape\n"
-                                  "6 unknown escape\n7 no equals sign\n8 unknown escape\n9 unknown escape\n"
-                                  "10 unknown escape\n11 unknown escape\n12 unknown escape\n"
-                                  "13 unknown escape\n14 not UTF-8\n15 not UTF-8\n16 not UTF-8\n"
-                                  "17 NUL character\n18 no equals sign\n");
-        EXPECT_EQ(file.getEntry(L"a"), L"");
-        file.setEntry(L"a", L"1");
-    });
-    EXPECT_EQ(after, damaged + "\na=1\n");
-    // Whatever the bytes are, they come through.
-    std::mt19937 random(7);
-    for (int i = 0; i < 30; ++i) {
-        std::string bytes;
-        for (auto left = random() % 2000; left > 0; --left) {
-            bytes +=
-                (random() & 1U) != 0 ? "=\\\n\r# u{1}"[random() % 10] : static_cast<char>(random() & 0xFFU);
-        }
-        ASSERT_EQ(changed(bytes, [](PropertyFile&) {}), bytes);
-    }
+    write(damaged);
+    PropertyFile file(path());
+    EXPECT_EQ(damageOf(file), "1 no equals sign\n3 not UTF-8\n4 not UTF-8\n5 unknown escape\n"
+                              "6 unknown escape\n7 no equals sign\n8 unknown escape\n9 unknown escape\n"
+                              "10 unknown escape\n11 unknown escape\n12 unknown escape\n13 not UTF-8\n"
+                              "14 not UTF-8\n15 not UTF-8\n16 NUL character\n17 no equals sign\n");
+    EXPECT_EQ(file.getEntry(L"a"), L"");
+    file.setEntry(L"a", L"1");
+    file.save();
+    EXPECT_EQ(content(), damaged + "\na=1\n");
 }
 
 TEST_F(APropertyFile, IsEmptyWhenThereIsNoFileAndFailsWhenItCannotBeRead) {
@@ -271,7 +202,6 @@ TEST_F(APropertyFile, IsEmptyWhenThereIsNoFileAndFailsWhenItCannotBeRead) {
     file.setEntry(L"a", L"1");
     file.save();
     EXPECT_EQ(fs::status(path()).permissions(), fs::perms::owner_read | fs::perms::owner_write);
-    EXPECT_EQ(failureOf([&] { PropertyFile(folder_.string()); }), EISDIR);
     EXPECT_EQ(failureOf([&] { PropertyFile(path("file/below")); }), ENOTDIR);
     // A failed load leaves the entries; a good one forgets what was not saved.
     file.setEntry(L"a", L"2");
@@ -283,15 +213,21 @@ TEST_F(APropertyFile, IsEmptyWhenThereIsNoFileAndFailsWhenItCannotBeRead) {
     write("a=3");
     file.load();
     EXPECT_EQ(file.getEntry(L"a"), L"3");
+
+    PropertyFile withoutPath;
+    withoutPath.setEntry(L"a", L"1");
+    withoutPath.save();
+    withoutPath.load();
+    EXPECT_EQ(withoutPath.getEntry(L"a"), L"1");
 }
 
 TEST_F(APropertyFile, KeepsPermissionsOwnerAndLinks) {
     write("a=1\n");
+    const bool isRoot = ::geteuid() == 0;
+    const uid_t owner = isRoot ? 1 : ::getuid();
+    const gid_t group = isRoot ? 2 : ::getgid();
+    ASSERT_EQ(::chown(path().c_str(), owner, group), 0);
     fs::permissions(path(), fs::perms(0754));
-    const bool root = ::geteuid() == 0;
-    if (root) {
-        ASSERT_EQ(::chown(path().c_str(), 1, 2), 0);
-    }
     fs::create_directory(path("links"));
     fs::create_symlink("../second", path("links/first"));
     fs::create_symlink(path(), path("second"));
@@ -303,17 +239,15 @@ TEST_F(APropertyFile, KeepsPermissionsOwnerAndLinks) {
     struct stat status {};
     ASSERT_EQ(::stat(path().c_str(), &status), 0);
     EXPECT_EQ(status.st_mode & 07777U, 0754U);
-    if (root) {
-        EXPECT_EQ(status.st_uid, 1U);
-        EXPECT_EQ(status.st_gid, 2U);
-    }
+    EXPECT_EQ(status.st_uid, owner);
+    EXPECT_EQ(status.st_gid, group);
     // A link that dangles names the file that is made.
     fs::remove(path());
     file.save();
     EXPECT_EQ(content(), "a=2\n");
     fs::remove(path());
     fs::create_symlink("second", path());
-    EXPECT_EQ(failureOf([&] { file.save(); }), ELOOP);
+    EXPECT_EQ(savingFailure(file), ELOOP);
 }
 
 TEST_F(APropertyFile, IsUntouchedByASaveThatFails) {
@@ -326,26 +260,23 @@ TEST_F(APropertyFile, IsUntouchedByASaveThatFails) {
     ASSERT_EQ(::getrlimit(RLIMIT_FSIZE, &earlier), 0);
     const rlimit small{4096, earlier.rlim_max};
     ASSERT_EQ(::setrlimit(RLIMIT_FSIZE, &small), 0);
-    const int failure = failureOf([&] { file.save(); });
+    const int failure = savingFailure(file);
     ASSERT_EQ(::setrlimit(RLIMIT_FSIZE, &earlier), 0);
     std::signal(SIGXFSZ, earlierHandler);
     EXPECT_EQ(failure, EFBIG);
     EXPECT_EQ(content(), "a=1\n");
-    EXPECT_EQ(filesInFolder(), 1U);
 
     // Something that is no file is in the way.
     fs::remove(path());
     fs::create_directory(path());
-    EXPECT_EQ(failureOf([&] { file.save(); }), EISDIR);
+    EXPECT_EQ(savingFailure(file), EISDIR);
     fs::remove(path());
     ASSERT_EQ(::mkfifo(path().c_str(), 0600), 0);
-    EXPECT_EQ(failureOf([&] { file.save(); }), EINVAL);
-    EXPECT_TRUE(fs::is_fifo(path()));
-    EXPECT_EQ(filesInFolder(), 1U);
+    EXPECT_EQ(savingFailure(file), EINVAL);
+    EXPECT_EQ(filesInFolder(), 1);
 
     fs::remove_all(folder_);
-    EXPECT_EQ(failureOf([&] { file.save(); }), ENOENT);
-    EXPECT_FALSE(fs::exists(folder_));
+    EXPECT_EQ(savingFailure(file), ENOENT);
     // And when nothing is in the way any more, all of it is there.
     fs::create_directory(folder_);
     file.save();
@@ -366,12 +297,12 @@ TEST_F(APropertyFile, GivesNothingAwayWhenItsGroupCannotBeKept) {
     ASSERT_EQ(::seteuid(nobody), 0);
     // A folder that cannot be read, and so not be synchronised, and one that cannot be written.
     fs::permissions(folder_, fs::perms(0300));
-    const int unreadable = failureOf([&] { file.save(); });
+    const int unreadable = savingFailure(file);
     fs::permissions(folder_, fs::perms(0500));
-    const int unwritable = failureOf([&] { file.save(); });
+    const int unwritable = savingFailure(file);
     fs::permissions(folder_, fs::perms(0700));
     const std::string untouched = content();
-    const int none = failureOf([&] { file.save(); });
+    const int none = savingFailure(file);
     ASSERT_EQ(::seteuid(0), 0);
     EXPECT_EQ(unreadable, EACCES);
     EXPECT_EQ(unwritable, EACCES);
@@ -379,17 +310,5 @@ TEST_F(APropertyFile, GivesNothingAwayWhenItsGroupCannotBeKept) {
     EXPECT_EQ(none, 0);
     EXPECT_EQ(content(), "a=2\n");
     EXPECT_EQ(fs::status(path()).permissions(), fs::perms(0604));
-    EXPECT_EQ(filesInFolder(), 1U);
-}
-
-TEST(ADerivedPropertyFile, TakesTheCallsMadeThroughItsBase) {
-    struct Derived : PropertyFile {
-        std::wstring getEntry(const std::wstring& key) override { return key + L"!"; }
-        void setEntry(const std::wstring& key, const std::wstring& value) override { last = key + value; }
-        std::wstring last;
-    } derived;
-    PropertyFile& file = derived;
-    file.setEntry(L"a", L"b");
-    EXPECT_EQ(derived.last, L"ab");
-    EXPECT_EQ(file.getEntry(L"a"), L"a!");
+    EXPECT_EQ(filesInFolder(), 1);
 }
