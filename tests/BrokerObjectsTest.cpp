@@ -63,6 +63,12 @@ TEST_F(ABroker, KeepsValuesByNameIgnoringCaseInTheirOrder) {
     EXPECT_EQ(status.rc, CMPI_RC_ERR_NOT_FOUND);
     EXPECT_EQ(CMGetKey(path, "missing", &status).state, CMPI_nullValue | CMPI_notFound);
     EXPECT_EQ(status.rc, CMPI_RC_ERR_NOT_FOUND);
+
+    CMSetHostname(path, "host");
+    CMPIObjectPath* const other = request_.objectPath("", "Other");
+    other->ft->setHostAndNameSpaceFromObjectPath(other, CMClone(path, nullptr));
+    EXPECT_EQ(textOf(CMGetHostname(other, nullptr)), "host");
+    EXPECT_EQ(oxahv::pathText(other), "root:Other");
 }
 
 TEST_F(ABroker, KeepsNullAsNull) {

@@ -119,6 +119,8 @@ TEST_F(ARequest, ReachesTheProviderAndBringsItsResultsBack) {
               "root:Demo.Key=\"text\"");
     serve = [](const CMPIContext* context, const CMPIResult* result, const CMPIObjectPath* p) {
         EXPECT_EQ(oxahv::valueText(CMGetContextEntry(context, CMPIInitNameSpace, nullptr)), "\"root\"");
+        EXPECT_EQ(oxahv::valueText(CMGetContextEntry(context, CMPIPrincipal, nullptr)), "\"\"");
+        EXPECT_EQ(oxahv::valueText(CMGetContextEntry(context, CMPIInvocationFlags, nullptr)), "0");
         CMPIInstance* const instance = CMNewInstance(broker, p, nullptr);
         const CMPIStatus status = CMReturnInstance(result, instance);
         CMSetProperty(instance, "Late", "x", CMPI_chars); // what was returned is a copy
