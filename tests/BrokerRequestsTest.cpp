@@ -301,12 +301,16 @@ TEST_F(ARequest, ReadsValuesAndPathsAndSaysWhatIsWrongWithThem) {
 }
 
 TEST_F(ARequest, DeliversKeysAsTheModeSays) {
+    CMPIObjectPath* const tooWide = path("Demo.U=256,S=-32769");
     broker_.declare(ClassDeclaration("Demo")
                         .key("U", CMPI_uint8)
                         .key("S", CMPI_sint16)
                         .key("T", CMPI_string)
                         .key("B", CMPI_boolean)
                         .key("R", CMPI_ref));
+    const CMPIInstance* const instance = CMNewInstance(broker_.handle(), tooWide, nullptr);
+    EXPECT_EQ(CMGetProperty(instance, "U", nullptr).type, CMPI_uint64);
+    EXPECT_EQ(CMGetProperty(instance, "S", nullptr).type, CMPI_sint64);
     const char* const text = "root:Demo.U=200,S=-5,T=\"t\",B=TRUE,R=\"Demo.U=1\"";
     const std::pair<KeyMode, std::vector<CMPIType>> rows[] = {
         {KeyMode::exact, {CMPI_uint8, CMPI_sint16, CMPI_string, CMPI_boolean, CMPI_ref, CMPI_uint8}},
