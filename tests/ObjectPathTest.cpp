@@ -112,6 +112,18 @@ TEST_F(ObjectPaths, WithoutKeysLeaveMonikersAsTheyAre) {
     takeTraces();
 }
 
+TEST_F(ObjectPaths, HaveOneKeyOfAName) {
+    Moniker moniker;
+    moniker.addKey("name", 1U);
+    moniker.addKey("NAME", 2U);
+    CMPIObjectPath* path = newPath();
+    PU::transformMonikerToObjectPath(moniker, &path);
+    Moniker again;
+    PU::transformObjectPathToMoniker(path, again);
+    EXPECT_EQ(moniker.getKeyCount(), 2U);
+    EXPECT_EQ(textOf(again), "name:2=2  > name:2=2");
+}
+
 TEST_F(ObjectPaths, CountAndConvertTheKeysThatHaveAValue) {
     CMPIObjectPath* const path = newPath();
     CMAddKey(path, "null", nullptr, CMPI_string);
