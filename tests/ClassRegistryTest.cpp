@@ -22,7 +22,8 @@ unsigned short chain(const char* name, std::size_t first) {
 }
 
 void expectAsTheChain(const std::string& text) {
-    const std::vector<char> exact(text.c_str(), text.c_str() + text.size() + 1); // a sanitizer sees its bounds
+    // Sanitizers see the bounds of a block of just this size.
+    const std::vector<char> exact(text.c_str(), text.c_str() + text.size() + 1);
     const char* const name = exact.data();
     ASSERT_EQ(ProviderUtilities::getClassId(name), chain(name, 0)) << name;
     ASSERT_EQ(ProviderUtilities::extend_getClassId(name), chain(name, 119)) << name;
