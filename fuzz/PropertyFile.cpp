@@ -11,14 +11,14 @@
 
 namespace {
 
-// A file of this process in memory; removed when the process ends.
+// A file of this process in memory; removed when the process ends by itself.
 class ScratchFile {
 public:
     ScratchFile() {
         const bool hasMemory = std::filesystem::is_directory("/dev/shm");
         folder_ = (hasMemory ? "/dev/shm" : std::filesystem::temp_directory_path().string()) +
-                  "/property-file-" + std::to_string(::getpid());
-        std::filesystem::create_directory(folder_);
+                  "/property-file-XXXXXX";
+        FUZZ_REQUIRE(::mkdtemp(folder_.data()) != nullptr);
     }
     ~ScratchFile() { std::filesystem::remove_all(folder_); }
     ScratchFile(const ScratchFile&) = delete;

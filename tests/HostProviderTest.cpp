@@ -50,7 +50,7 @@ public:
         write("/proc/1/stat", "");
         write("/proc/22/stat", "");
         write("/proc/meminfo", "MemTotal:       16 kB\nMemFree:        8 kB\nSwapTotal:      x kB\n");
-        write("/etc/os-release", "NAME=\"Test\"\nPRETTY_NAME=\"Prüf-OS \\ 1 €\"\n");
+        write("/etc/os-release", "NAME='Test'\nPRETTY_NAME=\"Prüf-OS \\ 1 €\"\n");
         writePort("eth0", "1", "up", "1000", "full");
         write("/sys/class/net/eth0/addr_assign_type", "0");
         write("/sys/class/net/eth0/ifalias", "Büro ☂");
@@ -199,6 +199,11 @@ TEST_F(TheHostProvider, ShowsTheMachine) {
     for (const auto& [className, text] : cases) {
         EXPECT_EQ(textOf(request_.enumerateInstances(path(className))), text);
     }
+    write("/sys/class/net/eth1/operstate", "unknown");
+    const std::string port = textOf(request_.enumerateInstances(path("OXATK_EthernetPort")));
+    EXPECT_NE(port.find(R"(OperationalStatus={0} StatusDescriptions={"unknown"} EnabledState=0 )"),
+              std::string::npos)
+        << port;
     const std::vector<std::string> wanted = {"Dependent", "NameFormat"};
     EXPECT_EQ(textOf(request_.associators(path(osPath), {}, &wanted)),
               R"(Name="machine" CreationClassName="OXATK_ComputerSystem" NameFormat="HostName" )");

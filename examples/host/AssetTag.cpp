@@ -3,6 +3,7 @@
 #include "HostTime.h"
 
 #include <ProviderUtilities.h>
+#include <ctime>
 #include <utils.h>
 
 #include <algorithm>

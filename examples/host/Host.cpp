@@ -4,6 +4,7 @@
 #include <charconv>
 #include <dirent.h>
 #include <fstream>
+#include <initializer_list>
 #include <memory>
 #include <string_view>
 #include <system_error>
@@ -37,12 +38,12 @@ struct CloseFolder {
     void operator()(DIR* folder) const { ::closedir(folder); }
 };
 
-// The value of a line KEY=VALUE or KEY: VALUE unit in a file.
+// The value of a line KEY=VALUE, with quotes or without, or KEY: VALUE unit in a file.
 std::string valueOf(std::ifstream file, const std::string& key) {
     for (std::string line; readLine(file, line);) {
         if (line.rfind(key, 0) == 0) {
-            const std::size_t begin = line.find_first_not_of(" \t\"", key.size());
-            return begin != std::string::npos ? line.substr(begin, line.find_last_not_of("\" ") + 1 - begin)
+            const std::size_t begin = line.find_first_not_of(" \t\"'", key.size());
+            return begin != std::string::npos ? line.substr(begin, line.find_last_not_of("\"' ") + 1 - begin)
                                               : "";
         }
     }

@@ -1,5 +1,6 @@
 #include "HostTime.h"
 
+#include <cerrno>
 #include <utils.h>
 
 #include <system_error>

@@ -4,6 +4,7 @@
 #include "Keys.h"
 
 #include <algorithm>
+#include <cerrno>
 #include <mutex>
 #include <system_error>
 
@@ -92,13 +93,19 @@ CMPIObjectPath* pathOf(const HostClass& hostClass, Moniker keys, const std::stri
     return path;
 }
 
+void require(const CMPIStatus& status) {
+    if (status.rc != CMPI_RC_OK) {
+        throw Refusal{status.rc, "the broker did not do what it was asked for"};
+    }
+}
+
 CMPIInstance* newInstance(CMPIObjectPath* path, const char** properties) {
     CMPIInstance* const instance = ProviderUtilities::createInstance(broker, path);
     if (instance == nullptr) {
         throw Refusal{CMPI_RC_ERR_FAILED, "the broker made no instance"};
     }
     if (properties != nullptr) {
-        CMSetPropertyFilter(instance, properties, nullptr);
+        require(CMSetPropertyFilter(instance, properties, nullptr));
     }
     return instance;
 }
@@ -108,12 +115,6 @@ CMPIInstance* instanceOf(const HostClass& hostClass, const Moniker& keys, const 
     CMPIInstance* const instance = newInstance(pathOf(hostClass, keys, nameSpace), properties);
     hostClass.fill(machine(), keys, instance);
     return instance;
-}
-
-void require(const CMPIStatus& status) {
-    if (status.rc != CMPI_RC_OK) {
-        throw Refusal{status.rc, "the broker did not take the result"};
-    }
 }
 
 void give(const CMPIResult* result, const CMPIObjectPath* path) {

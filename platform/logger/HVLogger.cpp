@@ -9,7 +9,6 @@
 #include <mutex>
 #include <system_error>
 #include <unistd.h>
-#include <utility>
 
 namespace HVLog {
 
@@ -98,6 +97,20 @@ void writeLine(int descriptor, std::string line) {
     }
 }
 
+// Closes what it holds when the last copy of a sink goes.
+struct OpenFile {
+    OpenFile() = default;
+    ~OpenFile() {
+        if (descriptor >= 0) {
+            ::close(descriptor);
+        }
+    }
+    OpenFile(const OpenFile&) = delete;
+    OpenFile& operator=(const OpenFile&) = delete;
+
+    int descriptor = -1;
+};
+
 } // namespace
 
 void HVLogger::logLevelMessage(const char* function, const char* file, int line, const std::string& category,
@@ -125,15 +138,13 @@ void HVLogger::setStderrSink() {
 }
 
 void HVLogger::setFileSink(const std::string& path) {
-    const int descriptor = ::open(path.c_str(), O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC, 0640);
-    if (descriptor < 0) {
-        throw std::system_error(errno, std::generic_category(), "cannot open log file '" + path + "'");
+    const auto file = std::make_shared<OpenFile>();
+    file->descriptor = ::open(path.c_str(), O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC, 0640);
+    if (file->descriptor < 0) {
+        const int error = errno;
+        throw std::system_error(error, std::generic_category(), "cannot open log file '" + path + "'");
     }
-    const std::shared_ptr<const int> file(new int(descriptor), [](const int* open) {
-        ::close(*open);
-        delete open;
-    });
-    setSink([file](const Message& message) { writeLine(*file, lineOf(message)); });
+    setSink([file](const Message& message) { writeLine(file->descriptor, lineOf(message)); });
 }
 
 void HVLogger::setThreshold(int level) {
