@@ -98,7 +98,11 @@ const MethodDeclaration* DeclaredClass::findMethod(std::string_view method) cons
 }
 
 bool DeclaredClass::isA(std::string_view ancestor) const {
-    return sameName(name, ancestor) || (superclass != nullptr && superclass->isA(ancestor));
+    const DeclaredClass* declared = this;
+    while (declared != nullptr && !sameName(declared->name, ancestor)) {
+        declared = declared->superclass.get();
+    }
+    return declared != nullptr;
 }
 
 namespace {
@@ -211,8 +215,18 @@ std::shared_ptr<const MethodDeclaration> inheritedMethod(
     return std::make_shared<const MethodDeclaration>(std::move(copy));
 }
 
+// Superclasses hold each other, so that the end of the last class is the end of all, one within the other. No
+// schema comes near.
+constexpr std::size_t mostSuperclasses = 1000;
+
 void inherit(DeclaredClass& declared) {
     const DeclaredClass& superclass = *declared.superclass;
+    declared.depth = superclass.depth + 1;
+    if (declared.depth > mostSuperclasses) {
+        throw DeclarationError("class " + declared.name + " has more than " +
+                                   std::to_string(mostSuperclasses) + " superclasses",
+                               Part::superclass);
+    }
     declared.qualifiers = declared.qualifiers.over(superclass.qualifiers);
     declared.properties = superclass.properties;
     for (PropertyDeclaration& property : declared.properties) {

@@ -16,6 +16,7 @@ namespace oxahv {
 struct DeclaredClass {
     std::string name;
     std::shared_ptr<const DeclaredClass> superclass;
+    std::size_t depth = 0; // how many superclasses it has in all
     Qualifiers qualifiers;
     std::vector<PropertyDeclaration> properties;
     std::vector<std::shared_ptr<const MethodDeclaration>> methods; // subclasses share what they inherit

@@ -8,8 +8,8 @@
  *
  * @code
  * oxahv::EmbeddedBroker broker;
- * broker.declare(oxahv::ClassDeclaration("Demo_Port").key("Name", CMPI_string).property("Speed",
- * CMPI_uint64)); broker.load("./libDemoPort.so", "DemoPort");
+ * broker.compileMof("DemoPort.mof");
+ * broker.load("./libDemoPort.so", "DemoPort");
  *
  * oxahv::Request request(broker);
  * oxahv::Reply reply = request.enumerateInstances(request.objectPath("root/cimv2", "Demo_Port"));
@@ -24,8 +24,9 @@
  * calling thread, the innermost Request alive there; without one, to the broker itself. It dies with its
  * owner, unless the caller released it before. What a `clone` slot or `prepareAttachThread` returned belongs
  * to its caller, who releases it with its `release` slot; what is left then dies with the broker. A part of
- * an object, such as a property's string, dies with the object; its release does nothing. An object may be
- * used after its release by nobody. A memory mark frees what the current owner has got since.
+ * an object, such as a property's string, dies with the object, or earlier when another value takes its place
+ * or a filter removes it; its release does nothing. An object may be used after its release by nobody. A
+ * memory mark frees what the current owner has got since.
  *
  * **Encoding.** All texts are UTF-8; a CMPIString keeps its bytes as they came.
  *
@@ -117,7 +118,8 @@ struct PropertyDeclaration {
     CMPIType type = CMPI_null;    ///< with `CMPI_ARRAY` for arrays; `CMPI_ref` for references
     bool isKey = false;           ///< whether it names instances
     std::string referenceClass{}; ///< of a reference: the class that it leads to; empty if none is said
-    DeclaredValue defaultValue{}; ///< of type `CMPI_null` when none is declared
+    DeclaredValue defaultValue{}; ///< of type `CMPI_null` when none is declared; a new instance's properties
+                                  ///< are NULL all the same
     Qualifiers qualifiers{};      ///< its own
 };
 
@@ -217,7 +219,8 @@ struct Fault {
     /** The status that the call reports instead of doing its work; `CMPI_RC_OK` leaves it to the real call.
      */
     CMPIrc code = CMPI_RC_ERR_FAILED;
-    /** With `code` `CMPI_RC_OK`: the call yields a null object, string or handle with an OK status. */
+    /** With `code` `CMPI_RC_OK`: the call yields a null object, string or handle with an OK status; a call
+     * that yields none of these is left out, and OK, 0 or false comes of it. */
     bool yieldsNull = false;
     /** Added to the state of the CMPIData that the call returns. */
     CMPIValueState stateBits = 0;
@@ -254,7 +257,7 @@ struct LiveObjects {
     std::size_t enumerations = 0; ///< `CMPIEnumeration`
     std::size_t contexts = 0;     ///< `CMPIContext`
     std::size_t results = 0;      ///< `CMPIResult`
-    std::size_t others = 0;       ///< errors, property lists, filters, select expressions
+    std::size_t others = 0;       ///< errors, property lists, memory marks
 
     /** All of them. */
     std::size_t total() const {

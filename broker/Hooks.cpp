@@ -1,7 +1,5 @@
 #include "Hooks.h"
 
-#include <algorithm>
-
 namespace oxahv {
 
 namespace {

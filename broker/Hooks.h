@@ -3,9 +3,7 @@
 
 #include "EmbeddedBroker.h"
 
-#include <array>
 #include <atomic>
-#include <map>
 #include <mutex>
 #include <string>
 #include <string_view>

@@ -62,7 +62,7 @@ namespace {
 
 template <class MI>
 void cleanUp(MI* mi, const CMPIContext* context) {
-    if (mi != nullptr && mi->ft != nullptr && mi->ft->cleanup != nullptr) {
+    if (mi != nullptr && mi->ft->cleanup != nullptr) {
         try {
             mi->ft->cleanup(mi, context, 1);
         } catch (...) { // NOLINT(bugprone-empty-catch): a provider that fails to end has ended all the same
@@ -111,8 +111,8 @@ Reply refused(CMPIrc code, std::string message = {}) {
 }
 
 // Calls a slot of an MI; a provider may leave one empty.
-template <class MI, class... Parameters, class... Arguments>
-CMPIStatus callSlot(CMPIStatus (*slot)(MI*, Parameters...), MI* mi, Arguments... arguments) {
+template <class MI, class... Parameters, class... Given>
+CMPIStatus callSlot(CMPIStatus (*slot)(MI*, Parameters...), MI* mi, Given... arguments) {
     return slot != nullptr ? slot(mi, arguments...) : CMPIStatus{CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
 }
 
@@ -206,9 +206,14 @@ MI* HostedProvider::made(const Factory& factory) const {
         mi = factory(&core_.record, context, &status);
     } catch (const std::exception& exception) {
         throw BrokerError("provider " + name_ + ": its factory threw: " + exception.what());
+    } catch (...) {
+        throw BrokerError("provider " + name_ + ": its factory threw an exception of an unknown kind");
     }
-    if (status.rc != CMPI_RC_OK || mi == nullptr) {
+    if (status.rc != CMPI_RC_OK) {
         throw BrokerError("provider " + name_ + ": its factory answered " + wordsOf(status));
+    }
+    if (mi == nullptr || mi->ft == nullptr) {
+        throw BrokerError("provider " + name_ + ": its factory made no function table");
     }
     return mi;
 }
@@ -373,7 +378,8 @@ template <class MI, class Function>
 Reply Hosting::request(const CMPIContext* context, const CMPIObjectPath* handle, const Function& function,
                        std::string_view associationClass) {
     const ObjectPath* const path = ObjectPath::of(handle);
-    if (path == nullptr || Context::of(context) == nullptr) {
+    Context* const own = Context::of(context);
+    if (path == nullptr || own == nullptr) {
         return refused(CMPI_RC_ERR_INVALID_HANDLE);
     }
     if (core_.classes.any() && core_.classes.find(path->className) == nullptr) {
@@ -384,9 +390,7 @@ Reply Hosting::request(const CMPIContext* context, const CMPIObjectPath* handle,
         return refused(CMPI_RC_ERR_NOT_SUPPORTED, "no provider serves this for class " + path->className);
     }
     Result result(core_, Owner::current(core_));
-    if (Context* const own = Context::of(context)) {
-        result.progress = std::exchange(own->progress, nullptr);
-    }
+    result.progress = std::exchange(own->progress, nullptr);
     const CMPIObjectPath* const delivered = deliver(handle);
     std::string message;
     const CMPIStatus status =
@@ -505,6 +509,9 @@ Reply Hosting::referenceNames(const CMPIContext* context, const CMPIObjectPath* 
 
 Reply Hosting::invokeMethod(const CMPIContext* context, const CMPIObjectPath* path, const char* method,
                             const CMPIArgs* in) {
+    if (in != nullptr && Arguments::of(in) == nullptr) {
+        return refused(CMPI_RC_ERR_INVALID_HANDLE);
+    }
     const CMPIArgs* const given = in != nullptr ? in : handOut(std::make_unique<Arguments>(core_));
     CMPIArgs* const out = handOut(std::make_unique<Arguments>(core_));
     Reply reply;

@@ -3,7 +3,6 @@
 
 #include "EmbeddedBroker.h"
 
-#include <functional>
 #include <memory>
 #include <shared_mutex>
 #include <string_view>
@@ -18,12 +17,9 @@ class HostedProvider;
 class PropertyArray {
 public:
     explicit PropertyArray(const std::vector<std::string>* names);
-    // What a slot was called with is passed on as it is.
-    explicit PropertyArray(const char** names) : given_(names) {}
-    const char** get() { return given_ != nullptr || pointers_.empty() ? given_ : pointers_.data(); }
+    const char** get() { return pointers_.empty() ? nullptr : pointers_.data(); }
 
 private:
-    const char** given_ = nullptr;
     std::vector<const char*> pointers_;
 };
 

@@ -45,6 +45,11 @@ Value declaredValue(Core& core, const DeclaredClass* declared, const char* name,
 
 void addKey(ObjectPath& path, const char* name, const CMPIValue* value, CMPIType type) {
     const auto declared = path.core().classes.find(path.className);
+    const PropertyDeclaration* const property =
+        declared != nullptr ? declared->find(required(name)) : nullptr;
+    if (property != nullptr && !property->isKey) {
+        throw Failure{CMPI_RC_ERR_NO_SUCH_PROPERTY};
+    }
     path.keys.set(required(name), declaredValue(path.core(), declared.get(), name, value, type));
 }
 

@@ -4,6 +4,7 @@
 #include "DateTimeText.h"
 #include "Integers.h"
 
+#include <algorithm>
 #include <cmath>
 #include <limits>
 

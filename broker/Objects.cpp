@@ -281,7 +281,8 @@ Value Value::asProperty(CMPIType declared) const {
     const bool isUnsigned = declared >= CMPI_uint8 && declared <= CMPI_uint64;
     const bool isSigned = declared >= CMPI_sint8 && declared <= CMPI_sint64;
     const unsigned int bits = 8U << (declared >> 4U & 3U); // as the codes of the integer types have it
-    // The narrower members share the low bytes of the widest.
+    static_assert(__BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__,
+                  "here and where integers are read from texts, the narrower members share the low bytes");
     const bool fits =
         (type_ == CMPI_uint64 && isUnsigned && (bits == 64 || plain_.uint64 >> bits == 0)) ||
         (type_ == CMPI_sint64 && isSigned && plain_.sint64 >> (bits - 1) == plain_.sint64 >> 63);

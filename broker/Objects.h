@@ -4,7 +4,6 @@
 #include "EmbeddedBroker.h"
 
 #include <algorithm>
-#include <atomic>
 #include <functional>
 #include <memory>
 #include <mutex>

@@ -78,7 +78,7 @@ CMPIEnumeration* enumerationOf(Core& core, const Reply& reply, CMPIType type) {
 }
 
 template <class Handle>
-Handle* onlyOne(const Reply& reply, const std::vector<Handle*>& handles) {
+Handle* firstOf(const Reply& reply, const std::vector<Handle*>& handles) {
     succeeded(reply);
     if (handles.empty()) {
         throw Failure{CMPI_RC_ERR_NOT_FOUND};
@@ -102,13 +102,13 @@ CMPIEnumeration* enumerateInstances(Core& core, const CMPIContext* context, cons
 CMPIInstance* getInstance(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
                           const char** properties) {
     const Reply reply = core.hosting.getInstance(context, path, properties);
-    return onlyOne(reply, reply.instances);
+    return firstOf(reply, reply.instances);
 }
 
 CMPIObjectPath* createInstance(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
                                const CMPIInstance* instance) {
     const Reply reply = core.hosting.createInstance(context, path, instance);
-    return onlyOne(reply, reply.objectPaths);
+    return firstOf(reply, reply.objectPaths);
 }
 
 void modifyInstance(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
@@ -155,8 +155,11 @@ CMPIEnumeration* referenceNames(Core& core, const CMPIContext* context, const CM
 
 CMPIData invokeMethod(Core& core, const CMPIContext* context, const CMPIObjectPath* path, const char* method,
                       const CMPIArgs* in, CMPIArgs* out) {
-    const Reply reply = succeeded(core.hosting.invokeMethod(context, path, required(method), in));
     Arguments* const wanted = Arguments::of(out);
+    if (out != nullptr && wanted == nullptr) {
+        throw Failure{CMPI_RC_ERR_INVALID_HANDLE};
+    }
+    const Reply reply = succeeded(core.hosting.invokeMethod(context, path, required(method), in));
     if (wanted != nullptr) {
         wanted->values = Arguments::of(reply.out)->values;
     }

@@ -35,7 +35,7 @@ pthread_cond_t* conditionOf(CMPI_COND_TYPE condition) {
     return static_cast<pthread_cond_t*>(condition);
 }
 
-// The platform's file name of a library: lib…so in a path.
+// The platform's file name of a library.
 char* resolveFileName(const char* library) {
     if (library == nullptr) {
         return nullptr;

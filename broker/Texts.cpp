@@ -1,4 +1,4 @@
-// The names of codes and types.
+// Codes, types, values and paths as texts.
 
 #include "EmbeddedBroker.h"
 #include "Objects.h"
@@ -7,7 +7,6 @@
 #include <array>
 #include <charconv>
 #include <cmath>
-#include <cstdlib>
 
 namespace oxahv {
 
@@ -182,7 +181,7 @@ std::string valueText(const CMPIData& data) {
     case CMPI_real64:
         return realText(data.value.real64);
     case CMPI_chars:
-        return quoted(data.value.chars);
+        return data.value.chars != nullptr ? quoted(data.value.chars) : "?";
     default:
         return objectText(data);
     }

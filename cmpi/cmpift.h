@@ -423,9 +423,7 @@ struct _CMPIPropertyListFT {
     CMPIBoolean (*isPropertyInList)(const CMPIPropertyList* plist, const char* pname, CMPIStatus* rc);
     const char** (*getProperties)(const CMPIPropertyList* plist, CMPIStatus* rc);
 };
-#endif
 
-#if CMPI_VERSION >= 210
 /** Tells which instances a client wants. */
 struct _CMPIEnumerationFilter {
     CMPI_CONST_SINCE_210 void* hdl;

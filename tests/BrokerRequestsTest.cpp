@@ -484,6 +484,8 @@ TEST(Hosting, LoadsAndUnloadsLibraries) {
     EXPECT_EQ(errorOfLoading(TEST_PROVIDER, "Unknown"),
               "provider Unknown: its factory answered CMPI_RC_ERR_NOT_FOUND");
     EXPECT_EQ(errorOfLoading(TEST_PROVIDER, "Throws"), "provider Throws: its factory threw: no provider");
+    EXPECT_EQ(errorOfLoading(TEST_PROVIDER, "ThrowsANumber"),
+              "provider ThrowsANumber: its factory threw an exception of an unknown kind");
     EXPECT_EQ(errorOf([&] { own.host("Empty", {}); }), "provider Empty has no factory");
 }
 

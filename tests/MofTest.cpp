@@ -239,6 +239,18 @@ TEST(Mof, HasErrorsOfFilesWhereTheyAreIncluded) {
               "t.mof:3:20: cannot read none/None.mof: No such file or directory");
 }
 
+// Classes hold their superclasses: a chain without end would be let go of by as many calls, one in the other.
+TEST(Mof, RefusesASuperclassToMany) {
+    std::string text = "class C0 {};\n";
+    for (int i = 1; i <= 1000; ++i) {
+        text += "class C" + std::to_string(i) + " : C" + std::to_string(i - 1) + " {};\n";
+    }
+    EmbeddedBroker broker;
+    EXPECT_EQ(errorOfText(broker, text), "no error");
+    EXPECT_EQ(errorOfText(broker, "class D : C1000 {};"),
+              "t.mof:1:11: class D has more than 1000 superclasses");
+}
+
 // Cut off or damaged at any place, a text is taken or refused, and nothing worse.
 TEST(Mof, OutlivesDamagedTexts) {
     const std::string whole =

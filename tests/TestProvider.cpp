@@ -82,6 +82,9 @@ extern "C" CMPI_EXPORT CMPIMethodMI* TestProvider_Create_MethodMI(const CMPIBrok
 extern "C" CMPI_EXPORT CMPIInstanceMI* _Generic_Create_InstanceMI(const CMPIBroker* theBroker,
                                                                   const CMPIContext* context,
                                                                   const char* name, CMPIStatus* status) {
+    if (std::strcmp(name, "ThrowsANumber") == 0) {
+        throw 1;
+    }
     if (std::strcmp(name, "Throws") == 0) {
         throw NoProvider();
     }
