@@ -201,6 +201,8 @@ TEST(TheRunner, TellsWhatWentWrongInOneLine) {
     for (const auto& c : cases) {
         expectFailure(c.arguments, c.status, c.line);
     }
+    EXPECT_EQ(run(test + "ein Demo", "2>&1 >/dev/full").output,
+              "oxahv-provider: cannot write to the standard output\n");
     // Lines that hold words of others.
     const std::pair<std::string, std::string> parts[] = {
         {"--library /nowhere/libX.so ein X",
