@@ -1,6 +1,7 @@
 #include "Answer.h"
 
-#include <algorithm>
+#include "Text.h"
+
 #include <strings.h>
 
 namespace {
@@ -108,48 +109,10 @@ Answer answerOf(const oxahv::Reply& reply, const std::string& nameSpace) {
     return answer;
 }
 
-std::string lowerCase(std::string text) {
-    std::transform(text.begin(), text.end(), text.begin(),
-                   [](char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c; });
-    return text;
-}
-
 std::string typeText(CMPIType type) {
     return oxahv::typeName(type) + ((type & CMPI_ARRAY) != 0 ? "[]" : "");
 }
 
 std::string wordsOf(const Answer& answer) {
     return oxahv::codeName(answer.code) + (answer.message.empty() ? "" : ": " + answer.message);
-}
-
-bool isUtf8(const std::string& text) {
-    struct Form {
-        unsigned char first; // the range of the first byte
-        unsigned char last;
-        unsigned char secondFirst; // the range of the second
-        unsigned char secondLast;
-        unsigned int length;
-    };
-    constexpr Form forms[] = {
-        {0x00, 0x7f, 0x80, 0xbf, 1}, {0xc2, 0xdf, 0x80, 0xbf, 2}, {0xe0, 0xe0, 0xa0, 0xbf, 3},
-        {0xe1, 0xec, 0x80, 0xbf, 3}, {0xed, 0xed, 0x80, 0x9f, 3}, {0xee, 0xef, 0x80, 0xbf, 3},
-        {0xf0, 0xf0, 0x90, 0xbf, 4}, {0xf1, 0xf3, 0x80, 0xbf, 4}, {0xf4, 0xf4, 0x80, 0x8f, 4}};
-    const auto byteAt = [&](std::size_t i) { return static_cast<unsigned char>(text[i]); };
-    for (std::size_t i = 0; i < text.size();) {
-        const Form* const form = std::find_if(std::begin(forms), std::end(forms), [&](const Form& f) {
-            return byteAt(i) >= f.first && byteAt(i) <= f.last;
-        });
-        if (form == std::end(forms) || text.size() - i < form->length) {
-            return false;
-        }
-        for (std::size_t k = 1; k < form->length; ++k) {
-            const unsigned char low = k == 1 ? form->secondFirst : 0x80;
-            const unsigned char high = k == 1 ? form->secondLast : 0xbf;
-            if (byteAt(i + k) < low || byteAt(i + k) > high) {
-                return false;
-            }
-        }
-        i += form->length;
-    }
-    return true;
 }

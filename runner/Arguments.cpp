@@ -1,15 +1,12 @@
 #include "Arguments.h"
 
+#include "Text.h"
+
 #include <algorithm>
 #include <iterator>
 #include <optional>
-#include <strings.h>
 
 namespace {
-
-bool sameName(const std::string& a, const std::string& b) {
-    return ::strcasecmp(a.c_str(), b.c_str()) == 0;
-}
 
 struct Argument {
     std::string name;

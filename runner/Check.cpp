@@ -2,6 +2,7 @@
 
 #include "Examination.h"
 #include "Strain.h"
+#include "Text.h"
 
 #include <algorithm>
 #include <chrono>
@@ -83,7 +84,7 @@ public:
         if (isTerminal_ && now >= due_) {
             due_ = now + std::chrono::milliseconds(200);
             isShown_ = true;
-            std::cerr << "\r\033[K" << text.substr(0, 79) << std::flush;
+            std::cerr << "\r\033[K" << printable(text, 79) << std::flush;
         }
     }
 
@@ -176,7 +177,7 @@ MethodCall CheckRun::methodCall(const std::string& text) const {
         words.front().substr(0, point), words.front().substr(point + 1), {words.begin() + 1, words.end()}};
     const auto methods = broker_.methodsOf(call.className);
     const bool isDeclared = std::any_of(methods.begin(), methods.end(), [&](const auto& method) {
-        return lowerCase(method.name) == lowerCase(call.method);
+        return sameName(method.name, call.method);
     });
     if (!isDeclared) {
         throw BrokerError("method '" + text + "': no class that --mof declares has it");
@@ -196,9 +197,8 @@ CheckReport CheckRun::run() {
     }
     for (const MethodCall& call : methods_) {
         const bool isChecked =
-            std::any_of(report_.classes.begin(), report_.classes.end(), [&](const CheckedClass& checked) {
-                return lowerCase(checked.name) == lowerCase(call.className);
-            });
+            std::any_of(report_.classes.begin(), report_.classes.end(),
+                        [&](const CheckedClass& checked) { return sameName(checked.name, call.className); });
         if (!isChecked) {
             throw BrokerError("method " + call.className + '.' + call.method +
                               " is of no class that is checked; name the class with --class");
@@ -227,7 +227,7 @@ void CheckRun::runClass(std::size_t position, std::size_t count) {
     task.isNamed = !checkOptions_.classes.empty();
     task.threads = checkOptions_.threads;
     for (const MethodCall& call : methods_) {
-        if (lowerCase(call.className) == lowerCase(checked.name)) {
+        if (sameName(call.className, checked.name)) {
             task.methods.push_back(call);
         }
     }

@@ -1,6 +1,7 @@
 #include "Examination.h"
 
 #include "Associations.h"
+#include "Text.h"
 
 #include <algorithm>
 #include <set>
@@ -173,7 +174,7 @@ void checkMethodResult(Client& client, const Query& query, const Answer& answer)
     }
     const auto methods = client.broker().methodsOf(client.task().className);
     const auto method = std::find_if(methods.begin(), methods.end(), [&](const auto& declared) {
-        return lowerCase(declared.name) == lowerCase(query.operands.method);
+        return sameName(declared.name, query.operands.method);
     });
     if (method == methods.end()) {
         return;
@@ -379,7 +380,7 @@ void Examination::checkList(const Query& query, const std::vector<std::string>& 
 bool Examination::yieldsMore(const Result& result, const std::vector<std::string>& wanted) const {
     const auto properties = client_.broker().propertiesOf(result.className);
     const auto isExpected = [&](const std::string& name) {
-        const auto isName = [&](const std::string& other) { return lowerCase(other) == lowerCase(name); };
+        const auto isName = [&](const std::string& other) { return sameName(other, name); };
         return std::any_of(wanted.begin(), wanted.end(), isName) ||
                std::any_of(properties.begin(), properties.end(), [&](const PropertyDeclaration& property) {
                    return property.isKey && isName(property.name);

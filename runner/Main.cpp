@@ -2,6 +2,7 @@
 
 #include "Check.h"
 #include "Runner.h"
+#include "Text.h"
 
 #include <CLI/CLI.hpp>
 
@@ -219,7 +220,7 @@ int main(int argc, char** argv) {
         }
         return status;
     } catch (const std::exception& exception) {
-        std::cerr << "oxahv-provider: " << exception.what() << '\n';
+        std::cerr << "oxahv-provider: " << printable(exception.what()) << '\n';
         return usageFailed;
     }
 }

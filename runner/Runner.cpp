@@ -2,6 +2,7 @@
 
 #include "Arguments.h"
 #include "Progress.h"
+#include "Text.h"
 
 #include <HVLogger.h>
 
@@ -218,7 +219,7 @@ int run(const Options& options, const Verb& verb, const Operands& operands) {
     }
     if (!reply.ok()) {
         std::cerr << "oxahv-provider: " << oxahv::codeName(reply.code)
-                  << (reply.message.empty() ? "" : ": " + reply.message) << '\n';
+                  << (reply.message.empty() ? "" : ": " + printable(reply.message)) << '\n';
         return providerFailed;
     }
     printReply(options, target, operands, verb.yields, reply);

@@ -172,6 +172,8 @@ TEST(TheRunner, TellsWhatWentWrongInOneLine) {
     } cases[] = {
         {1, host + port, "CMPI_RC_ERR_NOT_FOUND: no instance of that name"},
         {1, host + "ei CIM_Thing", "CMPI_RC_ERR_INVALID_CLASS: this provider does not serve class CIM_Thing"},
+        {1, host + "ei '\033[mÄ\n\x7f\u009b\xff'", // a terminal gets no control characters of others
+         "CMPI_RC_ERR_INVALID_CLASS: this provider does not serve class ?[mÄ????"},
         {1, host + hostClasses + "cm Else Echo", "CMPI_RC_ERR_INVALID_CLASS: class Else is not declared"},
         {1, test + "gi Demo", "CMPI_RC_ERR_FAILED: the provider returned 0 instances in place of one"},
         {1, host + "--keys chars " + port,
