@@ -9,7 +9,6 @@
 #include <mutex>
 #include <system_error>
 #include <unistd.h>
-#include <utility>
 
 namespace HVLog {
 
@@ -80,6 +79,20 @@ void change(Change&& apply) {
     publishLowest(now);
 }
 
+// A file sink's; sinks are copied, so they share it.
+struct LogFile {
+    LogFile() = default;
+    ~LogFile() {
+        if (descriptor >= 0) {
+            ::close(descriptor);
+        }
+    }
+    LogFile(const LogFile&) = delete;
+    LogFile& operator=(const LogFile&) = delete;
+
+    int descriptor = -1;
+};
+
 // Writes one whole line, so that lines of several processes in one file stay apart too.
 void writeLine(int descriptor, std::string line) {
     line += '\n';
@@ -125,15 +138,13 @@ void HVLogger::setStderrSink() {
 }
 
 void HVLogger::setFileSink(const std::string& path) {
-    const int descriptor = ::open(path.c_str(), O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC, 0640);
-    if (descriptor < 0) {
-        throw std::system_error(errno, std::generic_category(), "cannot open log file '" + path + "'");
+    const auto file = std::make_shared<LogFile>(); // before there is a descriptor to lose
+    file->descriptor = ::open(path.c_str(), O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC, 0640);
+    if (file->descriptor < 0) {
+        const int error = errno;
+        throw std::system_error(error, std::generic_category(), "cannot open log file '" + path + "'");
     }
-    const std::shared_ptr<const int> file(new int(descriptor), [](const int* open) {
-        ::close(*open);
-        delete open;
-    });
-    setSink([file](const Message& message) { writeLine(*file, lineOf(message)); });
+    setSink([file](const Message& message) { writeLine(file->descriptor, lineOf(message)); });
 }
 
 void HVLogger::setThreshold(int level) {

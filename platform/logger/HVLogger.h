@@ -13,8 +13,9 @@
  * **Level codes.** The higher, the more important: 3000 for calls with their parameters, 4000 for calls and
  * variables, 6000 for messages.
  *
- * **Threads.** Everything here may be called from any thread at any time. The sink is run by one thread at a
- * time, so lines never mix. A message that the sink itself causes is dropped.
+ * **Threads.** Everything here may be called from any thread at any time, with one exception: a sink must
+ * call none of the setters and not reset(), which wait until no thread runs a sink. The sink is run by one
+ * thread at a time, so lines never mix. A message that the sink itself causes is dropped.
  *
  * **Encoding.** Texts are bytes in any encoding and are written as they are.
  */
@@ -77,7 +78,7 @@ public:
 
     /** @name Where messages go
      * One sink at a time; a new one takes the earlier one's place, which no thread runs any more when these
-     * return. Not to be called from a sink.
+     * return.
      */
     /** @{ */
     /** Hands messages to a function. @param sink called for each message; an empty function switches logging
@@ -87,7 +88,7 @@ public:
     static void setStderrSink();
     /**
      * Appends a line per message to a file, which is created when it is missing.
-     * @throws std::system_error when the file cannot be opened; the earlier sink then stays.
+     * @throws std::system_error when the file cannot be opened, std::bad_alloc; the earlier sink then stays.
      */
     static void setFileSink(const std::string& path);
     /** @} */
