@@ -7,7 +7,6 @@
 #include <mntent.h>
 #include <sys/statvfs.h>
 
-#include <exception>
 #include <memory>
 #include <set>
 #include <string>
@@ -49,7 +48,7 @@ static CMPIStatus answer(const Function& function) noexcept {
         CMReturn(CMPI_RC_OK);
     } catch (const Refusal& refusal) {
         CMReturn(refusal.code);
-    } catch (const std::exception&) {
+    } catch (...) {
         CMReturn(CMPI_RC_ERR_FAILED);
     }
 }
