@@ -203,6 +203,13 @@ TEST_F(TheHostProvider, ShowsTheMachine) {
     const std::vector<std::string> wanted = {"Dependent", "NameFormat"};
     EXPECT_EQ(textOf(request_.associators(path(osPath), {}, &wanted)),
               R"(Name="machine" CreationClassName="OXATK_ComputerSystem" NameFormat="HostName" )");
+    write("/sys/class/net/eth0/operstate", "unknown");
+    const std::string port = textOf(request_.getInstance(path(portPath)));
+    EXPECT_NE(port.find(R"(Status={0} StatusDescriptions={"unknown"} EnabledState=0 )"), std::string::npos)
+        << port;
+    write("/etc/os-release", "PRETTY_NAME='It\"s an OS'");
+    const std::string os = textOf(request_.enumerateInstances(path("OXATK_OperatingSystem")));
+    EXPECT_EQ(os.rfind(R"(Caption="It\"s an OS" )", 0), 0U) << os;
 }
 
 TEST_F(TheHostProvider, FindsInstancesByKeysOfEveryUnsignedWidth) {

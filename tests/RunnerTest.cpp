@@ -182,6 +182,8 @@ TEST(TheRunner, TellsWhatWentWrongInOneLine) {
          "CMPI_RC_ERR_FAILED: the broker made no object path"},
         {1, host + "--fault returnObjectPath:1:ERR_ACCESS_DENIED ein OXATK_ComputerSystem",
          "CMPI_RC_ERR_ACCESS_DENIED: the broker did not take the result"},
+        {1, host + "--fault setPropertyFilter:1 ei OXATK_ComputerSystem --properties Name",
+         "CMPI_RC_ERR_FAILED: the broker did not take the property list"},
         {2, host + "--fault here ein X", "fault 'here' is not SLOT:N[:CODE] with N from 1 on"},
         {2, host + "--fault nothing:1 ein X",
          "there is no slot nothing; name it by table and member, as CMPIObjectPathFT.addKey"},

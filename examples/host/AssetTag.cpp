@@ -6,6 +6,7 @@
 #include <utils.h>
 
 #include <algorithm>
+#include <ctime>
 #include <cwctype>
 #include <filesystem>
 #include <mutex>

@@ -5,12 +5,15 @@
 
 #include <Utility.h>
 
+#include <ctime>
+
 using TK::Moniker;
 using TK::ProviderUtilities;
 
 namespace {
 
 // Values of EnabledState and OperationalStatus.
+constexpr unsigned short enabledStateUnknown = 0;
 constexpr unsigned short enabled = 2;
 constexpr unsigned short disabled = 3;
 constexpr unsigned short statusUnknown = 0;
@@ -127,6 +130,7 @@ void fillEthernetPort(const Machine& machine, const Moniker& keys, CMPIInstance*
     constexpr unsigned short wakeOnLan = 3;
     EthernetPort port = machine.host.ethernetPort(keyText(keys, "DeviceID").value_or(""));
     const bool isUp = port.state == "up";
+    const bool isUnknown = port.state == "unknown"; // of drivers that tell nothing: the port may well work
     std::vector<std::string> addresses = {port.address};
     std::vector<unsigned short> capabilities;
     if (port.canWakeSystem) {
@@ -134,7 +138,10 @@ void fillEthernetPort(const Machine& machine, const Moniker& keys, CMPIInstance*
     }
     ProviderUtilities::setProperty(instance, "Name", port.name);
     setElementName(instance, L"Ethernet port", port.name);
-    ProviderUtilities::setProperty(instance, "EnabledState", isUp ? enabled : disabled);
+    ProviderUtilities::setProperty(instance, "EnabledState",
+                                   isUp        ? enabled
+                                   : isUnknown ? enabledStateUnknown
+                                               : disabled);
     setStatus(machine, instance,
               isUp                   ? statusOk
               : port.state == "down" ? statusStopped

@@ -2,6 +2,7 @@
 
 #include <utils.h>
 
+#include <cerrno>
 #include <system_error>
 
 namespace {

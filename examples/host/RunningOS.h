@@ -4,6 +4,8 @@
 
 #include "Provider.h"
 
+#include <vector>
+
 // One of the two sides.
 struct End {
     const char* role; // the reference's name
