@@ -16,7 +16,6 @@
 #include <cstring>
 #include <ctime>
 #include <limits>
-#include <memory>
 #include <thread>
 
 // The silent logger
