@@ -25,11 +25,6 @@ struct PathContent {
     CMPIData byName;
 };
 
-struct ArrayContent {
-    CMPICount count;
-    CMPIData element;
-};
-
 // Strings
 
 // Newer CMPI headers make the characters const.
@@ -153,14 +148,6 @@ CMPIArgsFT argsTable = makeArgsTable();
 
 // Arrays and dates
 
-CMPICount getSize(const CMPIArray* array, CMPIStatus* /*status*/) {
-    return contentOf<ArrayContent>(array).count;
-}
-
-CMPIData getElementAt(const CMPIArray* array, CMPICount /*index*/, CMPIStatus* /*status*/) {
-    return contentOf<ArrayContent>(array).element;
-}
-
 CMPIStatus setElementAt(const CMPIArray* /*array*/, CMPICount /*index*/, const CMPIValue* /*value*/,
                         CMPIType /*type*/) {
     return ok;
@@ -168,8 +155,6 @@ CMPIStatus setElementAt(const CMPIArray* /*array*/, CMPICount /*index*/, const C
 
 CMPIArrayFT makeArrayTable() {
     CMPIArrayFT table = {};
-    table.getSize = getSize;
-    table.getElementAt = getElementAt;
     table.setElementAt = setElementAt;
     return table;
 }
@@ -216,14 +201,6 @@ CMPIBrokerEncFT brokerTable = makeBrokerTable();
 PathContent fiveKeys = {keyKinds, textData(&deviceId)};
 PathContent manyKeys = {65535, textData(&deviceId)};
 CMPIData text = textData(&deviceId);
-ArrayContent texts = {64, textData(&className)};
-
-CMPIData arrayData() {
-    CMPIData data = {CMPI_stringA, CMPI_goodValue, {}};
-    data.value.array = &objects().array;
-    return data;
-}
-CMPIData textArray = arrayData();
 
 } // namespace
 
@@ -233,11 +210,10 @@ Objects& objects() {
                           {&manyKeys, &pathTable},
                           {&numberSeven, &instanceTable},
                           {&text, &instanceTable},
-                          {&textArray, &instanceTable},
                           {&numberSeven, &argsTable},
                           {&text, &argsTable},
                           className,
-                          {&texts, &arrayTable},
+                          {nullptr, &arrayTable},
                           {nullptr, &dateTimeTable}};
     return all;
 }

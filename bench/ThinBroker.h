@@ -14,16 +14,15 @@ constexpr CMPICount keyKinds = 5;
 
 struct Objects {
     CMPIBroker broker;
-    CMPIObjectPath path;        // five keys
-    CMPIObjectPath longPath;    // 65,535 keys, the five again and again
-    CMPIInstance instance;      // each property is the number 7
-    CMPIInstance textInstance;  // each property is a text
-    CMPIInstance arrayInstance; // each property is an array of 64 texts
-    CMPIArgs args;              // each argument is the number 7
-    CMPIArgs textArgs;          // each argument is a text
-    CMPIString text;            // what the broker makes of any text
-    CMPIArray array;            // what it makes of any array
-    CMPIDateTime dateTime;      // what it makes of any date
+    CMPIObjectPath path;       // five keys
+    CMPIObjectPath longPath;   // 65,535 keys, the five again and again
+    CMPIInstance instance;     // each property is the number 7
+    CMPIInstance textInstance; // each property is a text
+    CMPIArgs args;             // each argument is the number 7
+    CMPIArgs textArgs;         // each argument is a text
+    CMPIString text;           // what the broker makes of any text
+    CMPIArray array;           // what it makes of any array
+    CMPIDateTime dateTime;     // what it makes of any date
 };
 
 // The prepared objects. Their function tables may be exchanged while no other thread uses them.

@@ -11,6 +11,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <string>
+#include <utility>
 
 // The one function of a target: asks the library about an input, and ends the process when the answer is
 // wrong.
@@ -28,9 +29,17 @@ namespace fuzz {
     std::abort();
 }
 
+// Bytes as wide characters, as many bytes a character as it has.
+inline std::wstring wide(const std::string& bytes) {
+    std::wstring text(bytes.size() / sizeof(wchar_t), L'\0');
+    std::memcpy(text.data(), bytes.data(), text.size() * sizeof(wchar_t));
+    return text;
+}
+
 class Input {
 public:
     Input(const std::uint8_t* data, std::size_t size) : text_(reinterpret_cast<const char*>(data), size) {}
+    explicit Input(std::string text) : text_(std::move(text)) {}
 
     bool isEmpty() const { return position_ == text_.size(); }
 

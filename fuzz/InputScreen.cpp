@@ -6,17 +6,6 @@
 
 #include "ProviderUtilities.h"
 
-namespace {
-
-// Four bytes a character.
-std::wstring wideFromBytes(const std::string& bytes) {
-    std::wstring text(bytes.size() / sizeof(wchar_t), L'\0');
-    std::memcpy(text.data(), bytes.data(), text.size() * sizeof(wchar_t));
-    return text;
-}
-
-} // namespace
-
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     using TK::ProviderUtilities;
     fuzz::Input input(data, size);
@@ -28,7 +17,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     std::wstring wideExemption = obvious::widened<wchar_t>(exemption);
     std::wstring wideText = obvious::widened<wchar_t>(text);
     FUZZ_REQUIRE(ProviderUtilities::ValidateInput(wideText, wideExemption) == isAcceptable);
-    wideText = wideFromBytes(text);
+    wideText = fuzz::wide(text);
     FUZZ_REQUIRE(ProviderUtilities::ValidateInput(wideText, wideExemption) ==
                  obvious::isAcceptable(wideText, wideExemption));
     return 0;

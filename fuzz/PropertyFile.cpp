@@ -11,14 +11,14 @@
 
 namespace {
 
-// A file of this process in memory; removed when the process ends.
+// A file of this process in memory; removed when the process ends by itself.
 class ScratchFile {
 public:
     ScratchFile() {
         const bool hasMemory = std::filesystem::is_directory("/dev/shm");
         folder_ = (hasMemory ? "/dev/shm" : std::filesystem::temp_directory_path().string()) +
-                  "/property-file-" + std::to_string(::getpid());
-        std::filesystem::create_directory(folder_);
+                  "/property-file-XXXXXX";
+        FUZZ_REQUIRE(::mkdtemp(folder_.data()) != nullptr);
     }
     ~ScratchFile() { std::filesystem::remove_all(folder_); }
     ScratchFile(const ScratchFile&) = delete;
@@ -35,12 +35,6 @@ private:
     std::string folder_;
 };
 
-std::wstring wideText(const std::string& bytes) {
-    std::wstring text(bytes.size() / sizeof(wchar_t), L'\0');
-    std::memcpy(text.data(), bytes.data(), text.size() * sizeof(wchar_t));
-    return text;
-}
-
 std::wstring untilNul(const std::wstring& text) {
     return text.c_str();
 }
@@ -50,8 +44,8 @@ std::wstring untilNul(const std::wstring& text) {
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     static const ScratchFile scratch;
     fuzz::Input input(data, size);
-    const std::wstring key = wideText(input.line());
-    const std::wstring value = wideText(input.line());
+    const std::wstring key = fuzz::wide(input.line());
+    const std::wstring value = fuzz::wide(input.line());
     const std::string bytes = input.rest();
 
     // What nobody changes stays byte for byte.

@@ -2,46 +2,22 @@
 // environment.
 #include "Fuzz.h"
 
+#include "../tests/Obvious.h"
+
 #include "StringConversion.h"
 #include "Utility.h"
 
 #include <clocale>
-#include <cwchar>
 #include <vector>
 
 namespace {
 
-constexpr auto failed = static_cast<std::size_t>(-1);
-
-bool toWide(const std::string& in, std::wstring& out) {
-    std::mbstate_t state{};
-    std::vector<wchar_t> wide(in.size() + 1);
-    const char* rest = in.c_str();
-    const std::size_t size = std::mbsrtowcs(wide.data(), &rest, wide.size(), &state);
-    if (size != failed) {
-        out.assign(wide.data(), size);
-    }
-    return size != failed;
-}
-
-bool toNarrow(const std::wstring& in, std::string& out) {
-    std::mbstate_t state{};
-    std::vector<char> narrow(in.size() * 16 + 16);
-    const wchar_t* rest = in.c_str();
-    const std::size_t size = std::wcsrtombs(narrow.data(), &rest, narrow.size(), &state);
-    if (size != failed) {
-        out.assign(narrow.data(), size);
-    }
-    return size != failed;
-}
-
-template <class From, class To>
-void check(const From& in, bool (*expected)(const From&, To&), bool (*convert)(From, To&)) {
+template <class To, class From>
+void check(const From& in, bool (*convert)(From, To&)) {
     const To before(1, '#');
-    To wanted = before;
     To converted = before;
-    FUZZ_REQUIRE(convert(in, converted) == expected(in, wanted));
-    FUZZ_REQUIRE(converted == wanted);
+    FUZZ_REQUIRE(convert(in, converted) == obvious::converted(in).has_value());
+    FUZZ_REQUIRE(converted == obvious::converted(in).value_or(before));
 }
 
 } // namespace
@@ -54,10 +30,8 @@ extern "C" int LLVMFuzzerInitialize(int*, char***) {
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     fuzz::Input input(data, size);
     const std::string narrow = input.rest();
-    std::wstring wide(narrow.size() / sizeof(wchar_t), L'\0');
-    std::memcpy(wide.data(), narrow.data(), wide.size() * sizeof(wchar_t));
-    check(narrow, &toWide, &TK::CUtility::AStringToWString);
-    check(wide, &toNarrow, &TK::CUtility::WStringToAString);
+    check(narrow, &TK::CUtility::AStringToWString);
+    check(fuzz::wide(narrow), &TK::CUtility::WStringToAString);
 
     // Lines as many texts: all or none.
     std::vector<std::string> texts;
@@ -67,9 +41,8 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     std::vector<std::wstring> wanted = {L"before"};
     bool isConvertible = true;
     for (const std::string& text : texts) {
-        std::wstring converted;
-        isConvertible = isConvertible && toWide(text, converted);
-        wanted.push_back(converted);
+        isConvertible = isConvertible && obvious::converted(text);
+        wanted.push_back(obvious::converted(text).value_or(L""));
     }
     if (!isConvertible) {
         wanted.clear();

@@ -1,6 +1,8 @@
 #include "Strain.h"
 
 #include <algorithm>
+#include <chrono>
+#include <iterator>
 #include <map>
 #include <set>
 #include <thread>
@@ -125,6 +127,31 @@ Differences oneRound(Client& client, const std::vector<Query>& queries) {
     return differences;
 }
 
+// What changes by itself while one thread asks for a second.
+std::set<std::string> restlessValues(Client& client, const Query& query) {
+    constexpr unsigned int times = 20;
+    constexpr std::chrono::milliseconds pause(50);
+    std::set<std::string> restless;
+    const std::optional<Answer> first = client.askPlainly(query);
+    for (unsigned int i = 0; first && i < times; ++i) {
+        std::this_thread::sleep_for(pause);
+        if (const std::optional<Answer> again = client.askPlainly(query)) {
+            restless.merge(differenceOf(*again, *first).values);
+        }
+    }
+    return restless;
+}
+
+// A value that is different once may have changed, and so may one that is different twice when it changes all
+// the time, as a number of processes does.
+std::set<std::string> lastingValues(Client& client, const Query& query, const Difference& first,
+                                    const Difference& second) {
+    std::set<std::string> both;
+    std::set_intersection(first.values.begin(), first.values.end(), second.values.begin(),
+                          second.values.end(), std::inserter(both, both.end()));
+    return both.empty() ? both : without(both, restlessValues(client, query));
+}
+
 // Faults
 
 constexpr unsigned int mostOfASlot = 100;
@@ -173,7 +200,6 @@ void failEach(Client& client, const Client::Asked& asked) {
 
 } // namespace
 
-// A value that is different once may have changed; one that is different twice has not.
 void strainByThreads(Client& client) {
     std::vector<Query> queries;
     for (const Client::Asked& asked : client.asked()) {
@@ -187,10 +213,8 @@ void strainByThreads(Client& client) {
         for (const std::string& text : difference.structure) {
             client.find(CheckKind::threadsDiffer, textOf(queries[index]), text);
         }
-        for (const std::string& text : difference.values) {
-            if (second[index].values.count(text) != 0) {
-                client.find(CheckKind::threadsDiffer, textOf(queries[index]), text);
-            }
+        for (const std::string& text : lastingValues(client, queries[index], difference, second[index])) {
+            client.find(CheckKind::threadsDiffer, textOf(queries[index]), text);
         }
     }
 }

@@ -1,316 +1,364 @@
-// Scalars and texts: what the setters hand the broker, and what the getters make of each of its answers.
+// The accessors of single values: what each calls the broker for, in which order, and what becomes of every
+// answer.
 #include "BrokerTest.h"
+#include "StringConversion.h"
+#include "TestLocales.h"
 
-#include <limits>
-
-using TK::FrameworkException;
-using TK::ProviderUtilities;
+using PU = TK::ProviderUtilities;
 
 namespace {
 
-constexpr const char* setPropertySlot = "CMPIInstanceFT.setProperty";
-constexpr const char* addKeySlot = "CMPIObjectPathFT.addKey";
+const std::string dateText = "20090307050409.000123-300";
+const std::string untouched = "untouched";
+
+template <class Value>
+std::string textOf(const Value& value) {
+    if constexpr (std::is_same_v<Value, std::wstring>) {
+        return TK::make_string(value);
+    } else if constexpr (std::is_same_v<Value, CMPIString*>) {
+        CMPIValue record = {};
+        record.string = value;
+        return oxahv::valueText({CMPI_string, CMPI_goodValue, record});
+    } else if constexpr (std::is_same_v<Value, CMPIObjectPath*>) {
+        return oxahv::pathText(value);
+    } else if constexpr (std::is_arithmetic_v<Value>) {
+        return std::to_string(value);
+    } else {
+        return value;
+    }
+}
+
+// The getter of a value from an object, told apart by their types.
+template <class Object, class Value>
+bool get(const Object* from, const char* name, Value& out) {
+    if constexpr (std::is_same_v<Object, CMPIObjectPath> && std::is_pointer_v<Value>) {
+        return PU::getKeyProperty(from, name, &out);
+    } else if constexpr (std::is_same_v<Object, CMPIObjectPath>) {
+        return PU::getKeyProperty(from, name, out);
+    } else if constexpr (std::is_pointer_v<Value>) {
+        return PU::getProperty(from, name, &out);
+    } else if constexpr (std::is_same_v<Object, CMPIInstance> && std::is_same_v<Value, std::string>) {
+        return PU::getProperty(from, name, out, name == std::string("Date"));
+    } else {
+        return PU::getProperty(from, name, out);
+    }
+}
+
+// An operation that reads something: the calls of the broker that it makes one by one, what it traces behind
+// them, and its result; when a call fails, it makes no other, and `failure` is its result.
+struct Reading {
+    std::string calls;
+    std::string traces;
+    std::string value;
+    std::function<std::string(const char* name)> read;
+    std::string name = {};
+    std::string failure = untouched;
+    std::string failureLog = {};
+};
 
 class Accessors : public BrokerTest {
 protected:
-    CMPIObjectPath* const path_ = request_.objectPath("root/cimv2", "Demo_Class");
-    CMPIInstance* const instance_ = ProviderUtilities::createInstance(broker_.handle(), path_);
+    Accessors() {
+        CMPIValue value = {};
+        store("Null", nullptr, CMPI_string);
+        store("Text", "text", CMPI_chars);
+        value.uint16 = 60000;
+        store("Short", &value, CMPI_uint16);
+        value.uint32 = 4000000000U;
+        store("Int", &value, CMPI_uint32);
+        value.boolean = 2; // any nonzero byte is true
+        store("Flag", &value, CMPI_boolean);
+        value.ref = request_.objectPath("root", "Other");
+        store("Path", &value, CMPI_ref);
+        value.dateTime = CMNewDateTimeFromChars(broker_.handle(), dateText.c_str(), nullptr);
+        store("Date", &value, CMPI_dateTime);
+    }
 
-    // The only call of a slot that an operation makes.
-    template <class Operation>
-    oxahv::Call callOf(const char* slot, const Operation& operation) {
-        const std::vector<oxahv::Call> calls = recorded(operation);
-        EXPECT_EQ(calls.size(), 1U);
-        if (calls.empty()) {
-            return {};
+    void store(const char* name, const void* value, CMPIType type) {
+        CMSetProperty(instance_, name, value, type);
+        CMAddKey(path_, name, value, type);
+        CMAddArg(args_, name, value, type);
+    }
+
+    // The row of a getter that reads a value by a name.
+    template <class Value, class Object>
+    Reading getter(const Object* const& from, const char* slot, const char* name, const std::string& value,
+                   const std::string& moreCalls = "", const std::string& traces = "") {
+        const auto read = [&from](const char* wanted) {
+            const Value before{};
+            Value out = before;
+            const bool isRead = get(from, wanted, out);
+            return isRead ? textOf(out) : out == before ? untouched : "changed";
+        };
+        return {slot + std::string(" ") + name + '\n' + moreCalls, traces, value, read, name};
+    }
+    std::vector<Reading> plainGetters() {
+        return {getter<unsigned short>(fromInstance_, "getProperty", "Short", "60000"),
+                getter<unsigned int>(fromInstance_, "getProperty", "Int", "4000000000"),
+                getter<bool>(fromInstance_, "getProperty", "Flag", "1"),
+                getter<CMPIString*>(fromInstance_, "getProperty", "Text", "\"text\""),
+                getter<unsigned short>(fromArgs_, "getArg", "Short", "60000"),
+                getter<unsigned int>(fromArgs_, "getArg", "Int", "4000000000"),
+                getter<bool>(fromArgs_, "getArg", "Flag", "1"),
+                getter<CMPIString*>(fromPath_, "getKey", "Text", "\"text\""),
+                getter<CMPIObjectPath*>(fromPath_, "getKey", "Path", "root:Other")};
+    }
+    std::vector<Reading> wideGetters(const std::string& value, const std::string& traces) {
+        return {getter<std::wstring>(fromInstance_, "getProperty", "Text", value, "getCharPtr\n", traces),
+                getter<std::wstring>(fromArgs_, "getArg", "Text", value, "getCharPtr\n", traces),
+                getter<std::wstring>(fromPath_, "getKey", "Text", value, "getCharPtr\n", traces)};
+    }
+    std::vector<Reading> textGetters() {
+        std::vector<Reading> all = wideGetters("text", passing(utility, "AStringToWString"));
+        all.push_back(getter<std::string>(fromInstance_, "getProperty", "Text", "text", "getCharPtr\n"));
+        all.push_back(getter<std::string>(fromPath_, "getKey", "Text", "text", "getCharPtr\n"));
+        all.push_back(getter<std::string>(fromArgs_, "getArg", "Text", "text", "getCharPtr\n")); // the last
+        return all;
+    }
+    Reading dateGetter() {
+        return getter<std::string>(fromInstance_, "getProperty", "Date", dateText,
+                                   "getStringFormat\ngetCharPtr\n");
+    }
+
+    // What a reading does in the face of the faults that are injected.
+    void expect(const Reading& reading, const std::string& value, const std::string& log,
+                const std::string& name) {
+        std::string result;
+        EXPECT_EQ(logOf([&] { result = reading.read(name.c_str()); }), log);
+        EXPECT_EQ(result, value) << log;
+    }
+    void expectAll(const Reading& reading) {
+        expect(reading, reading.value, reading.calls + reading.traces, reading.name);
+    }
+    void expectNothing(const Reading& reading) {
+        expect(reading, untouched, reading.calls.substr(0, reading.calls.find('\n') + 1), reading.name);
+    }
+
+    // A reading in every way in which its calls can fail.
+    void checkCalls(const Reading& reading, bool alsoNull) {
+        expectAll(reading);
+        unsigned int call = 1;
+        for (std::size_t end = reading.calls.find('\n'); end != std::string::npos;
+             end = reading.calls.find('\n', end + 1), ++call) {
+            for (oxahv::Fault fault : {anError, nothing}) {
+                fault.firstCall = call;
+                if (fault.code != CMPI_RC_OK || alsoNull) {
+                    SCOPED_TRACE(call);
+                    broker_.injectFault("*", fault);
+                    expect(reading, reading.failure, reading.calls.substr(0, end + 1) + reading.failureLog,
+                           reading.name);
+                }
+            }
         }
-        EXPECT_EQ(calls[0].slot, slot);
-        EXPECT_EQ(calls[0].name, "Name");
-        return calls[0];
     }
 
-    // The type and the value that the setters of both kinds hand over.
-    template <class T, class Check>
-    void checkSetters(T value, CMPIType type, const Check& check) {
-        const oxahv::Call key =
-            callOf(addKeySlot, [&] { ProviderUtilities::setKeyProperty(path_, "Name", value); });
-        EXPECT_EQ(key.object, path_);
-        EXPECT_EQ(key.type, type);
-        EXPECT_TRUE(check(key.value)) << "key of type " << type;
-        checkPropertySetter(value, type, check);
+    void checkGetter(const Reading& getter, bool alsoNull) {
+        checkCalls(getter, alsoNull);
+        const std::string slot = getter.calls.substr(0, getter.calls.find(' '));
+        for (const char* const name : {"Missing", "Null"}) {
+            expect(getter, untouched, slot + ' ' + name + '\n', name);
+        }
+        broker_.injectFault("*", {CMPI_RC_OK, false, CMPI_nullValue});
+        expectNothing(getter);
+        broker_.injectFault("*", {CMPI_RC_OK, false, CMPI_keyValue | CMPI_notFound | CMPI_badValue});
+        expectAll(getter); // only the NULL bit counts
     }
 
-    template <class T, class Check>
-    void checkPropertySetter(T value, CMPIType type, const Check& check) {
-        const oxahv::Call property =
-            callOf(setPropertySlot, [&] { ProviderUtilities::setProperty(instance_, "Name", value); });
-        EXPECT_EQ(property.object, instance_);
-        EXPECT_EQ(property.type, type);
-        EXPECT_TRUE(check(property.value)) << "property of type " << type;
+    // A setter's one call, with the value's text also from what is set then.
+    template <class Set>
+    void expectSet(const Set& set, const std::string& slot, const std::string& type, const std::string& text,
+                   const std::string& traces = "") {
+        EXPECT_EQ(logOf(set), traces + slot + " Name " + type + (type == "chars" ? "" : " = " + text) + '\n');
+        EXPECT_EQ(oxahv::valueText(slot == "addKey" ? CMGetKey(path_, "Name", nullptr)
+                                                    : CMGetProperty(instance_, "Name", nullptr)),
+                  text);
     }
 
-    void setProperty(const CMPIValue& value, CMPIType type) {
-        CMSetProperty(instance_, "Name", &value, type);
-    }
+    const ThreadLocale plain_{"C"};
+    CMPIObjectPath* const path_ = request_.objectPath("root/cimv2", "Demo_Class");
+    CMPIInstance* const instance_ = PU::createInstance(broker_.handle(), path_);
+    CMPIArgs* const args_ = CMNewArgs(broker_.handle(), nullptr);
+    // What the getters read from.
+    const CMPIObjectPath* fromPath_ = path_;
+    const CMPIInstance* fromInstance_ = instance_;
+    const CMPIArgs* fromArgs_ = args_;
 };
 
 } // namespace
 
-TEST_F(Accessors, HandEveryTypeOverWithItsCodeInItsMember) {
-    checkSetters<unsigned char>(200, CMPI_uint8, [](const CMPIValue& v) { return v.uint8 == 200; });
-    checkSetters<unsigned short>(60000, CMPI_uint16, [](const CMPIValue& v) { return v.uint16 == 60000; });
-    checkSetters<unsigned int>(4000000000U, CMPI_uint32,
-                               [](const CMPIValue& v) { return v.uint32 == 4000000000U; });
-    checkSetters<unsigned long long>(~0ULL, CMPI_uint64,
-                                     [](const CMPIValue& v) { return v.uint64 == ~0ULL; });
-    const char* const chars = "text";
-    checkSetters<const char*>(chars, CMPI_chars, [&](const CMPIValue& v) { return v.chars == chars; });
-    CMPIString* const string = CMNewString(broker_.handle(), "string", nullptr);
-    checkSetters<CMPIString*>(string, CMPI_string, [&](const CMPIValue& v) { return v.string == string; });
-    CMPIObjectPath* const other = request_.objectPath("root/cimv2", "Demo_Other");
-    checkSetters<CMPIObjectPath*>(other, CMPI_ref, [&](const CMPIValue& v) { return v.ref == other; });
-
-    checkPropertySetter<bool>(true, CMPI_boolean, [](const CMPIValue& v) { return v.boolean == 1; });
-    checkPropertySetter<bool>(false, CMPI_boolean, [](const CMPIValue& v) { return v.boolean == 0; });
-    checkPropertySetter<short>(-2, CMPI_sint16, [](const CMPIValue& v) { return v.sint16 == -2; });
-    checkPropertySetter<float>(1.5F, CMPI_real32, [](const CMPIValue& v) { return v.real32 == 1.5F; });
-    checkPropertySetter<double>(-0.25, CMPI_real64, [](const CMPIValue& v) { return v.real64 == -0.25; });
-}
-
-TEST_F(Accessors, HandOverAStringsOwnCharacters) {
-    std::string text = "a text that is longer than any short string buffer holds";
-    const oxahv::Call key = callOf(addKeySlot, [&] {
-        ProviderUtilities::setKeyProperty(path_, "Name", static_cast<const std::string&>(text));
-    });
-    EXPECT_EQ(key.type, CMPI_chars);
-    EXPECT_EQ(key.value.chars, text.c_str());
-    const oxahv::Call property =
-        callOf(setPropertySlot, [&] { ProviderUtilities::setProperty(instance_, "Name", text); });
-    EXPECT_EQ(property.type, CMPI_chars);
-    EXPECT_EQ(property.value.chars, text.c_str());
-}
-
-TEST_F(Accessors, DropTheStatusOfASetter) {
-    broker_.injectFault(addKeySlot, {CMPI_RC_ERR_FAILED});
-    broker_.injectFault(setPropertySlot, {CMPI_RC_ERR_TYPE_MISMATCH});
-    ProviderUtilities::setKeyProperty(path_, "Name", 1U);
-    ProviderUtilities::setProperty(instance_, "Name", 1U);
-    EXPECT_EQ(CMGetKeyCount(path_, nullptr), 0U);
-    EXPECT_EQ(CMGetPropertyCount(instance_, nullptr), 0U);
-}
-
-namespace {
-
-// A getter in every way in which it can be called and fail: `get` writes to its argument, `first` is the slot
-// that it reads by.
-template <class T, class Get>
-void checkGetter(oxahv::EmbeddedBroker& broker, const char* slot, const T& untouched, const T& expected,
-                 const Get& get) {
-    T out = untouched;
-    broker.startRecording();
-    EXPECT_TRUE(get("Name", out)) << slot;
-    const std::vector<oxahv::Call> calls = broker.stopRecording();
-    EXPECT_EQ(out, expected) << slot;
-    for (const oxahv::Call& call : calls) {
-        EXPECT_TRUE(call.hasStatus);
-        EXPECT_EQ(call.entryStatus.rc, CMPI_RC_OK);
-        EXPECT_EQ(call.entryStatus.msg, nullptr);
+TEST_F(Accessors, ReadAValueOrLeaveTheOutputAlone) {
+    for (const Reading& getter : plainGetters()) {
+        checkGetter(getter, false);
     }
-    out = untouched;
-    EXPECT_FALSE(get("Missing", out)) << slot;
-    EXPECT_EQ(out, untouched) << slot;
-    EXPECT_FALSE(get("Null", out)) << slot;
-    EXPECT_EQ(out, untouched) << slot;
-    for (const CMPIrc code : {CMPI_RC_ERR_FAILED, CMPI_RC_ERR_NOT_SUPPORTED}) {
-        broker.injectFault(slot, {code});
-        EXPECT_FALSE(get("Name", out)) << slot;
-        EXPECT_EQ(out, untouched) << slot;
+    for (const Reading& getter : textGetters()) {
+        checkGetter(getter, true);
     }
-    broker.clearFaults();
-    broker.injectFault(slot, {CMPI_RC_OK, false, CMPI_nullValue});
-    EXPECT_FALSE(get("Name", out)) << slot;
-    EXPECT_EQ(out, untouched) << slot;
-    broker.clearFaults();
-    broker.injectFault(slot, {CMPI_RC_OK, false, CMPI_keyValue | CMPI_notFound | CMPI_badValue});
-    EXPECT_TRUE(get("Name", out)) << slot << ": only the NULL bit counts";
-    broker.clearFaults();
+    checkGetter(dateGetter(), true);
 }
 
-} // namespace
-
-TEST_F(Accessors, GetAPropertyOrLeaveTheOutputAlone) {
-    constexpr const char* slot = "CMPIInstanceFT.getProperty";
-    CMPIValue value = {};
-    CMSetProperty(instance_, "Null", nullptr, CMPI_uint16);
-    value.uint16 = 60000;
-    setProperty(value, CMPI_uint16);
-    checkGetter<unsigned short>(broker_, slot, 7, 60000, [&](const char* name, unsigned short& out) {
-        return ProviderUtilities::getProperty(instance_, name, out);
-    });
-    value.uint32 = 4000000000U;
-    setProperty(value, CMPI_uint32);
-    checkGetter<unsigned int>(broker_, slot, 7, 4000000000U, [&](const char* name, unsigned int& out) {
-        return ProviderUtilities::getProperty(instance_, name, out);
-    });
-    value.boolean = 2; // any nonzero byte is true
-    setProperty(value, CMPI_boolean);
-    checkGetter<bool>(broker_, slot, false, true, [&](const char* name, bool& out) {
-        return ProviderUtilities::getProperty(instance_, name, out);
-    });
-    CMSetProperty(instance_, "Name", "text", CMPI_chars);
-    CMPIString* const stored = CMGetProperty(instance_, "Name", nullptr).value.string;
-    checkGetter<CMPIString*>(broker_, slot, nullptr, stored, [&](const char* name, CMPIString*& out) {
-        return ProviderUtilities::getProperty(instance_, name, &out);
-    });
-}
-
-TEST_F(Accessors, GetAnArgumentOrLeaveTheOutputAlone) {
-    constexpr const char* slot = "CMPIArgsFT.getArg";
-    CMPIArgs* const args = CMNewArgs(broker_.handle(), nullptr);
-    CMPIValue value = {};
-    CMAddArg(args, "Null", nullptr, CMPI_uint16);
-    value.uint16 = 60000;
-    CMAddArg(args, "Name", &value, CMPI_uint16);
-    checkGetter<unsigned short>(broker_, slot, 7, 60000, [&](const char* name, unsigned short& out) {
-        return ProviderUtilities::getProperty(args, name, out);
-    });
-    value.uint32 = 4000000000U;
-    CMAddArg(args, "Name", &value, CMPI_uint32);
-    checkGetter<unsigned int>(broker_, slot, 7, 4000000000U, [&](const char* name, unsigned int& out) {
-        return ProviderUtilities::getProperty(args, name, out);
-    });
-    value.boolean = 1;
-    CMAddArg(args, "Name", &value, CMPI_boolean);
-    checkGetter<bool>(broker_, slot, false, true, [&](const char* name, bool& out) {
-        return ProviderUtilities::getProperty(args, name, out);
-    });
-}
-
-TEST_F(Accessors, GetAKeyOrLeaveTheOutputAlone) {
-    constexpr const char* slot = "CMPIObjectPathFT.getKey";
-    CMAddKey(path_, "Null", nullptr, CMPI_string);
-    CMAddKey(path_, "Name", "text", CMPI_chars);
-    CMPIString* const stored = CMGetKey(path_, "Name", nullptr).value.string;
-    checkGetter<CMPIString*>(broker_, slot, nullptr, stored, [&](const char* name, CMPIString*& out) {
-        return ProviderUtilities::getKeyProperty(path_, name, &out);
-    });
-    const auto getText = [&](const char* name, std::string& out) {
-        return ProviderUtilities::getKeyProperty(path_, name, out);
-    };
-    checkGetter<std::string>(broker_, slot, "as it was", "text", getText);
-
-    // The text's characters can fail as well: by an error, by no characters, by no string.
-    std::string out = "as it was";
-    for (const oxahv::Fault& fault : {oxahv::Fault{CMPI_RC_ERR_FAILED}, oxahv::Fault{CMPI_RC_OK, true}}) {
-        broker_.injectFault("CMPIStringFT.getCharPtr", fault);
-        EXPECT_FALSE(getText("Name", out));
+TEST_F(Accessors, ReadWideTextsThatTheLocaleHas) {
+    store("Text", "", CMPI_chars);
+    for (const Reading& getter : wideGetters("", "")) {
+        expectAll(getter);
     }
-    broker_.clearFaults();
-    broker_.injectFault(slot, {CMPI_RC_OK, true});
-    EXPECT_FALSE(getText("Name", out));
-    EXPECT_EQ(out, "as it was");
-
-    CMPIValue value = {};
-    value.ref = request_.objectPath("root/cimv2", "Demo_Other");
-    CMAddKey(path_, "Name", &value, CMPI_ref);
-    CMPIObjectPath* const reference = CMGetKey(path_, "Name", nullptr).value.ref;
-    broker_.clearFaults();
-    checkGetter<CMPIObjectPath*>(broker_, slot, nullptr, reference,
-                                 [&](const char* name, CMPIObjectPath*& result) {
-                                     return ProviderUtilities::getKeyProperty(path_, name, &result);
-                                 });
-}
-
-TEST_F(Accessors, DoNotTakeAValueThatComesWithAnError) {
-    CMPIData data = {};
-    data.type = CMPI_string;
-    data.value.string = CMNewString(broker_.handle(), "text", nullptr);
-    Answering<CMPIInstance, CMPIInstanceFT> instance(instance_, &CMPIInstanceFT::getProperty, data,
-                                                     CMPI_RC_ERR_FAILED);
-    Answering<CMPIArgs, CMPIArgsFT> args(CMNewArgs(broker_.handle(), nullptr), &CMPIArgsFT::getArg, data,
-                                         CMPI_RC_ERR_FAILED);
-    Answering<CMPIObjectPath, CMPIObjectPathFT> path(path_, &CMPIObjectPathFT::getKey, data,
-                                                     CMPI_RC_ERR_FAILED);
-    unsigned short number16 = 7;
-    unsigned int number32 = 7;
-    bool flag = false;
-    std::string text = "as it was";
-    CMPIString* string = nullptr;
-    CMPIObjectPath* reference = nullptr;
-    EXPECT_FALSE(ProviderUtilities::getProperty(instance.handle(), "Name", number16));
-    EXPECT_FALSE(ProviderUtilities::getProperty(instance.handle(), "Name", number32));
-    EXPECT_FALSE(ProviderUtilities::getProperty(instance.handle(), "Name", flag));
-    EXPECT_FALSE(ProviderUtilities::getProperty(instance.handle(), "Name", &string));
-    EXPECT_FALSE(ProviderUtilities::getProperty(args.handle(), "Name", number16));
-    EXPECT_FALSE(ProviderUtilities::getProperty(args.handle(), "Name", number32));
-    EXPECT_FALSE(ProviderUtilities::getProperty(args.handle(), "Name", flag));
-    EXPECT_FALSE(ProviderUtilities::getProperty(args.handle(), "Name", text));
-    EXPECT_FALSE(ProviderUtilities::getKeyProperty(path.handle(), "Name", &string));
-    EXPECT_FALSE(ProviderUtilities::getKeyProperty(path.handle(), "Name", &reference));
-    EXPECT_FALSE(ProviderUtilities::getKeyProperty(path.handle(), "Name", text));
-    EXPECT_EQ(std::tie(number16, number32, flag, text), std::make_tuple(7, 7U, false, "as it was"));
-    EXPECT_EQ(string, nullptr);
-    EXPECT_EQ(reference, nullptr);
-
-    static CMPIString* name = nullptr;
-    name = data.value.string;
-    CMPIObjectPathFT table = *path_->ft;
-    table.getClassName = [](auto* /*path*/, CMPIStatus* status) {
-        *status = {CMPI_RC_ERR_FAILED, nullptr};
-        return name;
-    };
-    table.getNameSpace = table.getClassName;
-    CMPIObjectPath unnamed = *path_;
-    unnamed.ft = &table;
-    EXPECT_EQ(ProviderUtilities::getClassName(&unnamed), "");
-    EXPECT_EQ(ProviderUtilities::getNamespace(&unnamed), "");
-
-    StringWithAnError erring(data.value.string);
-    EXPECT_EQ(failureOf([&] { ProviderUtilities::convertToString(erring.handle()); }),
-              "String Conversion Failed !!");
-    EXPECT_EQ(ProviderUtilities::createInstance(ErringBroker(broker_.handle()).handle(), path_), nullptr);
+    store("Text", "t\xC3\xA4", CMPI_chars);
+    const std::string traces = passing(utility, "AStringToWString");
+    {
+        const ThreadLocale utf8("C.UTF-8");
+        for (const Reading& getter : wideGetters("t\xC3\xA4", traces)) {
+            expectAll(getter);
+        }
+    }
+    for (const Reading& getter : wideGetters(untouched, traces)) {
+        const bool isKey = getter.calls.rfind("getKey", 0) == 0;
+        expect(getter, untouched,
+               getter.calls + traces +
+                   message(providerUtilities, isKey ? "getKeyProperty" : "getProperty",
+                           "Failed to convert the data to Multi byte"),
+               "Text");
+    }
 }
 
 TEST_F(Accessors, ReadTheMemberAskedForWhateverTheType) {
-    CMPIValue value = {};
-    value.uint16 = 60000;
-    setProperty(value, CMPI_uint16);
     unsigned int wide = 0;
-    EXPECT_TRUE(ProviderUtilities::getProperty(instance_, "Name", wide));
+    EXPECT_TRUE(PU::getProperty(instance_, "Short", wide));
     EXPECT_EQ(wide & 0xFFFFU, 60000U);
 }
 
-TEST_F(Accessors, TellTheTextsOfAnObjectPathOrNothing) {
-    EXPECT_EQ(ProviderUtilities::getClassName(path_), "Demo_Class");
-    EXPECT_EQ(ProviderUtilities::getNamespace(path_), "root/cimv2");
-    for (const char* const slot :
-         {"CMPIObjectPathFT.getClassName", "CMPIObjectPathFT.getNameSpace", "CMPIStringFT.getCharPtr"}) {
-        for (const oxahv::Fault& fault :
-             {oxahv::Fault{CMPI_RC_ERR_FAILED, false, 0, 1, 0}, oxahv::Fault{CMPI_RC_OK, true, 0, 1, 0}}) {
-            broker_.injectFault(slot, fault);
-            const bool isClassName = std::string(slot) != "CMPIObjectPathFT.getNameSpace";
-            EXPECT_EQ(isClassName ? ProviderUtilities::getClassName(path_)
-                                  : ProviderUtilities::getNamespace(path_),
-                      "");
-            broker_.clearFaults();
+TEST_F(Accessors, DoNotTakeAValueThatComesWithAnError) {
+    Otherwise<&CMPIInstanceFT::getProperty> instance(instance_);
+    Otherwise<&CMPIArgsFT::getArg> args(args_);
+    Otherwise<&CMPIObjectPathFT::getKey> path(path_);
+    fromInstance_ = instance.handle();
+    fromArgs_ = args.handle();
+    fromPath_ = path.handle();
+    for (const std::vector<Reading>& getters : {plainGetters(), textGetters()}) {
+        for (const Reading& getter : getters) {
+            expectNothing(getter);
         }
     }
+    expectNothing(dateGetter());
+
+    Otherwise<&CMPIObjectPathFT::getClassName> unnamed(path_);
+    EXPECT_EQ(PU::getClassName(unnamed.handle()), "");
+    Otherwise<&CMPIObjectPathFT::getNameSpace> homeless(path_);
+    EXPECT_EQ(PU::getNamespace(homeless.handle()), "");
+    Otherwise<&CMPIStringFT::getCharPtr> string(newString("text"));
+    EXPECT_EQ(logOf([&] { PU::convertToString(string.handle()); }),
+              "getCharPtr\nthrows String Conversion Failed !!\n");
+    Otherwise<&CMPIBrokerEncFT::newInstance> broker(broker_.handle());
+    EXPECT_EQ(PU::createInstance(broker.handle(), path_), nullptr);
 }
 
-TEST_F(Accessors, ConvertAStringOrThrow) {
-    CMPIString* const string = CMNewString(broker_.handle(), "text", nullptr);
-    EXPECT_EQ(ProviderUtilities::convertToString(string), "text");
-    EXPECT_EQ(failureOf([&] { ProviderUtilities::convertToString(nullptr); }), "String Conversion Failed !!");
-    for (const oxahv::Fault& fault : {oxahv::Fault{CMPI_RC_ERR_FAILED}, oxahv::Fault{CMPI_RC_OK, true}}) {
-        broker_.injectFault("CMPIStringFT.getCharPtr", fault);
-        EXPECT_EQ(failureOf([&] { ProviderUtilities::convertToString(string); }),
-                  "String Conversion Failed !!");
+// Of a text's characters the status counts, but not with an argument; of a date's text it never does.
+TEST_F(Accessors, TakeATextThatComesWithAnErrorInTwoPlaces) {
+    Otherwise<&CMPIStringFT::getCharPtr> string(newString("text"));
+    const auto alter = [&](CMPIData& data, CMPIStatus& /*status*/) { data.value.string = string.handle(); };
+    Otherwise<&CMPIInstanceFT::getProperty> instance(instance_, alter);
+    Otherwise<&CMPIArgsFT::getArg> args(args_, alter);
+    Otherwise<&CMPIObjectPathFT::getKey> path(path_, alter);
+    fromInstance_ = instance.handle();
+    fromArgs_ = args.handle();
+    fromPath_ = path.handle();
+    std::vector<Reading> getters = textGetters();
+    expectAll(getters.back());
+    getters.pop_back();
+    for (const Reading& getter : getters) {
+        expect(getter, untouched, getter.calls, "Text");
     }
+
+    CMPIDateTime* const real = CMGetProperty(instance_, "Date", nullptr).value.dateTime;
+    Otherwise<&CMPIDateTimeFT::getStringFormat> date(real);
+    Otherwise<&CMPIInstanceFT::getProperty> dated(
+        instance_, [&](CMPIData& data, CMPIStatus& /*status*/) { data.value.dateTime = date.handle(); });
+    fromInstance_ = dated.handle();
+    expectAll(dateGetter());
 }
 
-TEST_F(Accessors, CreateAnInstanceOrNone) {
-    EXPECT_NE(instance_, nullptr);
-    broker_.injectFault("CMPIBrokerEncFT.newInstance", {CMPI_RC_ERR_INVALID_CLASS});
-    EXPECT_EQ(ProviderUtilities::createInstance(broker_.handle(), path_), nullptr);
-    EXPECT_TRUE(tracedTexts().empty()) << "none of these operations traces";
+TEST_F(Accessors, TellTheTextsOfHandlesAndMakeInstances) {
+    CMPIString* const string = newString("text");
+    const Reading readings[] = {
+        {"getClassName\ngetCharPtr\n", "", "Demo_Class",
+         [&](const char* /*name*/) { return PU::getClassName(path_); }, "", ""},
+        {"getNameSpace\ngetCharPtr\n", "", "root/cimv2",
+         [&](const char* /*name*/) { return PU::getNamespace(path_); }, "", ""},
+        {"getCharPtr\n", "", "text", [&](const char* /*name*/) { return PU::convertToString(string); }, "",
+         "", "throws String Conversion Failed !!\n"},
+        {"newInstance\n", "", "made",
+         [&](const char* /*name*/) {
+             return PU::createInstance(broker_.handle(), path_) != nullptr ? "made" : "none";
+         },
+         "", "none"},
+    };
+    for (const Reading& reading : readings) {
+        checkCalls(reading, true);
+    }
+    EXPECT_EQ(logOf([] { PU::convertToString(nullptr); }), "throws String Conversion Failed !!\n");
+}
+
+TEST_F(Accessors, HandEveryTypeOverWithItsCode) {
+    const auto checkProperty = [&](auto value, const std::string& type, const std::string& text) {
+        expectSet([&] { PU::setProperty(instance_, "Name", value); }, "setProperty", type, text);
+    };
+    const auto check = [&](auto value, const std::string& type, const std::string& text) {
+        expectSet([&] { PU::setKeyProperty(path_, "Name", value); }, "addKey", type, text);
+        checkProperty(value, type, text);
+    };
+    check(static_cast<unsigned char>(200), "uint8", "200");
+    check(static_cast<unsigned short>(60000), "uint16", "60000");
+    check(4000000000U, "uint32", "4000000000");
+    check(~0ULL, "uint64", "18446744073709551615");
+    check("chars", "chars", "\"chars\"");
+    check(std::string("text"), "chars", "\"text\"");
+    check(newString("string"), "string", "\"string\"");
+    check(request_.objectPath("root", "Other"), "reference", "\"root:Other\"");
+    checkProperty(true, "boolean", "TRUE");
+    checkProperty(false, "boolean", "FALSE");
+    checkProperty(static_cast<short>(-2), "sint16", "-2");
+    checkProperty(1.5F, "real32", "1.5");
+    checkProperty(-0.25, "real64", "-0.25");
+    // The broker's status is dropped.
+    EXPECT_EQ(logOf([&] { PU::setKeyProperty(path_, "Name", 1U); }, "*", anError),
+              "addKey Name uint32 = 1\n");
+    EXPECT_EQ(logOf([&] { PU::setProperty(instance_, "Name", 1U); }, "*", anError),
+              "setProperty Name uint32 = 1\n");
+}
+
+TEST_F(Accessors, SetTextsAsTheyAreOrAsDates) {
+    const auto set = [&](std::string value, bool isDate, const oxahv::Fault& fault = {CMPI_RC_OK}) {
+        return logOf([&] { PU::setProperty(broker_.handle(), instance_, "Name", value, isDate); }, "*",
+                     fault);
+    };
+    EXPECT_EQ(set(dateText, false), "setProperty Name chars\n");
+    const auto traces = [](const std::string& text) {
+        return variable(providerUtilities, "setProperty", "isDate", "1") +
+               variable(providerUtilities, "setProperty", "Date", text);
+    };
+    const std::string made = traces(dateText) + "newDateTimeFromChars " + dateText + '\n';
+    EXPECT_EQ(set(dateText, true), made + "setProperty Name datetime = \"" + dateText + "\"\n");
+    EXPECT_EQ(set("yesterday", true), traces("yesterday") + "newDateTimeFromChars yesterday\n");
+    EXPECT_EQ(set(dateText, true, anError), made);
+    EXPECT_EQ(set(dateText, true, nothing), made);
+    Otherwise<&CMPIBrokerEncFT::newDateTimeFromChars> erring(broker_.handle());
+    std::string text = dateText;
+    EXPECT_EQ(logOf([&] { PU::setProperty(erring.handle(), instance_, "Name", text, true); }), made);
+}
+
+TEST_F(Accessors, SetWideTextsThatTheLocaleHas) {
+    const std::string converted = passing(utility, "WStringToAString");
+    const auto check = [&](std::wstring value, const std::string& traces, const std::string& text) {
+        expectSet([&] { PU::setKeyProperty(path_, "Name", value); }, "addKey", "chars", text, traces);
+        expectSet([&] { PU::setProperty(instance_, "Name", value); }, "setProperty", "chars", text, traces);
+    };
+    check(L"wide", converted, "\"wide\"");
+    check(std::wstring(L"cut\0off", 7), converted, "\"cut\"");
+    check(L"", "", "\"\"");
+    const std::string failed = "Failed to convert the data to Multi byte";
+    std::wstring umlaut = L"\u00E4";
+    EXPECT_EQ(logOf([&] { PU::setKeyProperty(path_, "Name", umlaut); }),
+              converted + message(providerUtilities, "setKeyProperty", failed));
+    EXPECT_EQ(logOf([&] { PU::setProperty(instance_, "Name", umlaut); }),
+              converted + message(providerUtilities, "setProperty", failed));
+    const ThreadLocale utf8("C.UTF-8");
+    check(umlaut, converted, "\"\xC3\xA4\"");
 }

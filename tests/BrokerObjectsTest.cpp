@@ -1,7 +1,6 @@
 // The broker's objects: what their function tables do.
 #include "EmbeddedBroker.h"
 
-#include <cstring>
 #include <ctime>
 #include <gtest/gtest.h>
 #include <thread>
@@ -19,18 +18,8 @@ protected:
 
     static std::string textOf(const CMPIString* string) { return CMGetCharsPtr(string, nullptr); }
 
-    // Whether every slot of a function table is there; tables begin with numbers.
-    template <class Table>
-    static bool isFull(const Table* table) {
-        constexpr std::size_t words = sizeof(Table) / sizeof(void*);
-        const void* slots[words];
-        std::memcpy(slots, table, sizeof slots);
-        for (std::size_t i = 1; i < words; ++i) {
-            if (slots[i] == nullptr) {
-                return false;
-            }
-        }
-        return true;
+    CMPIInstance* instanceOf(const char* className) {
+        return CMNewInstance(handle_, request_.objectPath("root", className), nullptr);
     }
 
     EmbeddedBroker broker_;
@@ -40,44 +29,16 @@ protected:
 
 } // namespace
 
-TEST_F(ABroker, HasNoNullSlot) {
-    EXPECT_TRUE(isFull(handle_->bft) && isFull(handle_->eft) && isFull(handle_->xft) && isFull(handle_->mft));
-    const CMPIObjectPath* const path = request_.objectPath("root", "Demo");
-    EXPECT_TRUE(isFull(path->ft));
-    EXPECT_TRUE(isFull(CMNewInstance(handle_, path, nullptr)->ft));
-    EXPECT_TRUE(isFull(CMNewArgs(handle_, nullptr)->ft));
-    EXPECT_TRUE(isFull(string("")->ft));
-    EXPECT_TRUE(isFull(CMNewArray(handle_, 1, CMPI_uint8, nullptr)->ft));
-    EXPECT_TRUE(isFull(CMNewDateTime(handle_, nullptr)->ft));
-    EXPECT_TRUE(isFull(request_.context()->ft));
-    EXPECT_TRUE(isFull(handle_->eft->newPropertyList(handle_, nullptr, nullptr)->ft));
-    EXPECT_TRUE(isFull(
-        handle_->eft
-            ->newCMPIError(handle_, "o", "i", "m", ErrorSevLow, ErrorProbCauseOther, CMPI_RC_OK, nullptr)
-            ->ft));
-}
-
-TEST_F(ABroker, AnswersInvalidHandleToNullAndForeignHandles) {
-    CMPIObjectPath* const path = request_.objectPath("root", "Demo");
-    CMPIInstance* const instance = CMNewInstance(handle_, path, nullptr);
+TEST_F(ABroker, RefusesForeignHandlesAndMissingTexts) {
     CMPIStatus status = {CMPI_RC_OK, nullptr};
-    EXPECT_EQ(instance->ft->getProperty(nullptr, "p", &status).state, CMPI_nullValue);
+    CMPIObjectPath* const path = request_.objectPath("root", "Demo");
+    EXPECT_EQ(CMNewInstance(handle_, reinterpret_cast<CMPIObjectPath*>(string("")), &status), nullptr);
     EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_HANDLE);
-    EXPECT_EQ(path->ft->addKey(nullptr, "k", nullptr, CMPI_string).rc, CMPI_RC_ERR_INVALID_HANDLE);
-    EXPECT_EQ(path->ft->getKeyCount(nullptr, nullptr), 0U);
-    EXPECT_EQ(instance->ft->release(nullptr).rc, CMPI_RC_ERR_INVALID_HANDLE);
-    EXPECT_EQ(handle_->eft->newString(nullptr, "text", &status), nullptr);
-    EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_HANDLE);
-    EXPECT_EQ(CMNewInstance(handle_, reinterpret_cast<CMPIObjectPath*>(instance), &status), nullptr);
-    EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_HANDLE);
-    EXPECT_EQ(handle_->bft->getInstance(handle_, request_.context(), nullptr, nullptr, &status), nullptr);
-    EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_HANDLE);
-
     EXPECT_EQ(CMNewString(handle_, nullptr, &status), nullptr);
     EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_PARAMETER);
-    EXPECT_EQ(CMAddKey(path, nullptr, "v", CMPI_chars).rc, CMPI_RC_ERR_INVALID_PARAMETER);
     EXPECT_EQ(CMNewObjectPath(handle_, "root", nullptr, &status), nullptr);
     EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_PARAMETER);
+    EXPECT_EQ(CMAddKey(path, nullptr, "v", CMPI_chars).rc, CMPI_RC_ERR_INVALID_PARAMETER);
 }
 
 TEST_F(ABroker, KeepsValuesByNameIgnoringCaseInTheirOrder) {
@@ -102,27 +63,32 @@ TEST_F(ABroker, KeepsValuesByNameIgnoringCaseInTheirOrder) {
     EXPECT_EQ(status.rc, CMPI_RC_ERR_NOT_FOUND);
     EXPECT_EQ(CMGetKey(path, "missing", &status).state, CMPI_nullValue | CMPI_notFound);
     EXPECT_EQ(status.rc, CMPI_RC_ERR_NOT_FOUND);
+
+    CMSetHostname(path, "host");
+    CMPIObjectPath* const other = request_.objectPath("", "Other");
+    other->ft->setHostAndNameSpaceFromObjectPath(other, CMClone(path, nullptr));
+    EXPECT_EQ(textOf(CMGetHostname(other, nullptr)), "host");
+    EXPECT_EQ(oxahv::pathText(other), "root:Other");
 }
 
 TEST_F(ABroker, KeepsNullAsNull) {
-    CMPIInstance* const instance = CMNewInstance(handle_, request_.objectPath("root", "Demo"), nullptr);
-    CMPIValue none = {};
-    CMSetProperty(instance, "pointer", nullptr, CMPI_uint32);
-    CMSetProperty(instance, "text", nullptr, CMPI_chars);
-    CMSetProperty(instance, "string", &none, CMPI_string);
-    for (const char* const name : {"pointer", "text", "string"}) {
-        CMPIStatus status = {CMPI_RC_ERR_FAILED, nullptr};
-        EXPECT_TRUE(CMIsNullValue(CMGetProperty(instance, name, &status))) << name;
-        EXPECT_EQ(status.rc, CMPI_RC_OK) << name;
-    }
-    EXPECT_EQ(CMGetProperty(instance, "text", nullptr).type, CMPI_string);
-
     CMPIObjectPath* const path = request_.objectPath("root", "Demo");
     EXPECT_EQ(CMAddKey(path, "K", nullptr, CMPI_uint16).rc, CMPI_RC_OK);
     const CMPIData key = CMGetKeyAt(path, 0, nullptr, nullptr);
     EXPECT_EQ(key.type, CMPI_uint16);
     EXPECT_EQ(key.state, CMPI_keyValue | CMPI_nullValue);
-    EXPECT_TRUE(CMIsNullValue(CMGetProperty(CMNewInstance(handle_, path, nullptr), "K", nullptr)));
+
+    CMPIInstance* const instance = CMNewInstance(handle_, path, nullptr);
+    CMPIValue none = {};
+    CMSetProperty(instance, "pointer", nullptr, CMPI_uint32);
+    CMSetProperty(instance, "text", nullptr, CMPI_chars);
+    CMSetProperty(instance, "string", &none, CMPI_string);
+    for (const char* const name : {"K", "pointer", "text", "string"}) {
+        CMPIStatus status = {CMPI_RC_ERR_FAILED, nullptr};
+        EXPECT_TRUE(CMIsNullValue(CMGetProperty(instance, name, &status))) << name;
+        EXPECT_EQ(status.rc, CMPI_RC_OK) << name;
+    }
+    EXPECT_EQ(CMGetProperty(instance, "text", nullptr).type, CMPI_string);
 }
 
 TEST_F(ABroker, ChecksInstancesAgainstTheirClass) {
@@ -158,10 +124,11 @@ TEST_F(ABroker, ChecksInstancesAgainstTheirClass) {
 TEST_F(ABroker, LetsOnlyKeysAndWantedPropertiesThroughAFilter) {
     CMPIObjectPath* const path = request_.objectPath("root", "Demo");
     CMAddKey(path, "Id", "x", CMPI_chars);
-    CMPIInstance* const instance = CMNewInstance(handle_, path, nullptr);
+    CMPIInstance* instance = CMNewInstance(handle_, path, nullptr);
     CMSetProperty(instance, "Before", "x", CMPI_chars);
     const char* wanted[] = {"wanted", nullptr};
     CMSetPropertyFilter(instance, wanted, nullptr);
+    instance = CMClone(instance, nullptr);
     EXPECT_EQ(CMSetProperty(instance, "Wanted", "x", CMPI_chars).rc, CMPI_RC_OK);
     EXPECT_EQ(CMSetProperty(instance, "Other", "x", CMPI_chars).rc, CMPI_RC_OK);
     CMSetProperty(instance, "Id", "y", CMPI_chars);
@@ -177,39 +144,18 @@ TEST_F(ABroker, LetsOnlyKeysAndWantedPropertiesThroughAFilter) {
     EXPECT_EQ(oxahv::pathText(CMGetObjectPath(instance, nullptr)), "root:Demo.Id=\"z\"");
 }
 
-TEST_F(ABroker, HoldsArraysOfEveryTypeWithNullElements) {
-    const CMPIType types[] = {CMPI_boolean, CMPI_char16, CMPI_real32, CMPI_real64, CMPI_uint8,
-                              CMPI_uint16,  CMPI_uint32, CMPI_uint64, CMPI_sint8,  CMPI_sint16,
-                              CMPI_sint32,  CMPI_sint64, CMPI_string, CMPI_ref,    CMPI_dateTime};
-    for (const CMPIType type : types) {
-        CMPIValue value = {};
-        value.uint64 = 1;
-        if (type == CMPI_string) {
-            value.string = string("text");
-        } else if (type == CMPI_ref) {
-            value.ref = request_.objectPath("root", "Demo");
-        } else if (type == CMPI_dateTime) {
-            value.dateTime = CMNewDateTime(handle_, nullptr);
-        } else if (type == CMPI_real32) {
-            value.real32 = 1;
-        }
-        CMPIArray* const array = CMNewArray(handle_, 2, type, nullptr);
-        EXPECT_EQ(CMGetArrayCount(array, nullptr), 2U);
-        EXPECT_EQ(CMGetArrayType(array, nullptr), type);
-        EXPECT_EQ(CMSetArrayElementAt(array, 1, &value, type).rc, CMPI_RC_OK) << type;
-        EXPECT_TRUE(CMIsNullValue(CMGetArrayElementAt(array, 0, nullptr))) << type;
-        const std::string expected = oxahv::valueText({type, 0, value});
-        EXPECT_EQ(oxahv::valueText(CMGetArrayElementAt(array, 1, nullptr)), expected) << type;
-        EXPECT_EQ(CMSetArrayElementAt(array, 2, &value, type).rc, CMPI_RC_ERR_NOT_FOUND) << type;
-        const CMPIType other = type == CMPI_uint8 ? CMPI_uint16 : CMPI_uint8;
-        EXPECT_EQ(CMSetArrayElementAt(array, 0, &value, other).rc, CMPI_RC_ERR_TYPE_MISMATCH) << type;
-        CMPIInstance* const instance = CMNewInstance(handle_, request_.objectPath("root", "Demo"), nullptr);
-        CMPIValue whole = {};
-        whole.array = array;
-        CMSetProperty(instance, "Array", &whole, static_cast<CMPIType>(type | CMPI_ARRAY));
-        EXPECT_EQ(oxahv::valueText(CMGetProperty(instance, "Array", nullptr)), "{NULL, " + expected + "}")
-            << type;
-    }
+TEST_F(ABroker, HoldsArraysWithNullElements) {
+    CMPIValue value = {};
+    value.real32 = 1.5F;
+    CMPIValue whole = {};
+    whole.array = CMNewArray(handle_, 2, CMPI_real32, nullptr);
+    EXPECT_EQ(CMGetArrayCount(whole.array, nullptr), 2U);
+    EXPECT_EQ(CMSetArrayElementAt(whole.array, 1, &value, CMPI_real32).rc, CMPI_RC_OK);
+    EXPECT_EQ(CMSetArrayElementAt(whole.array, 2, &value, CMPI_real32).rc, CMPI_RC_ERR_NOT_FOUND);
+    EXPECT_EQ(CMSetArrayElementAt(whole.array, 0, &value, CMPI_real64).rc, CMPI_RC_ERR_TYPE_MISMATCH);
+    CMPIInstance* const instance = instanceOf("Demo");
+    CMSetProperty(instance, "Array", &whole, CMPI_real32A);
+    EXPECT_EQ(oxahv::valueText(CMGetProperty(instance, "Array", nullptr)), "{NULL, 1.5}");
     CMPIArray* const texts = CMNewArray(handle_, 1, CMPI_string, nullptr);
     EXPECT_EQ(CMSetArrayElementAt(texts, 0, "chars", CMPI_chars).rc, CMPI_RC_OK);
     EXPECT_EQ(oxahv::valueText(CMGetArrayElementAt(texts, 0, nullptr)), "\"chars\"");
@@ -217,8 +163,7 @@ TEST_F(ABroker, HoldsArraysOfEveryTypeWithNullElements) {
 
     broker_.declare(
         ClassDeclaration("Typed").property("Texts", CMPI_stringA).property("Numbers", CMPI_uint16A));
-    CMPIInstance* const typed = CMNewInstance(handle_, request_.objectPath("root", "Typed"), nullptr);
-    CMPIValue whole = {};
+    CMPIInstance* const typed = instanceOf("Typed");
     whole.array = CMNewArray(handle_, 1, CMPI_chars, nullptr);
     EXPECT_EQ(CMSetProperty(typed, "Texts", &whole, CMPI_charsA).rc, CMPI_RC_OK);
     EXPECT_EQ(CMSetProperty(typed, "Texts", nullptr, CMPI_charsA).rc, CMPI_RC_OK);
@@ -259,30 +204,19 @@ TEST_F(ABroker, ReadsAndWritesDatesAndIntervals) {
             CMNewDateTimeFromBinary(handle_, row.binary, row.isInterval ? 1 : 0, nullptr);
         EXPECT_EQ(textOf(CMGetStringFormat(back, nullptr)), row.back) << row.text;
     }
-    for (const char* const bad : {"",
-                                  "2024",
-                                  "20241301000000.000000+000",
-                                  "20240132000000.000000+000",
-                                  "20240101240000.000000+000",
-                                  "20230229000000.000000+000",
-                                  "19000229000000.000000+000",
-                                  "20240431000000.000000+000",
-                                  "20240001000000.000000+000",
-                                  "20240100000000.000000+000",
-                                  "*0240101000000.000000+000",
-                                  "20240101000060.000000+000",
-                                  "20240101000000:000000+000",
-                                  "20240101000000.000000 000",
-                                  "20240101000000.000000+0x0",
-                                  "2024**01000000.000000+000",
-                                  "20240101000000.1*2***+000",
-                                  "00000001020304.000005:001",
-                                  "00000001240000.000000:000",
-                                  "20240101000000.000000+0000"}) {
+    for (const char* const text :
+         {"20241301000000.000000+000", "20240132000000.000000+000", "20240101240000.000000+000",
+          "20230229000000.000000+000", "19000229000000.000000+000", "20240431000000.000000+000",
+          "20240001000000.000000+000", "20240100000000.000000+000", "*0240101000000.000000+000",
+          "20240101000060.000000+000", "20240101000000:000000+000", "20240101000000.000000 000",
+          "20240101000000.000000+0x0", "2024**01000000.000000+000", "20240101000000.1*2***+000",
+          "00000001020304.000005:001", "00000001240000.000000:000", "20240101000000.00000+0000"}) {
         CMPIStatus status = {CMPI_RC_OK, nullptr};
-        EXPECT_EQ(CMNewDateTimeFromChars(handle_, bad, &status), nullptr) << bad;
-        EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_PARAMETER) << bad;
+        EXPECT_EQ(CMNewDateTimeFromChars(handle_, text, &status), nullptr) << text;
+        EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_PARAMETER) << text;
     }
+    EXPECT_EQ(CMNewDateTimeFromChars(handle_, "", nullptr), nullptr);
+    EXPECT_EQ(CMNewDateTimeFromChars(handle_, "20240101000000.000000+0000", nullptr), nullptr);
     EXPECT_EQ(CMNewDateTimeFromBinary(handle_, ~0ULL, 0, nullptr), nullptr);
     // Every day of four centuries comes back.
     for (CMPIUint64 day = 0; day < 146097; ++day) {
@@ -339,9 +273,9 @@ TEST_F(ABroker, TellsAboutObjectsAndMakesMessages) {
     EXPECT_NE(handle_->eft->isOfType(handle_, string("x"), "CMPIString", nullptr), 0);
     EXPECT_EQ(textOf(handle_->eft->toString(handle_, path, nullptr)), "root:Demo");
     CMPIString* const message =
-        handle_->eft->getMessage(handle_, "id", "{0} of {1}: {2} {0} {3} {", nullptr, 3, CMPI_chars, "{1}",
+        handle_->eft->getMessage(handle_, "id", "{0} of {1}: {2} {0} {3} {0 {", nullptr, 3, CMPI_chars, "{1}",
                                  CMPI_uint32, 7U, CMPI_string, string("down"));
-    EXPECT_EQ(textOf(message), "{1} of 7: down {1} {3} {");
+    EXPECT_EQ(textOf(message), "{1} of 7: down {1} {3} {0 {");
     const CMPIError* const error = handle_->eft->newCMPIError(
         handle_, "owner", "id", "message", ErrorSevHigh, ErrorProbCauseOther, CMPI_RC_ERR_FAILED, nullptr);
     error->ft->setErrorSource(error, "source");

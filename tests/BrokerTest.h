@@ -1,4 +1,5 @@
-// What the tests of the library need of a broker: one of their own, with a request.
+// What the tests of the library need of a broker: one of their own, with a request, and a log of an
+// operation.
 #pragma once
 
 #include "LoggerCalls.h"
@@ -6,142 +7,134 @@
 #include "EmbeddedBroker.h"
 #include "ProviderUtilities.h"
 
+#include <functional>
 #include <gtest/gtest.h>
 #include <string>
 #include <tuple>
+#include <type_traits>
+#include <utility>
 #include <vector>
 
-// A broker's object that answers every name with one value and one status, as no correct broker would.
-template <class Object, class Table>
-class Answering {
+// A broker or an object of it whose function in a slot answers otherwise: it does its work, and `alter`
+// changes what comes of it, by default into an answer that comes with an error, as no correct broker's does.
+template <auto slot>
+class Otherwise;
+template <class Table, class Result, class Handle, class... Rest, Result (*Table::*slot)(Handle*, Rest...)>
+class Otherwise<slot> {
 public:
-    template <class Handle>
-    Answering(const Object* real, CMPIData (*Table::*getter)(Handle*, const char*, CMPIStatus*),
-              const CMPIData& data, CMPIrc code)
-        : table_(*real->ft), object_(*real) {
-        object_.ft = &table_;
-        table_.*getter = &answer<Handle>;
-        data_ = data;
-        code_ = code;
+    using Object = std::remove_const_t<Handle>;
+
+    explicit Otherwise(
+        const Object* real, std::function<void(Result&, CMPIStatus&)> alter =
+                                [](Result& /*result*/, CMPIStatus& status) {
+                                    status = {CMPI_RC_ERR_FAILED, nullptr};
+                                })
+        : object_(*real), table_(*tableOf(object_)) {
+        real_ = real;
+        alter_ = std::move(alter);
+        table_.*slot = [](Handle* /*object*/, Rest... rest) {
+            Object* const object = const_cast<Object*>(real_);
+            Result result = (tableOf(*object)->*slot)(object, rest...);
+            alter_(result, *std::get<CMPIStatus*>(std::make_tuple(rest...)));
+            return result;
+        };
+        tableOf(object_) = &table_;
     }
-    Answering(const Answering&) = delete;
-    Answering& operator=(const Answering&) = delete;
+    Otherwise(const Otherwise&) = delete;
+    Otherwise& operator=(const Otherwise&) = delete;
 
     Object* handle() { return &object_; }
 
 private:
-    template <class Handle>
-    static CMPIData answer(Handle* /*object*/, const char* /*name*/, CMPIStatus* status) {
-        *status = {code_, nullptr};
-        return data_;
+    static auto& tableOf(Object& object) {
+        if constexpr (std::is_same_v<Object, CMPIBroker>) {
+            return object.eft;
+        } else {
+            return object.ft;
+        }
     }
 
-    Table table_;
     Object object_;
-    static inline CMPIData data_;
-    static inline CMPIrc code_;
-};
-
-// A string whose characters come with a status that is no success.
-class StringWithAnError {
-public:
-    explicit StringWithAnError(const CMPIString* real) : table_(*real->ft), string_(*real) {
-        string_.ft = &table_;
-        setGetter(&CMPIStringFT::getCharPtr);
-    }
-    CMPIString* handle() { return &string_; }
-
-private:
-    // The headers of CIM servers differ in what is const.
-    template <class Chars, class Handle>
-    void setGetter(Chars* (*CMPIStringFT::*getter)(Handle*, CMPIStatus*)) {
-        table_.*getter = [](Handle* /*string*/, CMPIStatus* status) -> Chars* {
-            static char characters[] = "characters";
-            *status = {CMPI_RC_ERR_FAILED, nullptr};
-            return characters;
-        };
-    }
-
-    CMPIStringFT table_;
-    CMPIString string_;
-};
-
-// A broker that makes every object and reports an error nevertheless.
-class ErringBroker {
-public:
-    explicit ErringBroker(const CMPIBroker* real) : table_(*real->eft), broker_(*real) {
-        broker_.eft = &table_;
-        real_ = real;
-        replace<&CMPIBrokerEncFT::newInstance>();
-        replace<&CMPIBrokerEncFT::newObjectPath>();
-        replace<&CMPIBrokerEncFT::newString>();
-        replace<&CMPIBrokerEncFT::newArray>();
-        replace<&CMPIBrokerEncFT::newDateTimeFromChars>();
-        replace<&CMPIBrokerEncFT::classPathIsA>();
-    }
-    // Makes one kind alone err.
-    template <class Slot>
-    ErringBroker(const CMPIBroker* real, Slot CMPIBrokerEncFT::*slot) : ErringBroker(real) {
-        const Slot only = table_.*slot;
-        table_ = *real->eft;
-        table_.*slot = only;
-    }
-    ErringBroker(const ErringBroker&) = delete;
-    ErringBroker& operator=(const ErringBroker&) = delete;
-
-    const CMPIBroker* handle() const { return &broker_; }
-
-private:
-    template <auto slot>
-    void replace() {
-        table_.*slot = erring<slot>(table_.*slot);
-    }
-    template <auto slot, class Result, class Handle, class... Rest>
-    static auto erring(Result (* /*real*/)(Handle*, Rest...)) {
-        return [](Handle* /*broker*/, Rest... rest) {
-            const Result result = (real_->eft->*slot)(real_, rest...);
-            *std::get<CMPIStatus*>(std::make_tuple(rest...)) = {CMPI_RC_ERR_FAILED, nullptr};
-            return result;
-        };
-    }
-
-    CMPIBrokerEncFT table_;
-    CMPIBroker broker_;
-    static inline const CMPIBroker* real_;
+    Table table_;
+    static inline const Object* real_;
+    static inline std::function<void(Result&, CMPIStatus&)> alter_;
 };
 
 class BrokerTest : public testing::Test {
 protected:
-    BrokerTest() { forgetLoggerCalls(); }
+    BrokerTest() { takeTraces(); }
 
-    // The calls of the broker's slots that an operation makes.
+    // What an operation does, in order, a line each: the calls of the broker with what they are given, the
+    // trace points, and the message of its exception. The broker finds a fresh status at every call.
     template <class Operation>
-    std::vector<oxahv::Call> recorded(const Operation& operation) {
+    std::string logOf(const Operation& operation) {
+        std::string log;
+        std::vector<std::size_t> places; // of the logger's calls in it
+        const auto takeCalls = [&] {
+            for (const oxahv::Call& call : broker_.stopRecording()) {
+                EXPECT_TRUE(call.hasStatus && call.entryStatus.rc == CMPI_RC_OK && !call.entryStatus.msg);
+                log += lineOf(call);
+            }
+            broker_.startRecording();
+            places.push_back(log.size());
+        };
+        takeTraces();
         broker_.startRecording();
-        operation();
-        return broker_.stopRecording();
-    }
-
-    // The message of the exception that an operation throws.
-    template <class Operation>
-    static std::string failureOf(const Operation& operation) {
+        atLoggerCalls(takeCalls);
+        std::string failure;
         try {
             operation();
         } catch (const TK::FrameworkException& exception) {
-            return exception.what();
+            failure = std::string("throws ") + exception.what() + '\n';
         }
-        return "no exception";
+        takeCalls();
+        broker_.stopRecording();
+        broker_.clearFaults();
+        atLoggerCalls({});
+        const std::string traces = takeTraces();
+        for (std::size_t i = 0, inserted = 0, end = 0; i + 1 < places.size(); i += 2, inserted = end) {
+            EXPECT_EQ(places[i], places[i + 1]) << "a call of the broker within a trace point";
+            end = traces.find('\n', inserted) + 1;
+            log.insert(places[i] + inserted, traces, inserted, end - inserted);
+        }
+        return log + failure;
     }
 
-    // The names of the slots that were called, without their tables.
-    static std::vector<std::string> members(const std::vector<oxahv::Call>& calls) {
-        std::vector<std::string> names;
-        for (const oxahv::Call& call : calls) {
-            names.push_back(call.slot.substr(call.slot.find('.') + 1));
-        }
-        return names;
+    // The same with a fault: at the n-th call of a slot, or of any ("*").
+    template <class Operation>
+    std::string logOf(const Operation& operation, const std::string& slot, const oxahv::Fault& fault) {
+        broker_.injectFault(slot, fault);
+        return logOf(operation);
     }
+
+    CMPIString* newString(const char* text) { return CMNewString(broker_.handle(), text, nullptr); }
 
     oxahv::EmbeddedBroker broker_;
     oxahv::Request request_{broker_};
+
+private:
+    // The caller's own characters may be gone by now.
+    static std::string lineOf(const oxahv::Call& call) {
+        const std::string member = call.slot.substr(call.slot.find('.') + 1);
+        const auto begins = [&member](const char* word) { return member.rfind(word, 0) == 0; };
+        std::string text = member;
+        for (const std::string& name : {call.name, call.secondName}) {
+            text += name.empty() ? "" : ' ' + name;
+        }
+        if (begins("newArray") || member.find("At") != std::string::npos) {
+            text += ' ' + std::to_string(call.index);
+        }
+        if (call.type != CMPI_null) {
+            text += call.type == CMPI_chars ? " chars" : ' ' + oxahv::typeName(call.type);
+            text += (call.type & CMPI_ARRAY) != 0 ? "[]" : "";
+        }
+        if ((begins("set") || begins("add")) && call.type != CMPI_null && call.type != CMPI_chars) {
+            text += " = " + oxahv::valueText({call.type, CMPI_goodValue, call.value});
+        }
+        return text + '\n';
+    }
 };
+
+// The faults of a call: an error, and nothing in spite of success.
+inline const oxahv::Fault anError = {CMPI_RC_ERR_FAILED};
+inline const oxahv::Fault nothing = {CMPI_RC_OK, true};

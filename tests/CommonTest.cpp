@@ -62,6 +62,14 @@ TEST(ADate, ReadsBackFromItsTextForEveryValueOfEveryField) {
     check(USHRT_MAX, UCHAR_MAX, UCHAR_MAX, UCHAR_MAX, UCHAR_MAX, UCHAR_MAX, UINT_MAX, SHRT_MIN);
     EXPECT_EQ(std::string(DateTime()), "1970-01-01 00:00:00");
     EXPECT_TRUE(DateTime("1970-01-01 00:00:00.000-000", 3) == DateTime());
+    std::string other = "1970-01-01 00:00:00.000+000";
+    for (char& digit : other) {
+        if (digit == '0') {
+            digit = '1';
+            EXPECT_TRUE(DateTime(other, 3) != DateTime()) << other;
+            digit = '0';
+        }
+    }
 }
 
 TEST(ADate, IsReadFromNoOtherText) {

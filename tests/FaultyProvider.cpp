@@ -5,6 +5,7 @@
 
 #include <chrono>
 #include <csignal>
+#include <cstddef>
 #include <iostream>
 #include <stdexcept>
 #include <string>
@@ -319,6 +320,7 @@ static CMPIStatus FaultyInvokeMethod(CMPIMethodMI*, const CMPIContext*, const CM
         require(CMReturnData(result, &value, isFaulty ? CMPI_uint16 : CMPI_uint32));
         if (isFaulty) {
             require(CMAddArg(out, "Nothing", &value, CMPI_uint32));
+            require(CMAddArg(out, "Result", &value, CMPI_uint32));
         }
     });
 }

@@ -5,14 +5,12 @@
 #include "ProviderUtilities.h"
 
 #include <algorithm>
-#include <array>
 #include <cerrno>
 #include <cstdio>
 #include <dlfcn.h>
-#include <filesystem>
 #include <iostream>
-#include <iterator>
 #include <sstream>
+#include <string>
 #include <thread>
 #include <vector>
 
@@ -25,33 +23,7 @@ const std::string server = "/opt/oxa/vex/bin/cimserver";
 
 bool deviceOpens = false;
 bool serverOpens = false;
-std::vector<std::string> opened; // paths and modes, of these two files
-
-// Standard output, with the number of times that it was flushed.
-class Output : public std::stringbuf {
-public:
-    Output() : earlier_(std::cout.rdbuf(this)) {}
-    ~Output() override { std::cout.rdbuf(earlier_); }
-    Output(const Output&) = delete;
-    Output& operator=(const Output&) = delete;
-
-    int flushes() const { return flushes_; }
-
-protected:
-    int sync() override {
-        ++flushes_;
-        return 0;
-    }
-
-private:
-    std::streambuf* earlier_;
-    int flushes_ = 0;
-};
-
-auto openFiles() {
-    return std::distance(std::filesystem::directory_iterator("/proc/self/fd"),
-                         std::filesystem::directory_iterator());
-}
+std::string opened; // paths and modes, of these two files
 
 } // namespace
 
@@ -62,7 +34,7 @@ extern "C" __attribute__((visibility("default"))) FILE* fopen64(const char* path
     if (path != device && path != server) {
         return real(path, mode);
     }
-    opened.push_back(path + std::string(" ") + mode);
+    opened += path + std::string(" ") + mode + ';';
     if (path == device ? deviceOpens : serverOpens) {
         return real("/dev/null", mode);
     }
@@ -71,27 +43,20 @@ extern "C" __attribute__((visibility("default"))) FILE* fopen64(const char* path
 }
 
 TEST(TheHost, OffersVirtualMachinesWithADeviceAndWithoutTheServer) {
-    const std::vector<std::string> deviceAlone = {device + " r"};
-    const std::vector<std::string> both = {device + " r", server + " r"};
-    const auto files = openFiles();
+    std::stringbuf output;
+    std::streambuf* const earlier = std::cout.rdbuf(&output);
     for (const bool deviceThere : {false, true}) {
         for (const bool serverThere : {false, true}) {
             deviceOpens = deviceThere;
             serverOpens = serverThere;
-            const Output output;
-            std::string expected;
-            for (int call = 0; call < 2; ++call) {
-                opened.clear();
-                EXPECT_EQ(ProviderUtilities::isKVM(), deviceThere && !serverThere);
-                expected += deviceThere ? "" : "File cannot be found.";
-                EXPECT_EQ(output.str(), expected);
-                EXPECT_EQ(opened, deviceThere ? both : deviceAlone);
-            }
-            EXPECT_EQ(output.flushes(), 0);
-            EXPECT_EQ(openFiles(), files);
+            opened.clear();
+            output.str("");
+            EXPECT_EQ(ProviderUtilities::isKVM(), deviceThere && !serverThere);
+            EXPECT_EQ(output.str(), deviceThere ? "" : "File cannot be found.");
+            EXPECT_EQ(opened, device + " r;" + (deviceThere ? server + " r;" : ""));
         }
     }
-    EXPECT_TRUE(loggerCalls().empty());
+    std::cout.rdbuf(earlier);
 }
 
 TEST(LocalisedTexts, AreInTheLanguageAndTheEncodingOfTheThread) {
@@ -123,10 +88,8 @@ TEST(LocalisedTexts, StayUntilTheirThreadHasAskedForEightMore) {
     std::vector<const char*> texts;
     for (std::size_t i = 0; i < 24; ++i) {
         texts.push_back(ProviderUtilities::getNLSText(keys[i]));
-        std::thread([&keys] {
-            for (std::size_t other = 24; other < 48; ++other) {
-                ProviderUtilities::getNLSText(keys[other]);
-            }
+        std::thread([&] {
+            std::for_each(keys.begin() + 24, keys.end(), ProviderUtilities::getNLSText);
         }).join();
         for (std::size_t valid = i < 7 ? 0 : i - 7; valid <= i; ++valid) {
             ASSERT_STREQ(texts[valid], expected[valid].c_str()) << "after " << i;

@@ -164,8 +164,6 @@ TEST_F(TheHostProvider, ShowsTheMachine) {
     broker_.compileMof(MOF_FOLDER "/OXAHost.mof");
     const std::string noTag = textOf(request_.getInstance(path(detailsPath)));
     ASSERT_EQ(setTag("tag"), "0");
-    const std::string system =
-        R"(Name="machine" EnabledState=2 CreationClassName="OXATK_ComputerSystem" NameFormat="HostName" )";
     const std::string device =
         R"(SystemCreationClassName="OXATK_ComputerSystem" SystemName="machine" CreationClassName=)";
     const auto sensor = [&](const std::string& minutes, const std::string& reading) {
@@ -173,7 +171,8 @@ TEST_F(TheHostProvider, ShowsTheMachine) {
                device + "\"OXATK_NumericSensor\" SensorNumber=" + minutes + " Reading=" + reading + ' ';
     };
     const std::pair<const char*, std::string> cases[] = {
-        {"oxatk_computersystem", R"(ElementName="Computer system machine" )" + system},
+        {"oxatk_computersystem", R"(ElementName="Computer system machine" Name="machine" EnabledState=2 )"
+                                 R"(CreationClassName="OXATK_ComputerSystem" NameFormat="HostName" )"},
         {"OXATK_OperatingSystem",
          R"(Caption="Prüf-OS \\ 1 €" ElementName="Operating system machine" Name="Prüf-OS \\ 1 €" )"
          R"(OperationalStatus={2} StatusDescriptions={"running"} EnabledState=2 )"
@@ -200,13 +199,14 @@ TEST_F(TheHostProvider, ShowsTheMachine) {
     for (const auto& [className, text] : cases) {
         EXPECT_EQ(textOf(request_.enumerateInstances(path(className))), text);
     }
+    write("/sys/class/net/eth1/operstate", "unknown");
+    const std::string port = textOf(request_.enumerateInstances(path("OXATK_EthernetPort")));
+    EXPECT_NE(port.find(R"(OperationalStatus={0} StatusDescriptions={"unknown"} EnabledState=0 )"),
+              std::string::npos)
+        << port;
     const std::vector<std::string> wanted = {"Dependent", "NameFormat"};
     EXPECT_EQ(textOf(request_.associators(path(osPath), {}, &wanted)),
               R"(Name="machine" CreationClassName="OXATK_ComputerSystem" NameFormat="HostName" )");
-    write("/sys/class/net/eth0/operstate", "unknown");
-    const std::string port = textOf(request_.getInstance(path(portPath)));
-    EXPECT_NE(port.find(R"(Status={0} StatusDescriptions={"unknown"} EnabledState=0 )"), std::string::npos)
-        << port;
     write("/etc/os-release", "PRETTY_NAME='It\"s an OS'");
     const std::string os = textOf(request_.enumerateInstances(path("OXATK_OperatingSystem")));
     EXPECT_EQ(os.rfind(R"(Caption="It\"s an OS" )", 0), 0U) << os;
@@ -302,6 +302,7 @@ TEST_F(TheHostProvider, WritesDatesAsTheSameInstant) {
 
 TEST_F(TheHostProvider, AnswersWhatItCannotDoWithItsCode) {
     EXPECT_EQ(codeOf("OXATK_EthernetPort.DeviceID=\"eth0\""), CMPI_RC_ERR_NOT_FOUND);
+    EXPECT_EQ(codeOf(portPath + ",Other=1"), CMPI_RC_ERR_NOT_FOUND);
     std::string other = systemPath;
     other.replace(other.rfind("machine"), 7, "others");
     EXPECT_EQ(codeOf(other), CMPI_RC_ERR_NOT_FOUND);
@@ -328,6 +329,7 @@ TEST_F(TheHostProvider, AnswersWhatItCannotDoWithItsCode) {
     EXPECT_EQ(request_.invokeMethod(port, "SetAssetTag", argument("x")).code, CMPI_RC_ERR_METHOD_NOT_FOUND);
     EXPECT_TRUE(setTag(request_, "x", "setassettag").ok());
     CMPIData number = {CMPI_uint64, CMPI_goodValue, {}};
+    number.value.uint64 = 5;
     EXPECT_EQ(request_.invokeMethod(path(systemPath), "SetAssetTag", argument(number)).message,
               "The asset tag is missing.");
 

@@ -2,8 +2,9 @@
 #include "ResourceString.h"
 #include "TestLocales.h"
 
-#include <future>
 #include <string>
+#include <thread>
+#include <vector>
 
 using TK::Locale;
 using TK::ResourceString;
@@ -36,10 +37,18 @@ TEST(ALocalisedText, IsInTheLanguageOfTheThreadsMessages) {
         {"de_DE.ISO-8859-1", LC_ALL_MASK, "de_DE", german},
         {"tr_TR.ISO-8859-9", LC_ALL_MASK, "tr_TR", english}, // there is no such catalogue
     };
+    std::vector<std::thread> threads;
     for (const auto& row : rows) {
-        const ThreadLocale locale(row.locale, row.mask);
-        EXPECT_EQ(Locale::getLanguageId(), row.language);
-        EXPECT_EQ(localised(english), row.text) << row.locale;
+        threads.emplace_back([&row] {
+            const ThreadLocale locale(row.locale, row.mask);
+            EXPECT_EQ(Locale::getLanguageId(), row.language);
+            for (int i = 0; i < 1000; ++i) {
+                EXPECT_EQ(localised(english), row.text) << row.locale;
+            }
+        });
+    }
+    for (std::thread& thread : threads) {
+        thread.join();
     }
 }
 
@@ -57,21 +66,4 @@ TEST(ALocalisedText, IsTheKeyWhenThereIsNone) {
     for (const wchar_t* const name : {L"", L"other"}) {
         EXPECT_EQ(ResourceString(name, english).getString(), english);
     }
-}
-
-TEST(ALocalisedText, CanDifferBetweenThreadsAtOneTime) {
-    const auto lookUpIn = [](const char* name, const std::wstring& text) {
-        return std::async(std::launch::async, [name, text] {
-            const ThreadLocale locale(name);
-            int failures = 0;
-            for (int i = 0; i < 1000; ++i) {
-                failures += localised(english) == text ? 0 : 1;
-            }
-            return failures;
-        });
-    };
-    auto first = lookUpIn("de_DE.UTF-8", german);
-    auto second = lookUpIn("C", english);
-    EXPECT_EQ(first.get(), 0);
-    EXPECT_EQ(second.get(), 0);
 }

@@ -2,45 +2,34 @@
 
 #include "HVLogger.h"
 
-#include <atomic>
 #include <gtest/gtest.h>
-#include <mutex>
 #include <sstream>
-#include <stdexcept>
+#include <tuple>
+#include <utility>
 
 namespace {
 
-std::mutex mutex;
 std::vector<LoggerCall> calls;
-std::atomic<int> callsUntilFailure{0};
+std::function<void()> callHook;
 
-void record(LoggerCall&& call) {
-    if (callsUntilFailure > 0 && --callsUntilFailure == 0) {
-        throw std::runtime_error("logger");
+void record(bool isTrace, const char* function, const char* file, int line, const std::string& category,
+            int level, bool restIsNothing, const std::string& text) {
+    if (callHook) {
+        callHook();
     }
-    const std::lock_guard<std::mutex> lock(mutex);
-    calls.push_back(std::move(call));
-}
-
-std::string withoutLine(std::string text) {
-    for (const std::string& mark :
-         {std::string("[Line: "), std::string(", Line: "), std::string("at line ")}) {
-        const std::size_t begin = text.find(mark);
-        if (begin != std::string::npos) {
-            const std::size_t digits = begin + mark.size();
-            text.erase(digits, text.find_first_not_of("0123456789", digits) - digits);
-        }
-    }
-    return text;
+    calls.push_back({isTrace, function, file, line, category, level, restIsNothing, text});
 }
 
 std::string tracePoint(const TracingModule& module, int level, const std::string& function,
                        const std::string& text) {
-    return module.category + (" " + std::to_string(level)) + " " + function + "| " + text;
+    return module.category + (" " + std::to_string(level)) + " " + function + "| " + text + '\n';
 }
 
-std::string flow(const char* kind, const TracingModule& module, const std::string& function) {
-    return kind + function + "() in " + module.file + " [Line: ]";
+std::string flow(const char* kind, const TracingModule& module, const std::string& function,
+                 const std::string& parameters) {
+    return tracePoint(module, parameters.empty() ? 4000 : 3000, function,
+                      kind + function + "() in " + module.file + " [Line: ]" +
+                          (parameters.empty() ? "" : ",Parameters List: " + parameters));
 }
 
 } // namespace
@@ -48,72 +37,58 @@ std::string flow(const char* kind, const TracingModule& module, const std::strin
 void HVLog::HVLogger::logLevelMessage(const char* function, const char* file, int line,
                                       const std::string& category, int level, char* pointer, int first,
                                       int second, const std::string& text) {
-    record({false, function, file, line, category, level, pointer == nullptr && first == 0 && second == 0,
-            text});
+    record(false, function, file, line, category, level, pointer == nullptr && first == 0 && second == 0,
+           text);
 }
 
 void HVLog::HVLogger::traceLevelMessage(const char* function, const char* file, int line,
                                         const std::string& category, int level, char* pointer, int first,
                                         int second, const std::string& text) {
-    record(
-        {true, function, file, line, category, level, pointer == nullptr && first == 0 && second == 0, text});
+    record(true, function, file, line, category, level, pointer == nullptr && first == 0 && second == 0,
+           text);
 }
 
-void forgetLoggerCalls() {
-    const std::lock_guard<std::mutex> lock(mutex);
-    calls.clear();
-}
-
-std::vector<LoggerCall> loggerCalls() {
-    const std::lock_guard<std::mutex> lock(mutex);
+const std::vector<LoggerCall>& loggerCalls() {
     return calls;
 }
 
-std::vector<std::string> tracedTexts() {
-    const std::vector<LoggerCall> all = loggerCalls();
-    EXPECT_EQ(all.size() % 2, 0U);
-    std::vector<std::string> texts;
-    for (std::size_t i = 0; i + 1 < all.size(); i += 2) {
-        const LoggerCall& log = all[i];
-        const LoggerCall& trace = all[i + 1];
-        EXPECT_FALSE(log.isTrace);
-        EXPECT_TRUE(trace.isTrace);
-        EXPECT_TRUE(log.restIsNothing && trace.restIsNothing);
+void atLoggerCalls(std::function<void()> hook) {
+    callHook = std::move(hook);
+}
+
+std::string takeTraces() {
+    EXPECT_EQ(calls.size() % 2, 0U);
+    std::string texts;
+    for (std::size_t i = 0; i + 1 < calls.size(); i += 2) {
+        const LoggerCall& log = calls[i];
+        const LoggerCall& trace = calls[i + 1];
+        EXPECT_TRUE(!log.isTrace && trace.isTrace && log.restIsNothing && trace.restIsNothing);
         EXPECT_EQ(std::tie(log.function, log.file, log.line, log.category, log.level, log.text),
                   std::tie(trace.function, trace.file, trace.line, trace.category, trace.level, trace.text));
-        texts.push_back(log.text);
+        std::string text = log.text;
+        for (const std::string mark : {"[Line: ", ", Line: ", "at line "}) {
+            const std::size_t begin = text.find(mark + std::to_string(log.line));
+            if (begin != std::string::npos) {
+                text.erase(begin + mark.size(), std::to_string(log.line).size());
+            }
+        }
+        texts += tracePoint({log.category.c_str(), ""}, log.level, log.function, text);
     }
+    calls.clear();
     return texts;
-}
-
-std::vector<std::string> takeTraces() {
-    const std::vector<LoggerCall> all = loggerCalls();
-    std::vector<std::string> texts = tracedTexts();
-    for (std::size_t i = 0; i < texts.size(); ++i) {
-        const LoggerCall& call = all[2 * i];
-        texts[i] = tracePoint({call.category.c_str(), ""}, call.level, call.function, withoutLine(texts[i]));
-    }
-    forgetLoggerCalls();
-    return texts;
-}
-
-std::string entering(const TracingModule& module, const std::string& function) {
-    return tracePoint(module, 4000, function, flow("ENTERING: ", module, function));
-}
-
-std::string exiting(const TracingModule& module, const std::string& function) {
-    return tracePoint(module, 4000, function, flow("EXITING: ", module, function));
 }
 
 std::string entering(const TracingModule& module, const std::string& function,
                      const std::string& parameters) {
-    return tracePoint(module, 3000, function,
-                      flow("ENTERING: ", module, function) + ",Parameters List: " + parameters);
+    return flow("ENTERING: ", module, function, parameters);
 }
 
 std::string exiting(const TracingModule& module, const std::string& function, const std::string& parameters) {
-    return tracePoint(module, 3000, function,
-                      flow("EXITING: ", module, function) + ",Parameters List: " + parameters);
+    return flow("EXITING: ", module, function, parameters);
+}
+
+std::string passing(const TracingModule& module, const std::string& function) {
+    return entering(module, function) + exiting(module, function);
 }
 
 std::string variable(const TracingModule& module, const std::string& function, const std::string& name,
@@ -131,8 +106,4 @@ std::string address(const void* pointer) {
     std::ostringstream stream;
     stream << pointer;
     return stream.str();
-}
-
-void failLoggerCall(int n) {
-    callsUntilFailure = n;
 }

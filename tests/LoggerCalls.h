@@ -1,9 +1,10 @@
-// Stands in the place of the logger's two functions and records what they are called with.
+// Stands in the place of the logger's two functions and records what they are called with, from one thread.
 //
 // A test program that links LoggerCalls.cpp sees every call of the library, since the dynamic linker takes
 // the program's own definition first.
 #pragma once
 
+#include <functional>
 #include <string>
 #include <vector>
 
@@ -18,15 +19,15 @@ struct LoggerCall {
     std::string text;
 };
 
-// Starts afresh.
-void forgetLoggerCalls();
+// All calls since the start or takeTraces, in order.
+const std::vector<LoggerCall>& loggerCalls();
 
-// All calls since, in order, from every thread.
-std::vector<LoggerCall> loggerCalls();
+// What each call begins with; what it throws, the logger throws.
+void atLoggerCalls(std::function<void()> hook);
 
-// The texts of the calls, one per trace point: that the second call equals the first in all but its function
-// is checked.
-std::vector<std::string> tracedTexts();
+// The trace points since the start or the last call, a line for each: its category, level, function and text,
+// the text without its source line. Checks that the two calls of each are equal in all but their function.
+std::string takeTraces();
 
 // A module of the library, as its traces name it.
 struct TracingModule {
@@ -37,21 +38,15 @@ constexpr TracingModule providerUtilities = {"Hovara.ProviderUtilities", "Provid
 constexpr TracingModule utility = {"Hovara.ProviderUtilities", "Utility.cpp"};
 constexpr TracingModule utils = {"Hovara.Utils", "utils.cpp"};
 
-// The trace points since the start or the last call: of each its category, level, function and text, the text
-// without its source line.
-std::vector<std::string> takeTraces();
-
 // What takeTraces tells of a trace point of each kind in `function` of `module`.
-std::string entering(const TracingModule& module, const std::string& function);
-std::string exiting(const TracingModule& module, const std::string& function);
-std::string entering(const TracingModule& module, const std::string& function, const std::string& parameters);
-std::string exiting(const TracingModule& module, const std::string& function, const std::string& parameters);
+std::string entering(const TracingModule& module, const std::string& function,
+                     const std::string& parameters = "");
+std::string exiting(const TracingModule& module, const std::string& function,
+                    const std::string& parameters = "");
+std::string passing(const TracingModule& module, const std::string& function); // entering and exiting
 std::string variable(const TracingModule& module, const std::string& function, const std::string& name,
                      const std::string& value);
 std::string message(const TracingModule& module, const std::string& function, const std::string& text);
 
 // A pointer as a parameter list shows it.
 std::string address(const void* pointer);
-
-// Makes the n-th call from now (from 1) throw std::runtime_error("logger"); 0 none.
-void failLoggerCall(int n);

@@ -51,6 +51,7 @@ TEST_F(TheLogger, WritesByThresholdAndByLevelCodeOnceItHasASink) {
     HVLogger::reset();
     keepLevels();
     log(1000);
+    log(5000);
     EXPECT_EQ(levels_, std::vector<int>({1000, 4000, 4001, 4002}));
 }
 
@@ -141,6 +142,7 @@ TEST(AMessageBuffer, IsEmptyAndSoundAgainAfterEachText) {
     EXPECT_EQ(buffer.str(stream), "a1b2c");
     stream << 3;
     EXPECT_EQ(buffer.str(buffer), "3");
+    EXPECT_EQ(buffer.str(buffer), "");
 }
 
 TEST(AMessageBuffer, ThrowsInsteadOfHandingOutAShortText) {

@@ -6,6 +6,8 @@
 #include <array>
 #include <cstdio>
 #include <cstdlib>
+#include <cwchar>
+#include <optional>
 #include <string>
 
 namespace obvious {
@@ -34,6 +36,24 @@ bool isAcceptable(std::basic_string<Char> text, const std::basic_string<Char>& e
         }
     }
     return true;
+}
+
+// Wide and narrow texts: what the C library makes of one in one piece, with room for it all.
+
+inline std::optional<std::string> converted(const std::wstring& text) {
+    std::string bytes((text.size() + 1) * 16, '\0');
+    std::mbstate_t state{};
+    const wchar_t* from = text.c_str();
+    const std::size_t size = std::wcsrtombs(bytes.data(), &from, bytes.size(), &state);
+    return size != std::string::npos ? std::make_optional(bytes.substr(0, size)) : std::nullopt;
+}
+
+inline std::optional<std::wstring> converted(const std::string& text) {
+    std::wstring characters(text.size() + 1, L'\0');
+    std::mbstate_t state{};
+    const char* from = text.c_str();
+    const std::size_t size = std::mbsrtowcs(characters.data(), &from, characters.size(), &state);
+    return size != std::string::npos ? std::make_optional(characters.substr(0, size)) : std::nullopt;
 }
 
 // Dates

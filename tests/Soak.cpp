@@ -1,11 +1,8 @@
 // A long life: sends requests of the library's whole road, REQUESTS of them (soak [REQUESTS]), and fails when
 // resident memory grows after the warm-up or a CMPI object outlives its request.
-#include "EmbeddedBroker.h"
-#include "RoadProvider.h"
+#include "RoadRequest.h"
 
 #include <algorithm>
-#include <chrono>
-#include <cstdlib>
 #include <exception>
 #include <fstream>
 #include <iostream>
@@ -26,28 +23,13 @@ long residentKib() {
     return resident * (::sysconf(_SC_PAGESIZE) / 1024);
 }
 
-bool sendOne(oxahv::EmbeddedBroker& broker, unsigned long number) {
-    oxahv::Request request(broker);
-    CMPIObjectPath* const path = request.objectPath("root/x", "Road");
-    const std::string name = "road-number-" + std::to_string(number);
-    TK::ProviderUtilities::setKeyProperty(path, "Name", name);
-    TK::ProviderUtilities::setKeyProperty(path, "Number", 7U);
-    const oxahv::Reply reply = request.getInstance(path);
-    std::string answer;
-    return reply.ok() && TK::ProviderUtilities::getProperty(reply.instances.at(0), "Wide", answer, false) &&
-           answer == name;
-}
-
 int soak(unsigned long requests) {
     oxahv::EmbeddedBroker broker;
-    oxahv::ProviderFactories factories;
-    factories.instance = Road_Create_InstanceMI;
-    broker.host("Road", factories);
-    const auto start = std::chrono::steady_clock::now();
+    hostRoad(broker);
     long warm = 0;
     long highest = 0;
     for (unsigned long number = 0; number < requests; ++number) {
-        if (!sendOne(broker, number)) {
+        if (!roadAnswers(broker, "road-number-" + std::to_string(number))) {
             std::cerr << "soak: request " << number << " failed\n";
             return 1;
         }
@@ -58,10 +40,9 @@ int soak(unsigned long requests) {
         }
     }
     highest = std::max(highest, residentKib());
-    const std::chrono::duration<double> seconds = std::chrono::steady_clock::now() - start;
     const std::size_t alive = broker.liveObjects().total();
-    std::cout << "soak: " << requests << " requests in " << seconds.count() << " s; resident after warm-up "
-              << warm << " KiB, at most " << highest << " KiB; objects alive " << alive << '\n';
+    std::cout << "soak: " << requests << " requests; resident after warm-up " << warm << " KiB, at most "
+              << highest << " KiB; objects alive " << alive << '\n';
     if (highest - warm > allowedGrowth || alive != 0) {
         std::cerr << "soak: memory grew by more than " << allowedGrowth << " KiB, or objects stayed alive\n";
         return 1;

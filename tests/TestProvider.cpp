@@ -8,14 +8,12 @@
 #include <exception>
 #include <thread>
 
-static const CMPIBroker* broker;
+namespace {
 
-static CMPIStatus TestCleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
-    CMReturn(CMPI_RC_OK);
-}
+const CMPIBroker* broker = nullptr;
 
-static CMPIStatus TestEnumInstanceNames(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
-                                        const CMPIObjectPath* path) {
+CMPIStatus enumerateInstanceNames(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+                                  const CMPIObjectPath* path) {
     CMPIStatus status = CMReturnObjectPath(result, path);
     const CMPIString* const name = CMGetClassName(path, nullptr);
     const char* const chars = name != nullptr ? CMGetCharsPtr(name, nullptr) : nullptr;
@@ -29,43 +27,18 @@ static CMPIStatus TestEnumInstanceNames(CMPIInstanceMI*, const CMPIContext*, con
     return status;
 }
 
-static CMPIStatus TestEnumInstances(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
-                                    const CMPIObjectPath*, const char**) {
-    CMPIStatus status = {CMPI_RC_ERR_ACCESS_DENIED, CMNewString(broker, "not for you", nullptr)};
-    return status;
+CMPIStatus enumerateInstances(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*,
+                              const char**) {
+    return {CMPI_RC_ERR_ACCESS_DENIED, CMNewString(broker, "not for you", nullptr)};
 }
 
-static CMPIStatus TestGetInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
-                                  const CMPIObjectPath*, const char**) {
+CMPIStatus getInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*,
+                       const char**) {
     CMReturn(CMPI_RC_OK);
 }
 
-static CMPIStatus TestCreateInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
-                                     const CMPIObjectPath*, const CMPIInstance*) {
-    CMReturn(CMPI_RC_ERR_NOT_SUPPORTED);
-}
-
-static CMPIStatus TestModifyInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
-                                     const CMPIObjectPath*, const CMPIInstance*, const char**) {
-    CMReturn(CMPI_RC_ERR_NOT_SUPPORTED);
-}
-
-static CMPIStatus TestDeleteInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
-                                     const CMPIObjectPath*) {
-    CMReturn(CMPI_RC_ERR_NOT_SUPPORTED);
-}
-
-static CMPIStatus TestExecQuery(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*,
-                                const char*, const char*) {
-    CMReturn(CMPI_RC_ERR_NOT_SUPPORTED);
-}
-
-static CMPIStatus TestMethodCleanup(CMPIMethodMI*, const CMPIContext*, CMPIBoolean) {
-    CMReturn(CMPI_RC_OK);
-}
-
-static CMPIStatus TestInvokeMethod(CMPIMethodMI*, const CMPIContext*, const CMPIResult* result,
-                                   const CMPIObjectPath*, const char*, const CMPIArgs* in, CMPIArgs* out) {
+CMPIStatus invokeMethod(CMPIMethodMI*, const CMPIContext*, const CMPIResult* result, const CMPIObjectPath*,
+                        const char*, const CMPIArgs* in, CMPIArgs* out) {
     CMPIValue count = {};
     count.uint32 = CMGetArgCount(in, nullptr);
     for (CMPICount i = 0; i < count.uint32; ++i) {
@@ -79,11 +52,6 @@ static CMPIStatus TestInvokeMethod(CMPIMethodMI*, const CMPIContext*, const CMPI
     return CMReturnData(result, &count, CMPI_uint32);
 }
 
-CMInstanceMIStub(Test, TestProvider, broker, )
-CMMethodMIStub(Test, TestProvider, broker, )
-
-namespace {
-
 // Lives in this library alone, with all that a handler needs of it.
 class NoProvider : public std::exception {
 public:
@@ -91,6 +59,25 @@ public:
 };
 
 } // namespace
+
+extern "C" CMPI_EXPORT CMPIInstanceMI* TestProvider_Create_InstanceMI(const CMPIBroker* theBroker,
+                                                                      const CMPIContext*, CMPIStatus*) {
+    static CMPIInstanceMIFT table = {};
+    static CMPIInstanceMI mi = {nullptr, &table};
+    table.enumerateInstanceNames = enumerateInstanceNames;
+    table.enumerateInstances = enumerateInstances;
+    table.getInstance = getInstance;
+    broker = theBroker;
+    return &mi;
+}
+
+extern "C" CMPI_EXPORT CMPIMethodMI* TestProvider_Create_MethodMI(const CMPIBroker*, const CMPIContext*,
+                                                                  CMPIStatus*) {
+    static CMPIMethodMIFT table = {};
+    static CMPIMethodMI mi = {nullptr, &table};
+    table.invokeMethod = invokeMethod;
+    return &mi;
+}
 
 extern "C" CMPI_EXPORT CMPIInstanceMI* _Generic_Create_InstanceMI(const CMPIBroker* theBroker,
                                                                   const CMPIContext* context,

@@ -1,14 +1,12 @@
 // Requests on many threads at once, beside everything else that a program may do with the library meanwhile.
 // The logger's two functions are this program's own and take no lock, so that nothing orders the threads but
 // the library itself.
-#include "EmbeddedBroker.h"
 #include "HVLogger.h"
-#include "RoadProvider.h"
+#include "RoadRequest.h"
 #include "Trace.h"
 #include "Utility.h"
 #include "utils.h"
 
-#include <atomic>
 #include <cstdlib>
 #include <gtest/gtest.h>
 #include <mutex>
@@ -36,60 +34,35 @@ unsigned int requestsPerThread() {
 
 const std::string category("Test.Threads");
 
-struct Logged {
-    unsigned int calls = 0;
-    unsigned int damaged = 0;
-    std::string example; // of what is damaged
-};
-thread_local Logged logged;
-thread_local std::string own; // a text that no other thread traces
-
-bool startsWith(const std::string& text, const std::string& start) {
-    return text.compare(0, start.size(), start) == 0;
-}
-
-bool endsWith(const std::string& text, const std::string& end) {
-    return text.size() >= end.size() && text.compare(text.size() - end.size(), end.size(), end) == 0;
-}
+thread_local unsigned int loggerCalls = 0;
+thread_local std::string damaged; // an example
+thread_local std::string own;     // a text that no other thread traces
 
 // Whether a text is one whole trace of a place, and of this thread.
 bool isWhole(const std::string& function, const std::string& file, const std::string& line,
              const std::string& text) {
-    const std::string place = function + "() in " + file + " [Line: " + line + ']';
+    const auto starts = [&text](const std::string& start) { return text.rfind(start, 0) == 0; };
+    const auto ends = [&text](const std::string& end) {
+        return text.size() >= end.size() && text.compare(text.size() - end.size(), end.size(), end) == 0;
+    };
     for (const char* const kind : {"ENTERING: ", "EXITING: "}) {
-        const std::string flow = kind + place;
-        const std::string parameters = flow + ",Parameters List:  ";
-        if (text == flow ||
-            (startsWith(text, parameters) && text.find('=') != std::string::npos &&
-             (text.find("own=") == std::string::npos || endsWith(text, "own=" + own + " 1.5")))) {
+        const std::string flow = kind + function + "() in " + file + " [Line: " + line + ']';
+        if (text == flow || (starts(flow + ",Parameters List:  ") && text.find('=') != std::string::npos &&
+                             (text.find("own=") == std::string::npos || ends("own=" + own + " 1.5")))) {
             return true;
         }
     }
-    const bool isVariable =
-        startsWith(text, "VARIABLE: '") && endsWith(text, "' at line " + line + " in " + file);
-    const bool isMine = text.find("'own'") == std::string::npos ||
-                        startsWith(text, "VARIABLE: 'own' has Value '" + own + "' at line ");
-    return (isVariable && isMine) || text == "MESSAGE [File: " + file + ", Line: " + line + "]: " + own;
+    const bool isMine =
+        text.find("'own'") == std::string::npos || starts("VARIABLE: 'own' has Value '" + own + "' at line ");
+    return (starts("VARIABLE: '") && ends("' at line " + line + " in " + file) && isMine) ||
+           text == "MESSAGE [File: " + file + ", Line: " + line + "]: " + own;
 }
 
 void log(const char* function, const char* file, int line, const std::string& text) {
-    ++logged.calls;
+    ++loggerCalls;
     if (!isWhole(function, file, std::to_string(line), text)) {
-        ++logged.damaged;
-        logged.example = text;
+        damaged = text;
     }
-}
-
-// One round of a thread; whether everything came out right.
-bool request(oxahv::EmbeddedBroker& broker) {
-    oxahv::Request request(broker);
-    CMPIObjectPath* const path = request.objectPath("root/x", "Road");
-    PU::setKeyProperty(path, "Name", own);
-    PU::setKeyProperty(path, "Number", 7U);
-    const oxahv::Reply reply = request.getInstance(path);
-    std::string name;
-    return reply.ok() && reply.instances.size() == 1 &&
-           PU::getProperty(reply.instances[0], "Wide", name, false) && name == own;
 }
 
 void trace(unsigned int number) {
@@ -140,34 +113,23 @@ void HVLog::HVLogger::traceLevelMessage(const char* function, const char* file, 
 
 TEST(ManyThreads, ServeRequestsWhileEverythingElseGoesOn) {
     oxahv::EmbeddedBroker broker;
-    oxahv::ProviderFactories factories;
-    factories.instance = Road_Create_InstanceMI;
-    broker.host("Road", factories);
+    hostRoad(broker);
     TK::PropertyFile file;
     const unsigned int requests = requestsPerThread();
-    std::atomic<unsigned int> failures{0};
-    std::atomic<unsigned int> calls{0};
-    std::vector<std::string> damaged(threadCount);
     std::vector<std::thread> threads;
     for (unsigned int i = 0; i < threadCount; ++i) {
         threads.emplace_back([&, i] {
             own = std::string(20 + i, static_cast<char>('A' + i));
             for (unsigned int number = 0; number < requests; ++number) {
                 trace(number);
-                const bool isRight = request(broker) && convert() && lookUp() && useFile(file, number);
-                failures += isRight ? 0U : 1U;
+                EXPECT_TRUE(roadAnswers(broker, own) && convert() && lookUp() && useFile(file, number));
             }
-            calls += logged.calls;
-            damaged[i] = logged.example;
+            EXPECT_GT(loggerCalls, requests * 50U);
+            EXPECT_EQ(damaged, "");
         });
     }
     for (std::thread& thread : threads) {
         thread.join();
-    }
-    EXPECT_EQ(failures, 0U);
-    EXPECT_GT(calls, threadCount * requests * 50U);
-    for (const std::string& example : damaged) {
-        EXPECT_EQ(example, "");
     }
     EXPECT_EQ(broker.liveObjects().total(), 0U);
 }

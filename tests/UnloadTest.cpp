@@ -12,18 +12,10 @@
 namespace {
 
 bool isLoaded(const char* name) {
-    struct Search {
-        const char* name;
-        bool isFound;
-    } search = {name, false};
-    ::dl_iterate_phdr(
-        [](dl_phdr_info* info, std::size_t /*size*/, void* data) {
-            auto* const wanted = static_cast<Search*>(data);
-            wanted->isFound = wanted->isFound || std::strstr(info->dlpi_name, wanted->name) != nullptr;
-            return 0;
-        },
-        &search);
-    return search.isFound;
+    const auto compare = [](dl_phdr_info* info, std::size_t /*size*/, void* wanted) {
+        return std::strstr(info->dlpi_name, static_cast<const char*>(wanted)) != nullptr ? 1 : 0;
+    };
+    return ::dl_iterate_phdr(compare, const_cast<char*>(name)) != 0;
 }
 
 } // namespace

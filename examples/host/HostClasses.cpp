@@ -13,7 +13,7 @@ using TK::ProviderUtilities;
 namespace {
 
 // Values of EnabledState and OperationalStatus.
-constexpr unsigned short enabledStateUnknown = 0;
+constexpr unsigned short unknownState = 0;
 constexpr unsigned short enabled = 2;
 constexpr unsigned short disabled = 3;
 constexpr unsigned short statusUnknown = 0;
@@ -130,7 +130,8 @@ void fillEthernetPort(const Machine& machine, const Moniker& keys, CMPIInstance*
     constexpr unsigned short wakeOnLan = 3;
     EthernetPort port = machine.host.ethernetPort(keyText(keys, "DeviceID").value_or(""));
     const bool isUp = port.state == "up";
-    const bool isUnknown = port.state == "unknown"; // of drivers that tell nothing: the port may well work
+    // Some drivers tell no state, though the port may work.
+    const bool isUnknown = port.state.empty() || port.state == "unknown";
     std::vector<std::string> addresses = {port.address};
     std::vector<unsigned short> capabilities;
     if (port.canWakeSystem) {
@@ -140,7 +141,7 @@ void fillEthernetPort(const Machine& machine, const Moniker& keys, CMPIInstance*
     setElementName(instance, L"Ethernet port", port.name);
     ProviderUtilities::setProperty(instance, "EnabledState",
                                    isUp        ? enabled
-                                   : isUnknown ? enabledStateUnknown
+                                   : isUnknown ? unknownState
                                                : disabled);
     setStatus(machine, instance,
               isUp                   ? statusOk

@@ -93,6 +93,12 @@ CMPIObjectPath* pathOf(const HostClass& hostClass, Moniker keys, const std::stri
     return path;
 }
 
+void require(const CMPIStatus& status) {
+    if (status.rc != CMPI_RC_OK) {
+        throw Refusal{status.rc, "the broker did not do what it was asked for"};
+    }
+}
+
 namespace {
 
 // As CMPI takes them: a null pointer ends them. They belong to the path.
@@ -120,9 +126,7 @@ CMPIInstance* newInstance(CMPIObjectPath* path, const char** properties) {
     if (properties != nullptr) {
         // The client asked for some properties only: the broker then drops the others. Keys stay.
         std::vector<const char*> keys = keyNames(path);
-        if (CMSetPropertyFilter(instance, properties, keys.data()).rc != CMPI_RC_OK) {
-            throw Refusal{CMPI_RC_ERR_FAILED, "the broker did not take the property list"};
-        }
+        require(CMSetPropertyFilter(instance, properties, keys.data()));
     }
     return instance;
 }
@@ -132,12 +136,6 @@ CMPIInstance* instanceOf(const HostClass& hostClass, const Moniker& keys, const 
     CMPIInstance* const instance = newInstance(pathOf(hostClass, keys, nameSpace), properties);
     hostClass.fill(machine(), keys, instance);
     return instance;
-}
-
-void require(const CMPIStatus& status) {
-    if (status.rc != CMPI_RC_OK) {
-        throw Refusal{status.rc, "the broker did not take the result"};
-    }
 }
 
 void give(const CMPIResult* result, const CMPIObjectPath* path) {

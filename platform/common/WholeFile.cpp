@@ -67,10 +67,12 @@ public:
     // Takes over permissions, and owner and group as far as the process may.
     void resemble(const struct stat& earlier) {
         mode_t mode = earlier.st_mode & 07777U;
-        if (::fchown(file_.get(), earlier.st_uid, earlier.st_gid) != 0 &&
-            ::fchown(file_.get(), static_cast<uid_t>(-1), earlier.st_gid) != 0) {
-            // What was the group's is not for whichever group the file has now.
-            mode &= ~static_cast<mode_t>(S_IRWXG | S_ISGID);
+        if (::fchown(file_.get(), earlier.st_uid, earlier.st_gid) != 0) {
+            // What was the owner's or the group's is not for whichever the file has now.
+            mode &= ~static_cast<mode_t>(S_ISUID);
+            if (::fchown(file_.get(), static_cast<uid_t>(-1), earlier.st_gid) != 0) {
+                mode &= ~static_cast<mode_t>(S_IRWXG | S_ISGID);
+            }
         }
         if (::fchmod(file_.get(), mode) != 0) {
             fail("cannot set the permissions of", path_);

@@ -79,20 +79,6 @@ void change(Change&& apply) {
     publishLowest(now);
 }
 
-// A file sink's; sinks are copied, so they share it.
-struct LogFile {
-    LogFile() = default;
-    ~LogFile() {
-        if (descriptor >= 0) {
-            ::close(descriptor);
-        }
-    }
-    LogFile(const LogFile&) = delete;
-    LogFile& operator=(const LogFile&) = delete;
-
-    int descriptor = -1;
-};
-
 // Writes one whole line, so that lines of several processes in one file stay apart too.
 void writeLine(int descriptor, std::string line) {
     line += '\n';
@@ -110,6 +96,20 @@ void writeLine(int descriptor, std::string line) {
         size -= static_cast<std::size_t>(written);
     }
 }
+
+// Closes what it holds when the last copy of a sink goes.
+struct OpenFile {
+    OpenFile() = default;
+    ~OpenFile() {
+        if (descriptor >= 0) {
+            ::close(descriptor);
+        }
+    }
+    OpenFile(const OpenFile&) = delete;
+    OpenFile& operator=(const OpenFile&) = delete;
+
+    int descriptor = -1;
+};
 
 } // namespace
 
@@ -138,7 +138,7 @@ void HVLogger::setStderrSink() {
 }
 
 void HVLogger::setFileSink(const std::string& path) {
-    const auto file = std::make_shared<LogFile>(); // before there is a descriptor to lose
+    const auto file = std::make_shared<OpenFile>();
     file->descriptor = ::open(path.c_str(), O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC, 0640);
     if (file->descriptor < 0) {
         const int error = errno;

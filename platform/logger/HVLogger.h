@@ -13,9 +13,9 @@
  * **Level codes.** The higher, the more important: 3000 for calls with their parameters, 4000 for calls and
  * variables, 6000 for messages.
  *
- * **Threads.** Everything here may be called from any thread at any time, with one exception: a sink must
- * call none of the setters and not reset(), which wait until no thread runs a sink. The sink is run by one
- * thread at a time, so lines never mix. A message that the sink itself causes is dropped.
+ * **Threads.** Everything here may be called from any thread at any time. The sink is run by one thread at a
+ * time, so lines never mix. A message that the sink itself causes is dropped. A sink calls none of the
+ * setters and not reset(), which wait until it has ended.
  *
  * **Encoding.** Texts are bytes in any encoding and are written as they are.
  */

@@ -3,7 +3,7 @@
 #include <Trace.h>
 #include <cmpimacs.h>
 
-#include <exception>
+#include <string>
 
 static const CMPIBroker* broker;
 static const std::string category("Demo.Port");
@@ -16,18 +16,28 @@ CMPIStatus PortGetInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult
     TK::Moniker keys;
     ProviderUtilities::transformObjectPathToMoniker(path, keys);
     std::string name;
-    if (!ProviderUtilities::getKeyProperty(path, "DeviceID", name) || name != "eth0") {
+    if (keys.selectKey(0)) {
+        keys.getValue(name); // throws when the client sent a key that is no text
+    }
+    if (name != "eth0") {
         CMReturn(CMPI_RC_ERR_NOT_FOUND);
     }
     CMPIObjectPath* reply = ProviderUtilities::createObjectPath(broker, "OXATK_EthernetPort",
                                                                 ProviderUtilities::getNamespace(path));
+    if (reply == nullptr) {
+        CMReturn(CMPI_RC_ERR_FAILED);
+    }
     ProviderUtilities::transformMonikerToObjectPath(keys, &reply);
     CMPIInstance* port = ProviderUtilities::createInstance(broker, reply);
+    if (port == nullptr) {
+        CMReturn(CMPI_RC_ERR_FAILED);
+    }
     ProviderUtilities::setProperty(port, "ElementName", name);
     ProviderUtilities::setProperty(port, "Speed", 1'000'000'000ULL);
     TK_TRACE_EXITING(category);
-    return CMReturnInstance(result, port);
-} catch (const std::exception&) {
+    CMReturnInstance(result, port);
+    return CMReturnDone(result);
+} catch (...) {
     CMReturn(CMPI_RC_ERR_FAILED);
 }
 // README ends
