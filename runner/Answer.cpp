@@ -1,36 +1,27 @@
 #include "Answer.h"
 
 #include "Text.h"
+#include "Values.h"
 
 #include <strings.h>
 
 namespace {
 
-std::string textOf(const CMPIString* string) {
-    const char* const chars = string != nullptr ? CMGetCharsPtr(string, nullptr) : nullptr;
-    return chars != nullptr ? chars : "";
-}
-
 PlainData plainOf(const CMPIData& data, const std::string& nameSpace);
 
-// The values of an instance, an object path or arguments: `count` and `at` are the slots that tell them.
-template <class Object, class Count, class At>
-NamedData valuesOf(const Object* object, Count count, At at, const std::string& nameSpace) {
-    NamedData values;
-    const CMPICount size = object != nullptr ? count(object, nullptr) : 0;
-    for (CMPICount i = 0; i < size; ++i) {
-        CMPIString* name = nullptr;
-        const CMPIData data = at(object, i, &name, nullptr);
-        values[textOf(name)] = plainOf(data, nameSpace);
+NamedData plainOf(const std::vector<NamedValue>& values, const std::string& nameSpace) {
+    NamedData plain;
+    for (const NamedValue& value : values) {
+        plain[value.name] = plainOf(value.data, nameSpace);
     }
-    return values;
+    return plain;
 }
 
 Result resultOf(const CMPIObjectPath* path, const std::string& nameSpace) {
     Result result;
     result.className = textOf(CMGetClassName(path, nullptr));
     result.path = oxahv::pathText(path);
-    result.keys = valuesOf(path, CMGetKeyCount, CMGetKeyAt, nameSpace);
+    result.keys = plainOf(keysOf(path), nameSpace);
     const std::string own = lowerCase(textOf(CMGetNameSpace(path, nullptr)));
     result.identity = (own != lowerCase(nameSpace) ? own : "") + ':' + lowerCase(result.className);
     for (const auto& [name, key] : result.keys) {
@@ -97,7 +88,7 @@ Answer answerOf(const oxahv::Reply& reply, const std::string& nameSpace) {
     answer.isDone = reply.done;
     for (const CMPIInstance* const instance : reply.instances) {
         answer.results.push_back(resultOf(CMGetObjectPath(instance, nullptr), nameSpace));
-        answer.results.back().properties = valuesOf(instance, CMGetPropertyCount, CMGetPropertyAt, nameSpace);
+        answer.results.back().properties = plainOf(propertiesOf(instance), nameSpace);
     }
     for (const CMPIObjectPath* const path : reply.objectPaths) {
         answer.results.push_back(resultOf(path, nameSpace));
@@ -105,7 +96,7 @@ Answer answerOf(const oxahv::Reply& reply, const std::string& nameSpace) {
     for (const CMPIData& data : reply.data) {
         answer.data.push_back(plainOf(data, nameSpace));
     }
-    answer.out = valuesOf(reply.out, CMGetArgCount, CMGetArgAt, nameSpace);
+    answer.out = plainOf(argumentsOf(reply.out), nameSpace);
     return answer;
 }
 

@@ -3,6 +3,7 @@
 #include "Examination.h"
 #include "Strain.h"
 #include "Text.h"
+#include "Values.h"
 
 #include <algorithm>
 #include <chrono>
@@ -175,11 +176,7 @@ MethodCall CheckRun::methodCall(const std::string& text) const {
     }
     MethodCall call = {
         words.front().substr(0, point), words.front().substr(point + 1), {words.begin() + 1, words.end()}};
-    const auto methods = broker_.methodsOf(call.className);
-    const bool isDeclared = std::any_of(methods.begin(), methods.end(), [&](const auto& method) {
-        return sameName(method.name, call.method);
-    });
-    if (!isDeclared) {
+    if (!findMethod(broker_, call.className, call.method)) {
         throw BrokerError("method '" + text + "': no class that --mof declares has it");
     }
     return call;

@@ -2,6 +2,7 @@
 
 #include "Associations.h"
 #include "Text.h"
+#include "Values.h"
 
 #include <algorithm>
 #include <set>
@@ -172,11 +173,8 @@ void checkMethodResult(Client& client, const Query& query, const Answer& answer)
         client.fail(request, "method " + query.operands.method, answer);
         return;
     }
-    const auto methods = client.broker().methodsOf(client.task().className);
-    const auto method = std::find_if(methods.begin(), methods.end(), [&](const auto& declared) {
-        return sameName(declared.name, query.operands.method);
-    });
-    if (method == methods.end()) {
+    const auto method = findMethod(client.broker(), client.task().className, query.operands.method);
+    if (!method) {
         return;
     }
     const auto mind = [&](const std::string& text) {
