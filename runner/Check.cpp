@@ -1,6 +1,7 @@
 #include "Check.h"
 
 #include "Examination.h"
+#include "ProgressLine.h"
 #include "Strain.h"
 #include "Text.h"
 #include "Values.h"
@@ -68,33 +69,6 @@ void runTask(EmbeddedBroker& broker, const Options& options, const CheckTask& ta
 
 // In the parent
 
-// One line on a terminal, over and over, once the check takes longer than a second.
-class Ticker {
-public:
-    ~Ticker() {
-        if (isShown_) {
-            std::cerr << "\r\033[K" << std::flush;
-        }
-    }
-    Ticker() = default;
-    Ticker(const Ticker&) = delete;
-    Ticker& operator=(const Ticker&) = delete;
-
-    void show(const std::string& text) {
-        const auto now = std::chrono::steady_clock::now();
-        if (isTerminal_ && now >= due_) {
-            due_ = now + std::chrono::milliseconds(200);
-            isShown_ = true;
-            std::cerr << "\r\033[K" << printable(text, 79) << std::flush;
-        }
-    }
-
-private:
-    bool isTerminal_ = ::isatty(STDERR_FILENO) == 1;
-    bool isShown_ = false;
-    std::chrono::steady_clock::time_point due_ = std::chrono::steady_clock::now() + std::chrono::seconds(1);
-};
-
 class CheckRun {
 public:
     CheckRun(const Options& options, const CheckOptions& checkOptions)
@@ -121,8 +95,8 @@ private:
     std::vector<MethodCall> methods_;
     CheckReport report_;
     bool canLoad_ = true;
-    Ticker ticker_;
-    std::string place_;                         // for the ticker
+    ProgressLine progress_;
+    std::string place_;                         // for the progress
     std::map<std::size_t, std::string> atWork_; // the child's requests that have begun and not ended
 };
 
@@ -272,7 +246,7 @@ void CheckRun::receive(const Message& message, CheckedClass& checked) {
     case Message::Kind::begin:
         ++report_.requests;
         atWork_[message.number] = message.text;
-        ticker_.show(place_ + message.text);
+        progress_.show(place_ + message.text);
         break;
     case Message::Kind::end:
         atWork_.erase(message.number);
