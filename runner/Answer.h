@@ -48,8 +48,6 @@ struct Answer {
 // Copies a reply. A namespace that is missing or `nameSpace` is no part of an identity.
 Answer answerOf(const oxahv::Reply& reply, const std::string& nameSpace);
 
-std::string lowerCase(std::string text);
-
 // Whether there is a value of that name that is not NULL.
 bool hasValue(const NamedData& values, const std::string& name);
 
@@ -58,6 +56,3 @@ std::string typeText(CMPIType type);
 
 // "CMPI_RC_ERR_FAILED: text"
 std::string wordsOf(const Answer& answer);
-
-// Whether the text is UTF-8: no overlong forms, surrogates or numbers beyond U+10FFFF.
-bool isUtf8(const std::string& text);

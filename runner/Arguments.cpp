@@ -1,27 +1,19 @@
 #include "Arguments.h"
 
+#include "Text.h"
+#include "Values.h"
+
 #include <algorithm>
 #include <iterator>
 #include <optional>
-#include <strings.h>
 
 namespace {
-
-bool sameName(const std::string& a, const std::string& b) {
-    return ::strcasecmp(a.c_str(), b.c_str()) == 0;
-}
 
 struct Argument {
     std::string name;
     CMPIType type; // with CMPI_ARRAY for arrays; CMPI_null: what the text looks like
     std::vector<std::string> texts;
 };
-
-std::string classNameOf(const CMPIObjectPath* path) {
-    const CMPIString* const name = CMGetClassName(path, nullptr);
-    const char* const chars = name != nullptr ? CMGetCharsPtr(name, nullptr) : nullptr;
-    return chars != nullptr ? chars : ""; // a fault can strike the command's own calls too
-}
 
 // What there is, for a message about what there is not.
 template <class Declaration>
@@ -40,10 +32,9 @@ std::optional<oxahv::MethodDeclaration> declarationOf(const oxahv::EmbeddedBroke
     if (!broker.isDeclared(className)) {
         return std::nullopt;
     }
-    for (const oxahv::MethodDeclaration& declared : broker.methodsOf(className)) {
-        if (sameName(declared.name, method)) {
-            return declared;
-        }
+    std::optional<oxahv::MethodDeclaration> declared = findMethod(broker, className, method);
+    if (declared) {
+        return declared;
     }
     throw oxahv::BrokerError("class " + className + " has no method " + method + "; it has " +
                              namesOf(broker.methodsOf(className)));
@@ -126,7 +117,8 @@ CMPIArgs* argumentsFrom(oxahv::EmbeddedBroker& broker, oxahv::Request& request, 
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     CMPIArgs* const arguments = CMNewArgs(broker.handle(), &status);
     require(status);
-    for (const Argument& argument : parsed(declarationOf(broker, classNameOf(path), method), texts)) {
+    for (const Argument& argument :
+         parsed(declarationOf(broker, textOf(CMGetClassName(path, nullptr)), method), texts)) {
         const CMPIData data = (argument.type & CMPI_ARRAY) != 0
                                   ? arrayOf(broker, request, argument)
                                   : valueOf(request, argument, argument.texts.front());

@@ -1,6 +1,7 @@
 #include "Associations.h"
 
 #include "Examination.h"
+#include "Text.h"
 
 #include <algorithm>
 #include <set>
@@ -161,7 +162,7 @@ void Associations::runFilters() {
 // A declared class from which the class derives; empty if none.
 std::string Associations::superclass(const std::string& className) const {
     for (const std::string& other : client_.broker().declaredClasses()) {
-        if (lowerCase(other) != lowerCase(className) && client_.broker().isA(className, other)) {
+        if (!sameName(other, className) && client_.broker().isA(className, other)) {
             return other;
         }
     }
@@ -184,7 +185,7 @@ bool Associations::passesClass(const std::string& className, const std::string& 
 
 bool Associations::passes(const Way& way, const AssociationFilter& filter) const {
     const auto isRole = [](const std::string& wanted, const std::string& role) {
-        return wanted.empty() || lowerCase(wanted) == lowerCase(role);
+        return wanted.empty() || sameName(wanted, role);
     };
     return passesClass(way.associationClass, filter.associationClass) &&
            passesClass(way.otherClass, filter.resultClass) && isRole(filter.role, way.role) &&

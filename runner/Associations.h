@@ -3,6 +3,10 @@
 
 #include "Client.h"
 
+#include <optional>
+#include <string>
+#include <vector>
+
 class Associations {
 public:
     Associations(Client& client, std::string path, std::string identity)

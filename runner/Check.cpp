@@ -1,7 +1,10 @@
 #include "Check.h"
 
 #include "Examination.h"
+#include "ProgressLine.h"
 #include "Strain.h"
+#include "Text.h"
+#include "Values.h"
 
 #include <algorithm>
 #include <chrono>
@@ -66,33 +69,6 @@ void runTask(EmbeddedBroker& broker, const Options& options, const CheckTask& ta
 
 // In the parent
 
-// One line on a terminal, over and over, once the check takes longer than a second.
-class Ticker {
-public:
-    ~Ticker() {
-        if (isShown_) {
-            std::cerr << "\r\033[K" << std::flush;
-        }
-    }
-    Ticker() = default;
-    Ticker(const Ticker&) = delete;
-    Ticker& operator=(const Ticker&) = delete;
-
-    void show(const std::string& text) {
-        const auto now = std::chrono::steady_clock::now();
-        if (isTerminal_ && now >= due_) {
-            due_ = now + std::chrono::milliseconds(200);
-            isShown_ = true;
-            std::cerr << "\r\033[K" << text.substr(0, 79) << std::flush;
-        }
-    }
-
-private:
-    bool isTerminal_ = ::isatty(STDERR_FILENO) == 1;
-    bool isShown_ = false;
-    std::chrono::steady_clock::time_point due_ = std::chrono::steady_clock::now() + std::chrono::seconds(1);
-};
-
 class CheckRun {
 public:
     CheckRun(const Options& options, const CheckOptions& checkOptions)
@@ -119,8 +95,8 @@ private:
     std::vector<MethodCall> methods_;
     CheckReport report_;
     bool canLoad_ = true;
-    Ticker ticker_;
-    std::string place_;                         // for the ticker
+    ProgressLine progress_;
+    std::string place_;                         // for the progress
     std::map<std::size_t, std::string> atWork_; // the child's requests that have begun and not ended
 };
 
@@ -174,11 +150,7 @@ MethodCall CheckRun::methodCall(const std::string& text) const {
     }
     MethodCall call = {
         words.front().substr(0, point), words.front().substr(point + 1), {words.begin() + 1, words.end()}};
-    const auto methods = broker_.methodsOf(call.className);
-    const bool isDeclared = std::any_of(methods.begin(), methods.end(), [&](const auto& method) {
-        return lowerCase(method.name) == lowerCase(call.method);
-    });
-    if (!isDeclared) {
+    if (!findMethod(broker_, call.className, call.method)) {
         throw BrokerError("method '" + text + "': no class that --mof declares has it");
     }
     return call;
@@ -196,9 +168,8 @@ CheckReport CheckRun::run() {
     }
     for (const MethodCall& call : methods_) {
         const bool isChecked =
-            std::any_of(report_.classes.begin(), report_.classes.end(), [&](const CheckedClass& checked) {
-                return lowerCase(checked.name) == lowerCase(call.className);
-            });
+            std::any_of(report_.classes.begin(), report_.classes.end(),
+                        [&](const CheckedClass& checked) { return sameName(checked.name, call.className); });
         if (!isChecked) {
             throw BrokerError("method " + call.className + '.' + call.method +
                               " is of no class that is checked; name the class with --class");
@@ -227,7 +198,7 @@ void CheckRun::runClass(std::size_t position, std::size_t count) {
     task.isNamed = !checkOptions_.classes.empty();
     task.threads = checkOptions_.threads;
     for (const MethodCall& call : methods_) {
-        if (lowerCase(call.className) == lowerCase(checked.name)) {
+        if (sameName(call.className, checked.name)) {
             task.methods.push_back(call);
         }
     }
@@ -275,7 +246,7 @@ void CheckRun::receive(const Message& message, CheckedClass& checked) {
     case Message::Kind::begin:
         ++report_.requests;
         atWork_[message.number] = message.text;
-        ticker_.show(place_ + message.text);
+        progress_.show(place_ + message.text);
         break;
     case Message::Kind::end:
         atWork_.erase(message.number);

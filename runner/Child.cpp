@@ -7,6 +7,7 @@
 #include <fcntl.h>
 #include <poll.h>
 #include <sys/prctl.h>
+#include <sys/syscall.h>
 #include <sys/wait.h>
 #include <system_error>
 #include <unistd.h>
@@ -21,7 +22,9 @@ constexpr char finishedMark = '.'; // no message begins with it
 
 // An exception must not unwind into what the parent was doing.
 [[noreturn]] void live(const std::function<void(ChildOutput&)>& task, int output, pid_t parent) noexcept {
-    // The child must not outlive a parent that is killed, however early.
+    ::setpgid(0, 0);
+    // The child must not outlive a parent that is killed, however early; nor one that a terminal interrupts,
+    // which does not reach this group.
     ::prctl(PR_SET_PDEATHSIG, SIGKILL);
     if (::getppid() != parent) {
         ::_exit(1);
@@ -33,20 +36,23 @@ constexpr char finishedMark = '.'; // no message begins with it
     ::_exit(0); // what the parent's objects do at its end is the parent's
 }
 
-// Kills and reaps the child, whatever happens to its parent.
+// Kills and reaps the child, whatever happens to its parent. What the provider has started goes with it.
 class Process {
 public:
-    explicit Process(pid_t id) : id_(id) {}
+    // Both processes make the group, so that it is there for whichever needs it first.
+    explicit Process(pid_t id) : id_(id) { ::setpgid(id, id); }
     ~Process() {
         if (id_ > 0) {
-            ::kill(id_, SIGKILL);
-            wait();
+            end();
         }
     }
     Process(const Process&) = delete;
     Process& operator=(const Process&) = delete;
 
-    int wait() {
+    // Returns the status of a process that has ended by itself, or of the end that it meets here. The group
+    // keeps its number until the process is reaped.
+    int end() {
+        ::kill(-id_, SIGKILL);
         int status = 0;
         while (::waitpid(id_, &status, 0) < 0 && errno == EINTR) {
         }
@@ -84,30 +90,38 @@ std::string wordsOf(int status) {
     return "exit status " + std::to_string(WEXITSTATUS(status));
 }
 
-// Reads lines until the mark, the end of the child, or silence.
+// Reads lines until the mark, the end of the child, or silence. Of the end, the process itself tells: a pipe
+// stays open in what the child has started, and a child can close it and go on.
 class Reader {
 public:
-    Reader(int descriptor, const std::function<void(const std::string&)>& receive)
-        : descriptor_(descriptor), receive_(receive) {}
+    Reader(int descriptor, int process, const std::function<void(const std::string&)>& receive)
+        : descriptor_(descriptor), process_(process), receive_(receive) {}
 
     ChildEnd read(std::chrono::milliseconds timeout) {
+        std::array<pollfd, 2> waiting = {{{descriptor_, POLLIN, 0}, {process_, POLLIN, 0}}};
         while (!isFinished_) {
-            pollfd waiting = {descriptor_, POLLIN, 0};
-            const int ready = ::poll(&waiting, 1, static_cast<int>(timeout.count()));
-            if (ready == 0) {
-                return ChildEnd::hung;
-            }
+            const int ready = ::poll(waiting.data(), waiting.size(), static_cast<int>(timeout.count()));
             if (ready < 0 && errno != EINTR) {
                 fail("poll");
             }
-            if (ready > 0 && !readBlock()) {
+            if (ready == 0) {
+                return ChildEnd::hung;
+            }
+            if (ready < 0) {
+                continue;
+            }
+            if (waiting[0].revents == 0) { // then all is read
                 return ChildEnd::crashed;
+            }
+            if (!readBlock()) {
+                waiting[0].fd = -1; // is polled no more
             }
         }
         return ChildEnd::finished;
     }
 
 private:
+    // False at the end of the file.
     bool readBlock() {
         std::array<char, 65536> block{};
         const ssize_t size = ::read(descriptor_, block.data(), block.size());
@@ -132,6 +146,7 @@ private:
     }
 
     int descriptor_;
+    int process_;
     const std::function<void(const std::string&)>& receive_;
     std::string pending_;
     bool isFinished_ = false;
@@ -170,9 +185,13 @@ ChildResult runInChild(const std::function<void(ChildOutput&)>& task,
     }
     Process child(id);
     output.close();
-    const ChildEnd end = Reader(input.get(), receive).read(timeout);
+    const Descriptor process(static_cast<int>(::syscall(SYS_pidfd_open, id, 0)));
+    if (process.get() < 0) {
+        fail("pidfd_open");
+    }
+    const ChildEnd end = Reader(input.get(), process.get(), receive).read(timeout);
     if (end == ChildEnd::crashed) {
-        return {end, wordsOf(child.wait())};
+        return {end, wordsOf(child.end())};
     }
     return {end, ""};
 }

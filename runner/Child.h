@@ -31,7 +31,8 @@ struct ChildResult {
 
 // Forks, and runs the task in the child, whose standard output becomes its standard error stream: what a
 // provider prints belongs to no report. The parent's `receive` gets each line that the task sends. A child
-// that sends none for `timeout` is killed. Only for a process of one thread. Throws std::system_error when no
+// that sends none for `timeout` is killed. In the end, the processes that the child has started are killed as
+// well. Only for a process of one thread. Throws std::system_error when no
 // child can be made, and whatever `receive` throws.
 ChildResult runInChild(const std::function<void(ChildOutput&)>& task,
                        const std::function<void(const std::string&)>& receive,

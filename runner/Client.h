@@ -7,6 +7,7 @@
 #include "Query.h"
 
 #include <atomic>
+#include <functional>
 #include <optional>
 #include <set>
 #include <string>

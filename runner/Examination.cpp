@@ -1,6 +1,8 @@
 #include "Examination.h"
 
 #include "Associations.h"
+#include "Text.h"
+#include "Values.h"
 
 #include <algorithm>
 #include <set>
@@ -171,11 +173,8 @@ void checkMethodResult(Client& client, const Query& query, const Answer& answer)
         client.fail(request, "method " + query.operands.method, answer);
         return;
     }
-    const auto methods = client.broker().methodsOf(client.task().className);
-    const auto method = std::find_if(methods.begin(), methods.end(), [&](const auto& declared) {
-        return lowerCase(declared.name) == lowerCase(query.operands.method);
-    });
-    if (method == methods.end()) {
+    const auto method = findMethod(client.broker(), client.task().className, query.operands.method);
+    if (!method) {
         return;
     }
     const auto mind = [&](const std::string& text) {
@@ -379,7 +378,7 @@ void Examination::checkList(const Query& query, const std::vector<std::string>& 
 bool Examination::yieldsMore(const Result& result, const std::vector<std::string>& wanted) const {
     const auto properties = client_.broker().propertiesOf(result.className);
     const auto isExpected = [&](const std::string& name) {
-        const auto isName = [&](const std::string& other) { return lowerCase(other) == lowerCase(name); };
+        const auto isName = [&](const std::string& other) { return sameName(other, name); };
         return std::any_of(wanted.begin(), wanted.end(), isName) ||
                std::any_of(properties.begin(), properties.end(), [&](const PropertyDeclaration& property) {
                    return property.isKey && isName(property.name);

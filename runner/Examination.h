@@ -3,6 +3,8 @@
 
 #include "Client.h"
 
+#include <optional>
+#include <string>
 #include <vector>
 
 class Examination {

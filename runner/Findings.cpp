@@ -1,5 +1,7 @@
 #include "Findings.h"
 
+#include "Text.h"
+
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
@@ -29,20 +31,10 @@ void printClasses(std::ostream& out, const std::vector<CheckedClass>& classes) {
             out << "checked     " << checked.name << ": "
                 << counted(checked.instances, "instance", "instances") << '\n';
         } else {
-            refused += "not served  " + checked.name + ": " + checked.answer + '\n';
+            refused += "not served  " + checked.name + ": " + printable(checked.answer) + '\n';
         }
     }
     out << refused;
-}
-
-// What a provider wrote may hold anything; a terminal gets no control characters of it.
-std::string printable(std::string text) {
-    for (char& c : text) {
-        if (static_cast<unsigned char>(c) < 0x20 || c == 0x7f) {
-            c = '?';
-        }
-    }
-    return text;
 }
 
 void printFinding(std::ostream& out, const Finding& finding, bool isColoured) {

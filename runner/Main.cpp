@@ -2,6 +2,7 @@
 
 #include "Check.h"
 #include "Runner.h"
+#include "Text.h"
 
 #include <CLI/CLI.hpp>
 
@@ -213,9 +214,13 @@ int parseAndRun(int argc, char** argv) {
 
 int main(int argc, char** argv) {
     try {
-        return parseAndRun(argc, argv);
+        const int status = parseAndRun(argc, argv);
+        if (!std::cout.flush()) {
+            throw std::runtime_error("cannot write to the standard output");
+        }
+        return status;
     } catch (const std::exception& exception) {
-        std::cerr << "oxahv-provider: " << exception.what() << '\n';
+        std::cerr << "oxahv-provider: " << printable(exception.what()) << '\n';
         return usageFailed;
     }
 }

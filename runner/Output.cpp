@@ -1,45 +1,12 @@
 #include "Output.h"
 
+#include "Values.h"
+
 #include <nlohmann/json.hpp>
 
 namespace {
 
 using Json = nlohmann::ordered_json;
-
-struct NamedData {
-    std::string name;
-    CMPIData data;
-};
-
-std::string textOf(const CMPIString* string) {
-    const char* const chars = string != nullptr ? CMGetCharsPtr(string, nullptr) : nullptr;
-    return chars != nullptr ? chars : "";
-}
-
-// The values of an instance, an object path or arguments: `count` and `at` are the slots that tell them.
-template <class Object, class Count, class At>
-std::vector<NamedData> valuesOf(const Object* object, Count count, At at) {
-    std::vector<NamedData> values;
-    const CMPICount size = count(object, nullptr);
-    for (CMPICount i = 0; i < size; ++i) {
-        CMPIString* name = nullptr;
-        const CMPIData data = at(object, i, &name, nullptr);
-        values.push_back({textOf(name), data});
-    }
-    return values;
-}
-
-std::vector<NamedData> propertiesOf(const CMPIInstance* instance) {
-    return valuesOf(instance, CMGetPropertyCount, CMGetPropertyAt);
-}
-
-std::vector<NamedData> keysOf(const CMPIObjectPath* path) {
-    return valuesOf(path, CMGetKeyCount, CMGetKeyAt);
-}
-
-std::vector<NamedData> argumentsOf(const CMPIArgs* arguments) {
-    return valuesOf(arguments, CMGetArgCount, CMGetArgAt);
-}
 
 Json jsonOf(const CMPIData& data);
 
@@ -96,15 +63,15 @@ Json jsonOf(const CMPIData& data) {
     }
 }
 
-Json jsonOf(const std::vector<NamedData>& values) {
+Json jsonOf(const std::vector<NamedValue>& values) {
     Json object = Json::object();
-    for (const NamedData& value : values) {
+    for (const NamedValue& value : values) {
         object[value.name] = jsonOf(value.data);
     }
     return object;
 }
 
-Json jsonOf(const CMPIObjectPath* path, const std::vector<NamedData>& values) {
+Json jsonOf(const CMPIObjectPath* path, const std::vector<NamedValue>& values) {
     return {{"class", textOf(CMGetClassName(path, nullptr))},
             {"namespace", textOf(CMGetNameSpace(path, nullptr))},
             {"path", oxahv::pathText(path)},
@@ -122,13 +89,13 @@ void printInstances(std::ostream& out, Format format, const std::vector<CMPIInst
     Json array = Json::array();
     for (const CMPIInstance* const instance : instances) {
         const CMPIObjectPath* const path = CMGetObjectPath(instance, nullptr);
-        const std::vector<NamedData> properties = propertiesOf(instance);
+        const std::vector<NamedValue> properties = propertiesOf(instance);
         if (format == Format::json) {
             array.push_back(jsonOf(path, properties));
             continue;
         }
         out << "instance of " << textOf(CMGetClassName(path, nullptr)) << " {\n";
-        for (const NamedData& property : properties) {
+        for (const NamedValue& property : properties) {
             out << "  " << property.name << " = " << oxahv::valueText(property.data) << ";\n";
         }
         out << "};\n";
@@ -158,7 +125,7 @@ void printMethodResult(std::ostream& out, Format format, const CMPIObjectPath* p
     if (!reply.data.empty()) {
         returned = reply.data.front();
     }
-    const std::vector<NamedData> arguments = argumentsOf(reply.out);
+    const std::vector<NamedValue> arguments = argumentsOf(reply.out);
     if (format == Format::json) {
         print(out, Json::array({{{"path", oxahv::pathText(path)},
                                  {"method", method},
@@ -167,7 +134,7 @@ void printMethodResult(std::ostream& out, Format format, const CMPIObjectPath* p
         return;
     }
     out << "ReturnValue = " << oxahv::valueText(returned) << ";\n";
-    for (const NamedData& argument : arguments) {
+    for (const NamedValue& argument : arguments) {
         out << argument.name << " = " << oxahv::valueText(argument.data) << ";\n";
     }
 }

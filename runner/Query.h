@@ -4,7 +4,6 @@
 #include "Answer.h"
 #include "Runner.h"
 
-#include <optional>
 #include <string>
 #include <vector>
 

@@ -1,7 +1,8 @@
 #include "Runner.h"
 
 #include "Arguments.h"
-#include "Progress.h"
+#include "ProgressLine.h"
+#include "Text.h"
 
 #include <HVLogger.h>
 
@@ -61,6 +62,19 @@ Reply callMethod(EmbeddedBroker& broker, Request& request, const CMPIObjectPath*
                  const Operands& operands) {
     return request.invokeMethod(target, operands.method,
                                 argumentsFrom(broker, request, target, operands.method, operands.arguments));
+}
+
+// Tells how far the request has come while it runs.
+Reply performed(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* target, const Verb& verb,
+                const Operands& operands) {
+    ProgressLine line; // its end comes before anything is printed
+    struct Shown {
+        Request& request;
+        ~Shown() { request.setProgressHandler(nullptr); }
+    } const shown = {request};
+    request.setProgressHandler(
+        [&](std::size_t results) { line.show(std::to_string(results) + " results so far"); });
+    return verb.perform(broker, request, target, operands);
 }
 
 // Printing what they yield
@@ -205,11 +219,7 @@ int run(const Options& options, const Verb& verb, const Operands& operands) {
     }
     Request request(broker);
     const CMPIObjectPath* const target = targetOf(request, options, verb, operands);
-    Reply reply;
-    {
-        const Progress progress(request); // ends before anything is printed
-        reply = verb.perform(broker, request, target, operands);
-    }
+    Reply reply = performed(broker, request, target, verb, operands);
     broker.clearFaults(); // they are the request's; what is printed is asked of the broker too
     if (reply.ok() && verb.yields == Yields::oneInstance && reply.instances.size() != 1) {
         reply.code = CMPI_RC_ERR_FAILED;
@@ -218,7 +228,7 @@ int run(const Options& options, const Verb& verb, const Operands& operands) {
     }
     if (!reply.ok()) {
         std::cerr << "oxahv-provider: " << oxahv::codeName(reply.code)
-                  << (reply.message.empty() ? "" : ": " + reply.message) << '\n';
+                  << (reply.message.empty() ? "" : ": " + printable(reply.message)) << '\n';
         return providerFailed;
     }
     printReply(options, target, operands, verb.yields, reply);

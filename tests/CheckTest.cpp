@@ -18,6 +18,7 @@ using Texts = std::set<std::string>;
 const std::map<std::string, std::string> expectedFindings = {
     {"None", ""},
     {"Crash", "crash "},
+    {"CrashWithChild", "crash "},
     {"CrashInFault", "crash@faults crash@faults "},
     {"NotServed", "not-served "},
     {"Failed", "failed "},
@@ -57,7 +58,7 @@ std::string faultyClasses() {
                        "[Abstract] class Faulty_End : Faulty_Base {};"
                        "[Association, Abstract] class Faulty_Link {"
                        " [Key] Faulty_Base REF Near; [Key] Faulty_End REF Far; };"
-                       "class Faulty_Hang : Faulty_Base {};";
+                       "class Faulty_Hang : Faulty_Base {}; class Faulty_HangClosed : Faulty_Base {};";
     for (const auto& [name, findings] : expectedFindings) {
         text += "class Faulty_" + name + " : Faulty_Base {";
         text += name == "UntypedKeys" ? "[Key] uint16 Index; };" : "};";
@@ -75,7 +76,7 @@ protected:
 };
 
 Json reportOf(const std::string& arguments, int status) {
-    const Outcome outcome = run("--output json " + arguments, "");
+    const Outcome outcome = run("--output json " + arguments);
     EXPECT_EQ(outcome.status, status) << arguments;
     return Json::parse(outcome.output)[0];
 }
@@ -106,8 +107,11 @@ TEST_F(TheCheck, FindsEachFault) {
     EXPECT_EQ(run(faulty_ + crash, "2>/dev/null; exit $?").status, 128 + SIGKILL)
         << "the request does on the command line what it did in the check: " << crash;
 
-    const Json hang = reportOf(faulty_ + "check --timeout 1 --class Faulty_Hang", 1);
-    EXPECT_EQ(hang["findings"].at(0)["check"], "hang");
+    const Json hangs =
+        reportOf(faulty_ + "check --timeout 1 --class Faulty_Hang --class Faulty_HangClosed", 1)["findings"];
+    ASSERT_EQ(hangs.size(), 2U);
+    EXPECT_EQ(hangs[0]["check"], "hang");
+    EXPECT_EQ(hangs[1]["check"], "hang");
 }
 
 TEST_F(TheCheck, FindsNothingInTheExample) {

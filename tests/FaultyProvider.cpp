@@ -6,10 +6,12 @@
 #include <chrono>
 #include <csignal>
 #include <cstddef>
+#include <iostream>
 #include <stdexcept>
 #include <string>
 #include <strings.h>
 #include <thread>
+#include <unistd.h>
 
 static const CMPIBroker* broker;
 
@@ -232,9 +234,17 @@ static CMPIStatus FaultyGetInstance(CMPIInstanceMI*, const CMPIContext*, const C
         if ((target.key != "a" && target.key != "b") || (target.has("UntypedKeys") && !isTyped)) {
             throw Failure{CMPI_RC_ERR_NOT_FOUND};
         }
-        if (target.has("Crash")) {
+        if (target.has("CrashWithChild") && ::fork() == 0) {
+            std::this_thread::sleep_for(std::chrono::minutes(1));
+            std::cerr << "the child is left over\n";
+            ::_exit(0);
+        }
+        if (target.has("Crash") || target.has("CrashWithChild")) {
             std::raise(SIGKILL);
-        } else if (target.has("Hang") && target.key == "a" && properties == nullptr) {
+        } else if (target.begins("Faulty_Hang") && target.key == "a" && properties == nullptr) {
+            if (target.has("HangClosed")) {
+                ::close_range(3, ~0U, 0);
+            }
             std::this_thread::sleep_for(std::chrono::hours(1));
         } else if (target.has("NotACode")) {
             throw Failure{static_cast<CMPIrc>(77)};

@@ -50,7 +50,7 @@ public:
         write("/proc/1/stat", "");
         write("/proc/22/stat", "");
         write("/proc/meminfo", "MemTotal:       16 kB\nMemFree:        8 kB\nSwapTotal:      x kB\n");
-        write("/etc/os-release", "NAME='Test'\nPRETTY_NAME=\"Prüf-OS \\ 1 €\"\n");
+        write("/etc/os-release", "NAME=\"Test\"\nPRETTY_NAME=\"Prüf-OS \\ 1 €\"\n");
         writePort("eth0", "1", "up", "1000", "full");
         write("/sys/class/net/eth0/addr_assign_type", "0");
         write("/sys/class/net/eth0/ifalias", "Büro ☂");
@@ -207,6 +207,9 @@ TEST_F(TheHostProvider, ShowsTheMachine) {
     const std::vector<std::string> wanted = {"Dependent", "NameFormat"};
     EXPECT_EQ(textOf(request_.associators(path(osPath), {}, &wanted)),
               R"(Name="machine" CreationClassName="OXATK_ComputerSystem" NameFormat="HostName" )");
+    write("/etc/os-release", "PRETTY_NAME='It\"s an OS'");
+    const std::string os = textOf(request_.enumerateInstances(path("OXATK_OperatingSystem")));
+    EXPECT_EQ(os.rfind(R"(Caption="It\"s an OS" )", 0), 0U) << os;
 }
 
 TEST_F(TheHostProvider, FindsInstancesByKeysOfEveryUnsignedWidth) {

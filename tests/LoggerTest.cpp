@@ -9,6 +9,7 @@
 #include <stdexcept>
 #include <system_error>
 #include <thread>
+#include <unistd.h>
 #include <vector>
 
 using HVLog::HVLogger;
@@ -78,6 +79,27 @@ TEST_F(TheLogger, DropsWhatItsSinkLogsAndSurvivesWhatItThrows) {
     EXPECT_THROW(log(6000), std::runtime_error);
     EXPECT_THROW(log(6000), std::runtime_error);
     EXPECT_EQ(calls, 2);
+}
+
+TEST_F(TheLogger, LeavesNoFileOpenWhenMemoryRunsOut) {
+    const std::string path = testing::TempDir() + "oxahv-logger-test.log";
+    const auto nextDescriptor = [] {
+        const int next = ::dup(STDIN_FILENO);
+        ::close(next);
+        return next;
+    };
+    const int next = nextDescriptor();
+    bool hasFailed = true;
+    for (unsigned int n = 1; hasFailed; ++n) {
+        failing::allocation(n);
+        try {
+            HVLogger::setFileSink(path);
+        } catch (const std::bad_alloc&) {
+        }
+        hasFailed = failing::ended();
+        EXPECT_EQ(nextDescriptor() == next, hasFailed) << n;
+    }
+    std::remove(path.c_str());
 }
 
 TEST_F(TheLogger, WritesWholeLinesToAFileFromManyThreads) {

@@ -172,6 +172,8 @@ TEST(TheRunner, TellsWhatWentWrongInOneLine) {
     } cases[] = {
         {1, host + port, "CMPI_RC_ERR_NOT_FOUND: no instance of that name"},
         {1, host + "ei CIM_Thing", "CMPI_RC_ERR_INVALID_CLASS: this provider does not serve class CIM_Thing"},
+        {1, host + "ei '\033[mÄ\n\x7f\u009b\xff'", // a terminal gets no control characters of others
+         "CMPI_RC_ERR_INVALID_CLASS: this provider does not serve class ?[mÄ????"},
         {1, host + hostClasses + "cm Else Echo", "CMPI_RC_ERR_INVALID_CLASS: class Else is not declared"},
         {1, test + "gi Demo", "CMPI_RC_ERR_FAILED: the provider returned 0 instances in place of one"},
         {1, host + "--keys chars " + port,
@@ -180,6 +182,8 @@ TEST(TheRunner, TellsWhatWentWrongInOneLine) {
          "CMPI_RC_ERR_FAILED: the broker made no object path"},
         {1, host + "--fault returnObjectPath:1:ERR_ACCESS_DENIED ein OXATK_ComputerSystem",
          "CMPI_RC_ERR_ACCESS_DENIED: the broker did not do what it was asked for"},
+        {1, host + "--fault setPropertyFilter:1 ei OXATK_ComputerSystem --properties Name",
+         "CMPI_RC_ERR_FAILED: the broker did not do what it was asked for"},
         {2, host + "--fault here ein X", "fault 'here' is not SLOT:N[:CODE] with N from 1 on"},
         {2, host + "--fault nothing:1 ein X",
          "there is no slot nothing; name it by table and member, as CMPIObjectPathFT.addKey"},
@@ -202,6 +206,8 @@ TEST(TheRunner, TellsWhatWentWrongInOneLine) {
     for (const auto& c : cases) {
         expectFailure(c.arguments, c.status, c.line);
     }
+    EXPECT_EQ(run(test + "ein Demo", "2>&1 >/dev/full").output,
+              "oxahv-provider: cannot write to the standard output\n");
     // Lines that hold words of others.
     const std::pair<std::string, std::string> parts[] = {
         {"--library /nowhere/libX.so ein X",

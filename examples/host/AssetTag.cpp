@@ -3,10 +3,10 @@
 #include "HostTime.h"
 
 #include <ProviderUtilities.h>
-#include <ctime>
 #include <utils.h>
 
 #include <algorithm>
+#include <ctime>
 #include <cwctype>
 #include <filesystem>
 #include <mutex>

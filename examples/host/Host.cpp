@@ -38,16 +38,23 @@ struct CloseFolder {
     void operator()(DIR* folder) const { ::closedir(folder); }
 };
 
-// The value of a line KEY=VALUE, with quotes or without, or KEY: VALUE unit in a file.
+// The value of a line KEY=VALUE or KEY: VALUE unit in a file, without blanks around it.
 std::string valueOf(std::ifstream file, const std::string& key) {
     for (std::string line; readLine(file, line);) {
         if (line.rfind(key, 0) == 0) {
-            const std::size_t begin = line.find_first_not_of(" \t\"'", key.size());
-            return begin != std::string::npos ? line.substr(begin, line.find_last_not_of("\"' ") + 1 - begin)
+            const std::size_t begin = line.find_first_not_of(" \t", key.size());
+            return begin != std::string::npos ? line.substr(begin, line.find_last_not_of(" \t") + 1 - begin)
                                               : "";
         }
     }
     return "";
+}
+
+// A shell's word without the quotes around it, of either kind.
+std::string unquoted(const std::string& word) {
+    const bool isQuoted =
+        word.size() > 1 && word.front() == word.back() && (word.front() == '"' || word.front() == '\'');
+    return isQuoted ? word.substr(1, word.size() - 2) : word;
 }
 
 // Of /proc/meminfo's "123 kB" the number.
@@ -87,7 +94,7 @@ std::string Host::name() const {
 }
 
 std::string Host::operatingSystemName() const {
-    const std::string name = valueOf(std::ifstream(root_ + "/etc/os-release"), "PRETTY_NAME=");
+    const std::string name = unquoted(valueOf(std::ifstream(root_ + "/etc/os-release"), "PRETTY_NAME="));
     return name.empty() ? "Linux" : name;
 }
 

@@ -4,6 +4,7 @@
 #include "Keys.h"
 
 #include <Utility.h>
+
 #include <ctime>
 
 using TK::Moniker;

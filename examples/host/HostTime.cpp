@@ -1,8 +1,8 @@
 #include "HostTime.h"
 
-#include <cerrno>
 #include <utils.h>
 
+#include <cerrno>
 #include <system_error>
 
 namespace {

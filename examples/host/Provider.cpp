@@ -99,13 +99,34 @@ void require(const CMPIStatus& status) {
     }
 }
 
+namespace {
+
+// As CMPI takes them: a null pointer ends them. They belong to the path.
+std::vector<const char*> keyNames(const CMPIObjectPath* path) {
+    std::vector<const char*> names;
+    for (CMPICount i = 0; i < CMGetKeyCount(path, nullptr); ++i) {
+        CMPIString* name = nullptr;
+        CMGetKeyAt(path, i, &name, nullptr);
+        names.push_back(name != nullptr ? CMGetCharsPtr(name, nullptr) : nullptr);
+        if (names.back() == nullptr) {
+            throw Refusal{CMPI_RC_ERR_FAILED, "the broker did not tell the name of a key"};
+        }
+    }
+    names.push_back(nullptr);
+    return names;
+}
+
+} // namespace
+
 CMPIInstance* newInstance(CMPIObjectPath* path, const char** properties) {
     CMPIInstance* const instance = ProviderUtilities::createInstance(broker, path);
     if (instance == nullptr) {
         throw Refusal{CMPI_RC_ERR_FAILED, "the broker made no instance"};
     }
     if (properties != nullptr) {
-        require(CMSetPropertyFilter(instance, properties, nullptr));
+        // The client asked for some properties only: the broker then drops the others. Keys stay.
+        std::vector<const char*> keys = keyNames(path);
+        require(CMSetPropertyFilter(instance, properties, keys.data()));
     }
     return instance;
 }
