@@ -377,8 +377,8 @@ public:
      */
     void setContextEntry(const std::string& name, const std::string& text);
     /**
-     * Calls the provider's `cleanup`, waits for requests that are inside it, and unloads its library. Not to
-     * be called from a request that is inside it.
+     * Calls the provider's `cleanup` as at a server's end, waits for requests that are inside it, and unloads
+     * its library, whatever `cleanup` answers. Not to be called from a request that is inside it.
      * @throws BrokerError when no such provider is hosted.
      */
     void unload(const std::string& name);
@@ -447,7 +447,8 @@ struct AssociationFilter {
  * Requests nest: an upcall of a provider runs in the request that it serves.
  *
  * The operations find the provider by the class of the path, call its MI function, and collect what it
- * returns. Keys of the path are delivered as the broker's KeyMode says. With declarations, an unknown class
+ * returns. Each asks one provider, the first that serves the class; of several with associations, a request
+ * names the association class of the one that it means. Keys of the path are delivered as the broker's KeyMode says. With declarations, an unknown class
  * answers `CMPI_RC_ERR_INVALID_CLASS`, a method that its class does not have `CMPI_RC_ERR_METHOD_NOT_FOUND`;
  * a class that no provider serves answers `CMPI_RC_ERR_NOT_SUPPORTED`. None of them throws, but for
  * `std::bad_alloc`.
