@@ -448,10 +448,10 @@ struct AssociationFilter {
  *
  * The operations find the provider by the class of the path, call its MI function, and collect what it
  * returns. Each asks one provider, the first that serves the class; of several with associations, a request
- * names the association class of the one that it means. Keys of the path are delivered as the broker's KeyMode says. With declarations, an unknown class
- * answers `CMPI_RC_ERR_INVALID_CLASS`, a method that its class does not have `CMPI_RC_ERR_METHOD_NOT_FOUND`;
- * a class that no provider serves answers `CMPI_RC_ERR_NOT_SUPPORTED`. None of them throws, but for
- * `std::bad_alloc`.
+ * names the association class of the one that it means. Keys of the path are delivered as the broker's
+ * KeyMode says. With declarations, an unknown class answers `CMPI_RC_ERR_INVALID_CLASS`, a method that its
+ * class does not have `CMPI_RC_ERR_METHOD_NOT_FOUND`; a class that no provider serves answers
+ * `CMPI_RC_ERR_NOT_SUPPORTED`. None of them throws, but for `std::bad_alloc`.
  */
 class TK_EXPORT Request {
 public:
