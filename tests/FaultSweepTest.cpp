@@ -16,6 +16,7 @@
 #include <fstream>
 #include <functional>
 #include <gtest/gtest.h>
+#include <iostream>
 #include <locale>
 #include <sstream>
 #include <string>
@@ -368,6 +369,7 @@ protected:
                 points += outcome.isReached ? 1U : 0U;
             }
         }
+        std::cerr << way.name << ": " << points << " points\n";
         EXPECT_GT(points, 90U) << way.name;
     }
 
