@@ -103,7 +103,7 @@ TEST_F(TheLogger, LeavesNoFileOpenWhenMemoryRunsOut) {
 }
 
 TEST_F(TheLogger, WritesWholeLinesToAFileFromManyThreads) {
-    const std::string path = testing::TempDir() + "oxahv-logger-test.log";
+    const std::string path = testing::TempDir() + "oxahv-logger-test-threads.log";
     std::remove(path.c_str());
     HVLogger::setFileSink(path);
     HVLogger::setThreshold(0);

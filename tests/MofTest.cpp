@@ -251,6 +251,12 @@ TEST(Mof, RefusesASuperclassToMany) {
               "t.mof:1:11: class D has more than 1000 superclasses");
 }
 
+#ifdef __SANITIZE_ADDRESS__
+constexpr std::size_t step = 8; // with replacements of seven kinds, still each kind at many places
+#else
+constexpr std::size_t step = 1;
+#endif
+
 // Cut off or damaged at any place, a text is taken or refused, and nothing worse.
 TEST(Mof, OutlivesDamagedTexts) {
     const std::string whole =
@@ -271,7 +277,7 @@ TEST(Mof, OutlivesDamagedTexts) {
         return error;
     };
     EXPECT_EQ(tryText(whole, 0), "no error");
-    for (std::size_t i = 0; i < whole.size(); ++i) {
+    for (std::size_t i = 0; i < whole.size(); i += step) {
         tryText(whole.substr(0, i), i);
         std::string damaged = whole;
         const int byte = static_cast<unsigned char>(whole[i]);
