@@ -80,9 +80,7 @@ public:
     // Frees what was adopted after `mark`, and `mark` itself.
     void freeSince(const Object& mark);
 
-    // The owners of a thread, innermost first.
-    void enter();
-    void leave();
+    // The innermost owner of the calling thread, the broker itself when it has none.
     static Owner& current(Core& core);
 
     // Makes an owner the innermost one of the thread while it lives.
@@ -98,6 +96,9 @@ public:
     };
 
 private:
+    // The owners of a thread, innermost first.
+    void enter();
+    void leave();
     void unlink(Object& object);
 
     Core& core_;

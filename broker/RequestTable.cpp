@@ -9,9 +9,16 @@ namespace oxahv {
 
 namespace {
 
-// Threads. The objects that an attached thread makes die when it is detached.
+// Threads. The objects that an attached thread makes die when it is detached, or ends.
 
-thread_local std::vector<std::unique_ptr<Owner>> attachments;
+struct Attachment {
+    explicit Attachment(Core& core) : owner(core) {}
+
+    Owner owner;
+    Owner::Scope scope{owner};
+};
+
+thread_local std::vector<std::unique_ptr<Attachment>> attachments;
 
 // The new thread's context; it outlives the request that the provider is in.
 CMPIContext* prepareAttachThread(Core& core, const CMPIContext* handle) {
@@ -34,16 +41,14 @@ void requireContext(const CMPIContext* handle) {
 
 void attachThread(Core& core, const CMPIContext* context) {
     requireContext(context);
-    attachments.push_back(std::make_unique<Owner>(core));
-    attachments.back()->enter();
+    attachments.push_back(std::make_unique<Attachment>(core));
 }
 
 void detachThread(Core& core, const CMPIContext* context) {
     requireContext(context);
-    if (attachments.empty() || &attachments.back()->core() != &core) {
+    if (attachments.empty() || &attachments.back()->owner.core() != &core) {
         throw Failure{CMPI_RC_ERR_FAILED};
     }
-    attachments.back()->leave();
     attachments.pop_back();
 }
 

@@ -406,6 +406,23 @@ TEST_F(ARequest, CanBeLeftToAThreadThatIsAttached) {
     EXPECT_EQ(oxahv::pathText(CMGetObjectPath(reply.instances.at(0), nullptr)), "root:Demo.K=1");
 }
 
+// What ends a thread's own values may call the broker still; a sanitizer sees what it must not touch.
+TEST_F(ARequest, MayBeLeftByAThreadThatStaysAttached) {
+    serve = [](const CMPIContext* context, const CMPIResult* /*result*/, const CMPIObjectPath* /*path*/) {
+        CMPIContext* const prepared = broker->bft->prepareAttachThread(broker, context);
+        CMPI_THREAD_KEY_TYPE key = 0;
+        broker->xft->createThreadKey(&key, [](void* /*value*/) { CMNewString(broker, "late", nullptr); });
+        std::thread([&] {
+            broker->xft->setThreadSpecific(key, &key);
+            broker->bft->attachThread(broker, prepared);
+            CMNewString(broker, "text", nullptr);
+        }).join();
+        broker->xft->destroyThreadKey(key);
+        return CMRelease(prepared);
+    };
+    EXPECT_TRUE(request_.getInstance(path("Demo.K=1")).ok());
+}
+
 TEST_F(ARequest, KeepsItsProviderWhileItIsInside) {
     std::promise<void> entered;
     std::promise<void> mayLeave;
