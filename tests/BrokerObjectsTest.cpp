@@ -103,6 +103,8 @@ TEST_F(ABroker, ChecksInstancesAgainstTheirClass) {
     value.uint16 = 7;
     EXPECT_EQ(CMAddKey(path, "Id", &value, CMPI_uint32).rc, CMPI_RC_ERR_TYPE_MISMATCH);
     EXPECT_EQ(CMAddKey(path, "Key", &value, CMPI_uint16).rc, CMPI_RC_ERR_NO_SUCH_PROPERTY);
+    EXPECT_EQ(CMAddKey(path, "Text", "no key", CMPI_chars).rc, CMPI_RC_ERR_NO_SUCH_PROPERTY);
+    EXPECT_EQ(oxahv::valueText({CMPI_chars, CMPI_goodValue, {}}), "?");
     EXPECT_EQ(CMAddKey(path, "id", &value, CMPI_uint16).rc, CMPI_RC_OK);
 
     CMPIInstance* const instance = CMNewInstance(handle_, path, nullptr);

@@ -2,6 +2,7 @@
 #include "TestLocales.h"
 
 #include "EmbeddedBroker.h"
+#include "ErrorOf.h"
 #include "FailingMemory.h"
 
 #include <atomic>
@@ -85,16 +86,6 @@ CMPIMethodMI* createMethodMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*)
 CMPIStatus echo(const CMPIContext* /*context*/, const CMPIResult* result, const CMPIObjectPath* path) {
     CMReturnObjectPath(result, path);
     return CMReturnDone(result);
-}
-
-template <class Operation>
-std::string errorOf(const Operation& operation) {
-    try {
-        operation();
-    } catch (const BrokerError& error) {
-        return error.what();
-    }
-    return "no error";
 }
 
 class ARequest : public testing::Test {

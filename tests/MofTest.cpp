@@ -2,6 +2,7 @@
 #include "TestLocales.h"
 
 #include "EmbeddedBroker.h"
+#include "ErrorOf.h"
 
 #include <algorithm>
 #include <cstdio>
@@ -10,7 +11,6 @@
 #include <iterator>
 #include <sstream>
 
-using oxahv::BrokerError;
 using oxahv::ClassDeclaration;
 using oxahv::DeclaredValue;
 using oxahv::EmbeddedBroker;
@@ -18,16 +18,6 @@ using oxahv::EmbeddedBroker;
 namespace {
 
 const std::string folder = MOF_FIXTURES;
-
-template <class Operation>
-std::string errorOf(const Operation& operation) {
-    try {
-        operation();
-    } catch (const BrokerError& error) {
-        return error.what();
-    }
-    return "no error";
-}
 
 std::string errorOfText(EmbeddedBroker& broker, const std::string& text) {
     return errorOf([&] { broker.compileMofText(text, "t.mof"); });
