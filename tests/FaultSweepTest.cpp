@@ -3,9 +3,7 @@
 // What comes of it has to be what the headers say: the operation's own failure or the exception, outputs and
 // the caller's objects as they were or as far as they came, and nothing of the broker's released. Operations
 // that call the broker once and nothing else are left to their own tests.
-#include "EmbeddedBroker.h"
-#include "FailingMemory.h"
-#include "HVLogger.h"
+#include "FailureWays.h"
 #include "MonikerText.h"
 #include "ProviderUtilities.h"
 #include "Trace.h"
@@ -14,7 +12,6 @@
 
 #include <algorithm>
 #include <fstream>
-#include <functional>
 #include <gtest/gtest.h>
 #include <iostream>
 #include <locale>
@@ -36,8 +33,6 @@ const std::string category("Test.Sweep");
 const std::string longText("a-text-that-does-not-fit-into-a-string-itself");
 const std::wstring wideText(L"a-wide-text-that-does-not-fit-into-a-string");
 const std::string dateText("20260329013000.000250+001");
-
-struct LoggerFailure {};
 
 // A value; the elements of an array are words of their own.
 std::string textOf(const CMPIData& data) {
@@ -279,18 +274,6 @@ const Scenario scenarios[] = {
      }},
 };
 
-enum class Thrown { nothing, badAlloc, byTheLogger };
-
-// A way of failing: what begins it, for the n-th occasion, what ends it and tells whether there was one, and
-// what the operations throw when what they use throws.
-struct Way {
-    std::string name;
-    std::function<void(unsigned int n)> begin;
-    std::function<bool(unsigned int n)> end;
-    Thrown thrown = Thrown::nothing;
-    bool isHarmless = false;
-};
-
 // What an attempt came to.
 struct Outcome {
     std::string result;
@@ -356,7 +339,8 @@ void check(const Scenario& scenario, const Way& way, const Outcome& outcome, con
 class TheFaultSweep : public testing::Test {
 protected:
     void sweep(const Way& way) {
-        const Way none = {"", [](unsigned int) {}, [](unsigned int) { return false; }};
+        const Way none = {"", Thrown::nothing, false, [](unsigned int) {},
+                          [](unsigned int) { return false; }};
         unsigned int points = 0;
         for (const Scenario& scenario : scenarios) {
             const Outcome whole = attempt(scenario, none, 1);
@@ -373,19 +357,7 @@ protected:
         EXPECT_GT(points, 90U) << way.name;
     }
 
-    // Lets the logger take every trace, and throw at the n-th; never at 0.
-    void log(unsigned int n) {
-        loggerCalls_ = 0;
-        HVLog::HVLogger::setSink([this, n](const HVLog::Message& /*message*/) {
-            if (++loggerCalls_ == n) {
-                throw LoggerFailure();
-            }
-        });
-        HVLog::HVLogger::setThreshold(0);
-    }
-
     oxahv::EmbeddedBroker broker_;
-    unsigned int loggerCalls_ = 0;
 
 private:
     Outcome attempt(const Scenario& scenario, const Way& way, unsigned int n) {
@@ -452,38 +424,13 @@ TEST_F(TheFaultSweep, FailsEveryAllocationOfTheFirstLocalisedText) {
 }
 
 TEST_F(TheFaultSweep, FailsEveryCallOfTheBroker) {
-    constexpr CMPIValueState others = CMPI_keyValue | CMPI_badValue | CMPI_notFound;
-    const struct {
-        const char* name;
-        oxahv::Fault fault;
-    } kinds[] = {
-        {"error code", {CMPI_RC_ERR_FAILED}},
-        {"error code from then on", {CMPI_RC_ERR_FAILED, false, 0, 1, 0}},
-        {"null with OK", {CMPI_RC_OK, true}},
-        {"NULL state", {CMPI_RC_OK, false, CMPI_nullValue}},
-        {"extra state bits", {CMPI_RC_OK, false, others}},
-    };
-    for (const auto& kind : kinds) {
-        const auto begin = [&](unsigned int n) {
-            oxahv::Fault fault = kind.fault;
-            fault.firstCall = n;
-            broker_.injectFault("*", fault);
-            broker_.startRecording();
-        };
-        const auto end = [&](unsigned int n) {
-            const std::vector<oxahv::Call> calls = broker_.stopRecording();
-            broker_.clearFaults();
-            for (const oxahv::Call& call : calls) {
-                EXPECT_EQ(call.slot.find("elease"), std::string::npos) << call.slot;
-                EXPECT_EQ(call.slot.find("free"), std::string::npos) << call.slot;
-            }
-            return calls.size() >= n;
-        };
-        sweep({kind.name, begin, end, Thrown::nothing, kind.fault.stateBits == others});
+    for (const Way& way : waysOfTheBroker(broker_)) {
+        sweep(way);
     }
 }
 
-// With a plain global locale and with one that groups digits, where numbers go through streams.
+// With a plain global locale and with one that groups digits, where numbers go through streams; with and
+// without traces.
 TEST_F(TheFaultSweep, FailsEveryAllocation) {
     struct Grouping : std::numpunct<char> {
         std::string do_grouping() const override { return "\3"; }
@@ -491,32 +438,25 @@ TEST_F(TheFaultSweep, FailsEveryAllocation) {
     const std::locale plain = std::locale();
     for (const std::locale& locale : {plain, std::locale(plain, new Grouping)}) {
         std::locale::global(locale);
-        for (const bool once : {true, false}) {
-            for (const bool traces : {false, true}) {
-                const auto begin = [&](unsigned int n) {
-                    log(0);
-                    if (!traces) {
-                        HVLog::HVLogger::setThreshold(HVLog::HVLogger::off);
-                    }
-                    once ? failing::allocation(n) : failing::allocationsFrom(n);
-                };
-                const auto end = [](unsigned int /*n*/) {
-                    const bool isReached = failing::ended();
-                    HVLog::HVLogger::reset();
-                    return isReached;
-                };
-                sweep({once ? "allocation" : "allocations from", begin, end, Thrown::badAlloc});
-            }
+        for (const Way& way : waysOfMemory()) {
+            sweep(way);
+            Way traced = way;
+            traced.begin = [&way](unsigned int n) {
+                HVLog::HVLogger::setSink([](const HVLog::Message& /*message*/) {});
+                HVLog::HVLogger::setThreshold(0);
+                way.begin(n);
+            };
+            traced.end = [&way](unsigned int n) {
+                const bool isReached = way.end(n);
+                HVLog::HVLogger::reset();
+                return isReached;
+            };
+            sweep(traced);
         }
     }
     std::locale::global(plain);
 }
 
 TEST_F(TheFaultSweep, FailsEveryCallOfTheLogger) {
-    const auto begin = [this](unsigned int n) { log(n); };
-    const auto end = [this](unsigned int n) {
-        HVLog::HVLogger::reset();
-        return loggerCalls_ >= n;
-    };
-    sweep({"call of the logger", begin, end, Thrown::byTheLogger});
+    sweep(wayOfTheLogger());
 }

@@ -2,9 +2,7 @@
 // in the "C" locale, as many CIM servers' do.
 #include "HostProvider.h"
 #include "AssetTag.h"
-#include "EmbeddedBroker.h"
-#include "FailingMemory.h"
-#include "HVLogger.h"
+#include "FailureWays.h"
 #include "HostTime.h"
 #include "Keys.h"
 
@@ -13,12 +11,10 @@
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
-#include <functional>
 #include <gtest/gtest.h>
 #include <thread>
 #include <unistd.h>
 
-using oxahv::Fault;
 using oxahv::KeyMode;
 using oxahv::Reply;
 using oxahv::Request;
@@ -339,17 +335,6 @@ TEST_F(TheHostProvider, AnswersWhatItCannotDoWithItsCode) {
     EXPECT_THROW(host(faulty), oxahv::BrokerError);
 }
 
-namespace {
-
-// Something below the provider that fails at its n-th use.
-struct Breakage {
-    enum Kind { inBroker, ofMemory, ofLogger } kind;
-    std::function<void(unsigned int n)> begin;
-    std::function<bool(unsigned int n)> end; // whether it was used so often
-};
-
-} // namespace
-
 TEST_F(TheHostProvider, AnswersWithACodeWhateverFailsBelowIt) {
     const std::size_t before = broker_.liveObjects().total();
     const struct {
@@ -372,70 +357,39 @@ TEST_F(TheHostProvider, AnswersWithACodeWhateverFailsBelowIt) {
         {systemPath, [](auto& request, auto* system,
                         auto* in) { return request.invokeMethod(system, "SetAssetTag", in); }},
     };
-    const auto endMemory = [](unsigned int /*n*/) { return failing::ended(); };
-    unsigned int logged = 0;
-    std::vector<Breakage> breakages = {{Breakage::ofMemory, failing::allocation, endMemory},
-                                       {Breakage::ofMemory, failing::allocationsFrom, endMemory},
-                                       {Breakage::ofLogger,
-                                        [&](unsigned int n) {
-                                            logged = 0;
-                                            HVLog::HVLogger::setSink(
-                                                [&logged, n](const HVLog::Message& /*message*/) {
-                                                    if (++logged == n) {
-                                                        throw std::runtime_error("logger");
-                                                    }
-                                                });
-                                            HVLog::HVLogger::setThreshold(0);
-                                        },
-                                        [&](unsigned int n) {
-                                            HVLog::HVLogger::reset();
-                                            return logged >= n;
-                                        }}};
-    for (const Fault& kind :
-         {Fault{CMPI_RC_ERR_FAILED}, Fault{CMPI_RC_OK, true}, Fault{CMPI_RC_OK, false, CMPI_nullValue},
-          Fault{CMPI_RC_OK, false, CMPI_badValue}}) {
-        breakages.push_back({Breakage::inBroker,
-                             [this, fault = kind](unsigned int n) mutable {
-                                 fault.firstCall = n;
-                                 broker_.injectFault("*", fault);
-                                 broker_.startRecording();
-                             },
-                             [this](unsigned int n) {
-                                 broker_.clearFaults();
-                                 return broker_.stopRecording().size() >= n;
-                             }});
+    std::vector<Way> ways = waysOfTheBroker(broker_);
+    for (const Way& way : waysOfMemory()) {
+        ways.push_back(way);
     }
+    ways.push_back(wayOfTheLogger());
     for (const auto& operation : operations) {
         SCOPED_TRACE(operation.path);
-        std::string whole;
+        Request caller(broker_);
+        const CMPIObjectPath* const target = caller.objectPathFromText(operation.path, "root/cimv2");
+        const CMPIArgs* const in = argument("tag");
+        const std::string whole = textOf(operation.send(caller, target, in));
         unsigned int failures = 0;
-        for (const Breakage& breakage : breakages) {
+        for (const Way& way : ways) {
             bool isReached = true;
-            for (unsigned int n = 0; isReached; ++n) { // 0: nothing fails
-                SCOPED_TRACE(n);
+            for (unsigned int n = 1; isReached; ++n) {
+                SCOPED_TRACE(way.name + ' ' + std::to_string(n));
                 Request request(broker_);
-                const CMPIObjectPath* const target = request.objectPathFromText(operation.path, "root/cimv2");
-                const CMPIArgs* const in = argument("tag");
                 Reply reply;
-                breakage.begin(n == 0 ? 100000 : n);
+                way.begin(n);
                 try {
                     reply = operation.send(request, target, in);
-                    isReached = breakage.end(n);
                 } catch (const std::bad_alloc&) { // the broker itself had no room for the reply
-                    isReached = breakage.end(n);
-                    continue;
+                    reply.code = CMPI_RC_ERR_FAILED;
                 }
+                isReached = way.end(n);
                 const std::string shown = textOf(reply);
-                whole = n == 0 ? shown : whole;
-                isReached = isReached || n == 0;
                 EXPECT_NE(reply.message.rfind("exception", 0), 0U) << reply.message;
-                EXPECT_TRUE(reply.ok() || (isReached && n != 0));
-                EXPECT_TRUE(shown == whole || isReached);
+                EXPECT_TRUE(isReached || (reply.ok() && shown == whole));
                 failures += reply.ok() ? 0 : 1;
-                if (breakage.kind == Breakage::ofMemory && reply.ok() && !failing::failedIn("oxahvbroker")) {
+                if (way.thrown == Thrown::badAlloc && reply.ok() && !failing::failedIn("oxahvbroker")) {
                     EXPECT_EQ(shown, whole) << "a failed allocation was swallowed";
                 }
-                if (breakage.kind == Breakage::ofLogger && isReached && n != 0) {
+                if (way.thrown == Thrown::byTheLogger && isReached) {
                     EXPECT_EQ(reply.code, CMPI_RC_ERR_FAILED);
                 }
             }
