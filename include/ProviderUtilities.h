@@ -170,11 +170,11 @@ public:
     /** A text property, as the broker's own string. */
     static bool getProperty(const CMPIInstance* instance, const char* name, CMPIString** out);
 
-    /** A argument of CIM type `uint16`. */
+    /** An argument of CIM type `uint16`. */
     static bool getProperty(const CMPIArgs* args, const char* name, unsigned short& out);
-    /** A argument of CIM type `uint32`. */
+    /** An argument of CIM type `uint32`. */
     static bool getProperty(const CMPIArgs* args, const char* name, unsigned int& out);
-    /** A argument of CIM type `boolean`. */
+    /** An argument of CIM type `boolean`. */
     static bool getProperty(const CMPIArgs* args, const char* name, bool& out);
     /** @} */
 
@@ -229,9 +229,9 @@ public:
      * change the vector. They trace the number of elements; the first three also trace entry and exit with
      * the vector's address, which the one for `std::string` leaves out for the property "UserPassword".
      *
-     * The getters **append** to `out`. They return false when the property is NULL or no array, or cannot be
-     * read; an element that cannot be read is left out. They look at no element's type or state, and do not
-     * trace.
+     * The getters **append** to `out`. They return false when the property is NULL or no array, whatever the
+     * broker's status; an element that cannot be read is left out. They look at no element's type or state,
+     * and do not trace.
      *
      * @throws std::bad_alloc what a getter has appended until then stays
      */
@@ -246,7 +246,7 @@ public:
     static void setProperty(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
                             std::vector<std::string>& value);
     /** As `CMPI_stringA`. A text that the locale cannot convert becomes an empty one. **Traces every text**,
-     * whatever the property. */
+     * whatever the property, and each conversion. */
     static void setProperty(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
                             std::vector<std::wstring>& value);
     /** A property of CIM type `uint16[]`. */
@@ -265,7 +265,7 @@ public:
      *     <  http:  https:  %  $  \\  www.  wap.  ftp:  sftp:  :  \
      *
      * It is a screen and not a proof: what it accepts still has to be quoted for wherever it goes. Letters
-     * are folded by `tolower` (C) in the process's locale. Does not trace.
+     * are folded by `tolower` (C) in the calling thread's locale. Does not trace.
      *
      * @param text the text.
      * @param exemption one of the above, exactly as written; neither it nor **any that stands behind it** is
@@ -349,7 +349,8 @@ public:
 
     /** @name Class registry
      * Class ids are the agent's numbers for its CIM classes. 0 stands for no name, 255 for a name that the
-     * registry does not know. Names compare as `strcasecmp` (POSIX) does, in the process's locale.
+     * registry does not know. Names compare as `strcasecmp` (POSIX) does, in the calling thread's
+     * locale.
      */
     /** @{ */
     /** The id of a class. @param name its name; may be null. @return its id, 0 for null, 255 for an unknown
@@ -372,7 +373,8 @@ public:
      * @param nameSpace the namespace of all of them.
      * @param candidates the names of the classes in question; not changed.
      * @param ancestor the name of the other class.
-     * @return false also when there is no candidate or the broker reports an error.
+     * @return false also when there is no candidate. One for which the broker reports an error counts as not
+     * related.
      * @throws std::bad_alloc
      */
     static bool areClassesRelated(const CMPIBroker* broker, const std::string& nameSpace,
@@ -392,7 +394,8 @@ public:
     /** @} */
 
     /**
-     * Creates an object path without keys. Traces its parameters on entry and exit, and the class.
+     * Creates an object path without keys. Traces its parameters on entry and exit, the class, and that a
+     * path was made.
      * @param classname the class's name; a null pointer is passed on for the broker to judge.
      * @param nameSpace the namespace.
      * @return the path, which belongs to the request; null when the broker refuses.

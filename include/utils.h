@@ -80,8 +80,8 @@ public:
     /** @} */
 
     /** @name Reading a field of a property file
-     * One call of the file's `getEntry` each. What the file holds no usable value for reads as a default: the
-     * empty text, 0, or 1970-01-01 00:00:00.
+     * One call of the file's `getEntry` each. A key without a value reads as the empty text, 0, or 1970-01-01
+     * 00:00:00; a value that is no number as 0.
      *
      * @param file the file.
      * @param key the key; any text.

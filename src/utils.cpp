@@ -81,6 +81,7 @@ char* write(char* to, unsigned int number, std::ptrdiff_t width) {
 
 TK::DateTime Utils::convertStringToDateTime(std::string text) {
     TK_TRACE_ENTERING(loggerUtils);
+    TK::DateTime date;
     // All fields are read before any is set: reading is what can throw.
     const auto year = orDefault(read<unsigned short>(text, yearField), defaultYear);
     const auto month = orDefault(read<unsigned char>(text, monthField), defaultMonthOrDay);
@@ -90,7 +91,6 @@ TK::DateTime Utils::convertStringToDateTime(std::string text) {
     const auto second = read<unsigned char>(text, secondField);
     const auto millisecond = read<unsigned int>(text, millisecondField);
     const auto offset = read<short>(text, offsetField);
-    TK::DateTime date;
     date.setYear(year);
     date.setMonth(month);
     date.setDay(day);

@@ -34,7 +34,8 @@ public:
      * @param format the code of the text's form. There is one, 3: the text that the conversion to
      * `std::string` writes, each number with at least the digits shown there.
      * @throws std::invalid_argument when the text does not have the form, a number does not fit into its
-     * field, or the code is none; what() holds the text or the code. std::bad_alloc
+     * field, or the code is none; what() holds the text or the code.
+     * @throws std::bad_alloc
      */
     DateTime(const std::string& text, unsigned int format);
 

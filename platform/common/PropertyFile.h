@@ -48,7 +48,8 @@ public:
     /**
      * Reads a file as load() does.
      * @param path the file's path, absolute unless the process stays in its folder.
-     * @throws std::system_error when the file exists but cannot be read. std::bad_alloc
+     * @throws std::system_error when the file exists but cannot be read.
+     * @throws std::bad_alloc
      */
     explicit PropertyFile(std::string path);
 
@@ -73,8 +74,8 @@ public:
 
     /**
      * Reads the file anew; changes that were not saved are lost. A file that does not exist is an empty one.
-     * @throws std::system_error when the file exists but cannot be read, std::bad_alloc; the entries are then
-     * as before.
+     * @throws std::system_error when the file exists but cannot be read; the entries are then as before.
+     * @throws std::bad_alloc likewise.
      */
     void load();
 
@@ -86,7 +87,8 @@ public:
      *
      * @throws std::system_error when it cannot be written; the earlier file is then untouched, unless its
      * folder alone could not be synchronised: then the new content is in place but may not outlive a power
-     * failure. std::bad_alloc
+     * failure.
+     * @throws std::bad_alloc
      */
     void save();
 

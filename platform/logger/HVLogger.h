@@ -88,7 +88,8 @@ public:
     static void setStderrSink();
     /**
      * Appends a line per message to a file, which is created when it is missing.
-     * @throws std::system_error when the file cannot be opened, std::bad_alloc; the earlier sink then stays.
+     * @throws std::system_error when the file cannot be opened; the earlier sink then stays.
+     * @throws std::bad_alloc likewise.
      */
     static void setFileSink(const std::string& path);
     /** @} */
