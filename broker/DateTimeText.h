@@ -8,8 +8,8 @@
 
 namespace oxahv {
 
-// Whether a text is one of the two forms. Digits may be asterisks, whole fields from the least significant
-// on.
+// Whether a text is one of the two forms. Digits may be asterisks from the least significant on: whole
+// fields, and of the fraction single ones.
 bool isDateTimeText(std::string_view text);
 bool isIntervalText(std::string_view text);
 

@@ -304,8 +304,10 @@ public:
     /** @name Classes */
     /** @{ */
     /**
-     * Declares a class. As soon as one class is declared, classes, properties, keys, their types and methods
-     * are checked against the declarations; without any the broker takes what comes.
+     * Declares a class. As soon as one class is declared, the class of a request and of a new instance,
+     * properties and keys with their types, methods and their input arguments are checked against the
+     * declarations; without any the broker takes what comes. A path alone may name a class that is not
+     * declared, since a reference may lead to one.
      * @throws BrokerError when the superclass is not declared, the class already is, a property or method
      * stands twice, or an inherited one is redeclared with another type.
      */

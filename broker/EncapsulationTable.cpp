@@ -202,8 +202,11 @@ std::string insertionOf(std::va_list& list) {
     case CMPI_uint64:
         return std::to_string(va_arg(list, unsigned long long));
     case CMPI_real32:
-    case CMPI_real64:
-        return std::to_string(va_arg(list, double));
+    case CMPI_real64: {
+        CMPIData real = {CMPI_real64, CMPI_goodValue, {}};
+        real.value.real64 = va_arg(list, double);
+        return valueText(real);
+    }
     default:
         throw Failure{CMPI_RC_ERR_INVALID_DATA_TYPE};
     }

@@ -3,6 +3,7 @@
 #include "Core.h"
 
 #include <algorithm>
+#include <cxxabi.h>
 #include <dlfcn.h>
 #include <future>
 
@@ -95,6 +96,8 @@ CMPIStatus guarded(const Function& function, std::string& message) {
     } catch (const std::exception& exception) {
         message = std::string("exception: ") + exception.what();
         return thrown;
+    } catch (const abi::__forced_unwind&) { // the thread ends
+        throw;
     } catch (...) {
         message = "exception of an unknown kind";
         return thrown;
@@ -507,6 +510,21 @@ Reply Hosting::referenceNames(const CMPIContext* context, const CMPIObjectPath* 
         filter.resultClass);
 }
 
+// Why a declared method does not take its arguments; empty when it does.
+static std::string complaintAbout(const MethodDeclaration& method, const Arguments& in) {
+    for (const NamedValue& argument : in.values) {
+        const ParameterDeclaration* const parameter = method.find(argument.name);
+        if (parameter == nullptr || !parameter->isIn) {
+            return "method " + method.name + " takes no argument " + argument.name;
+        }
+        if (!argument.value.isNull() && argument.value.type() != storedType(parameter->type)) {
+            return "argument " + argument.name + " of method " + method.name + " is no " +
+                   declaredTypeName(parameter->type);
+        }
+    }
+    return {};
+}
+
 Reply Hosting::invokeMethod(const CMPIContext* context, const CMPIObjectPath* path, const char* method,
                             const CMPIArgs* in) {
     if (in != nullptr && Arguments::of(in) == nullptr) {
@@ -514,12 +532,15 @@ Reply Hosting::invokeMethod(const CMPIContext* context, const CMPIObjectPath* pa
     }
     const CMPIArgs* const given = in != nullptr ? in : handOut(std::make_unique<Arguments>(core_));
     CMPIArgs* const out = handOut(std::make_unique<Arguments>(core_));
-    Reply reply;
     const ObjectPath* const target = ObjectPath::of(path);
     const auto declared = target != nullptr ? core_.classes.find(target->className) : nullptr;
-    if (declared != nullptr && declared->findMethod(method) == nullptr) {
-        reply.code = CMPI_RC_ERR_METHOD_NOT_FOUND;
-        reply.message = "class " + declared->name + " has no method " + method;
+    const MethodDeclaration* const wanted = declared != nullptr ? declared->findMethod(method) : nullptr;
+    const std::string complaint = wanted != nullptr ? complaintAbout(*wanted, *Arguments::of(given)) : "";
+    Reply reply;
+    if (declared != nullptr && wanted == nullptr) {
+        reply = refused(CMPI_RC_ERR_METHOD_NOT_FOUND, "class " + declared->name + " has no method " + method);
+    } else if (!complaint.empty()) {
+        reply = refused(CMPI_RC_ERR_INVALID_PARAMETER, complaint);
     } else {
         reply = request<CMPIMethodMI>(
             context, path, [&](auto* mi, const CMPIResult* result, const CMPIObjectPath* delivered) {

@@ -350,12 +350,19 @@ public:
     Value messageArguments;
 };
 
+// What a CMPIGcStat is here: a record like the others, so that it is told from them.
+struct MarkRecord {
+    void* hdl;
+    const char* ft;
+};
+
 // A position in an owner's list of objects, for CMPIBrokerMemFT.
-class Mark : public Object {
+class Mark : public RecordedObject<MarkRecord, Kind::other, Mark> {
 public:
-    explicit Mark(Core& core) : Object(core, Kind::other) {}
+    static constexpr char table = 0;
+
+    explicit Mark(Core& core) : RecordedObject(core) {}
     std::unique_ptr<Object> clone() const override { throw Failure{CMPI_RC_ERR_NOT_SUPPORTED}; }
-    void* record() override { return this; }
 };
 
 // The object of a handle of any kind; null for what is none.

@@ -21,16 +21,12 @@ struct Attachment {
 thread_local std::vector<std::unique_ptr<Attachment>> attachments;
 
 // The new thread's context; it outlives the request that the provider is in.
-CMPIContext* prepareAttachThread(Core& core, const CMPIContext* handle) {
+CMPIContext* prepareAttachThread(Core& /*core*/, const CMPIContext* handle) {
     const Context* const context = Context::of(handle);
     if (context == nullptr) {
         throw Failure{CMPI_RC_ERR_INVALID_HANDLE};
     }
-    auto copy = std::make_unique<Context>(core);
-    copy->values = context->values;
-    Context* const prepared = copy.get();
-    core.clones.adopt(std::move(copy));
-    return prepared;
+    return cloneObject(*context);
 }
 
 void requireContext(const CMPIContext* handle) {

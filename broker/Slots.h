@@ -9,6 +9,7 @@
 #include "Core.h"
 
 #include <cstring>
+#include <cxxabi.h>
 #include <new>
 #include <tuple>
 #include <type_traits>
@@ -89,10 +90,12 @@ Result failed(CMPIStatus& status, CMPIrc code) {
 struct CallDescription {
     Call call;
     const CMPIValue* value = nullptr;
+    unsigned int texts = 0;
 
     void add(const char* text) {
-        if (text != nullptr) {
-            (call.name.empty() ? call.name : call.secondName) = text;
+        const unsigned int position = texts++;
+        if (text != nullptr && position < 2) {
+            (position == 0 ? call.name : call.secondName) = text;
         }
     }
     void add(CMPICount index) { call.index = index; }
@@ -143,7 +146,9 @@ private:
             return failed<Return>(status, failure.code);
         } catch (const std::bad_alloc&) {
             return failed<Return>(status, CMPI_RC_ERROR_SYSTEM);
-        } catch (const std::exception&) { // such as a message handler's
+        } catch (const abi::__forced_unwind&) { // the thread ends
+            throw;
+        } catch (...) { // such as a message handler's
             return failed<Return>(status, CMPI_RC_ERR_FAILED);
         }
     }
@@ -166,7 +171,7 @@ private:
         (description.add(rest), ...);
         const Fault fault = hooks.strike(index);
         if constexpr (std::is_void_v<Return>) {
-            if (fault.code == CMPI_RC_OK) {
+            if (fault.code == CMPI_RC_OK && !fault.yieldsNull) {
                 run(self, status, rest...);
             }
             finish(hooks, description, handle, status);

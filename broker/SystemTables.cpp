@@ -175,15 +175,15 @@ int signalCondition(CMPI_COND_TYPE condition) {
 // Memory. Blocks are their caller's until cmpiFree.
 
 CMPIGcStat* mark(Core& core) {
-    Mark* const mark = handOut(std::make_unique<Mark>(core));
+    MarkRecord* const mark = handOut(std::make_unique<Mark>(core));
     return reinterpret_cast<CMPIGcStat*>(mark);
 }
 
 void releaseSince(Core& /*core*/, const CMPIGcStat* gcStat) {
-    if (gcStat == nullptr) {
+    const Mark* const mark = Mark::of(reinterpret_cast<const MarkRecord*>(gcStat));
+    if (mark == nullptr) {
         throw Failure{CMPI_RC_ERR_INVALID_HANDLE};
     }
-    const auto* const mark = reinterpret_cast<const Mark*>(gcStat);
     mark->owner()->freeSince(*mark);
 }
 

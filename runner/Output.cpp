@@ -2,6 +2,7 @@
 
 #include "Values.h"
 
+#include <charconv>
 #include <nlohmann/json.hpp>
 
 namespace {
@@ -9,6 +10,14 @@ namespace {
 using Json = nlohmann::ordered_json;
 
 Json jsonOf(const CMPIData& data);
+
+// The double that is written as shortly as the number is: 0.1, not 0.10000000149011612.
+double shortest(const CMPIData& real) {
+    const std::string text = oxahv::valueText(real);
+    double number = 0;
+    std::from_chars(text.data(), text.data() + text.size(), number);
+    return number;
+}
 
 Json jsonOfArray(const CMPIArray* array) {
     Json elements = Json::array();
@@ -47,7 +56,7 @@ Json jsonOf(const CMPIData& data) {
     case CMPI_sint64:
         return data.value.sint64;
     case CMPI_real32:
-        return data.value.real32;
+        return shortest(data);
     case CMPI_real64:
         return data.value.real64;
     case CMPI_string:
