@@ -11,29 +11,27 @@ static const std::string category("Demo.Port");
 // README begins
 CMPIStatus PortGetInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
                            const CMPIObjectPath* path, const char**) try {
-    using TK::ProviderUtilities;
+    using PU = TK::ProviderUtilities;
     TK_TRACE_ENTERING_PARAMETERS(category, " path=" << path);
     TK::Moniker keys;
-    ProviderUtilities::transformObjectPathToMoniker(path, keys);
+    PU::transformObjectPathToMoniker(path, keys);
     std::string name;
-    if (keys.selectKey(0)) {
-        keys.getValue(name); // throws when the client sent a key that is no text
-    }
+    keys.selectKey(0);
+    keys.getValue(name); // throws when the client sent no key, or one that is no text
     if (name != "eth0") {
         CMReturn(CMPI_RC_ERR_NOT_FOUND);
     }
-    CMPIObjectPath* reply = ProviderUtilities::createObjectPath(broker, "OXATK_EthernetPort",
-                                                                ProviderUtilities::getNamespace(path));
+    CMPIObjectPath* reply = PU::createObjectPath(broker, "OXATK_EthernetPort", PU::getNamespace(path));
     if (reply == nullptr) {
         CMReturn(CMPI_RC_ERR_FAILED);
     }
-    ProviderUtilities::transformMonikerToObjectPath(keys, &reply);
-    CMPIInstance* port = ProviderUtilities::createInstance(broker, reply);
+    PU::transformMonikerToObjectPath(keys, &reply);
+    CMPIInstance* port = PU::createInstance(broker, reply);
     if (port == nullptr) {
         CMReturn(CMPI_RC_ERR_FAILED);
     }
-    ProviderUtilities::setProperty(port, "ElementName", name);
-    ProviderUtilities::setProperty(port, "Speed", 1'000'000'000ULL);
+    PU::setProperty(port, "ElementName", name);
+    PU::setProperty(port, "Speed", 1'000'000'000ULL);
     TK_TRACE_EXITING(category);
     CMReturnInstance(result, port);
     return CMReturnDone(result);
