@@ -12,6 +12,7 @@
 #include <cstddef>
 #include <gtest/gtest.h>
 #include <stdexcept>
+#include <string>
 #include <string_view>
 #include <type_traits>
 
@@ -233,14 +234,30 @@ static_assert(return_<CMPIBoolean, &CMPIBrokerEncFT::classPathIsA, &CMPIBrokerEn
 static_assert(return_<CMPIType, &CMPIArrayFT::getSimpleType> &&
               return_<CMPIUint64, &CMPIDateTimeFT::getBinaryFormat>);
 static_assert(return_<CMPI_CONST_SINCE_210 char*, &CMPIStringFT::getCharPtr>);
+static_assert(are<CMPIVersion, decltype(CMPIBrokerFT::brokerVersion), decltype(CMPIBrokerEncFT::ftVersion),
+                  decltype(CMPIBrokerExtFT::ftVersion), decltype(CMPIBrokerMemFT::ftVersion)>);
+static_assert(are<unsigned int, decltype(CMPIBrokerFT::brokerCapabilities)>);
 #if CMPI_VERSION >= 210
-static_assert(return_<CMPIBoolean, &CMPIPropertyListFT::isPropertyInList, &CMPIEnumerationFilterFT::match>);
+// What has no function behind it.
+#define REQUEST_OF(kind) CMPI##kind##MI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*
+#define FILTER const char**, const char*, const char*
+static_assert(are<decltype(CMPIInstanceMIFT::enumerateInstancesFiltered),
+                  CMPIStatus (*)(REQUEST_OF(Instance), FILTER, CMPIStatus*)>);
+static_assert(are<decltype(CMPIAssociationMIFT::associatorsFiltered),
+                  CMPIStatus (*)(REQUEST_OF(Association), const char*, const char*, const char*, const char*,
+                                 FILTER, CMPIBoolean)>);
+static_assert(are<decltype(CMPIAssociationMIFT::referencesFiltered),
+                  CMPIStatus (*)(REQUEST_OF(Association), const char*, const char*, FILTER, CMPIBoolean)>);
+static_assert(are<decltype(CMPIEnumerationFilterFT::match),
+                  CMPIBoolean (*)(const CMPIEnumerationFilter*, const CMPIInstance*, CMPIStatus*)>);
+static_assert(return_<CMPIBoolean, &CMPIPropertyListFT::isPropertyInList>);
 #endif
 
 // A provider as a class, which fails whatever it is asked for.
 
 bool constructorFails = false;
 int aliveProviders = 0;
+std::string calledFunctions;
 
 class Provider {
 public:
@@ -257,8 +274,20 @@ public:
 #define FAILS(function)                     \
     template <class... Parameters>          \
     CMPIStatus function(Parameters...) {    \
+        calledFunctions += #function " ";   \
         throw std::runtime_error("failed"); \
     }
+    FAILS(enumerateInstanceNames)
+    FAILS(enumerateInstances)
+    FAILS(getInstance)
+    FAILS(createInstance)
+    FAILS(modifyInstance)
+    FAILS(deleteInstance)
+    FAILS(execQuery)
+    FAILS(associators)
+    FAILS(associatorNames)
+    FAILS(references)
+    FAILS(referenceNames)
     FAILS(invokeMethod)
     FAILS(setProperty)
     FAILS(getProperty)
@@ -270,9 +299,22 @@ public:
     FAILS(disableIndications)
 };
 
+template <class MI, class Table, class... Parameters>
+void callSlot(MI* mi, CMPIStatus (*Table::*slot)(MI*, Parameters...)) {
+    if (mi->ft->*slot != nullptr) { // the filtered requests have no function
+        EXPECT_EQ((mi->ft->*slot)(mi, Parameters{}...).rc, CMPI_RC_ERR_FAILED);
+    }
+}
+template <class MI, auto... slots>
+void callSlots(MI* mi, Slots<slots...> /*of the table*/) {
+    (callSlot(mi, slots), ...);
+}
+
 } // namespace
 
 CMProviderBase(TestProvider)
+CMInstanceMIFactory(Provider, TestProvider)
+CMAssociationMIFactory(Provider, TestProvider)
 CMMethodMIFactory(Provider, TestProvider)
 CMPropertyMIFactory(Provider, TestProvider)
 CMIndicationMIFactory(Provider, TestProvider)
@@ -287,21 +329,34 @@ TEST(AProviderFactory, SharesOneObjectAmongTheKindsOfOneName) {
     constructorFails = false;
     CMPIMethodMI* const methods = TestProvider_Create_MethodMI(nullptr, nullptr, &status);
     EXPECT_EQ(status.rc, CMPI_RC_OK);
-    CMPIPropertyMI* const properties = TestProvider_Create_PropertyMI(nullptr, nullptr, nullptr);
-    CMPIIndicationMI* const indications = TestProvider_Create_IndicationMI(nullptr, nullptr, nullptr);
+    CMPIInstanceMI* const instances = TestProvider_Create_InstanceMI(nullptr, nullptr, nullptr);
     CMPIMethodMI* const others = OtherProvider_Create_MethodMI(nullptr, nullptr, nullptr);
     EXPECT_EQ(aliveProviders, 2);
     EXPECT_STREQ(methods->ft->miName, "methodTestProvider");
     EXPECT_STREQ(others->ft->miName, "methodOtherProvider");
-    EXPECT_EQ(properties->ft->getProperty(properties, nullptr, nullptr, nullptr, nullptr).rc,
-              CMPI_RC_ERR_FAILED);
-    EXPECT_EQ(indications->ft->enableIndications(indications, nullptr).rc, CMPI_RC_ERR_FAILED);
 
     others->ft->cleanup(others, nullptr, 0);
     EXPECT_EQ(aliveProviders, 1);
-    properties->ft->cleanup(properties, nullptr, 0);
-    indications->ft->cleanup(indications, nullptr, 0);
+    instances->ft->cleanup(instances, nullptr, 0);
     EXPECT_EQ(aliveProviders, 1);
     EXPECT_EQ(methods->ft->cleanup(methods, nullptr, 0).rc, CMPI_RC_OK);
+    EXPECT_EQ(aliveProviders, 0);
+}
+
+TEST(AProviderFactory, FillsEachSlotWithItsFunctionWhichLetsNoExceptionOut) {
+    callSlots(TestProvider_Create_InstanceMI(nullptr, nullptr, nullptr), InstanceMISlots());
+    callSlots(TestProvider_Create_AssociationMI(nullptr, nullptr, nullptr), AssociationMISlots());
+    callSlots(TestProvider_Create_MethodMI(nullptr, nullptr, nullptr), MethodMISlots());
+    callSlots(TestProvider_Create_PropertyMI(nullptr, nullptr, nullptr), PropertyMISlots());
+    CMPIIndicationMI* const indications = TestProvider_Create_IndicationMI(nullptr, nullptr, nullptr);
+    callSlots(indications, IndicationMISlots());
+    EXPECT_EQ(calledFunctions,
+              "enumerateInstanceNames enumerateInstances getInstance createInstance modifyInstance "
+              "deleteInstance execQuery associators associatorNames references referenceNames "
+              "invokeMethod setProperty getProperty authorizeFilter mustPoll activateFilter "
+              "deActivateFilter enableIndications disableIndications ");
+    for (int kind = 0; kind < 5; ++kind) {
+        indications->ft->cleanup(indications, nullptr, 0);
+    }
     EXPECT_EQ(aliveProviders, 0);
 }
