@@ -78,13 +78,18 @@ bool decodeCharacter(std::string_view text, unsigned long long& code) {
 }
 
 constexpr std::string_view symbols = "[](){}:;,=#";
+constexpr std::string_view lineEnds = "\r\n"; // each of them, and both together
 
 } // namespace
 
 void MofSource::fail(std::size_t offset, const std::string& message) const {
     const std::string_view before = std::string_view(text).substr(0, offset);
-    const auto line = 1 + std::count(before.begin(), before.end(), '\n');
-    const std::size_t lineStart = before.rfind('\n') + 1; // 0 on the first line, where nothing is found
+    long line = 1;
+    for (std::size_t i = 0; i < offset; ++i) {
+        line += text[i] == '\n' || (text[i] == '\r' && text[i + 1] != '\n') ? 1 : 0;
+    }
+    const std::size_t lineStart =
+        before.find_last_of(lineEnds) + 1; // 0 on the first line, where nothing is found
     const auto column = 1 + std::count_if(before.begin() + static_cast<std::ptrdiff_t>(lineStart),
                                           before.end(), [](char c) { return !isContinuation(c); });
     throw BrokerError(name + ':' + std::to_string(line) + ':' + std::to_string(column) + ": " + message);
@@ -102,7 +107,7 @@ void MofLexer::skipBlanks() {
         if (isBlank(text_[position_])) {
             ++position_;
         } else if (text_.compare(position_, 2, "//") == 0) {
-            position_ = std::min(text_.find('\n', position_), text_.size());
+            position_ = std::min(text_.find_first_of(lineEnds, position_), text_.size());
         } else if (text_.compare(position_, 2, "/*") == 0) {
             const std::size_t end = text_.find("*/", position_ + 2);
             if (end == std::string_view::npos) {
@@ -148,11 +153,10 @@ MofToken MofLexer::next() {
 }
 
 void MofLexer::skipPragma() {
-    while (at(position_) == ' ' || at(position_) == '\t') {
-        ++position_;
-    }
+    const std::size_t lineEnd = std::min(text_.find_first_of(lineEnds, position_), text_.size());
+    skipBlanks();
     if (at(position_) != '(') {
-        position_ = std::min(text_.find('\n', position_), text_.size());
+        position_ = lineEnd;
         return;
     }
     const std::size_t start = position_;

@@ -136,8 +136,9 @@ DeclaredValue mofValueOf(const MofSource& source, const MofValue& value, CMPITyp
 
 CMPIType mofTypeOf(const MofValue& value) {
     unsigned int type = CMPI_string;
-    if (!value.constants.empty()) {
-        const MofToken& first = value.constants.front();
+    const auto found = std::find_if_not(value.constants.begin(), value.constants.end(), isNullWord);
+    if (found != value.constants.end()) {
+        const MofToken& first = *found;
         const auto needsUnsigned = [](const MofToken& constant) {
             return constant.kind == MofKind::integer && !constant.isNegative() &&
                    constant.magnitude >
@@ -150,7 +151,7 @@ CMPIType mofTypeOf(const MofValue& value) {
             type = CMPI_real64;
         } else if (first.kind == MofKind::character) {
             type = CMPI_char16;
-        } else if (first.kind == MofKind::word && !isNullWord(first)) {
+        } else if (first.kind == MofKind::word) {
             type = CMPI_boolean;
         }
     }

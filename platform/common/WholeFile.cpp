@@ -50,7 +50,8 @@ class Replacement {
 public:
     explicit Replacement(const std::filesystem::path& target)
         : target_(target),
-          path_((target.parent_path() / ("." + target.filename().string() + ".XXXXXX")).string()),
+          path_((target.parent_path() / ('.' + target.filename().string().substr(0, longestPart) + ".XXXXXX"))
+                    .string()),
           file_(::mkostemp(path_.data(), O_CLOEXEC)) {
         if (!file_.isOpen()) {
             fail("cannot create a file beside", target_);
@@ -101,6 +102,9 @@ public:
     }
 
 private:
+    // Of the target's name in the temporary one, which may be no longer than a file system takes.
+    static constexpr std::size_t longestPart = 100;
+
     std::string target_;
     std::string path_;
     Descriptor file_;
