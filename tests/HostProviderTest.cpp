@@ -1,17 +1,22 @@
-// The example provider on a machine of the test's own, served by the embedded broker in a process that stays
-// in the "C" locale, as many CIM servers' do.
+// The example provider on a machine of the test's own, served by the embedded broker in a process that is in
+// the "C" locale, as one that never calls setlocale.
 #include "HostProvider.h"
 #include "AssetTag.h"
 #include "FailureWays.h"
 #include "HostTime.h"
 #include "Keys.h"
+#include "TestLocales.h"
 
 #include <atomic>
 #include <clocale>
+#include <csignal>
 #include <cstdlib>
+#include <ctime>
 #include <filesystem>
 #include <fstream>
 #include <gtest/gtest.h>
+#include <sstream>
+#include <sys/resource.h>
 #include <thread>
 #include <unistd.h>
 
@@ -38,7 +43,7 @@ const std::string detailsPath =
 class TheHostProvider : public testing::Test {
 public:
     TheHostProvider() {
-        std::setlocale(LC_MESSAGES, "C"); // whatever the environment's language: texts are compared
+        std::setlocale(LC_ALL, "C"); // the test program's main function has taken the environment's
         write("/proc/sys/kernel/hostname", "machine");
         write("/proc/sys/kernel/osrelease", "6.1.0-test");
         write("/proc/stat", "cpu 1 2\nbtime 1700000000\nprocesses 1");
@@ -55,7 +60,7 @@ public:
         writePort("lo", "772", "unknown", "", "");
         setZone("XST-5:30");
         setHostRoot(root_);
-        broker_.setContextEntry("OXAHostStateFile", root_ + "/var/lib/asset.properties");
+        broker_.setContextEntry("OXAHostStateFile", stateFile_);
         host(broker_);
     }
     ~TheHostProvider() override {
@@ -95,7 +100,21 @@ public:
 
     CMPIrc codeOf(const std::string& text) { return request_.getInstance(path(text)).code; }
 
-    // The properties of the instances that are not NULL, with "now" for the present time, and the paths.
+    // A value, with "now" for the present time.
+    static std::string textOf(const CMPIData& data) {
+        std::string text = oxahv::valueText(data);
+        if (data.type == CMPI_dateTime) {
+            const auto time =
+                static_cast<std::time_t>(CMGetBinaryFormat(data.value.dateTime, nullptr) / 1'000'000);
+            const std::time_t age = std::time(nullptr) - time;
+            if (age >= 0 && age < 60) {
+                text.replace(1, sizeof "20261231235959.000000" - 1, "now");
+            }
+        }
+        return text;
+    }
+
+    // The properties of the instances that are not NULL, and the paths.
     static std::string textOf(const Reply& reply) {
         std::string text;
         for (const CMPIInstance* const instance : reply.instances) {
@@ -103,13 +122,8 @@ public:
                 CMPIString* name = nullptr;
                 const CMPIData data = CMGetPropertyAt(instance, i, &name, nullptr);
                 if (!CMIsNullValue(data)) {
-                    text += std::string(CMGetCharsPtr(name, nullptr)) + '=' + oxahv::valueText(data) + ' ';
+                    text += std::string(CMGetCharsPtr(name, nullptr)) + '=' + textOf(data) + ' ';
                 }
-            }
-        }
-        for (const std::string present : {"LocalDateTime=\"", "AssetTagDate=\""}) {
-            if (const std::size_t found = text.find(present); found != std::string::npos) {
-                text.replace(found + present.size(), sizeof "20261231235959.000000" - 1, "now");
             }
         }
         for (const CMPIObjectPath* const objectPath : reply.objectPaths) {
@@ -140,6 +154,12 @@ public:
         return reply.ok() ? std::to_string(reply.data.at(0).value.uint32) : oxahv::codeName(reply.code);
     }
 
+    std::string content() const {
+        std::ostringstream content;
+        content << std::ifstream(stateFile_).rdbuf();
+        return content.str();
+    }
+
     // How often the tag was changed, and the tag.
     std::string tag() {
         const CMPIInstance* const details = request_.getInstance(path(detailsPath)).instances.at(0);
@@ -148,6 +168,7 @@ public:
     }
 
     const std::string root_ = testing::TempDir() + "oxahv-host-" + std::to_string(::getpid());
+    const std::string stateFile_ = root_ + "/var/lib/asset.properties";
     oxahv::EmbeddedBroker broker_;
     Request request_{broker_};
 };
@@ -158,6 +179,7 @@ TEST_F(TheHostProvider, ShowsTheMachine) {
     // A property that its class lacks, or that has another type there, would be dropped.
     broker_.compileMof(MOF_FOLDER "/CIMSuperclasses.mof");
     broker_.compileMof(MOF_FOLDER "/OXAHost.mof");
+    broker_.setKeyMode(KeyMode::untyped);
     const std::string noTag = textOf(request_.getInstance(path(detailsPath)));
     ASSERT_EQ(setTag("tag"), "0");
     const std::string device =
@@ -247,12 +269,14 @@ TEST_F(TheHostProvider, LeavesTheServersLocaleAsItIs) {
     EXPECT_EQ(::uselocale(nullptr), LC_GLOBAL_LOCALE);
     EXPECT_EQ(codeOf("OXATK_Fan"), CMPI_RC_ERR_INVALID_CLASS);
     EXPECT_EQ(::uselocale(nullptr), LC_GLOBAL_LOCALE);
-
-    const locale_t own = ::newlocale(LC_CTYPE_MASK, "C.UTF-8", nullptr);
-    ::uselocale(own);
-    EXPECT_EQ(setTag("ä"), "0");
-    EXPECT_EQ(::uselocale(LC_GLOBAL_LOCALE), own);
-    ::freelocale(own);
+    {
+        const ThreadLocale german("de_DE.ISO-8859-1");
+        const locale_t own = ::uselocale(nullptr);
+        EXPECT_EQ(setTag("ä"), "0");
+        EXPECT_EQ(::uselocale(nullptr), own);
+        const std::string os = textOf(request_.getInstance(path(osPath)));
+        EXPECT_NE(os.find(R"(ElementName="Betriebssystem machine" Caption="Prüf-OS)"), std::string::npos) << os;
+    }
     EXPECT_EQ(std::setlocale(LC_ALL, nullptr), before);
 }
 
@@ -272,13 +296,20 @@ TEST_F(TheHostProvider, StoresAcceptableAssetTagsAlone) {
 }
 
 TEST_F(TheHostProvider, TellsWhyATagCannotBeSaved) {
-    write("/var", "no folder");
-    const Reply reply = setTag(request_, "first");
+    EXPECT_EQ(setTag("first"), "0");
+    const std::string saved = content();
+    std::signal(SIGXFSZ, SIG_IGN);
+    rlimit earlier = {};
+    ::getrlimit(RLIMIT_FSIZE, &earlier);
+    const rlimit nothing = {0, earlier.rlim_max};
+    ::setrlimit(RLIMIT_FSIZE, &nothing);
+    const Reply reply = setTag(request_, "second");
+    ::setrlimit(RLIMIT_FSIZE, &earlier);
     EXPECT_EQ(reply.code, CMPI_RC_ERR_FAILED);
     EXPECT_EQ(reply.message.rfind("The asset tag could not be saved. ", 0), 0U) << reply.message;
-    std::filesystem::remove(root_ + "/var");
-    EXPECT_EQ(setTag("second"), "0");
-    EXPECT_EQ(tag(), "1 \"second\"");
+    EXPECT_EQ(content(), saved);
+    EXPECT_EQ(setTag("third"), "0");
+    EXPECT_EQ(tag(), "2 \"third\"");
 }
 
 TEST_F(TheHostProvider, WritesDatesAsTheSameInstant) {

@@ -95,7 +95,7 @@ void referenceNames(const CMPIResult* result, const CMPIObjectPath* path, const 
 
 CMPIStatus HostAssociationCleanup(CMPIAssociationMI* /*mi*/, const CMPIContext* /*context*/,
                                   CMPIBoolean /*terminating*/) {
-    return statusOf(CMPI_RC_OK);
+    return answer([] {});
 }
 
 CMPIStatus HostAssociators(CMPIAssociationMI* /*mi*/, const CMPIContext* /*context*/,

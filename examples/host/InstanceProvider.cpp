@@ -58,7 +58,7 @@ void getInstance(const CMPIResult* result, const CMPIObjectPath* path, const cha
 // The functions of the table
 
 CMPIStatus HostCleanup(CMPIInstanceMI* /*mi*/, const CMPIContext* /*context*/, CMPIBoolean /*terminating*/) {
-    return statusOf(CMPI_RC_OK);
+    return answer([] {});
 }
 
 CMPIStatus HostEnumInstanceNames(CMPIInstanceMI* /*mi*/, const CMPIContext* /*context*/,
@@ -79,7 +79,9 @@ CMPIStatus HostGetInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* /*context*
 // Instances of this machine are not made, changed or deleted through CIM.
 
 CMPIStatus notSupported() {
-    return statusOf(CMPI_RC_ERR_NOT_SUPPORTED, "this provider's instances are read only");
+    return answer([] {
+        throw Refusal{CMPI_RC_ERR_NOT_SUPPORTED, "this provider's instances are read only"};
+    });
 }
 
 CMPIStatus HostCreateInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* /*context*/,
@@ -102,7 +104,7 @@ CMPIStatus HostDeleteInstance(CMPIInstanceMI* /*mi*/, const CMPIContext* /*conte
 CMPIStatus HostExecQuery(CMPIInstanceMI* /*mi*/, const CMPIContext* /*context*/, const CMPIResult* /*result*/,
                          const CMPIObjectPath* /*classPath*/, const char* /*query*/,
                          const char* /*language*/) {
-    return statusOf(CMPI_RC_ERR_NOT_SUPPORTED, "this provider knows no query language");
+    return answer([] { throw Refusal{CMPI_RC_ERR_NOT_SUPPORTED, "this provider knows no query language"}; });
 }
 
 } // namespace

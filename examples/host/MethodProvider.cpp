@@ -66,7 +66,7 @@ void invokeMethod(const CMPIResult* result, const CMPIObjectPath* path, const ch
 
 CMPIStatus HostMethodCleanup(CMPIMethodMI* /*mi*/, const CMPIContext* /*context*/,
                              CMPIBoolean /*terminating*/) {
-    return statusOf(CMPI_RC_OK);
+    return answer([] {});
 }
 
 CMPIStatus HostInvokeMethod(CMPIMethodMI* /*mi*/, const CMPIContext* /*context*/, const CMPIResult* result,
