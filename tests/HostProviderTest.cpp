@@ -275,7 +275,8 @@ TEST_F(TheHostProvider, LeavesTheServersLocaleAsItIs) {
         EXPECT_EQ(setTag("ä"), "0");
         EXPECT_EQ(::uselocale(nullptr), own);
         const std::string os = textOf(request_.getInstance(path(osPath)));
-        EXPECT_NE(os.find(R"(ElementName="Betriebssystem machine" Caption="Prüf-OS)"), std::string::npos) << os;
+        EXPECT_NE(os.find(R"(ElementName="Betriebssystem machine" Caption="Prüf-OS)"), std::string::npos)
+            << os;
     }
     EXPECT_EQ(std::setlocale(LC_ALL, nullptr), before);
 }
