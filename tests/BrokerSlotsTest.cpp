@@ -49,71 +49,72 @@ CMPIInstanceMI* createProvider(const CMPIBroker* theBroker, const CMPIContext*, 
 }
 
 // What a fresh argument points at, with which most slots succeed; null where they can do without.
-template <class Target>
-const Target* made() {
-    if constexpr (std::is_same_v<Target, CMPIBroker>) {
-        return broker;
-    } else if constexpr (std::is_same_v<Target, CMPIContext>) {
-        return context;
-    } else if constexpr (std::is_same_v<Target, CMPIResult>) {
-        return result;
-    } else if constexpr (std::is_same_v<Target, CMPIStatus>) {
-        return &status;
-    } else if constexpr (std::is_same_v<Target, CMPIString>) {
-        return CMNewString(broker, "text", nullptr);
-    } else if constexpr (std::is_same_v<Target, CMPIString*>) {
-        static CMPIString* text = nullptr;
-        return &text;
-    } else if constexpr (std::is_same_v<Target, CMPIValue>) {
-        static CMPIValue value = {};
-        value.string = CMNewString(broker, "text", nullptr);
-        return &value;
-    } else if constexpr (std::is_same_v<Target, CMPIObjectPath>) {
-        CMPIObjectPath* const path = CMNewObjectPath(broker, "root", "Demo", nullptr);
-        CMAddKey(path, "text", "value", CMPI_chars);
-        return path;
-    } else if constexpr (std::is_same_v<Target, CMPIInstance>) {
-        return CMNewInstance(broker, made<CMPIObjectPath>(), nullptr);
-    } else if constexpr (std::is_same_v<Target, CMPIArgs>) {
+struct Fresh {
+    static const void* of(const CMPIBroker*) { return broker; }
+    static const void* of(const CMPIContext*) { return context; }
+    static const void* of(const CMPIResult*) { return result; }
+    static const void* of(const CMPIStatus*) { return &status; }
+    static const void* of(const CMPIString*) { return CMNewString(broker, "text", nullptr); }
+    static const void* of(const CMPIInstance*) { return CMNewInstance(broker, path(), nullptr); }
+    static const void* of(const CMPIObjectPath*) { return path(); }
+    static const void* of(const CMPIArray*) { return array(); }
+    static const void* of(const CMPIError*) { return error(); }
+    static const void* of(const CMPIPropertyList*) { return properties(); }
+    static const void* of(const CMPIDateTime*) { return CMNewDateTime(broker, nullptr); }
+    static const void* of(const CMPIGcStat*) { return broker->mft->mark(broker, nullptr); }
+    static const void* of(const CMPIEnumeration*) {
+        return broker->bft->enumerateInstanceNames(broker, context, path(), nullptr);
+    }
+    static const void* of(const CMPIArgs*) {
         CMPIArgs* const arguments = CMNewArgs(broker, nullptr);
         CMAddArg(arguments, "text", "value", CMPI_chars);
         return arguments;
-    } else if constexpr (std::is_same_v<Target, CMPIArray>) {
+    }
+    static const void* of(const CMPIValue*) {
+        static CMPIValue value = {};
+        value.string = CMNewString(broker, "text", nullptr);
+        return &value;
+    }
+    static const void* of(CMPIString* const*) {
+        static CMPIString* text = nullptr;
+        return &text;
+    }
+    static const void* of(const char*) { return *names; }
+    static const void* of(const char* const*) { return names; }
+    static const void* of(const void*) { return CMNewString(broker, "text", nullptr); }
+    template <class Other>
+    static const void* of(const Other*) {
+        return nullptr;
+    }
+
+    static CMPIObjectPath* path() {
+        CMPIObjectPath* const path = CMNewObjectPath(broker, "root", "Demo", nullptr);
+        CMAddKey(path, "text", "value", CMPI_chars);
+        return path;
+    }
+    static CMPIArray* array() {
         CMPIArray* const array = CMNewArray(broker, 1, CMPI_string, nullptr);
         CMSetArrayElementAt(array, 0, "value", CMPI_chars);
         return array;
-    } else if constexpr (std::is_same_v<Target, CMPIDateTime>) {
-        return CMNewDateTime(broker, nullptr);
-    } else if constexpr (std::is_same_v<Target, CMPIEnumeration>) {
-        return broker->bft->enumerateInstanceNames(broker, context, made<CMPIObjectPath>(), nullptr);
-    } else if constexpr (std::is_same_v<Target, CMPIError>) {
+    }
+    static CMPIError* error() {
         CMPIError* const error = broker->eft->newCMPIError(broker, "owner", "id", "text", ErrorSevLow,
                                                            ErrorProbCauseOther, CMPI_RC_ERR_FAILED, nullptr);
-        error->ft->setRecommendedActions(error, made<CMPIArray>());
-        error->ft->setMessageArguments(error, made<CMPIArray>());
+        error->ft->setRecommendedActions(error, array());
+        error->ft->setMessageArguments(error, array());
         return error;
-    } else if constexpr (std::is_same_v<Target, CMPIPropertyList>) {
-        return broker->eft->newPropertyList(broker, nullptr, nullptr);
-    } else if constexpr (std::is_same_v<Target, CMPIGcStat>) {
-        return broker->mft->mark(broker, nullptr);
-    } else {
-        return nullptr;
     }
-}
+    static CMPIPropertyList* properties() { return broker->eft->newPropertyList(broker, nullptr, nullptr); }
+
+    static inline const char* names[] = {"text", nullptr};
+};
 
 template <class Type>
 const void* argument() {
-    static const char* names[] = {"text", nullptr};
-    if constexpr (std::is_same_v<Type, const char*>) {
-        return *names;
-    } else if constexpr (std::is_same_v<Type, const char**>) {
-        return names;
-    } else if constexpr (std::is_same_v<Type, const void*>) {
-        return made<CMPIString>();
-    } else if constexpr (std::is_pointer_v<Type> && !std::is_same_v<Type, void*>) {
-        return made<std::remove_const_t<std::remove_pointer_t<Type>>>();
-    } else {
+    if constexpr (!std::is_pointer_v<Type> || std::is_same_v<Type, void*> || std::is_same_v<Type, char*>) {
         return nullptr;
+    } else {
+        return Fresh::of(static_cast<const std::remove_pointer_t<Type>*>(nullptr));
     }
 }
 
@@ -135,23 +136,19 @@ constexpr bool isNeeded =
     std::is_same_v<Type, const CMPIContext*> || std::is_same_v<Type, const CMPIError*>;
 
 // Takes what a slot returns, or gives it back.
-void take(CMPIStatus returned) {
-    status = returned;
-}
-void take(void* block) {
-    std::free(block);
-}
-void take(char* text) {
-    std::free(text);
-}
-template <class Object>
-auto take(Object* object) -> decltype(object->ft->release, void()) {
-    if (object != nullptr) {
-        CMRelease(object);
+struct Returned {
+    static void take(CMPIStatus returned) { status = returned; }
+    static void take(void* block) { std::free(block); }
+    static void take(char* text) { std::free(text); }
+    template <class Object>
+    static auto take(Object* object) -> decltype(object->ft->release, void()) {
+        if (object != nullptr) {
+            CMRelease(object);
+        }
     }
-}
-template <class Other>
-void take(const Other& /*returned*/) {}
+    template <class Other>
+    static void take(const Other&) {}
+};
 
 // A slot without its type: nothing that is done for each signature takes long to compile.
 struct Slot {
@@ -171,7 +168,7 @@ Slot untyped(Type slot, Return (* /*fixed*/)(Parameters...), std::index_sequence
         } else {
             const Return returned = typedSlot(typed<Parameters>(arguments[positions])...);
             failing::ended();
-            take(returned);
+            Returned::take(returned);
         }
     };
     return {reinterpret_cast<void (*)()>(slot),
@@ -270,8 +267,8 @@ TEST_F(EverySlot, SurvivesNullArgumentsAndWantOfMemory) {
     sweepObject(path->ft, ObjectPathSlots());
     sweepObject(CMNewArgs(broker, nullptr)->ft, ArgsSlots());
     sweepObject(CMNewDateTime(broker, nullptr)->ft, DateTimeSlots());
-    sweepObject(made<CMPIError>()->ft, ErrorSlots());
-    sweepObject(made<CMPIPropertyList>()->ft, PropertyListSlots());
+    sweepObject(Fresh::error()->ft, ErrorSlots());
+    sweepObject(Fresh::properties()->ft, PropertyListSlots());
     EXPECT_EQ(swept_, EmbeddedBroker::slotNames().size());
     EXPECT_GT(failures_, 50U) << "the program's own operator new is not in use";
 }

@@ -139,11 +139,11 @@ struct Filter {
 };
 
 bool isOr(const char* filter, const char* text) {
-    return filter == nullptr || *filter == '\0' || ::strcasecmp(filter, text) == 0;
+    return filter == nullptr || ::strcasecmp(filter, text) == 0;
 }
 
 bool isOfClass(const char* filter, CMPIObjectPath* path) {
-    return filter == nullptr || *filter == '\0' || CMClassPathIsA(broker, path, filter, nullptr) != 0;
+    return filter == nullptr || CMClassPathIsA(broker, path, filter, nullptr) != 0;
 }
 
 struct Link {

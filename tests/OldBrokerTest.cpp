@@ -6,27 +6,16 @@
 #include <cstddef>
 #include <cstring>
 #include <gtest/gtest.h>
+#include <regex>
 #include <sys/mman.h>
 #include <unistd.h>
 
 namespace {
 
-const char* const laterSlots[] = {"enumerateInstancesFiltered",
-                                  "associatorsFiltered",
-                                  "referencesFiltered",
-                                  "newCMPIError",
-                                  "openMessageFile",
-                                  "closeMessageFile",
-                                  "getMessage2",
-                                  "newPropertyList",
-                                  "newStringCP",
-                                  "newEnumerationFilter",
-                                  "newCharsCP",
-                                  "setPropertyWithOrigin",
-                                  "returnError",
-                                  "CMPIBrokerMemFT",
-                                  "CMPIErrorFT",
-                                  "CMPIPropertyListFT"};
+const std::regex laterSlots(
+    "(MemFT|ErrorFT|PropertyListFT)\\.|Filtered$|\\.(newCMPIError|openMessageFile|closeMessageFile"
+    "|getMessage2|newPropertyList|newStringCP|newEnumerationFilter|newCharsCP"
+    "|setPropertyWithOrigin|returnError)$");
 
 const CMPIBroker* oldBroker = nullptr;
 
@@ -61,9 +50,8 @@ TEST(TheHostProviderInAnOldServer, ServesEveryKindOfRequest) {
                                     createForOldBroker<OXAHostProvider_Create_MethodMI>});
     oxahv::Request request(server);
     for (const char* const name : {"OXATK_OperatingSystem", "OXATK_EthernetPort", "OXATK_NumericSensor",
-                                   "OXATK_AssetIDDetails", "OXATK_RunningOS", "OXATK_ComputerSystem"}) {
-        const oxahv::Reply instances = request.enumerateInstances(request.objectPath("root/cimv2", name));
-        EXPECT_TRUE(instances.ok()) << name << ": " << instances.message;
+                                   "OXATK_AssetIDDetails", "OXATK_RunningOS"}) {
+        EXPECT_TRUE(request.enumerateInstances(request.objectPath("root/cimv2", name)).ok()) << name;
     }
     const oxahv::Reply systems =
         request.enumerateInstanceNames(request.objectPath("root/cimv2", "OXATK_ComputerSystem"));
@@ -80,8 +68,6 @@ TEST(TheHostProviderInAnOldServer, ServesEveryKindOfRequest) {
     ::unlink(stateFile.c_str());
 
     for (const oxahv::Call& call : server.stopRecording()) {
-        for (const char* const later : laterSlots) {
-            EXPECT_EQ(call.slot.find(later), std::string::npos) << call.slot;
-        }
+        EXPECT_FALSE(std::regex_search(call.slot, laterSlots)) << call.slot;
     }
 }

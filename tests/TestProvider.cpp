@@ -1,6 +1,6 @@
 // A provider library with factories of one name, and generic ones that refuse every other name but "Generic",
-// "Throws" by an exception. It returns the paths and arguments that it is given; of class Slow a path takes
-// half a second.
+// "Throws" by an exception. It returns the paths and arguments that it is given; a path of class Slow four
+// times, half a second apart.
 #include <cmpimacs.h>
 
 #include <chrono>
@@ -10,26 +10,14 @@
 
 namespace {
 
-const CMPIBroker* broker = nullptr;
-
 CMPIStatus enumerateInstanceNames(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
                                   const CMPIObjectPath* path) {
-    CMPIStatus status = CMReturnObjectPath(result, path);
-    const CMPIString* const name = CMGetClassName(path, nullptr);
-    const char* const chars = name != nullptr ? CMGetCharsPtr(name, nullptr) : nullptr;
-    if (chars != nullptr && std::strcmp(chars, "Slow") == 0) {
-        for (int i = 0; i < 3; ++i) {
-            std::this_thread::sleep_for(std::chrono::milliseconds(500));
-            status = CMReturnObjectPath(result, path);
-        }
+    const bool isSlow = std::strcmp(CMGetCharsPtr(CMGetClassName(path, nullptr), nullptr), "Slow") == 0;
+    for (int i = 0; isSlow && i < 3; ++i) {
+        CMReturnObjectPath(result, path);
+        std::this_thread::sleep_for(std::chrono::milliseconds(500));
     }
-    CMReturnDone(result);
-    return status;
-}
-
-CMPIStatus enumerateInstances(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*,
-                              const char**) {
-    return {CMPI_RC_ERR_ACCESS_DENIED, CMNewString(broker, "not for you", nullptr)};
+    return CMReturnObjectPath(result, path);
 }
 
 CMPIStatus getInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*,
@@ -60,14 +48,12 @@ public:
 
 } // namespace
 
-extern "C" CMPI_EXPORT CMPIInstanceMI* TestProvider_Create_InstanceMI(const CMPIBroker* theBroker,
-                                                                      const CMPIContext*, CMPIStatus*) {
+extern "C" CMPI_EXPORT CMPIInstanceMI* TestProvider_Create_InstanceMI(const CMPIBroker*, const CMPIContext*,
+                                                                      CMPIStatus*) {
     static CMPIInstanceMIFT table = {};
     static CMPIInstanceMI mi = {nullptr, &table};
     table.enumerateInstanceNames = enumerateInstanceNames;
-    table.enumerateInstances = enumerateInstances;
     table.getInstance = getInstance;
-    broker = theBroker;
     return &mi;
 }
 
@@ -79,7 +65,7 @@ extern "C" CMPI_EXPORT CMPIMethodMI* TestProvider_Create_MethodMI(const CMPIBrok
     return &mi;
 }
 
-extern "C" CMPI_EXPORT CMPIInstanceMI* _Generic_Create_InstanceMI(const CMPIBroker* theBroker,
+extern "C" CMPI_EXPORT CMPIInstanceMI* _Generic_Create_InstanceMI(const CMPIBroker* broker,
                                                                   const CMPIContext* context,
                                                                   const char* name, CMPIStatus* status) {
     if (std::strcmp(name, "ThrowsANumber") == 0) {
@@ -92,5 +78,5 @@ extern "C" CMPI_EXPORT CMPIInstanceMI* _Generic_Create_InstanceMI(const CMPIBrok
         CMSetStatus(status, CMPI_RC_ERR_NOT_FOUND);
         return nullptr;
     }
-    return TestProvider_Create_InstanceMI(theBroker, context, status);
+    return TestProvider_Create_InstanceMI(broker, context, status);
 }
