@@ -4,7 +4,6 @@
 
 #include "ClassTable.h"
 
-#include <cctype>
 #include <strings.h>
 
 using TK::ProviderUtilities;
@@ -29,12 +28,7 @@ void expectAsTheChain(const std::string& text) {
     ASSERT_EQ(ProviderUtilities::extend_getClassId(name), chain(name, 119)) << name;
 }
 
-class ClassRegistry : public BrokerTest {
-protected:
-    static std::string trace(const std::string& name) {
-        return variable(providerUtilities, "getClassId", "classname", name);
-    }
-};
+class ClassRegistry : public BrokerTest {};
 
 class Ancestry : public BrokerTest {
 protected:
@@ -100,16 +94,12 @@ TEST_F(ClassRegistry, AnswersAsAChainOfComparisonsForEveryEdit) {
         for (std::size_t i = 0; i <= name.size(); ++i) {
             for (const char letter : letters) {
                 expectAsTheChain(std::string(name).insert(i, 1, letter));
-                if (i < name.size()) {
-                    expectAsTheChain(std::string(name).replace(i, 1, 1, letter));
-                }
             }
-            if (i < name.size()) {
-                std::string flipped = name;
-                flipped[i] = static_cast<char>(std::isupper(flipped[i]) != 0 ? std::tolower(flipped[i])
-                                                                             : std::toupper(flipped[i]));
-                expectAsTheChain(flipped);
-                expectAsTheChain(std::string(name).erase(i, 1));
+        }
+        for (std::size_t i = 0; i < name.size(); ++i) {
+            expectAsTheChain(std::string(name).erase(i, 1));
+            for (const char letter : letters + static_cast<char>(name[i] ^ 0x20)) { // the other case
+                expectAsTheChain(std::string(name).replace(i, 1, 1, letter));
             }
         }
     }
@@ -150,10 +140,11 @@ TEST_F(ClassRegistry, TellsTheClassOfAnObjectPath) {
     const auto check = [&](const CMPIObjectPath* path, int id, const std::string& log) {
         EXPECT_EQ(logOf([&] { EXPECT_EQ(ProviderUtilities::getClassId(path), id); }), log);
     };
+    const auto trace = [](const std::string& name) {
+        return variable(providerUtilities, "getClassId", "classname", name);
+    };
     check(real, 101, "getClassName\ngetCharPtr\n" + trace("oxatk_Fan"));
     check(nullptr, 0, "");
-    broker_.injectFault("CMPIObjectPathFT.getClassName", anError);
-    check(real, 0, "getClassName\n");
     broker_.injectFault("CMPIObjectPathFT.getClassName", nothing);
     check(real, 0, "getClassName\n" + trace("(null)"));
     broker_.injectFault("CMPIStringFT.getCharPtr", nothing);

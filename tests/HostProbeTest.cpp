@@ -12,6 +12,7 @@
 #include <sstream>
 #include <string>
 #include <thread>
+#include <utility>
 #include <vector>
 
 using TK::ProviderUtilities;
@@ -60,20 +61,15 @@ TEST(TheHost, OffersVirtualMachinesWithADeviceAndWithoutTheServer) {
 }
 
 TEST(LocalisedTexts, AreInTheLanguageAndTheEncodingOfTheThread) {
-    ::unsetenv("LANGUAGE");
-    const ThreadLocale plain("C");
     const std::wstring key = L"The asset tag holds characters that are not allowed.";
-    EXPECT_STREQ(ProviderUtilities::getNLSText(key), "The asset tag holds characters that are not allowed.");
-    {
-        const ThreadLocale german("de_DE.UTF-8");
-        EXPECT_STREQ(ProviderUtilities::getNLSText(key),
-                     "Das Inventarkennzeichen enth\xC3\xA4lt unzul\xC3\xA4ssige Zeichen.");
-        EXPECT_STREQ(ProviderUtilities::getNLSText(L"no such t\u00E4xt"), "no such t\xC3\xA4xt");
-        EXPECT_STREQ(ProviderUtilities::getNLSText(L""), "");
+    const std::pair<const char*, const char*> rows[] = {
+        {"C", "The asset tag holds characters that are not allowed."},
+        {"de_DE.UTF-8", "Das Inventarkennzeichen enth\xC3\xA4lt unzul\xC3\xA4ssige Zeichen."},
+        {"de_DE.ISO-8859-1", "Das Inventarkennzeichen enth\xE4lt unzul\xE4ssige Zeichen."}};
+    for (const auto& [name, text] : rows) {
+        const ThreadLocale locale(name);
+        EXPECT_STREQ(ProviderUtilities::getNLSText(key), text);
     }
-    const ThreadLocale german("de_DE.ISO-8859-1");
-    EXPECT_STREQ(ProviderUtilities::getNLSText(key),
-                 "Das Inventarkennzeichen enth\xE4lt unzul\xE4ssige Zeichen.");
     EXPECT_TRUE(loggerCalls().empty());
 }
 

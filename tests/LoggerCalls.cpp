@@ -12,12 +12,11 @@ namespace {
 std::vector<LoggerCall> calls;
 std::function<void()> callHook;
 
-void record(bool isTrace, const char* function, const char* file, int line, const std::string& category,
-            int level, bool restIsNothing, const std::string& text) {
+void record(LoggerCall call) {
     if (callHook) {
         callHook();
     }
-    calls.push_back({isTrace, function, file, line, category, level, restIsNothing, text});
+    calls.push_back(std::move(call));
 }
 
 std::string tracePoint(const TracingModule& module, int level, const std::string& function,
@@ -37,15 +36,15 @@ std::string flow(const char* kind, const TracingModule& module, const std::strin
 void HVLog::HVLogger::logLevelMessage(const char* function, const char* file, int line,
                                       const std::string& category, int level, char* pointer, int first,
                                       int second, const std::string& text) {
-    record(false, function, file, line, category, level, pointer == nullptr && first == 0 && second == 0,
-           text);
+    record({false, function, file, line, category, level, pointer == nullptr && first == 0 && second == 0,
+            text});
 }
 
 void HVLog::HVLogger::traceLevelMessage(const char* function, const char* file, int line,
                                         const std::string& category, int level, char* pointer, int first,
                                         int second, const std::string& text) {
-    record(true, function, file, line, category, level, pointer == nullptr && first == 0 && second == 0,
-           text);
+    record(
+        {true, function, file, line, category, level, pointer == nullptr && first == 0 && second == 0, text});
 }
 
 const std::vector<LoggerCall>& loggerCalls() {

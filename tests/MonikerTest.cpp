@@ -15,13 +15,7 @@ const char* const notReadable =
 // How one type of value reads the selected key; the value must survive a failure.
 template <class T>
 std::string read(const Moniker& moniker) {
-    const T untouched = [] {
-        if constexpr (std::is_arithmetic_v<T>) {
-            return T{7};
-        } else {
-            return T("untouched");
-        }
-    }();
+    const T untouched{'\7'};
     T value = untouched;
     try {
         moniker.getValue(value);
@@ -68,7 +62,6 @@ TEST(AMoniker, ReadsEveryTypeOnlyAsItself) {
     Moniker moniker = oneOfEach();
     EXPECT_EQ(textOf(moniker), std::string("a:0=65 b:1=65535 c:2=4294967295 d:3=18446744073709551615 ") +
                                    std::string("a:4=t\0t  > a:4=t\0t", 18));
-    EXPECT_EQ(moniker.getKeyCount(), 5U);
     for (unsigned int key = 0; key < 5; ++key) {
         ASSERT_TRUE(moniker.selectKey(key));
         for (unsigned int type = 0; type < 5; ++type) {
@@ -108,11 +101,11 @@ TEST(AMoniker, IsIndependentOfItsCopies) {
     Moniker copy(moniker);
     Moniker assigned;
     assigned = moniker;
+    const std::string before = textOf(moniker);
     copy.addKey("new", 1U);
-    EXPECT_EQ(selectedKey(moniker) + selectedKey(assigned) + selectedKey(copy), "b:1=65535b:1=65535new:2=1");
-    EXPECT_EQ(moniker.getKeyCount(), 5U);
-    EXPECT_EQ(assigned.getKeyCount(), 5U);
-    EXPECT_EQ(copy.getKeyCount(), 6U);
+    EXPECT_EQ(selectedKey(copy), "new:2=1");
+    EXPECT_EQ(textOf(moniker), before);
+    EXPECT_EQ(textOf(assigned), before);
 }
 
 TEST(AMoniker, ReadsItsNumbersBackUnderALocaleThatGroupsDigits) {
@@ -132,13 +125,10 @@ TEST(AMoniker, ReadsItsNumbersBackUnderALocaleThatGroupsDigits) {
 TEST(AFrameworkException, KeepsItsOwnCopyOfTheMessage) {
     std::string text = "a message that is longer than any short string buffer holds";
     const std::string before = text;
-    const FrameworkException exception(text.c_str());
-    const FrameworkException copy(exception);
-    FrameworkException assigned(nullptr);
-    EXPECT_STREQ(assigned.what(), "");
-    assigned = exception;
+    FrameworkException copy(nullptr);
+    EXPECT_STREQ(copy.what(), "");
+    copy = FrameworkException(text.c_str());
     text[0] = 'X';
-    EXPECT_EQ(exception.what(), before);
     EXPECT_EQ(copy.what(), before);
-    EXPECT_EQ(assigned.what(), before);
+    EXPECT_EQ(FrameworkException(copy).what(), before);
 }

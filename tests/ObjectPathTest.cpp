@@ -7,6 +7,7 @@ using TK::Moniker;
 
 namespace {
 
+const std::string chars = "getCharPtr\n";
 const std::string noCount = "throws Could not Extract Keys from Object Path.\n";
 const std::string noText = "throws String Conversion Failed !!\n";
 const std::string noType = "throws Moniker component for data type not available.\n";
@@ -70,7 +71,6 @@ const std::string oneOfEach = "a:0=7 b:1=8 c:2=9 d:3=18446744073709551615 e:4=te
 
 TEST_F(ObjectPaths, BecomeMonikersAndComeBack) {
     const CMPIObjectPath* const path = pathWithOneOfEach();
-    const std::string chars = "getCharPtr\n";
     const std::string log = counted("5", keysAt(std::vector<std::string>(5)), "5") +
                             keysAt({chars, chars, chars, chars, chars + chars});
     EXPECT_EQ(logOfTransforming(path), log + oneOfEach);
@@ -108,8 +108,7 @@ TEST_F(ObjectPaths, WithoutKeysLeaveMonikersAsTheyAre) {
     EXPECT_EQ(logOfTransforming(newPath(), moniker), counted("0", "", "0") + "x:2=1 y:2=2  > x:2=1");
     Moniker empty;
     CMPIObjectPath* none = nullptr;
-    EXPECT_NO_FATAL_FAILURE(PU::transformMonikerToObjectPath(empty, &none));
-    takeTraces();
+    PU::transformMonikerToObjectPath(empty, &none); // touches neither
 }
 
 TEST_F(ObjectPaths, HaveOneKeyOfAName) {
@@ -131,16 +130,13 @@ TEST_F(ObjectPaths, CountAndConvertTheKeysThatHaveAValue) {
     CMAddKey(path, "other null", nullptr, CMPI_uint32);
     PU::setKeyProperty(path, "b", 2U);
     const std::string keys = keysAt({"", "", "", ""});
-    EXPECT_EQ(logOfTransforming(path), counted("4", keys, "2") +
-                                           keysAt({"", "getCharPtr\n", "", "getCharPtr\n"}) +
-                                           "a:2=1 b:2=2  > b:2=2");
+    EXPECT_EQ(logOfTransforming(path),
+              counted("4", keys, "2") + keysAt({"", chars, "", chars}) + "a:2=1 b:2=2  > b:2=2");
     // A key that cannot be read counts as none, whatever comes with the error.
-    for (const unsigned int position : {1U, 2U, 3U, 4U, 0U}) {
-        broker_.injectFault(
-            "CMPIObjectPathFT.getKeyAt",
-            {CMPI_RC_ERR_FAILED, false, 0, position == 0 ? 1 : position, position == 0 ? 0U : 1U});
-        const int count = position == 0 ? 0 : position % 2 == 0 ? 1 : 2;
-        EXPECT_EQ(logOf([&] { EXPECT_EQ(PU::getKeyCount(path), count); }),
+    for (const unsigned int position : {1U, 2U}) { // which has no value, and which has one
+        const int count = position == 1 ? 2 : 1;
+        EXPECT_EQ(logOf([&] { EXPECT_EQ(PU::getKeyCount(path), count); }, "CMPIObjectPathFT.getKeyAt",
+                        {CMPI_RC_ERR_FAILED, false, 0, position}),
                   counted("4", keys, std::to_string(count)));
     }
     Otherwise<&CMPIObjectPathFT::getKeyAt> erring(path);
@@ -217,36 +213,29 @@ TEST_F(ObjectPaths, TakeAWhiteSpaceByteAsZero) {
 }
 
 TEST_F(ObjectPaths, AreCreatedUnlessTheBrokerRefuses) {
-    const auto create = [&](const char* name, const std::string& nameSpace, bool isMade,
-                            const CMPIBroker* broker) {
-        return logOf([&] { EXPECT_EQ(PU::createObjectPath(broker, name, nameSpace) != nullptr, isMade); });
-    };
-    const auto trace = [](const std::string& name, const std::string& value) {
-        return variable(providerUtilities, "createObjectPath", name, value);
-    };
-    const auto expected = [&](bool isMade, const CMPIBroker* broker) {
+    const auto expect = [this](const CMPIBroker* broker, bool isMade) {
+        const auto trace = [](const std::string& name, const std::string& value) {
+            return variable(providerUtilities, "createObjectPath", name, value);
+        };
         const std::string list = " broker=" + address(broker) + " classname=Demo_Class nameSpace=root";
-        return entering(providerUtilities, "createObjectPath", list) + trace("classname", "Demo_Class") +
-               "newObjectPath root Demo_Class\n" +
-               (isMade ? "setNameSpace root\n" + trace("\"ProviderUtilities::createObjectPath\"",
-                                                       "ProviderUtilities::createObjectPath")
-                       : "") +
-               exiting(providerUtilities, "createObjectPath", list);
+        const std::string own = "ProviderUtilities::createObjectPath";
+        EXPECT_EQ(
+            logOf([&] { EXPECT_EQ(PU::createObjectPath(broker, "Demo_Class", "root") != nullptr, isMade); }),
+            entering(providerUtilities, "createObjectPath", list) + trace("classname", "Demo_Class") +
+                "newObjectPath root Demo_Class\n" +
+                (isMade ? "setNameSpace root\n" + trace('"' + own + '"', own) : "") +
+                exiting(providerUtilities, "createObjectPath", list));
     };
     const CMPIBroker* const broker = broker_.handle();
-    EXPECT_EQ(create("Demo_Class", "root", true, broker), expected(true, broker));
+    expect(broker, true);
     broker_.injectFault("CMPIObjectPathFT.setNameSpace", anError);
-    EXPECT_EQ(create("Demo_Class", "root", true, broker), expected(true, broker));
+    expect(broker, true);
     for (const oxahv::Fault& fault : {anError, nothing}) {
         broker_.injectFault("CMPIBrokerEncFT.newObjectPath", fault);
-        EXPECT_EQ(create("Demo_Class", "root", false, broker), expected(false, broker));
+        expect(broker, false);
     }
     Otherwise<&CMPIBrokerEncFT::newObjectPath> erring(broker);
-    EXPECT_EQ(create("Demo_Class", "root", false, erring.handle()), expected(false, erring.handle()));
-    const std::string ended = " broker=" + address(broker) + " classname=";
-    EXPECT_EQ(create(nullptr, "root", false, broker),
-              entering(providerUtilities, "createObjectPath", ended) + trace("classname", "(null)") +
-                  "newObjectPath root\n" + exiting(providerUtilities, "createObjectPath", ended));
+    expect(erring.handle(), false);
+    EXPECT_EQ(PU::createObjectPath(broker, nullptr, "root"), nullptr);
     EXPECT_EQ(oxahv::pathText(PU::createObjectPath(broker, "Demo_Class", "")), "Demo_Class");
-    takeTraces();
 }

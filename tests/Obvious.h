@@ -72,26 +72,10 @@ inline TK::DateTime date(unsigned short year, unsigned char month, unsigned char
     return result;
 }
 
-// The number at the beginning of some characters, as the C standard words strtol, written out.
-inline long numberIn(const std::string& characters) {
-    std::size_t i = 0;
-    while (i < characters.size() &&
-           (characters[i] == ' ' || (characters[i] >= '\t' && characters[i] <= '\r'))) {
-        ++i;
-    }
-    const bool negative = i < characters.size() && characters[i] == '-';
-    i += negative || (i < characters.size() && characters[i] == '+') ? 1 : 0;
-    long number = 0;
-    for (; i < characters.size() && characters[i] >= '0' && characters[i] <= '9'; ++i) {
-        number = number * 10 + (characters[i] - '0');
-    }
-    return negative ? -number : number;
-}
-
 // What a CIM date/time text of 21 characters and more stands for.
 inline TK::DateTime parsed(const std::string& text) {
     const auto field = [&text](std::size_t position, std::size_t width) {
-        return numberIn(text.substr(position, width));
+        return std::strtol(text.substr(position, width).c_str(), nullptr, 10);
     };
     const auto year = static_cast<unsigned short>(field(0, 4));
     const auto month = static_cast<unsigned char>(field(4, 2));

@@ -5,7 +5,6 @@
 #include <gtest/gtest.h>
 #include <stdexcept>
 #include <string>
-#include <tuple>
 
 namespace {
 
@@ -76,32 +75,27 @@ TEST_F(ATracePoint, TakesAnyInsertionsUpToANullText) {
     const char* const none = nullptr;
     const std::string text("te%xt");
     TK_TRACE_ENTERING_PARAMETERS(category, " object=" << &object << " null=" << nowhere << " text=" << text);
-    TK_TRACE_ENTERING_PARAMETERS(category, " a=" << text);
     TK_TRACE_ENTERING_PARAMETERS(category, " a=" << Speed{100} << " b=" << std::hex << 255);
     TK_TRACE_ENTERING_PARAMETERS(category, " nothing");
     TK_TRACE_ENTERING_PARAMETERS(category, " object=" << &object << " text=" << none << " more=" << 1);
     TK_TRACE_ENTERING_PARAMETERS(category, " text=" << none << " more=" << text);
     EXPECT_EQ(takeTraces(), parameters(" object=" + address(&object) + " null=0 text=te%xt") +
-                                parameters(" a=te%xt") + parameters(" a=100 Mbit/s b=ff") +
-                                parameters(" nothing") +
+                                parameters(" a=100 Mbit/s b=ff") + parameters(" nothing") +
                                 parameters(" object=" + address(&object) + " text=") + parameters(" text="));
 }
 
 TEST_F(ATracePoint, EvaluatesItsArgumentsForEachOfTheTwoCalls) {
-    int categories = 0;
-    int names = 0;
-    int values = 0;
-    int insertions = 0;
-    const auto count = [](int& counter, const auto& value) -> const auto& {
-        ++counter;
+    int evaluations = 0;
+    const auto counted = [&evaluations](const auto& value) -> const auto& {
+        ++evaluations;
         return value;
     };
     const std::string name("n");
     const int seven = 7;
-    TK_TRACE_VARIABLE(count(categories, category), count(names, name).c_str(), count(values, seven));
-    EXPECT_EQ(std::tie(categories, names, values), std::make_tuple(2, 2, 2));
-    TK_TRACE_ENTERING_PARAMETERS(category, " n=" << count(insertions, seven));
-    EXPECT_EQ(insertions, 2);
+    TK_TRACE_VARIABLE(counted(category), counted(name).c_str(), counted(seven));
+    EXPECT_EQ(evaluations, 6);
+    TK_TRACE_ENTERING_PARAMETERS(category, " n=" << counted(seven));
+    EXPECT_EQ(evaluations, 8);
 }
 
 TEST_F(ATracePoint, IsOneStatement) {
