@@ -55,6 +55,71 @@ CMPIStatus echo(const CMPIContext*, const CMPIResult* result, const CMPIObjectPa
     return CMReturnDone(result);
 }
 
+// A provider that notes what it is asked for, with all arguments, and answers with an instance of the path,
+// or the path itself where that is asked for.
+std::string asked;
+
+void note(const char* text) {
+    asked += text != nullptr ? text + std::string(" ") : "- ";
+}
+void note(const char** list) {
+    for (; *list != nullptr; ++list) {
+        note(*list);
+    }
+}
+void note(const CMPIInstance* instance) {
+    note(oxahv::valueText(CMGetProperty(instance, "K", nullptr)).c_str());
+}
+void note(const CMPIArgs* in) {
+    note(oxahv::valueText(CMGetArg(in, "In", nullptr)).c_str());
+}
+void note(CMPIArgs* out) {
+    CMAddArg(out, "Out", "value", CMPI_chars);
+}
+
+enum Operation { names, list, get, create, modify, remove, query, method, ends, endNames, links, linkNames };
+
+template <Operation operation, class MI, class... Rest>
+CMPIStatus noting(MI*, const CMPIContext*, const CMPIResult* result, const CMPIObjectPath* path,
+                  Rest... rest) {
+    asked += std::to_string(operation) + ' ';
+    (note(rest), ...);
+    const bool isPath =
+        operation == names || operation == create || operation == endNames || operation == linkNames;
+    return isPath ? CMReturnObjectPath(result, path)
+                  : CMReturnInstance(result, CMNewInstance(broker, path, nullptr));
+}
+
+CMPIInstanceMI* createNotingInstanceMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*) {
+    static CMPIInstanceMIFT table = {};
+    static CMPIInstanceMI mi = {nullptr, &table};
+    table.enumerateInstanceNames = noting<names>;
+    table.enumerateInstances = noting<list>;
+    table.getInstance = noting<get>;
+    table.createInstance = noting<create>;
+    table.modifyInstance = noting<modify>;
+    table.deleteInstance = noting<remove>;
+    table.execQuery = noting<query>;
+    return &mi;
+}
+
+CMPIAssociationMI* createNotingAssociationMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*) {
+    static CMPIAssociationMIFT table = {};
+    static CMPIAssociationMI mi = {nullptr, &table};
+    table.associators = noting<ends>;
+    table.associatorNames = noting<endNames>;
+    table.references = noting<links>;
+    table.referenceNames = noting<linkNames>;
+    return &mi;
+}
+
+CMPIMethodMI* createNotingMethodMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*) {
+    static CMPIMethodMIFT table = {};
+    static CMPIMethodMI mi = {nullptr, &table};
+    table.invokeMethod = noting<method>;
+    return &mi;
+}
+
 class ARequest : public testing::Test {
 protected:
     ARequest() {
@@ -102,6 +167,70 @@ TEST_F(ARequest, ReachesTheProviderAndBringsItsResultsBack) {
     const Reply other = request.invokeMethod(demo, "Other", nullptr);
     EXPECT_EQ(other.code, CMPI_RC_ERR_METHOD_NOT_FOUND);
     EXPECT_EQ(other.message, "class Demo has no method Other");
+}
+
+TEST_F(ARequest, CanBeSentByAProvider) {
+    const CMPIBroker* const b = broker_.handle();
+    const CMPIContext* const context = request_.context();
+    broker_.host("Noting", {createNotingInstanceMI, createNotingAssociationMI, createNotingMethodMI},
+                 {"Asked"});
+    CMPIObjectPath* const p = path("Asked.K=1");
+    CMPIInstance* const instance = CMNewInstance(b, p, nullptr);
+    CMPIArgs* const in = CMNewArgs(b, nullptr);
+    CMPIArgs* const out = CMNewArgs(b, nullptr);
+    CMAddArg(in, "In", "x", CMPI_chars);
+    CMPIValue two = {};
+    two.uint64 = 2;
+    const char* properties[] = {"P", "Q", nullptr};
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    const auto pathOf = [](CMPIEnumeration* all) {
+        const CMPIData first = CMGetNext(all, nullptr);
+        return oxahv::pathText(first.type == CMPI_ref ? first.value.ref
+                                                      : CMGetObjectPath(first.value.inst, nullptr));
+    };
+    const std::vector<std::string> paths = {
+        pathOf(b->bft->enumerateInstanceNames(b, context, p, &status)),
+        pathOf(b->bft->enumerateInstances(b, context, p, properties, &status)),
+        oxahv::pathText(CMGetObjectPath(b->bft->getInstance(b, context, p, properties, &status), nullptr)),
+        oxahv::pathText(b->bft->createInstance(b, context, p, instance, &status)),
+        pathOf(b->bft->execQuery(b, context, p, "select", "WQL", &status)),
+        pathOf(b->bft->associators(b, context, p, "Asked", "B", "C", "D", properties, &status)),
+        pathOf(b->bft->associatorNames(b, context, p, "Asked", "B", "C", "D", &status)),
+        pathOf(b->bft->references(b, context, p, "Asked", "B", properties, &status)),
+        pathOf(b->bft->referenceNames(b, context, p, "Asked", nullptr, &status))};
+    EXPECT_EQ(paths, std::vector<std::string>(9, "root:Asked.K=1"));
+    EXPECT_EQ(b->bft->modifyInstance(b, context, p, instance, properties).rc, CMPI_RC_OK);
+    EXPECT_EQ(b->bft->deleteInstance(b, context, p).rc, CMPI_RC_OK);
+    b->bft->invokeMethod(b, context, p, "Start", in, out, &status);
+    EXPECT_EQ(oxahv::valueText(CMGetArg(out, "Out", nullptr)), "\"value\"");
+    EXPECT_EQ(b->bft->getProperty(b, context, p, "K", &status).value.uint64, 1U);
+    EXPECT_EQ(b->bft->setProperty(b, context, p, "K", &two, CMPI_uint64).rc, CMPI_RC_OK);
+    EXPECT_EQ(asked,
+              "0 1 P Q 2 P Q 3 1 6 select WQL 8 Asked B C D P Q 9 Asked B C D 10 Asked B P Q 11 Asked - "
+              "4 1 P Q 5 7 Start \"x\" 2 K 4 2 K ");
+    b->bft->invokeMethod(b, context, p, "Start", in, reinterpret_cast<CMPIArgs*>(p), &status);
+    EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_HANDLE);
+    EXPECT_EQ(request_.invokeMethod(p, "Start", reinterpret_cast<CMPIArgs*>(p)).code,
+              CMPI_RC_ERR_INVALID_HANDLE);
+}
+
+TEST_F(ARequest, ForAMethodHasTheArgumentsThatItsClassDeclares) {
+    broker_.host("Noting", {nullptr, nullptr, createNotingMethodMI}, {"Asked"});
+    broker_.declare(ClassDeclaration("Asked").method(
+        "Start", CMPI_uint32,
+        {{"In", CMPI_string}, {"Number", CMPI_uint8A}, {"Out", CMPI_string, "", false, true}}));
+    const auto messageOf = [&](const char* name, const void* value, CMPIType type) {
+        CMPIArgs* const in = CMNewArgs(broker_.handle(), nullptr);
+        CMAddArg(in, name, value, type);
+        const Reply reply = request_.invokeMethod(path("Asked"), "start", in);
+        EXPECT_TRUE(reply.code == CMPI_RC_OK || reply.code == CMPI_RC_ERR_INVALID_PARAMETER);
+        return reply.message;
+    };
+    EXPECT_EQ(messageOf("IN", "text", CMPI_chars), "");
+    EXPECT_EQ(messageOf("Number", nullptr, CMPI_null), "");
+    EXPECT_EQ(messageOf("Number", "text", CMPI_chars), "argument Number of method Start is no uint8[]");
+    EXPECT_EQ(messageOf("Out", "text", CMPI_chars), "method Start takes no argument Out");
+    EXPECT_EQ(messageOf("Else", "text", CMPI_chars), "method Start takes no argument Else");
 }
 
 TEST_F(ARequest, ReportsWhatTheProviderReports) {
@@ -301,6 +430,18 @@ TEST_F(ARequest, MeetsTheFaultsThatAreInjectedAndIsRecorded) {
     EXPECT_EQ(CMAddKey(demo, "C", "x", CMPI_chars).rc, CMPI_RC_ERR_FAILED);
     EXPECT_EQ(CMGetClassName(demo, &status), nullptr);
     EXPECT_EQ(CMGetKeyCount(demo, &status), 2U) << "a call that fails does nothing";
+    broker_.injectFault("freeString", {CMPI_RC_OK, true});
+    CMPIString* const kept = CMNewString(broker, "text", nullptr);
+    broker->mft->freeString(broker, kept);
+    EXPECT_STREQ(CMGetCharsPtr(kept, nullptr), "text") << "the call is left out";
+    broker_.startRecording();
+    CMNewObjectPath(broker, "", "Demo", nullptr);
+    broker->bft->associatorNames(broker, request_.context(), demo, "A", "B", "C", "D", nullptr);
+    std::string texts;
+    for (const oxahv::Call& call : broker_.stopRecording()) {
+        texts += call.name + '|' + call.secondName + ' ';
+    }
+    EXPECT_EQ(texts, "|Demo A|B ");
     EXPECT_EQ(errorOf([&] { broker_.injectFault("setProperty", {}); }),
               "slot setProperty is one of several: CMPIBrokerFT.setProperty, CMPIInstanceFT.setProperty");
 }
@@ -340,6 +481,24 @@ TEST_F(ARequest, MayBeLeftByAThreadThatStaysAttached) {
         return CMRelease(prepared);
     };
     EXPECT_TRUE(request_.getInstance(path("Demo.K=1")).ok());
+}
+
+TEST_F(ARequest, EndsWithTheThreadThatItsProviderEnds) {
+    serve = [](auto&&...) -> CMPIStatus {
+        broker->xft->exitThread(&serve);
+        return {CMPI_RC_OK, nullptr};
+    };
+    const auto send = [](void* parameter) -> void* {
+        auto* const own = static_cast<EmbeddedBroker*>(parameter);
+        Request request(*own);
+        request.getInstance(request.objectPath("root", "Demo"));
+        return nullptr;
+    };
+    const std::size_t before = broker_.liveObjects().total();
+    CMPI_THREAD_RETURN returned = nullptr;
+    EXPECT_EQ(broker->xft->joinThread(broker->xft->newThread(send, &broker_, 0), &returned), 0);
+    EXPECT_EQ(returned, &serve);
+    EXPECT_EQ(broker_.liveObjects().total(), before);
 }
 
 TEST_F(ARequest, KeepsItsProviderWhileItIsInside) {
