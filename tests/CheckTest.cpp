@@ -107,6 +107,10 @@ TEST_F(TheCheck, FindsEachFault) {
     EXPECT_EQ(run(faulty_ + crash, "2>/dev/null; exit $?").status, 128 + SIGKILL)
         << "the request does on the command line what it did in the check: " << crash;
 
+    const std::string typed = "gi 'Faulty_UntypedKeys.Name=\"a\",Index=1'";
+    EXPECT_EQ(run(faulty_ + typed).status, 0);
+    EXPECT_EQ(run(faulty_ + "--keys untyped " + typed).status, 1);
+
     const Json hangs =
         reportOf(faulty_ + "check --timeout 1 --class Faulty_Hang --class Faulty_HangClosed", 1)["findings"];
     ASSERT_EQ(hangs.size(), 2U);

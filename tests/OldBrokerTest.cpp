@@ -6,16 +6,25 @@
 #include <cstddef>
 #include <cstring>
 #include <gtest/gtest.h>
-#include <regex>
 #include <sys/mman.h>
 #include <unistd.h>
 
 namespace {
 
-const std::regex laterSlots(
-    "(MemFT|ErrorFT|PropertyListFT)\\.|Filtered$|\\.(newCMPIError|openMessageFile|closeMessageFile"
-    "|getMessage2|newPropertyList|newStringCP|newEnumerationFilter|newCharsCP"
-    "|setPropertyWithOrigin|returnError)$");
+const char* const laterSlots[] = {"MemFT.",
+                                  "ErrorFT.",
+                                  "PropertyListFT.",
+                                  "Filtered",
+                                  "newCMPIError",
+                                  "openMessageFile",
+                                  "closeMessageFile",
+                                  "getMessage2",
+                                  "newPropertyList",
+                                  "newStringCP",
+                                  "newCharsCP",
+                                  "returnError",
+                                  "newEnumerationFilter",
+                                  "setPropertyWithOrigin"};
 
 const CMPIBroker* oldBroker = nullptr;
 
@@ -68,6 +77,8 @@ TEST(TheHostProviderInAnOldServer, ServesEveryKindOfRequest) {
     ::unlink(stateFile.c_str());
 
     for (const oxahv::Call& call : server.stopRecording()) {
-        EXPECT_FALSE(std::regex_search(call.slot, laterSlots)) << call.slot;
+        for (const char* const later : laterSlots) {
+            EXPECT_EQ(call.slot.find(later), std::string::npos) << call.slot;
+        }
     }
 }

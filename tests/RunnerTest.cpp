@@ -68,6 +68,7 @@ TEST(TheRunner, FollowsAssociations) {
         {"an --assoc-class OXATK_InstalledOS " + system, ""},
         {"an --role Antecedent " + system, ""},
         {"an --result-role Dependent " + system, ""},
+        {hostClasses + "an --assoc-class CIM_Dependency " + system, unquoted(os) + '\n'},
         {hostClasses + "an " + os + " --result-class CIM_System", unquoted(system) + '\n'},
         {hostClasses + "an " + os + " --result-class CIM_LogicalDevice", ""},
         {"rn --result-class OXATK_RunningOS --role dependent " + system, unquoted(association) + '\n'},
@@ -82,6 +83,10 @@ TEST(TheRunner, FollowsAssociations) {
     }
     const Json json = Json::parse(run(host + "--output json ri " + os).output);
     EXPECT_EQ(json[0]["properties"]["Dependent"], unquoted(system));
+    EXPECT_TRUE(Json::parse(run(host + hostClasses + "--output json gi " + os).output)[0]
+                    .at("properties")
+                    .at("Description")
+                    .is_null());
 }
 
 TEST(TheRunner, CallsMethodsAsTheClassDeclaresThem) {
@@ -104,10 +109,12 @@ TEST(TheRunner, CallsMethodsAsTheClassDeclaresThem) {
     }
     EXPECT_EQ(run(test + "cm Demo Any A=5 B=-5 C=false D=1.5 'E=\"5\"'").output,
               "ReturnValue = 5;\nA = 5;\nB = -5;\nC = FALSE;\nD = \"1.5\";\nE = \"5\";\n");
-    EXPECT_EQ(
-        Json::parse(run(call + "Echo --output json Small=7 Real=1.5 Flag=true Numbers=8 Other=Demo").output),
-        Json::parse(R"([{"path": "root/cimv2:Demo", "method": "Echo", "returnValue": 5,
-            "parameters": {"Small": 7, "Real": 1.5, "Flag": true, "Numbers": [8], "Other": "Demo"}}])"));
+    EXPECT_EQ(Json::parse(run(call + "Echo --output json Small=7 Real=0.1 Flag=true Numbers=8 Other=Demo "
+                                     "When=20260102030405.000000+060")
+                              .output),
+              Json::parse(R"([{"path": "root/cimv2:Demo", "method": "Echo", "returnValue": 6,
+            "parameters": {"Small": 7, "Real": 0.1, "Flag": true, "Numbers": [8], "Other": "Demo",
+                           "When": "20260102030405.000000+060"}}])"));
     const std::pair<const char*, const char*> bad[] = {
         {"Other", "class Demo has no method Other; it has Echo"},
         {"Echo Text", "argument 'Text' is not name=value"},
