@@ -120,6 +120,10 @@ TEST_F(TheLogger, WritesWholeLinesToAFileFromManyThreads) {
     }
     HVLogger::setFileSink(path_); // goes on behind what is there
     log(4000, std::string(200, 'e'));
+    testing::internal::CaptureStderr();
+    HVLogger::setStderrSink();
+    log(4000, "shown");
+    EXPECT_EQ(testing::internal::GetCapturedStderr(), "log 4000 Test shown\n");
     std::ifstream lines(path_);
     int count = 0;
     for (std::string line; std::getline(lines, line); ++count) {

@@ -9,13 +9,29 @@
 #include <sstream>
 #include <sys/resource.h>
 #include <sys/stat.h>
+#include <sys/syscall.h>
 #include <system_error>
 #include <type_traits>
+#include <unistd.h>
 #include <vector>
 
 using TK::PropertyFile;
 namespace fs = std::filesystem;
 using namespace std::string_literals;
+
+static std::string synchronised; // what was, and where a file was renamed
+
+// Stand between the library and the C library.
+extern "C" __attribute__((visibility("default"))) int fsync(int descriptor) {
+    struct stat status {};
+    ::fstat(descriptor, &status);
+    synchronised += S_ISDIR(status.st_mode) ? "folder " : "file ";
+    return static_cast<int>(::syscall(SYS_fsync, descriptor));
+}
+extern "C" __attribute__((visibility("default"))) int rename(const char* from, const char* to) noexcept {
+    synchronised += fs::path(from).parent_path() == fs::path(to).parent_path() ? "rename " : "move ";
+    return static_cast<int>(::syscall(SYS_rename, from, to));
+}
 
 namespace {
 
@@ -232,6 +248,14 @@ TEST_F(APropertyFile, KeepsPermissionsOwnerAndLinks) {
     fs::remove(path());
     fs::create_symlink("second", path());
     EXPECT_EQ(savingFailure(file), ELOOP);
+}
+
+TEST_F(APropertyFile, OutlivesAPowerFailureAsItWasOrAsItIs) {
+    PropertyFile file(path(std::string(255, 'n'))); // no file system takes a longer name
+    file.setEntry(L"a", L"1");
+    synchronised.clear();
+    file.save();
+    EXPECT_EQ(synchronised, "file rename folder ");
 }
 
 TEST_F(APropertyFile, IsUntouchedByASaveThatFails) {
