@@ -186,6 +186,13 @@ TEST_F(Accessors, ReadWideTextsThatTheLocaleHas) {
 }
 
 TEST_F(Accessors, ReadTheMemberAskedForWhateverTheType) {
+    const auto retype = [](CMPIData& data, CMPIStatus& /*status*/) { data.type = CMPI_sint8; };
+    Otherwise<&CMPIInstanceFT::getProperty> instance(instance_, retype);
+    Otherwise<&CMPIArgsFT::getArg> args(args_, retype);
+    Otherwise<&CMPIObjectPathFT::getKey> path(path_, retype);
+    for (const Getter& getter : allGetters({instance.handle(), args.handle(), path.handle()})) {
+        expectValue(getter);
+    }
     unsigned int wide = 0;
     EXPECT_TRUE(PU::getProperty(instance_, "Short", wide));
     EXPECT_EQ(wide & 0xFFFFU, 60000U);
@@ -263,6 +270,13 @@ TEST_F(Accessors, HandEveryTypeOverWithItsCode) {
     check(std::string("text"), "chars", "\"text\"");
     check(newString("string"), "string", "\"string\"");
     check(request_.objectPath("root", "Other"), "reference", "\"root:Other\"");
+    std::string own = "its own characters are handed over, not a copy's";
+    broker_.startRecording();
+    PU::setKeyProperty(path_, "Name", own);
+    PU::setProperty(instance_, "Name", own);
+    for (const oxahv::Call& call : broker_.stopRecording()) {
+        EXPECT_EQ(call.value.chars, own.c_str());
+    }
     checkProperty(true, "boolean", "TRUE");
     checkProperty(false, "boolean", "FALSE");
     checkProperty(static_cast<short>(-2), "sint16", "-2");
@@ -281,13 +295,14 @@ TEST_F(Accessors, SetTextsAsTheyAreOrAsDates) {
                '\n';
     };
     const std::string made = asked(dateText);
-    EXPECT_EQ(set(dateText, false), "setProperty Name chars\n");
+    std::string text = dateText;
+    expectSet([&] { PU::setProperty(broker_.handle(), instance_, "Name", text, false); }, "setProperty",
+              "chars", '"' + dateText + '"');
     EXPECT_EQ(set(dateText, true), made + "setProperty Name datetime = \"" + dateText + "\"\n");
     EXPECT_EQ(set("yesterday", true), asked("yesterday"));
     EXPECT_EQ(set(dateText, true, anError), made);
     EXPECT_EQ(set(dateText, true, nothing), made);
     Otherwise<&CMPIBrokerEncFT::newDateTimeFromChars> erring(broker_.handle());
-    std::string text = dateText;
     EXPECT_EQ(logOf([&] { PU::setProperty(erring.handle(), instance_, "Name", text, true); }), made);
 }
 

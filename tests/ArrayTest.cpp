@@ -108,18 +108,24 @@ TEST_F(Arrays, AreFilledUntilTheBrokerRefusesAnElement) {
 }
 
 TEST_F(Arrays, OfPasswordsDoNotTellWhereTheyLie) {
-    Strings value = {"secret"};
-    const auto shows = [&](const char* name, const void* shown) {
+    Strings texts = {"secret"};
+    const auto shows = [&](auto& value, const char* name, const void* shown) {
         const std::string list = parameters(shown, broker_.handle(), name);
         const std::string log = logOfSetting(value, name, broker_.handle());
         return log.rfind(entering(providerUtilities, "setProperty", list), 0) == 0 &&
                log.find(exiting(providerUtilities, "setProperty", list)) != std::string::npos;
     };
-    EXPECT_TRUE(shows("UserPassword", nullptr));
+    EXPECT_TRUE(shows(texts, "UserPassword", nullptr));
     for (const char* const name : {"userpassword", "UserPasswor", "UserPasswords", ""}) {
-        EXPECT_TRUE(shows(name, &value)) << name;
+        EXPECT_TRUE(shows(texts, name, &texts)) << name;
     }
-    logOfSetting(value, nullptr, broker_.handle()); // does not end the process
+    // Those of other types do.
+    std::vector<unsigned short> numbers = {1};
+    EXPECT_TRUE(shows(numbers, "UserPassword", &numbers));
+    std::vector<std::wstring> wide = {L"secret"};
+    const std::string traced = variable(providerUtilities, "setProperty", "strTarget", "secret");
+    EXPECT_NE(logOfSetting(wide, "UserPassword", broker_.handle()).find(traced), std::string::npos);
+    logOfSetting(texts, nullptr, broker_.handle()); // does not end the process
 }
 
 TEST_F(Arrays, AreReadWithoutTheElementsThatCannotBe) {
@@ -162,6 +168,12 @@ TEST_F(Arrays, AreReadWithoutTheElementsThatCannotBe) {
     // The data decides, not the status; of an element the status decides.
     Otherwise<&CMPIInstanceFT::getProperty> erring(instance_);
     EXPECT_EQ(got<unsigned short>("Numbers", erring.handle()), allNumbers);
+    for (const CMPIType type : {CMPIType{CMPI_uint32A}, CMPIType{CMPI_ARRAY}}) { // any will do
+        Otherwise<&CMPIInstanceFT::getProperty> retyped(
+            instance_, [type](CMPIData& data, CMPIStatus& /*status*/) { data.type = type; });
+        EXPECT_EQ(got<unsigned short>("Numbers", retyped.handle()), allNumbers);
+        EXPECT_EQ(got<std::string>("Texts", retyped.handle()), allTexts);
+    }
     Otherwise<&CMPIArrayFT::getElementAt> unread(CMGetProperty(instance_, "Texts", nullptr).value.array);
     Otherwise<&CMPIArrayFT::getSize> array(unread.handle(), [](CMPICount& count, CMPIStatus& status) {
         count = 2;

@@ -38,26 +38,32 @@ protected:
         broker_.declare(oxahv::ClassDeclaration("Demo_Disk"));
     }
 
-    // Whether any of the candidates is a CIM_Port; `calls` tells what the broker is called for.
+    // Whether any of the candidates is a CIM_Port; `log_` tells how that was found.
     bool related(std::vector<std::string> candidates, const CMPIBroker* broker = nullptr) {
         bool result = false;
         broker = broker != nullptr ? broker : broker_.handle();
-        const std::string log = logOf([&] {
+        log_ = logOf([&] {
             result = ProviderUtilities::areClassesRelated(broker, "root/cimv2", candidates, "CIM_Port");
         });
-        calls_.clear();
-        for (std::size_t begin = 0; begin < log.size(); begin = log.find('\n', begin) + 1) {
-            const std::string line = log.substr(begin, log.find('\n', begin) + 1 - begin);
-            calls_ += line.find('|') == std::string::npos ? line : "";
-        }
         return result;
     }
 
-    static std::string asked(const std::string& candidate) {
-        return "newObjectPath root/cimv2 " + candidate + "\nsetNameSpace root/cimv2\nclassPathIsA CIM_Port\n";
+    // What createObjectPath does for a candidate, and with the path that is made.
+    std::string asked(const std::string& candidate, bool isMade = true) const {
+        const std::string list =
+            " broker=" + address(broker_.handle()) + " classname=" + candidate + " nameSpace=root/cimv2";
+        const std::string own = "ProviderUtilities::createObjectPath";
+        return entering(providerUtilities, "createObjectPath", list) +
+               variable(providerUtilities, "createObjectPath", "classname", candidate) +
+               "newObjectPath root/cimv2 " + candidate + '\n' +
+               (isMade ? "setNameSpace root/cimv2\n" +
+                             variable(providerUtilities, "createObjectPath", '"' + own + '"', own)
+                       : "") +
+               exiting(providerUtilities, "createObjectPath", list) +
+               (isMade ? "classPathIsA CIM_Port\n" : "");
     }
 
-    std::string calls_;
+    std::string log_;
 };
 
 } // namespace
@@ -131,6 +137,7 @@ TEST_F(ClassRegistry, AnswersAsAChainOfComparisonsInTurkish) {
 TEST_F(ClassRegistry, ComparesTextsIgnoringCase) {
     EXPECT_TRUE(ProviderUtilities::textEqual("aBc", "AbC"));
     EXPECT_FALSE(ProviderUtilities::textEqual("abc", "abc "));
+    EXPECT_FALSE(ProviderUtilities::textEqual(nullptr, nullptr));
     EXPECT_FALSE(ProviderUtilities::textEqual(nullptr, ""));
     EXPECT_FALSE(ProviderUtilities::textEqual("", nullptr));
 }
@@ -161,10 +168,10 @@ TEST_F(ClassRegistry, TellsTheClassOfAnObjectPath) {
 
 TEST_F(Ancestry, IsWhatTheBrokerSays) {
     EXPECT_FALSE(related({}));
-    EXPECT_EQ(calls_, "");
+    EXPECT_EQ(log_, "");
     EXPECT_FALSE(related({"Demo_Disk", "Demo_Missing"}));
     EXPECT_TRUE(related({"Demo_Disk", "Demo_Port", "CIM_Port"}));
-    EXPECT_EQ(calls_, asked("Demo_Disk") + asked("Demo_Port")) << "no more than it takes";
+    EXPECT_EQ(log_, asked("Demo_Disk") + asked("Demo_Port")) << "no more than it takes";
     EXPECT_TRUE(ProviderUtilities::areClassesRelated(broker_.handle(), "root", "CIM_Port", "demo_port"));
     EXPECT_FALSE(ProviderUtilities::areClassesRelated(broker_.handle(), "root", "Demo_Port", "CIM_Port"));
 }
@@ -175,7 +182,7 @@ TEST_F(Ancestry, IsNoneWhenTheBrokerFails) {
     // A candidate without a path does not end the list.
     broker_.injectFault("newObjectPath", anError);
     EXPECT_TRUE(related({"Demo_Disk", "Demo_Port"}));
-    EXPECT_EQ(calls_, "newObjectPath root/cimv2 Demo_Disk\n" + asked("Demo_Port"));
+    EXPECT_EQ(log_, asked("Demo_Disk", false) + asked("Demo_Port"));
     // An answer that comes with an error counts for nothing.
     Otherwise<&CMPIBrokerEncFT::classPathIsA> erring(broker_.handle());
     EXPECT_FALSE(related({"Demo_Port"}, erring.handle()));

@@ -44,7 +44,10 @@ extern "C" __attribute__((visibility("default"))) FILE* fopen64(const char* path
 }
 
 TEST(TheHost, OffersVirtualMachinesWithADeviceAndWithoutTheServer) {
-    std::stringbuf output;
+    struct : std::stringbuf {
+        int flushes = 0;
+        int sync() override { return ++flushes, 0; }
+    } output;
     std::streambuf* const earlier = std::cout.rdbuf(&output);
     for (const bool deviceThere : {false, true}) {
         for (const bool serverThere : {false, true}) {
@@ -58,6 +61,7 @@ TEST(TheHost, OffersVirtualMachinesWithADeviceAndWithoutTheServer) {
         }
     }
     std::cout.rdbuf(earlier);
+    EXPECT_EQ(output.flushes, 0);
 }
 
 TEST(LocalisedTexts, AreInTheLanguageAndTheEncodingOfTheThread) {

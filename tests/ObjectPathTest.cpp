@@ -77,6 +77,7 @@ TEST_F(ObjectPaths, BecomeMonikersAndComeBack) {
 
     Moniker moniker;
     PU::transformObjectPathToMoniker(path, moniker);
+    EXPECT_EQ(logOfTransforming(path, moniker), log + oneOfEach.substr(0, oneOfEach.find(" > ")) + oneOfEach);
     ASSERT_TRUE(moniker.selectKey(0));
     CMPIObjectPath* again = newPath();
     const std::string list = " moniker=" + address(&moniker) + " passedObjectPath=" + address(&again);
@@ -187,6 +188,14 @@ TEST_F(ObjectPaths, ThatCannotCountTheirKeysThrowAfterTheTrace) {
     EXPECT_EQ(logOf([&] { PU::getKeyCount(path); }, "CMPIObjectPathFT.getKeyCount", anError), log);
     broker_.injectFault("CMPIObjectPathFT.getKeyCount", anError);
     EXPECT_EQ(logOfTransforming(path), log + " > Key is not selected.");
+    // The error counts after the keys, where a count comes with it.
+    Otherwise<&CMPIObjectPathFT::getKeyAt> keys(path, [](auto&, auto&) {});
+    Otherwise<&CMPIObjectPathFT::getKeyCount> erring(keys.handle(), [](CMPICount& count, CMPIStatus& status) {
+        count = 2;
+        status = {CMPI_RC_ERR_FAILED, nullptr};
+    });
+    EXPECT_EQ(logOf([&] { PU::getKeyCount(erring.handle()); }),
+              variable(providerUtilities, "getKeyCount", "keyCount", "2") + keysAt({"", ""}) + noCount);
 }
 
 TEST_F(ObjectPaths, WhoseTextsCannotBeReadThrow) {

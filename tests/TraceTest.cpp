@@ -96,6 +96,8 @@ TEST_F(ATracePoint, EvaluatesItsArgumentsForEachOfTheTwoCalls) {
     EXPECT_EQ(evaluations, 6);
     TK_TRACE_ENTERING_PARAMETERS(category, " n=" << counted(seven));
     EXPECT_EQ(evaluations, 8);
+    TK_TRACE_MESSAGE(category, counted(name).c_str());
+    EXPECT_EQ(evaluations, 10);
 }
 
 TEST_F(ATracePoint, IsOneStatement) {
