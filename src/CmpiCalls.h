@@ -73,7 +73,6 @@ inline CMPIData get(const CMPIObjectPath* path, const char* key, CMPIStatus& sta
 }
 
 inline CMPIData getKeyAt(const CMPIObjectPath* path, CMPICount index, CMPIString*& name, CMPIStatus& status) {
-    name = nullptr;
     return CMGetKeyAt(writable(path), index, &name, fresh(status));
 }
 
