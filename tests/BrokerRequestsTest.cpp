@@ -569,8 +569,8 @@ TEST(Hosting, LoadsAndUnloadsLibraries) {
         {"Throws", "provider Throws: its factory threw: no provider"},
         {"ThrowsANumber", "provider ThrowsANumber: its factory threw an exception of an unknown kind"},
     };
-    for (const auto& [name, error] : rows) {
-        EXPECT_EQ(errorOf([&] { own.load(TEST_PROVIDER, name); }), error);
+    for (const auto& row : rows) {
+        EXPECT_EQ(errorOf([&] { own.load(TEST_PROVIDER, row.first); }), row.second);
     }
     own.unload("TestProvider");
     EXPECT_EQ(errorOf([&] { own.unload("TestProvider"); }), "no provider TestProvider is hosted");

@@ -219,8 +219,8 @@ TEST(Mof, HasErrorsOfFilesWhereTheyAreIncluded) {
         {"sub", "sub:1:1: cannot read " + folder + "/sub: it is no regular file"},
         {"Circle.mof", "sub/Circle.mof:2:20: " + folder + "/sub/../Circle.mof includes itself"},
     };
-    for (const auto& [file, error] : rows) {
-        EXPECT_EQ(errorOf([&] { broker.compileMof(folder + '/' + file); }), folder + '/' + error);
+    for (const auto& row : rows) {
+        EXPECT_EQ(errorOf([&] { broker.compileMof(folder + '/' + row.first); }), folder + '/' + row.second);
     }
     const std::string text = "class A {};\n#pragma include (\"sub/\" \"Faulty.mof\")";
     EXPECT_EQ(errorOf([&] { broker.compileMofText(text, folder + "/x.mof"); }),
