@@ -96,8 +96,8 @@ TEST_F(Texts, OfUsersAreScreened) {
     strayFoldings = 0;
     checkScreen<char>(std::string("<htps:%$\\w.afHTPSWAF xyz\0\x7F\x80\xBC\xFF\xD7", 30));
     // Wide characters whose low byte is that of an entry's character stand for themselves.
-    std::wstring alphabet(L"<htps:%$\\w.afHTPSWAF xyz\0\u00BC\u00FF\u0157\u013C\u013A\U0001003A\u0125\u0124\u0100",
-                          34);
+    std::wstring alphabet(
+        L"<htps:%$\\w.afHTPSWAF xyz\0\u00BC\u00FF\u0157\u013C\u013A\U0001003A\u0125\u0124\u0100", 34);
     alphabet += static_cast<wchar_t>(-0xC4);
     alphabet += static_cast<wchar_t>(0x8000003A);
     alphabet += static_cast<wchar_t>(-1);
