@@ -167,7 +167,7 @@ TEST_F(Arrays, AreReadWithoutTheElementsThatCannotBe) {
     }
     // The data decides, not the status; of an element the status decides.
     Otherwise<&CMPIInstanceFT::getProperty> erring(instance_);
-    EXPECT_EQ(got<unsigned short>("Numbers", erring.handle()), allNumbers);
+    logOf([&] { EXPECT_EQ(got<unsigned short>("Numbers", erring.handle()), allNumbers); });
     for (const CMPIType type : {CMPIType{CMPI_uint32A}, CMPIType{CMPI_ARRAY}}) { // any will do
         Otherwise<&CMPIInstanceFT::getProperty> retyped(
             instance_, [type](CMPIData& data, CMPIStatus& /*status*/) { data.type = type; });

@@ -60,6 +60,14 @@ private:
     static inline std::function<void(Result&, CMPIStatus&)> alter_;
 };
 
+// Leaves something on the stack, so that a variable without a value is not zero by chance.
+[[gnu::noinline]] inline void soilStack() {
+    volatile char bytes[8192];
+    for (volatile char& byte : bytes) {
+        byte = 'x';
+    }
+}
+
 class BrokerTest : public testing::Test {
 protected:
     BrokerTest() { takeTraces(); }
@@ -82,6 +90,7 @@ protected:
         broker_.startRecording();
         atLoggerCalls(takeCalls);
         std::string failure;
+        soilStack();
         try {
             operation();
         } catch (const TK::FrameworkException& exception) {
