@@ -162,18 +162,18 @@ void measure(benchmark::State& state, const rows::Row& row) {
         state.counters["naive_ns"] = naive.perUnit();
         state.counters["times_faster"] = row.timesFaster;
     }
-    if (row.floorUnits == row.units) { // not of growth
+    if (!row.isGrowth()) {
         state.counters["allocations"] = allocationsOf(row);
         state.counters["allocations_at_most"] = row.allocations;
     }
     state.SetLabel(row.floorName);
 }
 
-// What a second thread brings to a row, and to its floor.
+// What a second thread brings to a row, and to its floor or else to the naive build.
 void measureGain(benchmark::State& state, const rows::Row& row) {
     Side one(row.operation, row.units);
     Side two(one);
-    Side floorOne(row.floor, row.floorUnits);
+    Side floorOne(row.floor ? row.floor : row.naive, row.floorUnits);
     Side floorTwo(floorOne);
     for ([[maybe_unused]] auto round : state) {
         state.SetIterationTime((one.measure(CLOCK_MONOTONIC) + floorOne.measure(CLOCK_MONOTONIC) +
@@ -184,7 +184,7 @@ void measureGain(benchmark::State& state, const rows::Row& row) {
     state.counters["two_ns"] = two.perUnit() / 2;
     state.counters["floor_one_ns"] = floorOne.perUnit();
     state.counters["floor_two_ns"] = floorTwo.perUnit() / 2;
-    state.SetLabel(row.floorName);
+    state.SetLabel(row.floor ? row.floorName : "the naive build");
 }
 
 // A measurement of a row, as Google Benchmark takes it.
@@ -241,11 +241,10 @@ int main(int argc, char** argv) {
     const std::vector<rows::Row> table = rows::all(large << 20U);
     for (const rows::Row& row : table) {
         // A slice of the growing rows takes a fraction of a second.
-        const bool growth = row.floorUnits != row.units;
-        add(row.name, measure, row, growth ? std::min<std::size_t>(rounds, 3) : rounds);
+        add(row.name, measure, row, row.isGrowth() ? std::min<std::size_t>(rounds, 3) : rounds);
     }
     for (const rows::Row& row : table) {
-        if (row.onTwoThreads) {
+        if (!row.isGrowth()) {
             // Two processors are free at once more seldom than one.
             add("two threads: " + row.name, measureGain, row, 3 * rounds);
         }

@@ -38,10 +38,12 @@ struct Row {
     double units = 1;
     double floorUnits = 1;
     // Goals; 0 stands for none.
-    double atMostFloor = 0;    // the operation's time, in times of the floor's
-    double timesFaster = 0;    // the naive build's time, in times of the operation's
-    double allocations = -1;   // blocks of memory per unit, at most; -1 when nothing is said
-    bool onTwoThreads = false; // then there is a floor
+    double atMostFloor = 0;  // the operation's time, in times of the floor's
+    double timesFaster = 0;  // the naive build's time, in times of the operation's
+    double allocations = -1; // blocks of memory per unit, at most; -1 when nothing is said
+
+    // Whether it tells what a unit costs in a large input: its floor is the same operation on a small one.
+    bool isGrowth() const { return floorUnits != units; }
 
     // What the operation and its naive twin result in, as text; empty where there is no twin.
     std::function<std::string()> result;
