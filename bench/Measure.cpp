@@ -87,9 +87,14 @@ std::size_t callsPerSlice(const rows::Run& run) {
     return calls;
 }
 
+// Actively, since waking a thread takes longer than a slice; but the thread that is waited for may need this
+// very processor.
 void waitFor(const std::atomic<bool>& flag) {
-    while (!flag) {
-        std::this_thread::yield(); // the thread that is waited for may need this very processor
+    constexpr unsigned int patience = 1024;
+    for (unsigned int i = 1; !flag; ++i) {
+        if (i % patience == 0) {
+            std::this_thread::yield();
+        }
     }
 }
 
@@ -102,32 +107,8 @@ public:
     bool exists() const { return calls_ != 0; }
     double perUnit() const { return shortest_ / (static_cast<double>(calls_) * units_); }
 
-    double measure(clockid_t clock = CLOCK_THREAD_CPUTIME_ID) {
-        const double time = exists() ? timeOf(run_, calls_, clock) : 0;
-        shortest_ = std::min(shortest_, time);
-        return time;
-    }
-
-    // The same slice on this thread and on another one at once, until both are through. Both wait actively,
-    // since waking a thread takes longer than the slice.
-    double measureOnTwo() {
-        std::atomic<bool> ready{false};
-        std::atomic<bool> go{false};
-        std::atomic<bool> finished{false};
-        std::thread other([&] {
-            run_(calls_); // warms the thread's own heap and buffers
-            ready = true;
-            waitFor(go);
-            run_(calls_);
-            finished = true;
-        });
-        waitFor(ready);
-        const double start = now(CLOCK_MONOTONIC);
-        go = true;
-        run_(calls_);
-        waitFor(finished);
-        const double time = now(CLOCK_MONOTONIC) - start;
-        other.join();
+    double measure() {
+        const double time = exists() ? timeOf(run_, calls_, CLOCK_THREAD_CPUTIME_ID) : 0;
         shortest_ = std::min(shortest_, time);
         return time;
     }
@@ -137,6 +118,52 @@ private:
     double units_;
     std::size_t calls_;
     double shortest_ = std::numeric_limits<double>::infinity();
+};
+
+// One side of a row on two threads: a slice on each of them, one after the other and at once. Where a stack
+// and a thread's buffers lie makes a few percent of difference, so both ways take the same steps on both
+// threads.
+class TwoThreads {
+public:
+    TwoThreads(const rows::Run& run, double units) : run_(run), units_(units), calls_(callsPerSlice(run)) {}
+
+    double inTurn() const { return perUnit(inTurn_); }
+    double atOnce() const { return perUnit(atOnce_); }
+
+    double measure() {
+        double inTurn = slice();
+        std::atomic<bool> ready{false};
+        std::atomic<bool> go{false};
+        std::atomic<bool> finished{false};
+        std::thread other([&] {
+            slice(); // warms the thread's own heap and buffers
+            inTurn += slice();
+            ready = true;
+            waitFor(go);
+            slice();
+            finished = true;
+        });
+        waitFor(ready);
+        const double start = now(CLOCK_MONOTONIC);
+        go = true;
+        slice();
+        waitFor(finished);
+        const double atOnce = now(CLOCK_MONOTONIC) - start;
+        other.join();
+        inTurn_ = std::min(inTurn_, inTurn);
+        atOnce_ = std::min(atOnce_, atOnce);
+        return inTurn + atOnce;
+    }
+
+private:
+    double perUnit(double time) const { return time / (2 * static_cast<double>(calls_) * units_); }
+    [[gnu::noinline]] double slice() { return timeOf(run_, calls_, CLOCK_MONOTONIC); }
+
+    const rows::Run& run_;
+    double units_;
+    std::size_t calls_;
+    double inTurn_ = std::numeric_limits<double>::infinity();
+    double atOnce_ = std::numeric_limits<double>::infinity();
 };
 
 double allocationsOf(const rows::Row& row) {
@@ -171,19 +198,15 @@ void measure(benchmark::State& state, const rows::Row& row) {
 
 // What a second thread brings to a row, and to its floor or else to the naive build.
 void measureGain(benchmark::State& state, const rows::Row& row) {
-    Side one(row.operation, row.units);
-    Side two(one);
-    Side floorOne(row.floor ? row.floor : row.naive, row.floorUnits);
-    Side floorTwo(floorOne);
+    TwoThreads operation(row.operation, row.units);
+    TwoThreads floor(row.floor ? row.floor : row.naive, row.units);
     for ([[maybe_unused]] auto round : state) {
-        state.SetIterationTime((one.measure(CLOCK_MONOTONIC) + floorOne.measure(CLOCK_MONOTONIC) +
-                                two.measureOnTwo() + floorTwo.measureOnTwo()) /
-                               1e9);
+        state.SetIterationTime((operation.measure() + floor.measure()) / 1e9);
     }
-    state.counters["one_ns"] = one.perUnit();
-    state.counters["two_ns"] = two.perUnit() / 2;
-    state.counters["floor_one_ns"] = floorOne.perUnit();
-    state.counters["floor_two_ns"] = floorTwo.perUnit() / 2;
+    state.counters["one_ns"] = operation.inTurn();
+    state.counters["two_ns"] = operation.atOnce();
+    state.counters["floor_one_ns"] = floor.inTurn();
+    state.counters["floor_two_ns"] = floor.atOnce();
     state.SetLabel(row.floor ? row.floorName : "the naive build");
 }
 
