@@ -47,18 +47,41 @@ bool get(const Object* object, const char* name, Member CMPIValue::*member, Out&
     return true;
 }
 
-template <class Object>
-bool getText(const Object* object, const char* name, std::string& out) {
-    CMPIString* string = nullptr;
-    if (!get(object, name, &CMPIValue::string, string)) {
-        return false;
-    }
+const char* charsOf(CMPIString* string) {
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     const char* const chars = CMGetCharsPtr(string, &status);
-    if (status.rc != CMPI_RC_OK || chars == nullptr) {
+    return status.rc == CMPI_RC_OK ? chars : nullptr;
+}
+
+bool assign(CMPIString* string, std::string& out) {
+    const char* const chars = charsOf(string);
+    if (chars == nullptr) {
         return false;
     }
     out = chars;
+    return true;
+}
+
+template <class Object>
+bool getText(const Object* object, const char* name, std::string& out) {
+    CMPIString* string = nullptr;
+    return get(object, name, &CMPIValue::string, string) && assign(string, out);
+}
+
+template <class Push>
+bool pushElements(const CMPIInstance* instance, const char* name, const Push& push) {
+    CMPIArray* array = nullptr;
+    if (!get(instance, name, &CMPIValue::array, array)) {
+        return false;
+    }
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    const CMPICount count = CMGetArrayCount(array, &status);
+    for (CMPICount i = 0; i < count; ++i) {
+        const CMPIData element = CMGetArrayElementAt(array, i, &status);
+        if (status.rc == CMPI_RC_OK) {
+            push(element.value);
+        }
+    }
     return true;
 }
 
@@ -190,6 +213,26 @@ bool getProperty(const CMPIArgs* args, const char* name, std::string& out) {
 
 bool getKeyProperty(const CMPIObjectPath* path, const char* name, std::string& out) {
     return getText(path, name, out);
+}
+
+bool getDate(const CMPIInstance* instance, const char* name, std::string& out) {
+    CMPIDateTime* dateTime = nullptr;
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    return get(instance, name, &CMPIValue::dateTime, dateTime) &&
+           assign(CMGetStringFormat(dateTime, &status), out);
+}
+
+bool getArray(const CMPIInstance* instance, const char* name, std::vector<unsigned short>& out) {
+    return pushElements(instance, name, [&out](const CMPIValue& value) { out.push_back(value.uint16); });
+}
+
+bool getArray(const CMPIInstance* instance, const char* name, std::vector<std::string>& out) {
+    return pushElements(instance, name, [&out](const CMPIValue& value) {
+        const char* const chars = charsOf(value.string);
+        if (chars != nullptr) {
+            out.emplace_back(chars);
+        }
+    });
 }
 
 void push(Keys& keys, std::string name, unsigned char value) {

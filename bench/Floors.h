@@ -44,6 +44,11 @@ TK_EXPORT bool getKeyProperty(const CMPIObjectPath* path, const char* name, CMPI
 TK_EXPORT bool getProperty(const CMPIInstance* instance, const char* name, std::string& out);
 TK_EXPORT bool getProperty(const CMPIArgs* args, const char* name, std::string& out);
 TK_EXPORT bool getKeyProperty(const CMPIObjectPath* path, const char* name, std::string& out);
+TK_EXPORT bool getDate(const CMPIInstance* instance, const char* name, std::string& out);
+
+// The bare calls and a push of each element.
+TK_EXPORT bool getArray(const CMPIInstance* instance, const char* name, std::vector<unsigned short>& out);
+TK_EXPORT bool getArray(const CMPIInstance* instance, const char* name, std::vector<std::string>& out);
 
 // Appends the record that Moniker::addKey appends, its digits written by to_chars.
 using Keys = std::vector<TK::Moniker::KeyComponent>;

@@ -299,6 +299,53 @@ void ProviderUtilities::setKeyProperty(CMPIObjectPath* objectPath, const char* n
     CMAddKey(objectPath, name, value.c_str(), CMPI_chars);
 }
 
+void ProviderUtilities::setKeyProperty(CMPIObjectPath* objectPath, const char* name,
+                                       const std::wstring& value) {
+    std::string converted;
+    if (!ConvertWideCharToMultiByte(value, converted)) {
+        NAIVE_MESSAGE(providerUtilities, "Failed to convert the data to Multi byte");
+        return;
+    }
+    CMAddKey(objectPath, name, converted.c_str(), CMPI_chars);
+}
+
+namespace {
+
+bool widen(const CMPIData& data, const CMPIStatus& status, std::wstring& out) {
+    if (status.rc != CMPI_RC_OK || (data.state & CMPI_nullValue) != 0) {
+        return false;
+    }
+    const std::string text = ProviderUtilities::convertToString(data.value.string);
+    std::wstring converted;
+    if (!ProviderUtilities::ConvertMultiByteToWideChar(text, converted)) {
+        NAIVE_MESSAGE(providerUtilities, "Failed to convert the data to Multi byte");
+        return false;
+    }
+    out = converted;
+    return true;
+}
+
+} // namespace
+
+bool ProviderUtilities::getKeyProperty(const CMPIObjectPath* objectPath, const char* name,
+                                       std::wstring& out) {
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    const CMPIData data = CMGetKey(objectPath, name, &status);
+    return widen(data, status, out);
+}
+
+bool ProviderUtilities::getProperty(const CMPIInstance* instance, const char* name, std::wstring& out) {
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    const CMPIData data = CMGetProperty(instance, name, &status);
+    return widen(data, status, out);
+}
+
+bool ProviderUtilities::getProperty(const CMPIArgs* args, const char* name, std::wstring& out) {
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    const CMPIData data = CMGetArg(args, name, &status);
+    return widen(data, status, out);
+}
+
 void ProviderUtilities::setProperty(CMPIInstance* instance, const char* name, bool value) {
     CMPIBoolean number = value ? 1 : 0;
     CMSetProperty(instance, name, &number, CMPI_boolean);
@@ -520,6 +567,14 @@ bool ProviderUtilities::ConvertWideCharToMultiByte(std::wstring in, std::string&
         return true;
     }
     return CUtility::WStringToAString(in, out);
+}
+
+bool ProviderUtilities::ConvertMultiByteToWideChar(std::string in, std::wstring& out) {
+    if (in.empty()) {
+        out = L"";
+        return true;
+    }
+    return CUtility::AStringToWString(in, out);
 }
 
 bool CUtility::AStringToWString(std::string in, std::wstring& out) {

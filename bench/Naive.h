@@ -56,6 +56,8 @@ public:
     static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, unsigned int value);
     static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, unsigned long long value);
     static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, const std::string& value);
+    static void setKeyProperty(CMPIObjectPath* objectPath, const char* name, const std::wstring& value);
+    static bool getKeyProperty(const CMPIObjectPath* objectPath, const char* name, std::wstring& out);
 
     static void setProperty(CMPIInstance* instance, const char* name, bool value);
     static void setProperty(CMPIInstance* instance, const char* name, unsigned char value);
@@ -77,9 +79,13 @@ public:
     static void setProperty(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
                             std::vector<std::wstring>& value);
 
+    static bool getProperty(const CMPIInstance* instance, const char* name, std::wstring& out);
+    static bool getProperty(const CMPIArgs* args, const char* name, std::wstring& out);
+
     static bool ValidateInput(std::string text, std::string exemption);
     static bool ValidateInput(std::wstring text, std::wstring exemption);
     static bool ConvertWideCharToMultiByte(std::wstring in, std::string& out);
+    static bool ConvertMultiByteToWideChar(std::string in, std::wstring& out);
 
     static unsigned short getKeyCount(const CMPIObjectPath* objectPath);
     static void transformObjectPathToMoniker(const CMPIObjectPath* objectPath, Moniker& moniker);

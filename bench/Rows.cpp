@@ -269,9 +269,19 @@ struct BareCalls {
     static void setKeyProperty(Arguments... arguments) {
         floors::setKeyProperty(arguments...);
     }
+    static void setProperty(CMPIInstance* instance, const char* name, const std::string& value) {
+        floors::setProperty(instance, name, value.c_str());
+    }
+    static void setKeyProperty(CMPIObjectPath* path, const char* name, const std::string& value) {
+        floors::setKeyProperty(path, name, value.c_str());
+    }
     template <class Object, class Out>
     static bool getProperty(const Object* object, const char* name, Out&& out) {
         return floors::getProperty(object, name, std::forward<Out>(out));
+    }
+    template <class Element>
+    static bool getProperty(const CMPIInstance* instance, const char* name, std::vector<Element>& out) {
+        return floors::getArray(instance, name, out);
     }
     template <class Out>
     static bool getKeyProperty(const CMPIObjectPath* path, const char* name, Out&& out) {
@@ -292,11 +302,14 @@ void setNumbers() {
     Calls::setProperty(instance, "Temperature", 36.6);
 }
 
+std::string elementName = "Onboard network port";
+
 template <class Calls>
 void setHandles() {
     Calls::setProperty(&broker.instance, "Name", &broker.text);
     Calls::setProperty(&broker.instance, "System", &broker.path);
-    Calls::setProperty(&broker.instance, "ElementName", "eth0");
+    Calls::setProperty(&broker.instance, "DeviceID", "eth0");
+    Calls::setProperty(&broker.instance, "ElementName", elementName);
 }
 
 template <class Calls>
@@ -313,6 +326,7 @@ void setKeyHandles() {
     Calls::setKeyProperty(&broker.path, "Name", &broker.text);
     Calls::setKeyProperty(&broker.path, "System", &broker.path);
     Calls::setKeyProperty(&broker.path, "DeviceID", "eth0");
+    Calls::setKeyProperty(&broker.path, "ElementName", elementName);
 }
 
 template <class Calls, class Object>
@@ -343,17 +357,17 @@ void addScalars(Table& table) {
         .floor(bare, setNumbers<BareCalls>, 1.1)
         .units(8)
         .allocations(0);
-    table.add("setProperty: string, reference, C text", setHandles<Utilities>)
+    table.add("setProperty: string, reference, C text, C++ text", setHandles<Utilities>)
         .floor(bare, setHandles<BareCalls>, 1.1)
-        .units(3)
+        .units(4)
         .allocations(0);
     table.add("setKeyProperty: 4 kinds of numbers", setKeyNumbers<Utilities>)
         .floor(bare, setKeyNumbers<BareCalls>, 1.1)
         .units(4)
         .allocations(0);
-    table.add("setKeyProperty: string, reference, C text", setKeyHandles<Utilities>)
+    table.add("setKeyProperty: string, reference, C text, C++ text", setKeyHandles<Utilities>)
         .floor(bare, setKeyHandles<BareCalls>, 1.1)
-        .units(3)
+        .units(4)
         .allocations(0);
     table.add("getProperty of an instance: 3 kinds", [] { return getNumbers<Utilities>(&broker.instance); })
         .floor(
@@ -372,55 +386,67 @@ void addScalars(Table& table) {
 }
 
 void addTextGetters(Table& table) {
-    const std::string bare = "the bare calls, one assignment";
-    table
-        .add("getProperty of an instance: text",
-             [] {
-                 std::string out;
-                 TK::ProviderUtilities::getProperty(&broker.textInstance, "Name", out, false);
-                 return out.size();
-             })
-        .floor(
-            bare,
-            [] {
+    const auto row = [&table](const std::string& from, auto get, auto getBare) {
+        const auto sizeOf = [](auto getter) {
+            return [getter] {
                 std::string out;
-                floors::getProperty(&broker.textInstance, "Name", out);
+                getter(out);
                 return out.size();
-            },
-            1.2)
-        .allocations(0);
+            };
+        };
+        table.add(from, sizeOf(get)).floor("the bare calls, one assignment", sizeOf(getBare), 1.2);
+    };
+    row(
+        "getProperty of an instance: text",
+        [](auto& out) { TK::ProviderUtilities::getProperty(&broker.textInstance, "Name", out, false); },
+        [](auto& out) { floors::getProperty(&broker.textInstance, "Name", out); });
+    table.allocations(0);
+    row(
+        "getProperty of an instance: date as text",
+        [](auto& out) { TK::ProviderUtilities::getProperty(&broker.dateInstance, "Name", out, true); },
+        [](auto& out) { floors::getDate(&broker.dateInstance, "Name", out); });
+    table.allocations(1); // the result is longer than a string holds by itself
+    row(
+        "getProperty of arguments: text",
+        [](auto& out) { TK::ProviderUtilities::getProperty(&broker.textArgs, "Name", out); },
+        [](auto& out) { floors::getProperty(&broker.textArgs, "Name", out); });
+    table.allocations(0);
+    row(
+        "getKeyProperty: text",
+        [](auto& out) { TK::ProviderUtilities::getKeyProperty(&broker.path, "DeviceID", out); },
+        [](auto& out) { floors::getKeyProperty(&broker.path, "DeviceID", out); });
+    table.allocations(0);
+}
+
+// Wide accessors: a conversion of a short text, and the bare calls.
+void addWideAccessors(Table& table) {
+    static const std::wstring key = L"Onboard port";
+    static std::wstring value = key;
     table
-        .add("getProperty of arguments: text",
-             [] {
-                 std::string out;
-                 TK::ProviderUtilities::getProperty(&broker.textArgs, "Name", out);
-                 return out.size();
-             })
-        .floor(
-            bare,
-            [] {
-                std::string out;
-                floors::getProperty(&broker.textArgs, "Name", out);
-                return out.size();
-            },
-            1.2)
-        .allocations(0);
+        .addBoth("getProperty, getKeyProperty: wide text, 3 handles",
+                 [](auto side) {
+                     using Utilities = typename decltype(side)::ProviderUtilities;
+                     std::wstring ofInstance;
+                     std::wstring ofArguments;
+                     std::wstring ofPath;
+                     Utilities::getProperty(&broker.textInstance, "Name", ofInstance);
+                     Utilities::getProperty(&broker.textArgs, "Name", ofArguments);
+                     Utilities::getKeyProperty(&broker.path, "DeviceID", ofPath);
+                     return ofInstance.size() + ofArguments.size() + ofPath.size();
+                 })
+        .units(3)
+        .timesFaster(4)
+        .allocations(traces(2, 0) + 1); // the result
     table
-        .add("getKeyProperty: text",
-             [] {
-                 std::string out;
-                 TK::ProviderUtilities::getKeyProperty(&broker.path, "DeviceID", out);
-                 return out.size();
-             })
-        .floor(
-            bare,
-            [] {
-                std::string out;
-                floors::getKeyProperty(&broker.path, "DeviceID", out);
-                return out.size();
-            },
-            1.2)
-        .allocations(0);
+        .addBoth("setProperty, setKeyProperty: wide text",
+                 [](auto side) {
+                     using Utilities = typename decltype(side)::ProviderUtilities;
+                     Utilities::setProperty(&broker.instance, "ElementName", value);
+                     Utilities::setKeyProperty(&broker.path, "ElementName", key);
+                 })
+        .units(2)
+        .timesFaster(4)
+        .allocations(traces(2, 0) + 1); // the text that is taken by value
 }
 
 // Monikers
@@ -458,7 +484,11 @@ template <class Number>
 Number numberFromChars() {
     static const std::string text = "54321";
     Number number = 0;
-    std::from_chars(opaque(text.data()), text.data() + text.size(), number);
+    if constexpr (std::is_same_v<Number, unsigned char>) {
+        number = static_cast<Number>(*opaque(text.data())); // its text is the character itself
+    } else {
+        std::from_chars(opaque(text.data()), text.data() + text.size(), number);
+    }
     return number;
 }
 
@@ -499,20 +529,20 @@ void addMonikers(Table& table) {
         .units(16)
         .allocations(5.0 / 16);
     table
-        .addBoth("getValue: 3 kinds of numbers",
+        .addBoth("getValue: 4 kinds of numbers",
                  [](auto side) {
                      using Moniker = typename decltype(side)::Moniker;
-                     return numberIn<Moniker, unsigned short>() + numberIn<Moniker, unsigned int>() +
-                            numberIn<Moniker, unsigned long long>();
+                     return numberIn<Moniker, unsigned char>() + numberIn<Moniker, unsigned short>() +
+                            numberIn<Moniker, unsigned int>() + numberIn<Moniker, unsigned long long>();
                  })
         .floor(
             "from_chars",
             [] {
-                return numberFromChars<unsigned short>() + numberFromChars<unsigned int>() +
-                       numberFromChars<unsigned long long>();
+                return numberFromChars<unsigned char>() + numberFromChars<unsigned short>() +
+                       numberFromChars<unsigned int>() + numberFromChars<unsigned long long>();
             },
             4)
-        .units(3)
+        .units(4)
         .allocations(0);
 }
 
@@ -775,8 +805,17 @@ void addDates(Table& table) {
         .allocations(traces(2, 0) + 1);
 }
 
+template <class Calls, class Element>
+std::size_t getArray() {
+    std::vector<Element> out;
+    const bool areTexts = std::is_same_v<Element, std::string>;
+    Calls::getProperty(areTexts ? &broker.textsInstance : &broker.numbersInstance, "Names", out);
+    return out.size();
+}
+
 void addArrays(Table& table) {
-    constexpr std::size_t size = 64;
+    constexpr std::size_t size = thin::arraySize;
+    static std::vector<unsigned char> bytes(size, 65);
     static std::vector<unsigned short> numbers(size, 5989);
     static std::vector<std::string> texts(size, "enp0s31f6");
     static std::vector<std::wstring> wideTexts(size, L"enp0s31f6");
@@ -786,12 +825,22 @@ void addArrays(Table& table) {
                                                            elements);
         };
     };
+    table.addBoth("array setter, 64 numbers of 8 bits", set(bytes)).timesFaster(4).allocations(traces(1, 2));
     table.addBoth("array setter, 64 numbers", set(numbers)).timesFaster(4).allocations(traces(1, 2));
     table.addBoth("array setter, 64 texts", set(texts)).timesFaster(4).allocations(traces(1, 2));
     // Each conversion takes its text by value and traces entry, exit and result.
     table.addBoth("array setter, 64 wide texts", set(wideTexts))
         .timesFaster(4)
         .allocations(traces(1, 0) + size * (traces(3, 0) + 1));
+
+    const std::string push = "the bare calls, a push of each";
+    // The vector grows seven times to 64 elements.
+    table.add("array getter, 64 numbers", getArray<TK::ProviderUtilities, unsigned short>)
+        .floor(push, getArray<BareCalls, unsigned short>, 1.2)
+        .allocations(7);
+    table.add("array getter, 64 texts", getArray<TK::ProviderUtilities, std::string>)
+        .floor(push, getArray<BareCalls, std::string>, 1.2)
+        .allocations(7);
 }
 
 // A file of some entries.
@@ -801,6 +850,7 @@ struct FilledFile {
             file.setEntry(L"asset.entry." + std::to_wstring(i), L"some value");
         }
         file.setEntry(L"asset.number", L"90210");
+        file.setEntry(L"asset.byte", L"65");
     }
     TK::PropertyFile file;
 };
@@ -815,9 +865,20 @@ void addPropertyFile(Table& table) {
     static const std::string key = "asset.number";
     static const std::wstring wideKey = L"asset.number";
     static const std::wstring value = L"90210";
+    static const std::string byteKey = "asset.byte";
+    static const std::wstring wideByteKey = L"asset.byte";
+    static const std::wstring byteValue = L"65";
     table.add("ReadUint32FromFile", [] { return TK::Utils::ReadUint32FromFile(someFile(), key); })
         .floor(
             "the file's getEntry", [] { return someFile().getEntry(wideKey); }, 2);
+    table.add("ReadUint8FromFile", [] { return TK::Utils::ReadUint8FromFile(someFile(), key); })
+        .floor(
+            "the file's getEntry", [] { return someFile().getEntry(wideKey); }, 2);
+    table
+        .add("WriteUint8ToFile",
+             [] { TK::Utils::WriteUint8ToFile(someFile(), byteKey, opaque(static_cast<unsigned char>(65))); })
+        .floor(
+            "the file's setEntry", [] { someFile().setEntry(wideByteKey, byteValue); }, 2);
     table.add("WriteUint32ToFile", [] { TK::Utils::WriteUint32ToFile(someFile(), key, opaque(90210U)); })
         .floor(
             "the file's setEntry", [] { someFile().setEntry(wideKey, value); }, 2);
@@ -961,6 +1022,7 @@ std::vector<Row> all(std::size_t large) {
     addRegistry(table);
     addScalars(table);
     addTextGetters(table);
+    addWideAccessors(table);
     addMonikers(table);
     addPaths(table);
     addTraces(table);

@@ -153,13 +153,35 @@ CMPIStatus setElementAt(const CMPIArray* /*array*/, CMPICount /*index*/, const C
     return ok;
 }
 
+CMPICount getSize(const CMPIArray* /*array*/, CMPIStatus* /*status*/) {
+    return arraySize;
+}
+
+CMPIData getElementAt(const CMPIArray* array, CMPICount /*index*/, CMPIStatus* /*status*/) {
+    return contentOf<CMPIData>(array);
+}
+
 CMPIArrayFT makeArrayTable() {
     CMPIArrayFT table = {};
+    table.getSize = getSize;
+    table.getElementAt = getElementAt;
     table.setElementAt = setElementAt;
     return table;
 }
 CMPIArrayFT arrayTable = makeArrayTable();
-CMPIDateTimeFT dateTimeTable = {};
+
+CMPIString dateText = stringOf("20260329013007.000250+120");
+
+CMPIString* getStringFormat(const CMPIDateTime* /*dateTime*/, CMPIStatus* /*status*/) {
+    return &dateText;
+}
+
+CMPIDateTimeFT makeDateTimeTable() {
+    CMPIDateTimeFT table = {};
+    table.getStringFormat = getStringFormat;
+    return table;
+}
+CMPIDateTimeFT dateTimeTable = makeDateTimeTable();
 
 // The broker
 
@@ -202,6 +224,26 @@ PathContent fiveKeys = {keyKinds, textData(&deviceId)};
 PathContent manyKeys = {65535, textData(&deviceId)};
 CMPIData text = textData(&deviceId);
 
+CMPIArray numbersArray = {&numberSeven, &arrayTable};
+CMPIArray textsArray = {&text, &arrayTable};
+
+CMPIData arrayData(CMPIType elementType, CMPIArray* array) {
+    CMPIData data = {static_cast<CMPIType>(elementType | CMPI_ARRAY), CMPI_goodValue, {}};
+    data.value.array = array;
+    return data;
+}
+CMPIData numbers = arrayData(CMPI_uint16, &numbersArray);
+CMPIData texts = arrayData(CMPI_string, &textsArray);
+
+CMPIDateTime someDate = {nullptr, &dateTimeTable};
+
+CMPIData dateData(CMPIDateTime* dateTime) {
+    CMPIData data = {CMPI_dateTime, CMPI_goodValue, {}};
+    data.value.dateTime = dateTime;
+    return data;
+}
+CMPIData date = dateData(&someDate);
+
 } // namespace
 
 Objects& objects() {
@@ -210,6 +252,9 @@ Objects& objects() {
                           {&manyKeys, &pathTable},
                           {&numberSeven, &instanceTable},
                           {&text, &instanceTable},
+                          {&date, &instanceTable},
+                          {&numbers, &instanceTable},
+                          {&texts, &instanceTable},
                           {&numberSeven, &argsTable},
                           {&text, &argsTable},
                           className,
