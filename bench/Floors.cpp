@@ -251,4 +251,20 @@ void push(Keys& keys, std::string name, unsigned long long value) {
     pushNumber(keys, TK::Moniker::COMPONENT_UINT64, std::move(name), value);
 }
 
+void read(const std::string& text, unsigned char& value) {
+    value = static_cast<unsigned char>(text[0]);
+}
+
+void read(const std::string& text, unsigned short& value) {
+    std::from_chars(text.data(), text.data() + text.size(), value);
+}
+
+void read(const std::string& text, unsigned int& value) {
+    std::from_chars(text.data(), text.data() + text.size(), value);
+}
+
+void read(const std::string& text, unsigned long long& value) {
+    std::from_chars(text.data(), text.data() + text.size(), value);
+}
+
 } // namespace floors

@@ -57,4 +57,10 @@ TK_EXPORT void push(Keys& keys, std::string name, unsigned short value);
 TK_EXPORT void push(Keys& keys, std::string name, unsigned int value);
 TK_EXPORT void push(Keys& keys, std::string name, unsigned long long value);
 
+// Reads the text that Moniker::addKey makes of a number by from_chars; that of a byte is the byte itself.
+TK_EXPORT void read(const std::string& text, unsigned char& value);
+TK_EXPORT void read(const std::string& text, unsigned short& value);
+TK_EXPORT void read(const std::string& text, unsigned int& value);
+TK_EXPORT void read(const std::string& text, unsigned long long& value);
+
 } // namespace floors

@@ -9,7 +9,6 @@
 
 #include <array>
 #include <cctype>
-#include <charconv>
 #include <cmpimacs.h>
 #include <cstdio>
 #include <cstring>
@@ -484,11 +483,7 @@ template <class Number>
 Number numberFromChars() {
     static const std::string text = "54321";
     Number number = 0;
-    if constexpr (std::is_same_v<Number, unsigned char>) {
-        number = static_cast<Number>(*opaque(text.data())); // its text is the character itself
-    } else {
-        std::from_chars(opaque(text.data()), text.data() + text.size(), number);
-    }
+    floors::read(text, number);
     return number;
 }
 
