@@ -5,7 +5,6 @@
 #include <limits>
 #include <locale>
 #include <sstream>
-#include <string_view>
 #include <utility>
 
 namespace TK {
@@ -62,10 +61,9 @@ void numberOf(const std::string& text, Number& number) {
 
 // A stream skips white space, finds nothing behind it, and leaves `byte` as it is.
 void numberOf(const std::string& text, unsigned char& byte) {
-    constexpr std::string_view whiteSpace = " \t\n\v\f\r";
     if (!digitsArePlain()) {
         extract(text, byte);
-    } else if (whiteSpace.find(text[0]) == std::string_view::npos) {
+    } else if (text[0] != ' ' && (text[0] < '\t' || text[0] > '\r')) {
         byte = static_cast<unsigned char>(text[0]);
     }
 }
