@@ -78,7 +78,10 @@ template <class Object>
 bool read(const Object* object, const char* name, CMPIData& data) {
     CMPIStatus status;
     data = cmpi::get(object, name, status);
-    return !cmpi::failed(status) && !cmpi::isNull(data);
+    if (cmpi::failed(status)) { // in one expression with the other test, success takes two jumps
+        return false;
+    }
+    return !cmpi::isNull(data);
 }
 
 // A getter. The data's type is not compared: the member asked for is read whatever it is.
