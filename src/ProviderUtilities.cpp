@@ -598,16 +598,29 @@ wchar_t lowerCase(wchar_t c) {
 // A word of the list ends with a point, behind one of two letters.
 constexpr std::size_t wordLength = 4;
 
+// Whether three characters, folded, are the letters of a word.
+template <class Fold>
+bool areLetters(const char* characters, Fold fold) {
+    const char second = fold(characters[1]);
+    const char third = fold(characters[2]);
+    return fold(characters[0]) == 'w' && ((second == 'w' && third == 'w') || (second == 'a' && third == 'p'));
+}
+
+// No locale folds another character to one of these letters, so that few have to be asked of the locale.
+constexpr char foldedLetter(char c) {
+    return static_cast<char>(c | 0x20);
+}
+
 // Whether a word ends in a text at a position from `first` on.
 bool endsWord(std::string_view text, std::size_t first) {
     for (std::size_t point = text.find('.', first); point != std::string_view::npos;
          point = text.find('.', point + 1)) {
-        if (point >= wordLength - 1 && lowerCase(text[point - 3]) == 'w') {
-            const char second = lowerCase(text[point - 2]);
-            const char third = lowerCase(text[point - 1]);
-            if ((second == 'w' && third == 'w') || (second == 'a' && third == 'p')) {
-                return true;
-            }
+        if (point < wordLength - 1) {
+            continue;
+        }
+        const char* const letters = text.data() + point - (wordLength - 1);
+        if (areLetters(letters, foldedLetter) && areLetters(letters, [](char c) { return lowerCase(c); })) {
+            return true;
         }
     }
     return false;
@@ -615,12 +628,12 @@ bool endsWord(std::string_view text, std::size_t first) {
 
 // Whether a word may end in a block of a text, which is not the text's beginning. There is no branch in it,
 // so that compilers look at many characters at once: texts of many sentences have many points, but few behind
-// these letters. No locale folds another character to one of them.
+// these letters.
 constexpr std::size_t blockSize = 4096;
 bool mayEndWord(const char* block) {
     char found = 0;
     for (std::size_t i = 0; i < blockSize; ++i) {
-        const char before = static_cast<char>(block[i - 1] | 0x20);
+        const char before = foldedLetter(block[i - 1]);
         found = static_cast<char>(found | ((block[i] == '.') & ((before == 'w') | (before == 'p'))));
     }
     return found != 0;
