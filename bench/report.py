@@ -13,6 +13,7 @@ import subprocess
 
 MOST_INITIALISERS = 3
 LEAST_GAIN = 0.97
+REASONS = pathlib.Path(__file__).with_name("missed.md")
 MET, MISSED = "", " ✗"
 
 
@@ -175,11 +176,29 @@ def markdown(head, lines):
     return "\n".join("| " + " | ".join(line) + " |" for line in [head, rule] + lines)
 
 
+def goals_of(entry):
+    """Whether each goal of a row is met."""
+    return [entry[key]["met"] for key in ("goal", "faster_goal", "allocation_goal") if key in entry]
+
+
 def summary(entries):
     """How many goals are met."""
-    goals = [entry[key]["met"] for entry in entries for key in ("goal", "faster_goal", "allocation_goal")
-             if key in entry]
+    goals = [met for entry in entries for met in goals_of(entry)]
     return f"{sum(goals)} of {len(goals)} goals met; {MISSED.strip()} marks a miss"
+
+
+def reasons():
+    """What is known of rows that miss, by the row's name: the sections of a file of their own."""
+    sections = re.split(r"^## (.*)\n", REASONS.read_text(), flags=re.M)
+    return {name: text.strip() for name, text in zip(sections[1::2], sections[2::2])}
+
+
+def missed(entries):
+    """The page's section on the rows that miss a goal; empty when none does."""
+    known = reasons()
+    names = [entry["name"] for entry in entries if not all(goals_of(entry))]
+    texts = [f"**{name}**: {known.get(name, 'not looked into')}" for name in names]
+    return "\n\n".join(["", "## What is missed, and why", *texts]) + "\n" if texts else ""
 
 
 def machine():
@@ -241,7 +260,7 @@ What each operation costs, beside its floor and beside a naive build of the same
 ![How much of each goal's allowance is used](performance.svg)
 
 {markdown(head, lines)}
-"""
+{missed(entries)}"""
 
 
 def main():
@@ -259,6 +278,8 @@ def main():
     head, lines = table(entries, arguments.baseline)
     print(plain(head, lines))
     print("\n" + summary(entries))
+    for name in reasons().keys() - {entry["name"] for entry in entries}:
+        print(f"{REASONS.name} tells of a row that does not exist: {name}")
     arguments.json.write_text(json.dumps({"machine": facts, "rows": entries}, indent=1, ensure_ascii=False))
     if arguments.record:
         arguments.record.mkdir(exist_ok=True)
