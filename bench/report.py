@@ -197,7 +197,7 @@ def missed(entries):
     """The page's section on the rows that miss a goal; empty when none does."""
     known = reasons()
     names = [entry["name"] for entry in entries if not all(goals_of(entry))]
-    texts = [f"**{name}**: {known.get(name, 'not looked into')}" for name in names]
+    texts = [f"**{name}**: {known.get(name) or known.get(name.split(':')[0], 'not looked into')}" for name in names]
     return "\n\n".join(["", "## What is missed, and why", *texts]) + "\n" if texts else ""
 
 
@@ -278,7 +278,7 @@ def main():
     head, lines = table(entries, arguments.baseline)
     print(plain(head, lines))
     print("\n" + summary(entries))
-    for name in reasons().keys() - {entry["name"] for entry in entries}:
+    for name in reasons().keys() - {part for entry in entries for part in (entry["name"], entry["name"].split(":")[0])}:
         print(f"{REASONS.name} tells of a row that does not exist: {name}")
     arguments.json.write_text(json.dumps({"machine": facts, "rows": entries}, indent=1, ensure_ascii=False))
     if arguments.record:
