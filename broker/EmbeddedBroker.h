@@ -446,7 +446,8 @@ struct AssociationFilter {
 
 /**
  * A client's request, with its CMPI context. While it lives, it owns what the broker makes on this thread.
- * Requests nest: an upcall of a provider runs in the request that it serves.
+ * Requests nest: an upcall of a provider runs in the request that it serves. Of one that fails the provider
+ * gets the code without the message.
  *
  * The operations find the provider by the class of the path, call its MI function, and collect what it
  * returns. Each asks one provider, the first that serves the class; of several with associations, a request
