@@ -3,7 +3,6 @@
 #include "Core.h"
 
 #include <algorithm>
-#include <cxxabi.h>
 #include <dlfcn.h>
 #include <future>
 
@@ -96,9 +95,8 @@ CMPIStatus guarded(const Function& function, std::string& message) {
     } catch (const std::exception& exception) {
         message = std::string("exception: ") + exception.what();
         return thrown;
-    } catch (const abi::__forced_unwind&) { // the thread ends
-        throw;
     } catch (...) {
+        passOnTheEndOfAThread();
         message = "exception of an unknown kind";
         return thrown;
     }

@@ -4,6 +4,7 @@
 #include "EmbeddedBroker.h"
 
 #include <algorithm>
+#include <cxxabi.h>
 #include <functional>
 #include <memory>
 #include <mutex>
@@ -20,6 +21,14 @@ using Core = EmbeddedBroker::Impl;
 struct Failure {
     CMPIrc code;
 };
+
+// In a handler of everything: a thread that ends unwinds its stack by what is no C++ exception and must go
+// on.
+inline void passOnTheEndOfAThread() {
+    if (abi::__cxa_current_exception_type() == nullptr) {
+        throw;
+    }
+}
 
 // Names of classes, properties and keys compare ignoring the case of ASCII letters.
 bool sameName(std::string_view a, std::string_view b);

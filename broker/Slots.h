@@ -9,7 +9,6 @@
 #include "Core.h"
 
 #include <cstring>
-#include <cxxabi.h>
 #include <new>
 #include <tuple>
 #include <type_traits>
@@ -146,9 +145,8 @@ private:
             return failed<Return>(status, failure.code);
         } catch (const std::bad_alloc&) {
             return failed<Return>(status, CMPI_RC_ERROR_SYSTEM);
-        } catch (const abi::__forced_unwind&) { // the thread ends
-            throw;
         } catch (...) { // such as a message handler's
+            passOnTheEndOfAThread();
             return failed<Return>(status, CMPI_RC_ERR_FAILED);
         }
     }

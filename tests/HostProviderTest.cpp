@@ -60,6 +60,7 @@ public:
         writePort("lo", "772", "unknown", "", "");
         setZone("XST-5:30");
         setHostRoot(root_);
+        ::unsetenv("LOCPATH"); // for the provider's own locale, of which the C library would lose the path
         broker_.setContextEntry("OXAHostStateFile", stateFile_);
         host(broker_);
     }
@@ -270,7 +271,9 @@ TEST_F(TheHostProvider, LeavesTheServersLocaleAsItIs) {
     EXPECT_EQ(codeOf("OXATK_Fan"), CMPI_RC_ERR_INVALID_CLASS);
     EXPECT_EQ(::uselocale(nullptr), LC_GLOBAL_LOCALE);
     {
+        ::setenv("LOCPATH", TEST_LOCALES, 1);
         const ThreadLocale german("de_DE.ISO-8859-1");
+        ::unsetenv("LOCPATH");
         const locale_t own = ::uselocale(nullptr);
         EXPECT_EQ(setTag("ä"), "0");
         EXPECT_EQ(::uselocale(nullptr), own);
