@@ -250,9 +250,9 @@ TEST_F(ABroker, TellsAboutObjectsAndMakesMessages) {
     EXPECT_NE(handle_->eft->isOfType(handle_, string("x"), "CMPIString", nullptr), 0);
     EXPECT_EQ(textOf(handle_->eft->toString(handle_, path_, nullptr)), "root:Demo");
     CMPIString* const message =
-        handle_->eft->getMessage(handle_, "id", "{0} of {1}: {2} {0} {3} {0 {", nullptr, 3, CMPI_chars, "{1}",
-                                 CMPI_uint32, 7U, CMPI_string, string("down"));
-    EXPECT_EQ(textOf(message), "{1} of 7: down {1} {3} {0 {");
+        handle_->eft->getMessage(handle_, "id", "{0} of {1}: {2} {0} {4} {0 { {3}", nullptr, 4, CMPI_chars,
+                                 "{1}", CMPI_uint32, 7U, CMPI_string, string("down"), CMPI_real64, 0.1);
+    EXPECT_EQ(textOf(message), "{1} of 7: down {1} {4} {0 { 0.1");
     const CMPIError* const error = handle_->eft->newCMPIError(
         handle_, "owner", "id", "message", ErrorSevHigh, ErrorProbCauseOther, CMPI_RC_ERR_FAILED, nullptr);
     error->ft->setErrorSource(error, "source");
