@@ -1,10 +1,10 @@
 // The broker behind its public class.
 #pragma once
 
-#include "Classes.h"
-#include "Hooks.h"
-#include "Hosting.h"
-#include "Objects.h"
+#include "classes/Classes.h"
+#include "hosting/Hosting.h"
+#include "objects/Objects.h"
+#include "tables/Hooks.h"
 
 #include <array>
 #include <atomic>

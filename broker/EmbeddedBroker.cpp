@@ -1,7 +1,7 @@
 #include "EmbeddedBroker.h"
 
 #include "Core.h"
-#include "MofCompiler.h"
+#include "mof/MofCompiler.h"
 
 namespace oxahv {
 

@@ -1,7 +1,7 @@
 #include "Arguments.h"
 
-#include "Text.h"
-#include "Values.h"
+#include "show/Text.h"
+#include "show/Values.h"
 
 #include <algorithm>
 #include <iterator>

@@ -1,8 +1,8 @@
 // oxahv-provider: the command line.
 
-#include "Check.h"
 #include "Runner.h"
-#include "Text.h"
+#include "check/Check.h"
+#include "show/Text.h"
 
 #include <CLI/CLI.hpp>
 

@@ -1,8 +1,8 @@
 #include "Runner.h"
 
 #include "Arguments.h"
-#include "ProgressLine.h"
-#include "Text.h"
+#include "show/ProgressLine.h"
+#include "show/Text.h"
 
 #include <HVLogger.h>
 

@@ -1,7 +1,7 @@
 // Performs one request on a provider.
 #pragma once
 
-#include "Output.h"
+#include "show/Output.h"
 
 #include <EmbeddedBroker.h>
 

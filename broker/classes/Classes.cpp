@@ -1,4 +1,4 @@
-#include "Classes.h"
+#include "classes/Classes.h"
 
 #include <algorithm>
 

@@ -1,7 +1,7 @@
 // The declared classes.
 #pragma once
 
-#include "Objects.h"
+#include "objects/Objects.h"
 
 #include <atomic>
 #include <functional>

@@ -1,6 +1,6 @@
 // The qualifiers of a declared element, and their values as CMPI hands them out.
 
-#include "Classes.h"
+#include "classes/Classes.h"
 
 #include <algorithm>
 

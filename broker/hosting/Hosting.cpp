@@ -1,4 +1,4 @@
-#include "Hosting.h"
+#include "hosting/Hosting.h"
 
 #include "Core.h"
 

@@ -1,6 +1,6 @@
-#include "MofCompiler.h"
+#include "mof/MofCompiler.h"
 
-#include "MofValues.h"
+#include "mof/MofValues.h"
 
 #include <algorithm>
 #include <fstream>

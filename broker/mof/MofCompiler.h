@@ -1,8 +1,8 @@
 // From MOF to declarations: reads files, follows includes, and gives what is written its meaning.
 #pragma once
 
-#include "Classes.h"
-#include "MofParser.h"
+#include "classes/Classes.h"
+#include "mof/MofParser.h"
 
 #include <cstddef>
 #include <filesystem>

@@ -1,4 +1,4 @@
-#include "MofLexer.h"
+#include "mof/MofLexer.h"
 
 #include "EmbeddedBroker.h"
 

@@ -1,6 +1,6 @@
-#include "MofParser.h"
+#include "mof/MofParser.h"
 
-#include "Objects.h"
+#include "objects/Objects.h"
 
 #include <algorithm>
 #include <iterator>

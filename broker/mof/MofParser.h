@@ -2,7 +2,7 @@
 #pragma once
 
 #include "EmbeddedBroker.h"
-#include "MofLexer.h"
+#include "mof/MofLexer.h"
 
 #include <optional>
 #include <string>

@@ -1,8 +1,8 @@
-#include "MofValues.h"
+#include "mof/MofValues.h"
 
-#include "Classes.h"
-#include "DateTimeText.h"
-#include "Integers.h"
+#include "classes/Classes.h"
+#include "text/DateTimeText.h"
+#include "text/Integers.h"
 
 #include <algorithm>
 #include <cmath>

@@ -1,7 +1,7 @@
 // What the values in a MOF text mean.
 #pragma once
 
-#include "MofParser.h"
+#include "mof/MofParser.h"
 
 namespace oxahv {
 

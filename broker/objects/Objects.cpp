@@ -1,4 +1,4 @@
-#include "Objects.h"
+#include "objects/Objects.h"
 
 #include "Core.h"
 

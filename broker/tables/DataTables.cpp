@@ -1,8 +1,8 @@
 // The function tables of strings, arrays, date/times, arguments, contexts, enumerations, results, property
 // lists and errors.
 
-#include "DateTimeText.h"
-#include "Slots.h"
+#include "tables/Slots.h"
+#include "text/DateTimeText.h"
 
 namespace oxahv {
 

@@ -1,7 +1,7 @@
 // CMPIBrokerEncFT: makes objects and asks about them.
 
-#include "DateTimeText.h"
-#include "Slots.h"
+#include "tables/Slots.h"
+#include "text/DateTimeText.h"
 
 #include <charconv>
 #include <chrono>

@@ -1,4 +1,4 @@
-#include "Hooks.h"
+#include "tables/Hooks.h"
 
 namespace oxahv {
 

@@ -1,6 +1,6 @@
 // The function tables of object paths and instances.
 
-#include "Slots.h"
+#include "tables/Slots.h"
 
 #include <algorithm>
 

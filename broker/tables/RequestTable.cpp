@@ -1,7 +1,7 @@
 // CMPIBrokerFT: a provider's threads, and its requests to other providers, which run in the request that it
 // serves.
 
-#include "Slots.h"
+#include "tables/Slots.h"
 
 #include <memory>
 

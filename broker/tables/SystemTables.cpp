@@ -1,6 +1,6 @@
 // CMPIBrokerExtFT and CMPIBrokerMemFT: threads and memory of the operating system.
 
-#include "Slots.h"
+#include "tables/Slots.h"
 
 #include <cerrno>
 #include <cstdlib>

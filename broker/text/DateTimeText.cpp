@@ -1,4 +1,4 @@
-#include "DateTimeText.h"
+#include "text/DateTimeText.h"
 
 #include <algorithm>
 #include <array>

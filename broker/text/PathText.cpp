@@ -1,8 +1,8 @@
 // Reads object paths, and single values, from texts.
 
 #include "Core.h"
-#include "DateTimeText.h"
-#include "Integers.h"
+#include "text/DateTimeText.h"
+#include "text/Integers.h"
 
 #include <cerrno>
 #include <charconv>

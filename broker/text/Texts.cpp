@@ -1,7 +1,7 @@
 // Codes, types, values and paths as texts.
 
 #include "EmbeddedBroker.h"
-#include "Objects.h"
+#include "objects/Objects.h"
 
 #include <algorithm>
 #include <array>

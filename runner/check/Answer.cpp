@@ -1,7 +1,7 @@
-#include "Answer.h"
+#include "check/Answer.h"
 
-#include "Text.h"
-#include "Values.h"
+#include "show/Text.h"
+#include "show/Values.h"
 
 #include <strings.h>
 

@@ -1,7 +1,7 @@
-#include "Associations.h"
+#include "check/Associations.h"
 
-#include "Examination.h"
-#include "Text.h"
+#include "check/Examination.h"
+#include "show/Text.h"
 
 #include <algorithm>
 #include <set>

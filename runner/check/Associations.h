@@ -1,7 +1,7 @@
 // The associations of one instance: from both ends, through every filter.
 #pragma once
 
-#include "Client.h"
+#include "check/Client.h"
 
 #include <optional>
 #include <string>

@@ -1,10 +1,10 @@
-#include "Check.h"
+#include "check/Check.h"
 
-#include "Examination.h"
-#include "ProgressLine.h"
-#include "Strain.h"
-#include "Text.h"
-#include "Values.h"
+#include "check/Examination.h"
+#include "check/Strain.h"
+#include "show/ProgressLine.h"
+#include "show/Text.h"
+#include "show/Values.h"
 
 #include <algorithm>
 #include <chrono>

@@ -1,4 +1,4 @@
-#include "Child.h"
+#include "check/Child.h"
 
 #include <array>
 #include <cerrno>

@@ -1,4 +1,4 @@
-#include "Client.h"
+#include "check/Client.h"
 
 #include <nlohmann/json.hpp>
 

@@ -2,9 +2,9 @@
 // each, and looks at what any answer has to be.
 #pragma once
 
-#include "Child.h"
-#include "Findings.h"
-#include "Query.h"
+#include "check/Child.h"
+#include "check/Findings.h"
+#include "check/Query.h"
 
 #include <atomic>
 #include <functional>

@@ -1,8 +1,8 @@
-#include "Examination.h"
+#include "check/Examination.h"
 
-#include "Associations.h"
-#include "Text.h"
-#include "Values.h"
+#include "check/Associations.h"
+#include "show/Text.h"
+#include "show/Values.h"
 
 #include <algorithm>
 #include <set>

@@ -1,7 +1,7 @@
 // What every client does with a class, and what is looked at meanwhile.
 #pragma once
 
-#include "Client.h"
+#include "check/Client.h"
 
 #include <optional>
 #include <string>

@@ -1,6 +1,6 @@
-#include "Findings.h"
+#include "check/Findings.h"
 
-#include "Text.h"
+#include "show/Text.h"
 
 #include <nlohmann/json.hpp>
 

@@ -1,7 +1,7 @@
 // What a check of a provider finds, and how it is reported.
 #pragma once
 
-#include "Output.h"
+#include "show/Output.h"
 
 #include <ostream>
 #include <string>

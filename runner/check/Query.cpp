@@ -1,4 +1,4 @@
-#include "Query.h"
+#include "check/Query.h"
 
 #include <algorithm>
 #include <cctype>

@@ -1,8 +1,8 @@
 // One request of a check, and how it is sent.
 #pragma once
 
-#include "Answer.h"
 #include "Runner.h"
+#include "check/Answer.h"
 
 #include <string>
 #include <vector>

@@ -1,4 +1,4 @@
-#include "Strain.h"
+#include "check/Strain.h"
 
 #include <algorithm>
 #include <chrono>

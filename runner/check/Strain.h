@@ -2,7 +2,7 @@
 // broker's calls failing.
 #pragma once
 
-#include "Client.h"
+#include "check/Client.h"
 
 // Compares what several threads at once get with what one got before and after. What changes from one time to
 // the next by itself, such as the free memory, is left out.

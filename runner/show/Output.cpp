@@ -1,6 +1,6 @@
-#include "Output.h"
+#include "show/Output.h"
 
-#include "Values.h"
+#include "show/Values.h"
 
 #include <charconv>
 #include <nlohmann/json.hpp>

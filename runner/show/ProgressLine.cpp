@@ -1,6 +1,6 @@
-#include "ProgressLine.h"
+#include "show/ProgressLine.h"
 
-#include "Text.h"
+#include "show/Text.h"
 
 #include <iostream>
 #include <unistd.h>

@@ -1,4 +1,4 @@
-#include "Text.h"
+#include "show/Text.h"
 
 #include <Utf8.h>
 

@@ -1,6 +1,6 @@
-#include "Values.h"
+#include "show/Values.h"
 
-#include "Text.h"
+#include "show/Text.h"
 
 namespace {
 
