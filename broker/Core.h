@@ -2,8 +2,9 @@
 #pragma once
 
 #include "classes/Classes.h"
+#include "hosting/AttachedThreads.h"
 #include "hosting/Hosting.h"
-#include "objects/Objects.h"
+#include "objects/Records.h"
 #include "tables/Hooks.h"
 
 #include <array>
@@ -48,6 +49,7 @@ public:
     Owner clones{*this}; // apart from what a memory mark frees: they are their callers'
     Classes classes;
     Hooks hooks;
+    AttachedThreads attachedThreads; // after the owners and before the providers, which may leave threads
     Hosting hosting{*this};
     std::atomic<KeyMode> keyMode{KeyMode::exact};
 };

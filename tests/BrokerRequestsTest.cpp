@@ -483,6 +483,28 @@ TEST_F(ARequest, MayBeLeftByAThreadThatStaysAttached) {
     EXPECT_TRUE(request_.getInstance(path("Demo.K=1")).ok());
 }
 
+// A sanitizer sees the thread's end touch the objects of the broker that is gone.
+TEST(AnAttachedThread, OutlivesItsBroker) {
+    auto shortLived = std::make_unique<EmbeddedBroker>();
+    const CMPIBroker* const handle = shortLived->handle();
+    std::promise<void> attached;
+    std::promise<void> gone;
+    std::thread thread([&] {
+        {
+            Request request(*shortLived);
+            handle->bft->attachThread(handle, request.context());
+            CMNewString(handle, "text", nullptr);
+        }
+        attached.set_value();
+        gone.get_future().wait();
+    });
+    attached.get_future().wait();
+    EXPECT_EQ(shortLived->liveObjects().strings, 1U);
+    shortLived.reset();
+    gone.set_value();
+    thread.join();
+}
+
 TEST_F(ARequest, EndsWithTheThreadThatItsProviderEnds) {
     serve = [](auto&&...) -> CMPIStatus {
         broker->xft->exitThread(&serve);

@@ -1,7 +1,7 @@
 // The declared classes.
 #pragma once
 
-#include "objects/Objects.h"
+#include "objects/Records.h"
 
 #include <atomic>
 #include <functional>

@@ -1,6 +1,6 @@
 #include "mof/MofParser.h"
 
-#include "objects/Objects.h"
+#include "objects/Records.h"
 
 #include <algorithm>
 #include <iterator>

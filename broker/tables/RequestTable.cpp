@@ -3,22 +3,11 @@
 
 #include "tables/Slots.h"
 
-#include <memory>
-
 namespace oxahv {
 
 namespace {
 
-// Threads. The objects that an attached thread makes die when it is detached, or ends.
-
-struct Attachment {
-    explicit Attachment(Core& core) : owner(core) {}
-
-    Owner owner;
-    Owner::Scope scope{owner};
-};
-
-thread_local std::vector<std::unique_ptr<Attachment>> attachments;
+// Threads
 
 // The new thread's context; it outlives the request that the provider is in.
 CMPIContext* prepareAttachThread(Core& /*core*/, const CMPIContext* handle) {
@@ -37,15 +26,12 @@ void requireContext(const CMPIContext* handle) {
 
 void attachThread(Core& core, const CMPIContext* context) {
     requireContext(context);
-    attachments.push_back(std::make_unique<Attachment>(core));
+    core.attachedThreads.attach(core);
 }
 
 void detachThread(Core& core, const CMPIContext* context) {
     requireContext(context);
-    if (attachments.empty() || &attachments.back()->owner.core() != &core) {
-        throw Failure{CMPI_RC_ERR_FAILED};
-    }
-    attachments.pop_back();
+    AttachedThreads::detach(core);
 }
 
 // There is nobody to deliver to.

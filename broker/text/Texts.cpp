@@ -1,7 +1,7 @@
 // Codes, types, values and paths as texts.
 
 #include "EmbeddedBroker.h"
-#include "objects/Objects.h"
+#include "objects/Records.h"
 
 #include <algorithm>
 #include <array>

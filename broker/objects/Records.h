@@ -1,191 +1,17 @@
-// The broker's CMPI objects, the values in them, and who owns them.
+// The broker's objects with their CMPI records: instances, object paths, strings, arrays and the rest. Each
+// class has one function table, which tables/ fills; the address of that table in a record tells the class of
+// a handle.
 #pragma once
 
-#include "EmbeddedBroker.h"
+#include "objects/Value.h"
 
-#include <algorithm>
-#include <cxxabi.h>
 #include <functional>
 #include <memory>
-#include <mutex>
 #include <string>
-#include <string_view>
 #include <utility>
 #include <vector>
 
 namespace oxahv {
-
-using Core = EmbeddedBroker::Impl;
-
-// What an operation of a slot throws; the slot reports it as a status.
-struct Failure {
-    CMPIrc code;
-};
-
-// In a handler of everything: a thread that ends unwinds its stack by what is no C++ exception and must go
-// on.
-inline void passOnTheEndOfAThread() {
-    if (abi::__cxa_current_exception_type() == nullptr) {
-        throw;
-    }
-}
-
-// Names of classes, properties and keys compare ignoring the case of ASCII letters.
-bool sameName(std::string_view a, std::string_view b);
-std::string foldedName(std::string_view name);
-
-enum class Kind {
-    instance,
-    objectPath,
-    arguments,
-    string,
-    array,
-    dateTime,
-    enumeration,
-    context,
-    result,
-    other
-};
-constexpr std::size_t kindCount = 10;
-
-class Owner;
-
-// What all objects of the broker have in common.
-class Object {
-public:
-    Object(Core& core, Kind kind);
-    virtual ~Object();
-    Object(const Object&) = delete;
-    Object& operator=(const Object&) = delete;
-
-    Core& core() const { return core_; }
-    Kind kind() const { return kind_; }
-    // The owner that frees this object; null while it is part of another object.
-    Owner* owner() const { return owner_; }
-    virtual std::unique_ptr<Object> clone() const = 0;
-    // The CMPI record, as a handle of any kind.
-    virtual void* record() = 0;
-
-private:
-    friend class Owner;
-    Core& core_;
-    Kind kind_;
-    Owner* owner_ = nullptr;
-    Object* newer_ = nullptr; // the owner's list
-    Object* older_ = nullptr;
-};
-
-// Frees its objects when it dies: a request's, an attached thread's, or the broker's.
-class Owner {
-public:
-    explicit Owner(Core& core) : core_(core) {}
-    ~Owner();
-    Owner(const Owner&) = delete;
-    Owner& operator=(const Owner&) = delete;
-
-    Core& core() const { return core_; }
-    void adopt(std::unique_ptr<Object> object);
-    std::unique_ptr<Object> release(Object& object);
-    // Frees what was adopted after `mark`, and `mark` itself.
-    void freeSince(const Object& mark);
-
-    // The innermost owner of the calling thread, the broker itself when it has none.
-    static Owner& current(Core& core);
-
-    // Makes an owner the innermost one of the thread while it lives.
-    class Scope {
-    public:
-        explicit Scope(Owner& owner) : owner_(owner) { owner_.enter(); }
-        ~Scope() { owner_.leave(); }
-        Scope(const Scope&) = delete;
-        Scope& operator=(const Scope&) = delete;
-
-    private:
-        Owner& owner_;
-    };
-
-private:
-    // The owners of a thread, innermost first.
-    void enter();
-    void leave();
-    void unlink(Object& object);
-
-    Core& core_;
-    std::mutex mutex_;
-    Object* newest_ = nullptr;
-    Owner* outer_ = nullptr;
-};
-
-// The member of a value that its type says, and no byte more: the caller may have no whole value. Of a
-// `CMPI_chars` the pointer itself.
-CMPIValue memberOf(const CMPIValue* value, CMPIType type);
-
-// The type under which values of a type are stored: texts are CMPI_string, their arrays CMPI_stringA.
-CMPIType storedType(CMPIType type);
-
-// A CMPI value that owns its text or object.
-class Value {
-public:
-    Value() = default;
-    Value(const Value& other) { *this = other; }
-    Value(Value&&) noexcept = default;
-    Value& operator=(const Value& other);
-    Value& operator=(Value&&) noexcept = default;
-    ~Value() = default;
-
-    // A NULL of a type.
-    static Value null(CMPIType type);
-    // A copy of what the caller of a slot passed: `value` may be null, and of `CMPI_chars` is the text
-    // itself.
-    static Value from(Core& core, const CMPIValue* value, CMPIType type);
-    static Value number(const CMPIValue& value, CMPIType type);
-    static Value text(Core& core, std::string text, CMPIType type = CMPI_string);
-
-    CMPIType type() const { return type_; }
-    bool isNull() const { return isNull_; }
-    // What a slot hands out. Texts and objects in it stay this value's.
-    CMPIData data(CMPIValueState state = CMPI_goodValue) const;
-    // A text as `CMPI_chars`, or as `CMPI_string` again.
-    void retype(CMPIType type) { type_ = type; }
-    // A key, which may have come as the KeyMode has it, as a property of a type: a text as `CMPI_string`, an
-    // integer of the widest type as the narrower one where it fits.
-    Value asProperty(CMPIType declared) const;
-
-private:
-    CMPIType type_ = CMPI_null;
-    bool isNull_ = true;
-    CMPIValue plain_ = {};
-    std::unique_ptr<Object> object_;
-};
-
-struct NamedValue {
-    std::string name;
-    Value value;
-};
-
-// Keys, properties, arguments, context entries: values by name, in the order in which the names came.
-class NamedValues {
-public:
-    const NamedValue* find(std::string_view name) const;
-    void set(std::string_view name, Value value);
-    std::size_t size() const { return values_.size(); }
-    // Throws CMPI_RC_ERR_NOT_FOUND for an index out of range.
-    const NamedValue& at(std::size_t index) const;
-    // Removes the others. `isKept` takes a name.
-    template <class Predicate>
-    void keepOnly(const Predicate& isKept) {
-        const auto end = std::remove_if(values_.begin(), values_.end(),
-                                        [&](const NamedValue& named) { return !isKept(named.name); });
-        values_.erase(end, values_.end());
-    }
-    auto begin() const { return values_.begin(); }
-    auto end() const { return values_.end(); }
-    auto begin() { return values_.begin(); }
-    auto end() { return values_.end(); }
-
-private:
-    std::vector<NamedValue> values_;
-};
 
 // An object with its CMPI record. The address of the table tells the kind of a handle.
 template <class Record, Kind objectKind, class Derived>
@@ -376,14 +202,6 @@ public:
 
 // The object of a handle of any kind; null for what is none.
 Object* objectOf(const void* handle);
-
-// Gives a new object to the current owner of the thread and hands out its record.
-template <class Class>
-auto handOut(std::unique_ptr<Class> object) {
-    Class& given = *object;
-    Owner::current(given.core()).adopt(std::move(object));
-    return &given;
-}
 
 // A value that belongs to an array of one, which the current owner has.
 CMPIData keep(Core& core, Value value);

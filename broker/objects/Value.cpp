@@ -1,19 +1,12 @@
-#include "objects/Objects.h"
+#include "objects/Value.h"
 
-#include "Core.h"
+#include "objects/Records.h"
 
 #include <algorithm>
-#include <iterator>
 
 namespace oxahv {
 
 namespace {
-
-thread_local Owner* currentOwner = nullptr;
-
-char folded(char c) {
-    return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
-}
 
 // A copy of the object in a value, null when there is none.
 std::unique_ptr<Object> objectIn(const void* handle) {
@@ -85,110 +78,6 @@ bool copyPlain(CMPIValue& to, const CMPIValue& from, CMPIType type) {
 }
 
 } // namespace
-
-Object* objectOf(const void* handle) {
-    // Every record begins with a handle and a table, and the address of the table tells the kind.
-    struct Record {
-        void* object;
-        const void* table;
-    };
-    static const void* const tables[] = {&String::table,       &Array::table,    &DateTime::table,
-                                         &Arguments::table,    &Context::table,  &Enumeration::table,
-                                         &ObjectPath::table,   &Instance::table, &Result::table,
-                                         &PropertyList::table, &Error::table};
-    if (handle == nullptr) {
-        return nullptr;
-    }
-    const auto* const record = static_cast<const Record*>(handle);
-    const bool isOurs = std::find(std::begin(tables), std::end(tables), record->table) != std::end(tables);
-    return isOurs ? static_cast<Object*>(record->object) : nullptr;
-}
-
-bool sameName(std::string_view a, std::string_view b) {
-    return a.size() == b.size() &&
-           std::equal(a.begin(), a.end(), b.begin(), [](char x, char y) { return folded(x) == folded(y); });
-}
-
-std::string foldedName(std::string_view name) {
-    std::string result(name);
-    std::transform(result.begin(), result.end(), result.begin(), folded);
-    return result;
-}
-
-Object::Object(Core& core, Kind kind) : core_(core), kind_(kind) {
-    core.countObject(kind, 1);
-}
-
-Object::~Object() {
-    core_.countObject(kind_, -1);
-}
-
-Owner::~Owner() {
-    while (newest_ != nullptr) {
-        release(*newest_);
-    }
-}
-
-void Owner::adopt(std::unique_ptr<Object> object) {
-    const std::lock_guard<std::mutex> lock(mutex_);
-    Object* const given = object.release();
-    given->owner_ = this;
-    given->older_ = newest_;
-    if (newest_ != nullptr) {
-        newest_->newer_ = given;
-    }
-    newest_ = given;
-}
-
-void Owner::unlink(Object& object) {
-    (object.newer_ != nullptr ? object.newer_->older_ : newest_) = object.older_;
-    if (object.older_ != nullptr) {
-        object.older_->newer_ = object.newer_;
-    }
-    object.owner_ = nullptr;
-    object.newer_ = nullptr;
-    object.older_ = nullptr;
-}
-
-std::unique_ptr<Object> Owner::release(Object& object) {
-    const std::lock_guard<std::mutex> lock(mutex_);
-    unlink(object);
-    return std::unique_ptr<Object>(&object);
-}
-
-void Owner::freeSince(const Object& mark) {
-    Owner doomed(core_); // frees outside the lock
-    const std::lock_guard<std::mutex> lock(mutex_);
-    for (bool reached = false; !reached && newest_ != nullptr;) {
-        Object& object = *newest_;
-        reached = &object == &mark;
-        unlink(object);
-        doomed.adopt(std::unique_ptr<Object>(&object));
-    }
-}
-
-void Owner::enter() {
-    outer_ = currentOwner;
-    currentOwner = this;
-}
-
-void Owner::leave() {
-    for (Owner** link = &currentOwner; *link != nullptr; link = &(*link)->outer_) {
-        if (*link == this) {
-            *link = outer_;
-            return;
-        }
-    }
-}
-
-Owner& Owner::current(Core& core) {
-    for (Owner* owner = currentOwner; owner != nullptr; owner = owner->outer_) {
-        if (&owner->core_ == &core) {
-            return *owner;
-        }
-    }
-    return core.owner;
-}
 
 CMPIValue memberOf(const CMPIValue* value, CMPIType type) {
     CMPIValue result = {};
@@ -323,92 +212,6 @@ const NamedValue& NamedValues::at(std::size_t index) const {
         throw Failure{CMPI_RC_ERR_NOT_FOUND};
     }
     return values_[index];
-}
-
-Array::Array(Core& core, CMPIType type, std::size_t size)
-    : RecordedObject(core), elementType(storedType(type)), elements(size, Value::null(type)) {}
-
-std::unique_ptr<Object> Array::clone() const {
-    auto copy = std::make_unique<Array>(core(), elementType, 0);
-    copy->elements = elements;
-    return copy;
-}
-
-std::unique_ptr<Object> Arguments::clone() const {
-    auto copy = std::make_unique<Arguments>(core());
-    copy->values = values;
-    return copy;
-}
-
-std::unique_ptr<Object> Context::clone() const {
-    auto copy = std::make_unique<Context>(core());
-    copy->values = values;
-    return copy;
-}
-
-std::unique_ptr<Object> Enumeration::clone() const {
-    auto copy = std::make_unique<Enumeration>(core(), elementType);
-    copy->elements = elements;
-    copy->next = next;
-    return copy;
-}
-
-std::unique_ptr<ObjectPath> ObjectPath::copy() const {
-    auto copy = std::make_unique<ObjectPath>(core(), nameSpace, className);
-    copy->hostName = hostName;
-    copy->keys = keys;
-    return copy;
-}
-
-std::unique_ptr<Object> Instance::clone() const {
-    auto copy = std::make_unique<Instance>(core(), path->copy());
-    copy->properties = properties;
-    copy->isFiltered = isFiltered;
-    copy->filter = filter;
-    return copy;
-}
-
-void Instance::setKeysOf(const ObjectPath& source) {
-    const auto declared = core().classes.find(source.className);
-    for (const NamedValue& key : source.keys) {
-        const PropertyDeclaration* const property = declared != nullptr ? declared->find(key.name) : nullptr;
-        properties.set(key.name,
-                       key.value.asProperty(property != nullptr ? property->type : CMPIType{CMPI_null}));
-    }
-}
-
-PropertyList::PropertyList(Core& core, std::vector<std::string> list)
-    : RecordedObject(core), names(std::move(list)) {
-    for (const std::string& name : names) {
-        pointers.push_back(name.c_str());
-    }
-    pointers.push_back(nullptr);
-}
-
-std::unique_ptr<Object> Error::clone() const {
-    auto copy = std::make_unique<Error>(core());
-    copy->type = type;
-    copy->severity = severity;
-    copy->probableCause = probableCause;
-    copy->sourceFormat = sourceFormat;
-    copy->statusCode = statusCode;
-    copy->otherType = otherType;
-    copy->owningEntity = owningEntity;
-    copy->messageId = messageId;
-    copy->message = message;
-    copy->probableCauseDescription = probableCauseDescription;
-    copy->source = source;
-    copy->otherSourceFormat = otherSourceFormat;
-    copy->statusCodeDescription = statusCodeDescription;
-    copy->recommendedActions = recommendedActions;
-    copy->messageArguments = messageArguments;
-    return copy;
-}
-
-CMPIData keep(Core& core, Value value) {
-    auto holder = std::make_unique<Array>(core, value.type(), 0);
-    holder->elements.push_back(std::move(value));
-    return handOut(std::move(holder))->elements.front().data();
 }
 
 } // namespace oxahv

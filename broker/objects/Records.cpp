@@ -1,0 +1,116 @@
+#include "objects/Records.h"
+
+#include "Core.h"
+
+#include <algorithm>
+#include <cstring>
+#include <iterator>
+
+namespace oxahv {
+
+Object* objectOf(const void* handle) {
+    static const void* const tables[] = {&String::table,       &Array::table,    &DateTime::table,
+                                         &Arguments::table,    &Context::table,  &Enumeration::table,
+                                         &ObjectPath::table,   &Instance::table, &Result::table,
+                                         &PropertyList::table, &Error::table};
+    if (handle == nullptr) {
+        return nullptr;
+    }
+    // Every record begins with a handle and a table. The records are types of their own, so their bytes are
+    // copied: reading them all through one structure would break the aliasing rule.
+    struct {
+        void* object;
+        const void* table;
+    } record;
+    std::memcpy(&record, handle, sizeof record);
+    const bool isOurs = std::find(std::begin(tables), std::end(tables), record.table) != std::end(tables);
+    return isOurs ? static_cast<Object*>(record.object) : nullptr;
+}
+
+Array::Array(Core& core, CMPIType type, std::size_t size)
+    : RecordedObject(core), elementType(storedType(type)), elements(size, Value::null(type)) {}
+
+std::unique_ptr<Object> Array::clone() const {
+    auto copy = std::make_unique<Array>(core(), elementType, 0);
+    copy->elements = elements;
+    return copy;
+}
+
+std::unique_ptr<Object> Arguments::clone() const {
+    auto copy = std::make_unique<Arguments>(core());
+    copy->values = values;
+    return copy;
+}
+
+std::unique_ptr<Object> Context::clone() const {
+    auto copy = std::make_unique<Context>(core());
+    copy->values = values;
+    return copy;
+}
+
+std::unique_ptr<Object> Enumeration::clone() const {
+    auto copy = std::make_unique<Enumeration>(core(), elementType);
+    copy->elements = elements;
+    copy->next = next;
+    return copy;
+}
+
+std::unique_ptr<ObjectPath> ObjectPath::copy() const {
+    auto copy = std::make_unique<ObjectPath>(core(), nameSpace, className);
+    copy->hostName = hostName;
+    copy->keys = keys;
+    return copy;
+}
+
+std::unique_ptr<Object> Instance::clone() const {
+    auto copy = std::make_unique<Instance>(core(), path->copy());
+    copy->properties = properties;
+    copy->isFiltered = isFiltered;
+    copy->filter = filter;
+    return copy;
+}
+
+void Instance::setKeysOf(const ObjectPath& source) {
+    const auto declared = core().classes.find(source.className);
+    for (const NamedValue& key : source.keys) {
+        const PropertyDeclaration* const property = declared != nullptr ? declared->find(key.name) : nullptr;
+        properties.set(key.name,
+                       key.value.asProperty(property != nullptr ? property->type : CMPIType{CMPI_null}));
+    }
+}
+
+PropertyList::PropertyList(Core& core, std::vector<std::string> list)
+    : RecordedObject(core), names(std::move(list)) {
+    for (const std::string& name : names) {
+        pointers.push_back(name.c_str());
+    }
+    pointers.push_back(nullptr);
+}
+
+std::unique_ptr<Object> Error::clone() const {
+    auto copy = std::make_unique<Error>(core());
+    copy->type = type;
+    copy->severity = severity;
+    copy->probableCause = probableCause;
+    copy->sourceFormat = sourceFormat;
+    copy->statusCode = statusCode;
+    copy->otherType = otherType;
+    copy->owningEntity = owningEntity;
+    copy->messageId = messageId;
+    copy->message = message;
+    copy->probableCauseDescription = probableCauseDescription;
+    copy->source = source;
+    copy->otherSourceFormat = otherSourceFormat;
+    copy->statusCodeDescription = statusCodeDescription;
+    copy->recommendedActions = recommendedActions;
+    copy->messageArguments = messageArguments;
+    return copy;
+}
+
+CMPIData keep(Core& core, Value value) {
+    auto holder = std::make_unique<Array>(core, value.type(), 0);
+    holder->elements.push_back(std::move(value));
+    return handOut(std::move(holder))->elements.front().data();
+}
+
+} // namespace oxahv
