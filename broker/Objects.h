@@ -2,6 +2,7 @@
 #pragma once
 
 #include "EmbeddedBroker.h"
+#include "Integers.h"
 
 #include <algorithm>
 #include <cxxabi.h>
@@ -147,8 +148,10 @@ public:
     CMPIData data(CMPIValueState state = CMPI_goodValue) const;
     // A text as `CMPI_chars`, or as `CMPI_string` again.
     void retype(CMPIType type) { type_ = type; }
+    // The number of an integer that is not NULL.
+    WideInteger integer() const;
     // A key, which may have come as the KeyMode has it, as a property of a type: a text as `CMPI_string`, an
-    // integer of the widest type as the narrower one where it fits.
+    // integer of the widest type or in a text as the declared one where it fits.
     Value asProperty(CMPIType declared) const;
 
 private:
@@ -279,6 +282,8 @@ public:
         : RecordedObject(core), nameSpace(std::move(ns)), className(std::move(cn)) {}
     std::unique_ptr<Object> clone() const override { return copy(); }
     std::unique_ptr<ObjectPath> copy() const;
+    // Gives keys that came as the KeyMode has them their declared types.
+    void declareKeys();
 
     std::string nameSpace;
     std::string hostName;
@@ -293,8 +298,8 @@ public:
     Instance(Core& core, std::unique_ptr<ObjectPath> itsPath)
         : RecordedObject(core), path(std::move(itsPath)) {}
     std::unique_ptr<Object> clone() const override;
-    // Sets the properties that are a path's keys, with their declared types.
-    void setKeysOf(const ObjectPath& source);
+    // Names it anew. The keys become properties, unless new instances are bare.
+    void setPath(std::unique_ptr<ObjectPath> newPath);
 
     std::unique_ptr<ObjectPath> path;
     NamedValues properties;
