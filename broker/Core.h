@@ -31,6 +31,9 @@ public:
     void tell(const BrokerMessage& message) const;
     void setMessageHandler(std::function<void(const BrokerMessage&)> handler);
 
+    void setPathDelivery(PathDelivery delivery);
+    PathDelivery pathDelivery() const;
+
     void setContextEntry(const std::string& name, const std::string& text);
     // Puts the program's entries into a new context.
     void addContextEntries(Context& context);
@@ -40,6 +43,8 @@ private:
         counts_{}; // before the owner, whose objects are counted to the last
     mutable std::shared_mutex handlerMutex_;
     std::function<void(const BrokerMessage&)> handler_;
+    mutable std::shared_mutex deliveryMutex_;
+    PathDelivery delivery_;
     std::shared_mutex contextMutex_;
     std::map<std::string, std::string> contextEntries_;
 
@@ -52,6 +57,7 @@ public:
     AttachedThreads attachedThreads; // after the owners and before the providers, which may leave threads
     Hosting hosting{*this};
     std::atomic<KeyMode> keyMode{KeyMode::exact};
+    std::atomic<NewInstances> newInstances{NewInstances::full};
 };
 
 // The broker of a handle; null for a null handle and for another broker's.

@@ -39,6 +39,16 @@ void EmbeddedBroker::Impl::setMessageHandler(std::function<void(const BrokerMess
     handler_.swap(handler);
 }
 
+void EmbeddedBroker::Impl::setPathDelivery(PathDelivery delivery) {
+    const std::unique_lock<std::shared_mutex> lock(deliveryMutex_);
+    std::swap(delivery_, delivery);
+}
+
+PathDelivery EmbeddedBroker::Impl::pathDelivery() const {
+    const std::shared_lock<std::shared_mutex> lock(deliveryMutex_);
+    return delivery_;
+}
+
 void EmbeddedBroker::Impl::setContextEntry(const std::string& name, const std::string& text) {
     const std::unique_lock<std::shared_mutex> lock(contextMutex_);
     contextEntries_[name] = text;
@@ -135,6 +145,14 @@ void EmbeddedBroker::unload(const std::string& name) {
 
 void EmbeddedBroker::setKeyMode(KeyMode mode) {
     impl_->keyMode.store(mode, std::memory_order_relaxed);
+}
+
+void EmbeddedBroker::setNewInstances(NewInstances mode) {
+    impl_->newInstances.store(mode, std::memory_order_relaxed);
+}
+
+void EmbeddedBroker::setPathDelivery(PathDelivery delivery) {
+    impl_->setPathDelivery(std::move(delivery));
 }
 
 void EmbeddedBroker::injectFault(const std::string& slot, const Fault& fault) {

@@ -207,6 +207,13 @@ typedef struct _CMPIData {
 #define CMPI_ENC 0x1000     /**< objects of the broker */
 /** @} */
 
+/** @name Types of keys, where a broker does not know the class's declaration */
+/** @{ */
+#define CMPI_keyInteger CMPI_sint64
+#define CMPI_keyString CMPI_string
+#define CMPI_keyBoolean CMPI_boolean
+/** @} */
+
 /** @name State bits of a value */
 /** @{ */
 #define CMPI_goodValue 0

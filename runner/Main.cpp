@@ -7,6 +7,7 @@
 #include <CLI/CLI.hpp>
 
 #include <iostream>
+#include <map>
 #include <sstream>
 #include <stdexcept>
 #include <string>
@@ -56,13 +57,29 @@ looks like a number. With --output json the result is an array of one object {"p
 struct Words {
     std::string format = "mof";
     std::string keyMode = "exact";
+    std::string newInstances = "full";
+    std::vector<std::string> pathChanges;
 
     void putInto(Options& options) const {
         options.format = format == "json" ? Format::json : Format::mof;
-        options.keyMode = keyMode == "untyped" ? oxahv::KeyMode::untyped
-                          : keyMode == "chars" ? oxahv::KeyMode::chars
-                                               : oxahv::KeyMode::exact;
+        options.keyMode = keyModes.at(keyMode);
+        options.newInstances = newInstances == "bare" ? oxahv::NewInstances::bare : oxahv::NewInstances::full;
+        for (const std::string& change : pathChanges) {
+            options.pathDelivery.reversesKeys = options.pathDelivery.reversesKeys || change == "reversed";
+            options.pathDelivery.changesCase = options.pathDelivery.changesCase || change == "case";
+            if (change == "host") {
+                options.pathDelivery.hostName = "host.example.com";
+            }
+        }
     }
+
+    static inline const std::map<std::string, oxahv::KeyMode> keyModes = {
+        {"exact", oxahv::KeyMode::exact},
+        {"untyped", oxahv::KeyMode::untyped},
+        {"signed", oxahv::KeyMode::signedIntegers},
+        {"chars", oxahv::KeyMode::chars},
+        {"text", oxahv::KeyMode::text},
+    };
 };
 
 void addOptions(CLI::App& app, Options& options, Words& words) {
@@ -79,9 +96,17 @@ void addOptions(CLI::App& app, Options& options, Words& words) {
         ->check(CLI::IsMember({"mof", "json"}).description(""))
         ->type_name("FORM");
     app.add_flag("--trace", options.showsTraces, "show the provider's traces on the standard error stream");
-    app.add_option("--keys", words.keyMode, "how keys reach it: exact, untyped (widest type) or chars")
-        ->check(CLI::IsMember({"exact", "untyped", "chars"}).description(""))
+    app.add_option("--keys", words.keyMode, "how keys reach it: exact, untyped, signed, chars or text")
+        ->check(CLI::IsMember({"exact", "untyped", "signed", "chars", "text"}).description(""))
         ->type_name("MODE");
+    app.add_option("--new-instance", words.newInstances,
+                   "its path's keys are properties (full) or not (bare)")
+        ->check(CLI::IsMember({"full", "bare"}).description(""))
+        ->type_name("MODE");
+    app.add_option("--path", words.pathChanges, "change paths: keys reversed, other case, a host; repeatable")
+        ->check(CLI::IsMember({"reversed", "case", "host"}).description(""))
+        ->type_name("CHANGE")
+        ->allow_extra_args(false);
     app.add_option("--context", options.contextEntries, "an entry of the provider's context; repeatable")
         ->type_name("NAME=TEXT")
         ->allow_extra_args(false);

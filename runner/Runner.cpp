@@ -214,6 +214,8 @@ int run(const Options& options, const Verb& verb, const Operands& operands) {
     prepare(broker, options);
     loadProvider(broker, options);
     broker.setKeyMode(options.keyMode);
+    broker.setNewInstances(options.newInstances);
+    broker.setPathDelivery(options.pathDelivery);
     for (const std::string& fault : options.faults) {
         inject(broker, fault);
     }

@@ -16,6 +16,8 @@ struct Options {
     Format format = Format::mof;
     bool showsTraces = false;
     oxahv::KeyMode keyMode = oxahv::KeyMode::exact;
+    oxahv::NewInstances newInstances = oxahv::NewInstances::full;
+    oxahv::PathDelivery pathDelivery;
     std::vector<std::string> mofFiles;
     std::vector<std::string> contextEntries; // NAME=TEXT
     std::vector<std::string> faults;         // SLOT:N[:CODE]

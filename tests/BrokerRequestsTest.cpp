@@ -378,11 +378,15 @@ TEST_F(ARequest, DeliversKeysAsTheModeSays) {
         {KeyMode::exact, {CMPI_uint8, CMPI_sint16, CMPI_string, CMPI_boolean, CMPI_ref, CMPI_uint8}},
         {KeyMode::untyped, {CMPI_uint64, CMPI_sint64, CMPI_string, CMPI_boolean, CMPI_ref, CMPI_uint64}},
         {KeyMode::chars, {CMPI_uint8, CMPI_sint16, CMPI_chars, CMPI_boolean, CMPI_ref, CMPI_uint8}},
+        {KeyMode::signedIntegers,
+         {CMPI_keyInteger, CMPI_keyInteger, CMPI_keyString, CMPI_keyBoolean, CMPI_ref, CMPI_keyInteger}},
+        {KeyMode::text, {CMPI_string, CMPI_string, CMPI_string, CMPI_boolean, CMPI_ref, CMPI_string}},
     };
     for (const auto& [mode, expected] : rows) {
         broker_.setKeyMode(mode);
         const CMPIObjectPath* const delivered = request_.deliver(path(text));
-        EXPECT_EQ(oxahv::pathText(delivered), text);
+        EXPECT_EQ(oxahv::pathText(delivered),
+                  mode == KeyMode::text ? R"(root:Demo.U="200",S="-5",T="t",B=TRUE,R="Demo.U=\"1\"")" : text);
         std::vector<CMPIType> types;
         CMPIData key = {};
         for (CMPICount i = 0; i < CMGetKeyCount(delivered, nullptr); ++i) {
@@ -395,7 +399,37 @@ TEST_F(ARequest, DeliversKeysAsTheModeSays) {
         const CMPIData number = CMGetProperty(instance, "S", nullptr);
         EXPECT_EQ(oxahv::typeName(number.type) + oxahv::valueText(number), "sint16-5") << "as it is declared";
         EXPECT_EQ(CMGetProperty(instance, "T", nullptr).type, CMPI_string);
+        EXPECT_EQ(oxahv::pathText(CMGetObjectPath(instance, nullptr)).rfind("root:Demo.U=200,S=-5,", 0), 0U);
     }
+}
+
+TEST_F(ARequest, KeepsTheBitsOfAKeyThatSignedIntegersDoNotHold) {
+    broker_.declare(ClassDeclaration("Demo").key("U", CMPI_uint64));
+    broker_.setKeyMode(KeyMode::signedIntegers);
+    const CMPIObjectPath* const delivered = request_.deliver(path("Demo.U=18446744073709551615"));
+    EXPECT_EQ(CMGetKey(delivered, "U", nullptr).value.sint64, -1);
+    const CMPIInstance* const instance = CMNewInstance(broker_.handle(), delivered, nullptr);
+    EXPECT_EQ(oxahv::valueText(CMGetProperty(instance, "U", nullptr)), "18446744073709551615");
+}
+
+TEST_F(ARequest, DeliversPathsAsServersAndClientsChangeThem) {
+    broker_.declare(ClassDeclaration("Demo").key("Aa", CMPI_uint8).key("R", CMPI_ref));
+    broker_.setPathDelivery({true, true, "a.example"});
+    const CMPIObjectPath* const delivered = request_.deliver(path("root:Demo.Aa=1,R=\"x:Other.b_1=2,C=3\""));
+    EXPECT_EQ(oxahv::pathText(delivered), R"(root:Demo.r="x:Other.c=3,B_1=2",aA=1)");
+    const CMPIObjectPath* const referred = CMGetKey(delivered, "R", nullptr).value.ref;
+    for (const CMPIObjectPath* const changed : {delivered, referred}) {
+        EXPECT_STREQ(CMGetCharsPtr(CMGetHostname(changed, nullptr), nullptr), "a.example");
+    }
+}
+
+TEST_F(ARequest, LeavesTheKeysOfABareInstanceToItsProvider) {
+    broker_.declare(ClassDeclaration("Demo").key("U", CMPI_uint8));
+    broker_.setNewInstances(oxahv::NewInstances::bare);
+    CMPIInstance* const instance = CMNewInstance(broker_.handle(), path("Demo.U=1"), nullptr);
+    instance->ft->setObjectPath(instance, path("root:Demo.U=2"));
+    EXPECT_EQ(oxahv::valueText(CMGetProperty(instance, "U", nullptr)), "NULL");
+    EXPECT_EQ(oxahv::pathText(CMGetObjectPath(instance, nullptr)), "root:Demo.U=2");
 }
 
 TEST_F(ARequest, MeetsTheFaultsThatAreInjectedAndIsRecorded) {

@@ -234,7 +234,7 @@ TEST(Completion, OffersVerbsClassesAndValues) {
         {"--mof " MOF_FOLDER "/OXAHost.mof gi OXATK_A", {"OXATK_AssetIDDetails"}},
         {"--mof " MOF_FOLDER "/OXAHost.mof check --class OXATK_R", {"OXATK_RunningOS"}},
         {"--output j", {"json"}},
-        {"--keys \"\"", {"exact", "untyped", "chars"}},
+        {"--keys \"\"", {"exact", "untyped", "signed", "chars", "text"}},
         {"--mof " MOF_FOLDER "/CIMS", {MOF_FOLDER "/CIMSuperclasses.mof"}},
         {"--namespace e", {""}},
     };

@@ -86,6 +86,8 @@ static_assert(follow(0x3000, 0x0100, CMPI_instanceA, CMPI_refA, CMPI_argsA, CMPI
                      CMPI_charsptrA));
 static_assert(CMPI_SIMPLE == 0x0002 && CMPI_REAL == 0x0008 && CMPI_UINT == 0x0080 && CMPI_SINT == 0x00C0);
 static_assert(CMPI_INTEGER == 0x00C0 && CMPI_ENC == 0x1000);
+static_assert(CMPI_keyInteger == CMPI_sint64 && CMPI_keyString == CMPI_string);
+static_assert(CMPI_keyBoolean == CMPI_boolean);
 static_assert(CMPI_goodValue == 0 && CMPI_nullValue == 0x0100 && CMPI_keyValue == 0x0200);
 static_assert(CMPI_notFound == 0x0400 && CMPI_badValue == 0x8000);
 static_assert(follow(0, 1, CMPI_RC_OK, CMPI_RC_ERR_FAILED, CMPI_RC_ERR_ACCESS_DENIED,

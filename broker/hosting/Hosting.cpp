@@ -1,6 +1,7 @@
 #include "hosting/Hosting.h"
 
 #include "Core.h"
+#include "text/Integers.h"
 
 #include <algorithm>
 #include <dlfcn.h>
@@ -117,50 +118,54 @@ CMPIStatus callSlot(CMPIStatus (*slot)(MI*, Parameters...), MI* mi, Given... arg
     return slot != nullptr ? slot(mi, arguments...) : CMPIStatus{CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
 }
 
-// A signed integer is widened with its sign, any other with zeros.
-Value widest(const Value& value) {
-    const CMPIData data = value.data();
-    CMPIValue wide = {};
-    CMPIType type = CMPI_uint64;
-    switch (data.type) {
-    case CMPI_uint8:
-        wide.uint64 = data.value.uint8;
-        break;
-    case CMPI_uint16:
-        wide.uint64 = data.value.uint16;
-        break;
-    case CMPI_uint32:
-        wide.uint64 = data.value.uint32;
-        break;
-    case CMPI_sint8:
-        wide.sint64 = data.value.sint8; // NOLINT(bugprone-signed-char-misuse,cert-str34-c): a number
-        type = CMPI_sint64;
-        break;
-    case CMPI_sint16:
-        wide.sint64 = data.value.sint16;
-        type = CMPI_sint64;
-        break;
-    case CMPI_sint32:
-        wide.sint64 = data.value.sint32;
-        type = CMPI_sint64;
-        break;
-    default:
-        return value;
+Value changedInteger(Core& core, const Value& value, KeyMode mode) {
+    const WideInteger number = value.integer();
+    if (mode == KeyMode::text) {
+        return Value::text(core, (number.isNegative ? "-" : "") + std::to_string(number.magnitude));
     }
-    return Value::number(wide, type);
+    CMPIValue wide = {};
+    wide.uint64 = number.bits();
+    const bool isSigned = mode == KeyMode::signedIntegers || integerType(value.type())->isSigned;
+    return Value::number(wide, isSigned ? CMPI_sint64 : CMPI_uint64);
 }
 
-void applyKeyMode(ObjectPath& path, KeyMode mode) {
+void changeKey(Core& core, Value& value, KeyMode mode) {
+    if (mode == KeyMode::chars) {
+        if (value.type() == CMPI_string) {
+            value.retype(CMPI_chars);
+        }
+    } else if (mode != KeyMode::exact && integerType(value.type()) != nullptr) {
+        value = changedInteger(core, value, mode);
+    }
+}
+
+std::string otherCase(std::string name) {
+    for (char& c : name) {
+        const bool isLetter = (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z');
+        c = isLetter ? static_cast<char>(c ^ ('a' ^ 'A')) : c;
+    }
+    return name;
+}
+
+// Changes a path as a server or a client does, and the paths among its keys.
+void change(ObjectPath& path, KeyMode mode, const PathDelivery& delivery) {
+    if (!delivery.hostName.empty()) {
+        path.hostName = delivery.hostName;
+    }
+    if (delivery.reversesKeys) {
+        std::reverse(path.keys.begin(), path.keys.end());
+    }
     for (NamedValue& key : path.keys) {
+        if (delivery.changesCase) {
+            key.name = otherCase(std::move(key.name));
+        }
         if (key.value.isNull()) {
             continue;
         }
         if (key.value.type() == CMPI_ref) {
-            applyKeyMode(*ObjectPath::of(key.value.data().value.ref), mode);
-        } else if (mode == KeyMode::untyped) {
-            key.value = widest(key.value);
-        } else if (key.value.type() == CMPI_string) {
-            key.value.retype(CMPI_chars);
+            change(*ObjectPath::of(key.value.data().value.ref), mode, delivery);
+        } else {
+            changeKey(path.core(), key.value, mode);
         }
     }
 }
@@ -368,10 +373,7 @@ CMPIObjectPath* Hosting::deliver(const CMPIObjectPath* handle) const {
         return nullptr;
     }
     std::unique_ptr<ObjectPath> copy = path->copy();
-    const KeyMode mode = core_.keyMode.load(std::memory_order_relaxed);
-    if (mode != KeyMode::exact) {
-        applyKeyMode(*copy, mode);
-    }
+    change(*copy, core_.keyMode.load(std::memory_order_relaxed), core_.pathDelivery());
     return handOut(std::move(copy));
 }
 

@@ -57,7 +57,7 @@ public:
     Reply invokeMethod(const CMPIContext* context, const CMPIObjectPath* path, const char* method,
                        const CMPIArgs* in);
 
-    // A copy of a path with its keys as the broker's KeyMode says; the current owner's.
+    // A copy of a path as the broker's KeyMode and PathDelivery say; the current owner's.
     CMPIObjectPath* deliver(const CMPIObjectPath* handle) const;
 
 private:

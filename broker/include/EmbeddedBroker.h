@@ -209,9 +209,25 @@ private:
 
 /** How the keys of a request's object path reach the provider. CIM servers differ in it. */
 enum class KeyMode {
-    exact,   ///< with the type that they were given or that their class declares
-    untyped, ///< unsigned integers as `CMPI_uint64`, signed ones as `CMPI_sint64`
-    chars    ///< texts as `CMPI_chars` instead of `CMPI_string`
+    exact,          ///< with the type that they were given or that their class declares
+    untyped,        ///< unsigned integers as `CMPI_uint64`, signed ones as `CMPI_sint64`
+    chars,          ///< texts as `CMPI_chars` instead of `CMPI_string`
+    signedIntegers, ///< all integers as `CMPI_keyInteger`, that is `CMPI_sint64`; a `CMPI_uint64` that does
+                    ///< not fit keeps its bits
+    text            ///< integers as decimal texts, `CMPI_string`, for a client that quotes a number
+};
+
+/** What a new instance holds. CIM servers differ in it. */
+enum class NewInstances {
+    full, ///< the keys of its path as properties
+    bare  ///< its path alone; every property is NULL until the provider sets it
+};
+
+/** What else of a request's object path differs from server to server, and from client to client. */
+struct PathDelivery {
+    bool reversesKeys = false; ///< keys come last first
+    bool changesCase = false;  ///< names of keys come with their capital letters small and the others capital
+    std::string hostName{};    ///< the host of the path and of those among its keys; empty: as it was given
 };
 
 /** What goes wrong at a slot. The parts can be combined. */
@@ -390,6 +406,10 @@ public:
     /** @{ */
     /** How the keys of request paths reach providers from now on. */
     void setKeyMode(KeyMode mode);
+    /** What instances hold that are made from now on. */
+    void setNewInstances(NewInstances mode);
+    /** What else becomes of request paths from now on. */
+    void setPathDelivery(PathDelivery delivery);
     /**
      * Makes a slot fail. Several faults at one slot count the same calls.
      * @param slot table and member, as "CMPIObjectPathFT.getKeyAt", or the member alone where only one table
@@ -451,9 +471,9 @@ struct AssociationFilter {
  *
  * The operations find the provider by the class of the path, call its MI function, and collect what it
  * returns. Each asks one provider, the first that serves the class; of several with associations, a request
- * names the association class of the one that it means. Keys of the path are delivered as the broker's
- * KeyMode says. With declarations, an unknown class answers `CMPI_RC_ERR_INVALID_CLASS`, a method that its
- * class does not have `CMPI_RC_ERR_METHOD_NOT_FOUND`; a class that no provider serves answers
+ * names the association class of the one that it means. The path is delivered as the broker's KeyMode and
+ * PathDelivery say. With declarations, an unknown class answers `CMPI_RC_ERR_INVALID_CLASS`, a method that
+ * its class does not have `CMPI_RC_ERR_METHOD_NOT_FOUND`; a class that no provider serves answers
  * `CMPI_RC_ERR_NOT_SUPPORTED`. None of them throws, but for `std::bad_alloc`.
  */
 class TK_EXPORT Request {
@@ -493,8 +513,8 @@ public:
      * @throws BrokerError naming the column (from 1) and what is wrong there.
      */
     CMPIData valueFromText(const std::string& text, CMPIType type);
-    /** A copy of the path as a client's request would bring it to a provider: its keys as the broker's
-     * KeyMode says. */
+    /** A copy of the path as a client's request would bring it to a provider: as the broker's KeyMode and
+     * PathDelivery say. */
     CMPIObjectPath* deliver(const CMPIObjectPath* path);
 
     /** @name Operations of instances

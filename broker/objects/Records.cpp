@@ -70,12 +70,21 @@ std::unique_ptr<Object> Instance::clone() const {
     return copy;
 }
 
-void Instance::setKeysOf(const ObjectPath& source) {
-    const auto declared = core().classes.find(source.className);
-    for (const NamedValue& key : source.keys) {
+void ObjectPath::declareKeys() {
+    const auto declared = core().classes.find(className);
+    for (NamedValue& key : keys) {
         const PropertyDeclaration* const property = declared != nullptr ? declared->find(key.name) : nullptr;
-        properties.set(key.name,
-                       key.value.asProperty(property != nullptr ? property->type : CMPIType{CMPI_null}));
+        key.value = key.value.asProperty(property != nullptr ? property->type : CMPIType{CMPI_null});
+    }
+}
+
+void Instance::setPath(std::unique_ptr<ObjectPath> newPath) {
+    path = std::move(newPath);
+    path->declareKeys();
+    if (core().newInstances.load(std::memory_order_relaxed) == NewInstances::full) {
+        for (const NamedValue& key : path->keys) {
+            properties.set(key.name, key.value);
+        }
     }
 }
 

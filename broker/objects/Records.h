@@ -105,6 +105,8 @@ public:
         : RecordedObject(core), nameSpace(std::move(ns)), className(std::move(cn)) {}
     std::unique_ptr<Object> clone() const override { return copy(); }
     std::unique_ptr<ObjectPath> copy() const;
+    // Gives keys that came as the KeyMode has them their declared types.
+    void declareKeys();
 
     std::string nameSpace;
     std::string hostName;
@@ -119,8 +121,8 @@ public:
     Instance(Core& core, std::unique_ptr<ObjectPath> itsPath)
         : RecordedObject(core), path(std::move(itsPath)) {}
     std::unique_ptr<Object> clone() const override;
-    // Sets the properties that are a path's keys, with their declared types.
-    void setKeysOf(const ObjectPath& source);
+    // Names it anew. The keys become properties, unless new instances are bare.
+    void setPath(std::unique_ptr<ObjectPath> newPath);
 
     std::unique_ptr<ObjectPath> path;
     NamedValues properties;

@@ -3,6 +3,8 @@
 #include "objects/Records.h"
 
 #include <algorithm>
+#include <charconv>
+#include <optional>
 
 namespace oxahv {
 
@@ -41,6 +43,16 @@ Kind kindOf(CMPIType type) {
     default:
         return Kind::other;
     }
+}
+
+// The number that a text is, all of it; none for any other text.
+std::optional<WideInteger> decimal(std::string_view text) {
+    WideInteger number;
+    number.isNegative = !text.empty() && text.front() == '-';
+    const char* const end = text.data() + text.size();
+    const auto [after, error] =
+        std::from_chars(text.data() + (number.isNegative ? 1 : 0), end, number.magnitude);
+    return error == std::errc() && after == end ? std::optional(number) : std::nullopt;
 }
 
 // Copies the one member that holds a plain value: the caller may have no more than that.
@@ -165,17 +177,38 @@ Value Value::from(Core& core, const CMPIValue* value, CMPIType type) {
     return result;
 }
 
+WideInteger Value::integer() const {
+    const IntegerType& type = *integerType(type_);
+    const unsigned int unused = 64U - type.bits;
+    const unsigned long long low = plain_.uint64 << unused;
+    if (!type.isSigned) {
+        return {low >> unused, false};
+    }
+    const long long number = static_cast<long long>(low) >> unused;
+    const auto magnitude = static_cast<unsigned long long>(number);
+    return {number < 0 ? 0U - magnitude : magnitude, number < 0};
+}
+
 Value Value::asProperty(CMPIType declared) const {
     Value result = *this;
-    const bool isUnsigned = declared >= CMPI_uint8 && declared <= CMPI_uint64;
-    const bool isSigned = declared >= CMPI_sint8 && declared <= CMPI_sint64;
-    const unsigned int bits = 8U << (declared >> 4U & 3U); // as the codes of the integer types have it
-    static_assert(__BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__,
-                  "here and where integers are read from texts, the narrower members share the low bytes");
-    const bool fits =
-        (type_ == CMPI_uint64 && isUnsigned && (bits == 64 || plain_.uint64 >> bits == 0)) ||
-        (type_ == CMPI_sint64 && isSigned && plain_.sint64 >> (bits - 1) == plain_.sint64 >> 63);
-    result.type_ = fits ? declared : storedType(type_);
+    result.type_ = storedType(type_);
+    const IntegerType* const wanted = integerType(declared);
+    if (isNull_ || wanted == nullptr) {
+        return result;
+    }
+    std::optional<WideInteger> number;
+    if (type_ == CMPI_sint64 && declared == CMPI_uint64) {
+        number = {plain_.uint64, false}; // the bits are those of a number that did not fit
+    } else if (type_ == CMPI_sint64 || type_ == CMPI_uint64) {
+        number = integer();
+    } else if (result.type_ == CMPI_string) {
+        number = decimal(static_cast<String&>(*object_).text);
+    }
+    if (number && wanted->holds(number->magnitude, number->isNegative)) {
+        CMPIValue value = {};
+        value.uint64 = number->bits();
+        return Value::number(value, declared);
+    }
     return result;
 }
 

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "objects/Object.h"
+#include "text/Integers.h"
 
 #include <algorithm>
 #include <memory>
@@ -43,8 +44,10 @@ public:
     CMPIData data(CMPIValueState state = CMPI_goodValue) const;
     // A text as `CMPI_chars`, or as `CMPI_string` again.
     void retype(CMPIType type) { type_ = type; }
+    // The number of an integer that is not NULL.
+    WideInteger integer() const;
     // A key, which may have come as the KeyMode has it, as a property of a type: a text as `CMPI_string`, an
-    // integer of the widest type as the narrower one where it fits.
+    // integer of the widest type or in a text as the declared one where it fits.
     Value asProperty(CMPIType declared) const;
 
 private:

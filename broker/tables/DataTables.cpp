@@ -144,7 +144,9 @@ void returnInstance(Result& result, const CMPIInstance* instance) {
 }
 
 void returnObjectPath(Result& result, const CMPIObjectPath* path) {
-    result.reply.objectPaths.push_back(copyFor<ObjectPath>(result, path));
+    CMPIObjectPath* const copy = copyFor<ObjectPath>(result, path);
+    ObjectPath::of(copy)->declareKeys();
+    result.reply.objectPaths.push_back(copy);
     result.tellProgress();
 }
 

@@ -16,8 +16,8 @@ CMPIObjectPath* newObjectPath(Core& core, const char* nameSpace, const char* cla
         std::make_unique<ObjectPath>(core, nameSpace != nullptr ? nameSpace : "", required(className)));
 }
 
-// The instance has every property of its class, NULL but for the path's keys: what the provider does not set
-// shows.
+// The instance has every property of its class, NULL but for the path's keys where they become properties:
+// what the provider does not set shows.
 CMPIInstance* newInstance(Core& core, const CMPIObjectPath* handle) {
     const ObjectPath* const path = ObjectPath::of(handle);
     if (path == nullptr) {
@@ -33,7 +33,7 @@ CMPIInstance* newInstance(Core& core, const CMPIObjectPath* handle) {
             instance->properties.set(property.name, Value::null(property.type));
         }
     }
-    instance->setKeysOf(*path);
+    instance->setPath(path->copy());
     return handOut(std::move(instance));
 }
 

@@ -214,9 +214,7 @@ CMPIObjectPath* getObjectPath(const Instance& instance) {
 
 // The path's keys become properties, as they do in a new instance.
 void setObjectPath(Instance& instance, const CMPIObjectPath* handle) {
-    std::unique_ptr<ObjectPath> path = pathOf(handle).copy();
-    instance.setKeysOf(*path);
-    instance.path = std::move(path);
+    instance.setPath(pathOf(handle).copy());
 }
 
 void appendNames(std::vector<std::string>& names, const char** list) {

@@ -7,6 +7,16 @@
 
 namespace oxahv {
 
+// A number of any integer type.
+struct WideInteger {
+    unsigned long long magnitude = 0;
+    bool isNegative = false;
+
+    // As `CMPI_uint64` and `CMPI_sint64` hold it. Narrower members of a CMPIValue share the low bytes.
+    constexpr unsigned long long bits() const { return isNegative ? 0U - magnitude : magnitude; }
+};
+static_assert(__BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__);
+
 struct IntegerType {
     CMPIType type;
     bool isSigned;
