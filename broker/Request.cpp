@@ -1,4 +1,5 @@
 #include "Core.h"
+#include "text/PathText.h"
 
 namespace oxahv {
 
@@ -34,10 +35,6 @@ Request::Request(EmbeddedBroker& broker) : impl_(std::make_unique<Impl>(broker))
 
 Request::~Request() = default;
 
-EmbeddedBroker::Impl& Request::core() {
-    return impl_->core;
-}
-
 const CMPIContext* Request::context() const {
     return &impl_->context;
 }
@@ -48,6 +45,14 @@ void Request::setProgressHandler(std::function<void(std::size_t results)> handle
 
 CMPIObjectPath* Request::objectPath(const std::string& nameSpace, const std::string& className) {
     return CMNewObjectPath(&impl_->core.record, nameSpace.c_str(), className.c_str(), nullptr);
+}
+
+CMPIObjectPath* Request::objectPathFromText(const std::string& text, const std::string& nameSpace) {
+    return handOut(readPath(impl_->core, text, nameSpace));
+}
+
+CMPIData Request::valueFromText(const std::string& text, CMPIType type) {
+    return keep(impl_->core, readValue(impl_->core, text, type));
 }
 
 CMPIObjectPath* Request::deliver(const CMPIObjectPath* path) {

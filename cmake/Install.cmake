@@ -27,7 +27,7 @@ install(DIRECTORY
     FILES_MATCHING PATTERN "*.h" PATTERN private EXCLUDE PATTERN po EXCLUDE)
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/cmpi/
     DESTINATION ${oxahv_include}/cmpi COMPONENT development FILES_MATCHING PATTERN "*.h")
-install(FILES ${PROJECT_SOURCE_DIR}/broker/include/EmbeddedBroker.h
+install(DIRECTORY ${PROJECT_SOURCE_DIR}/broker/include/
     DESTINATION ${oxahv_include}/broker COMPONENT broker_development)
 
 set(oxahv_package_dir ${CMAKE_INSTALL_LIBDIR}/cmake/oxahvproviderutilities)

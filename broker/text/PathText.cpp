@@ -1,5 +1,7 @@
 // Reads object paths, and single values, from texts.
 
+#include "text/PathText.h"
+
 #include "Core.h"
 #include "text/DateTimeText.h"
 #include "text/Integers.h"
@@ -256,12 +258,12 @@ private:
 
 } // namespace
 
-CMPIData Request::valueFromText(const std::string& text, CMPIType type) {
-    return keep(core(), PathReader(core(), text, "value").readOnlyValue(type));
+Value readValue(Core& core, const std::string& text, CMPIType type) {
+    return PathReader(core, text, "value").readOnlyValue(type);
 }
 
-CMPIObjectPath* Request::objectPathFromText(const std::string& text, const std::string& nameSpace) {
-    return handOut(PathReader(core(), text).read(nameSpace));
+std::unique_ptr<ObjectPath> readPath(Core& core, const std::string& text, const std::string& nameSpace) {
+    return PathReader(core, text).read(nameSpace);
 }
 
 } // namespace oxahv
