@@ -1,6 +1,7 @@
 // The qualifiers of a declared element, and their values as CMPI hands them out.
 
 #include "classes/Classes.h"
+#include "objects/Records.h"
 
 #include <algorithm>
 

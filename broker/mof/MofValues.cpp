@@ -1,6 +1,7 @@
 #include "mof/MofValues.h"
 
 #include "classes/Classes.h"
+#include "objects/Records.h"
 #include "text/DateTimeText.h"
 #include "text/Integers.h"
 
