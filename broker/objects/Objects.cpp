@@ -11,10 +11,6 @@ namespace {
 
 thread_local Owner* currentOwner = nullptr;
 
-char folded(char c) {
-    return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
-}
-
 // A copy of the object in a value, null when there is none.
 std::unique_ptr<Object> objectIn(const void* handle) {
     if (handle == nullptr) {
@@ -102,17 +98,6 @@ Object* objectOf(const void* handle) {
     const auto* const record = static_cast<const Record*>(handle);
     const bool isOurs = std::find(std::begin(tables), std::end(tables), record->table) != std::end(tables);
     return isOurs ? static_cast<Object*>(record->object) : nullptr;
-}
-
-bool sameName(std::string_view a, std::string_view b) {
-    return a.size() == b.size() &&
-           std::equal(a.begin(), a.end(), b.begin(), [](char x, char y) { return folded(x) == folded(y); });
-}
-
-std::string foldedName(std::string_view name) {
-    std::string result(name);
-    std::transform(result.begin(), result.end(), result.begin(), folded);
-    return result;
 }
 
 Object::Object(Core& core, Kind kind) : core_(core), kind_(kind) {

@@ -3,6 +3,8 @@
 
 #include "EmbeddedBroker.h"
 
+#include <Names.h>
+
 #include <algorithm>
 #include <cxxabi.h>
 #include <functional>
@@ -30,9 +32,8 @@ inline void passOnTheEndOfAThread() {
     }
 }
 
-// Names of classes, properties and keys compare ignoring the case of ASCII letters.
-bool sameName(std::string_view a, std::string_view b);
-std::string foldedName(std::string_view name);
+using encoding::foldedName;
+using encoding::sameName;
 
 enum class Kind {
     instance,
