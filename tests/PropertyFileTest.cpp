@@ -1,36 +1,54 @@
 #include "PropertyFile.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <csignal>
+#include <fcntl.h>
 #include <filesystem>
 #include <fstream>
+#include <functional>
 #include <gtest/gtest.h>
 #include <map>
 #include <sstream>
 #include <sys/resource.h>
 #include <sys/stat.h>
 #include <sys/syscall.h>
+#include <sys/wait.h>
+#include <sys/xattr.h>
 #include <system_error>
 #include <type_traits>
 #include <unistd.h>
+#include <utility>
 #include <vector>
 
 using TK::PropertyFile;
 namespace fs = std::filesystem;
 using namespace std::string_literals;
 
-static std::string synchronised; // what was, and where a file was renamed
+// Functions of the C library that the tests watch or let fail. The library under test calls these.
+static std::string calls;
+static std::function<void()> beforeSync;
+static int attributeFailure = 0;
 
-// Stand between the library and the C library.
-extern "C" __attribute__((visibility("default"))) int fsync(int descriptor) {
+#define REPLACED extern "C" __attribute__((visibility("default")))
+REPLACED int fsync(int descriptor) {
+    if (beforeSync) {
+        std::exchange(beforeSync, nullptr)();
+    }
     struct stat status {};
     ::fstat(descriptor, &status);
-    synchronised += S_ISDIR(status.st_mode) ? "folder " : "file ";
+    calls += S_ISDIR(status.st_mode) ? "sync-folder " : "sync-file ";
     return static_cast<int>(::syscall(SYS_fsync, descriptor));
 }
-extern "C" __attribute__((visibility("default"))) int rename(const char* from, const char* to) noexcept {
-    synchronised += fs::path(from).parent_path() == fs::path(to).parent_path() ? "rename " : "move ";
-    return static_cast<int>(::syscall(SYS_rename, from, to));
+REPLACED int rename(const char* from, const char* to) noexcept {
+    calls += fs::path(from).parent_path() == fs::path(to).parent_path() ? "rename " : "move ";
+    return static_cast<int>(::syscall(SYS_renameat2, AT_FDCWD, from, AT_FDCWD, to, 0));
+}
+REPLACED int fsetxattr(int descriptor, const char* name, const void* value, size_t size, int flags) noexcept {
+    errno = attributeFailure;
+    return attributeFailure != 0
+               ? -1
+               : static_cast<int>(::syscall(SYS_fsetxattr, descriptor, name, value, size, flags));
 }
 
 namespace {
@@ -56,11 +74,34 @@ protected:
         file.save();
     }
 
+    // False where the file system has no such attributes.
+    bool setAttribute(const char* name, const std::string& value) const {
+        return ::setxattr(path().c_str(), name, value.data(), value.size(), 0) == 0;
+    }
+
+    std::string attribute(const char* name) const {
+        std::string value(1000, '\0');
+        const ssize_t size = ::getxattr(path().c_str(), name, value.data(), value.size());
+        value.resize(static_cast<std::size_t>(std::max<ssize_t>(size, 0)));
+        return value;
+    }
+
+    unsigned int mode() const { return static_cast<unsigned int>(fs::status(path()).permissions()); }
+
     std::ptrdiff_t filesInFolder() const { return std::distance(fs::directory_iterator(folder_), {}); }
 
     std::string pattern_ = testing::TempDir() + "propertiesXXXXXX";
     const fs::path folder_ = ::mkdtemp(pattern_.data());
 };
+
+constexpr const char* accessList = "system.posix_acl_access";
+
+// user::rw-, user:1:r--, group::, mask::rw-, other::r--, as the kernel writes them.
+std::string accessListWith(char group) {
+    const std::string nobody = "\xFF\xFF\xFF\xFF";
+    return "\2\0\0\0\1\0\6\0"s + nobody + "\2\0\4\0\1\0\0\0\4\0"s + group + '\0' + nobody + "\x10\0\6\0"s +
+           nobody + "\x20\0\4\0"s + nobody;
+}
 
 template <class Operation>
 int failureOf(const Operation& operation) {
@@ -250,12 +291,58 @@ TEST_F(APropertyFile, KeepsPermissionsOwnerAndLinks) {
     EXPECT_EQ(savingFailure(file), ELOOP);
 }
 
-TEST_F(APropertyFile, OutlivesAPowerFailureAsItWasOrAsItIs) {
+TEST_F(APropertyFile, KeepsAccessControlListAndAttributesOrIsNotSaved) {
+    write("a=1\n");
+    if (!setAttribute(accessList, accessListWith(0)) || !setAttribute("user.note", "x")) {
+        GTEST_SKIP() << "the file system has no attributes";
+    }
+    save(L"a", L"2");
+    EXPECT_EQ(attribute(accessList), accessListWith(0));
+    EXPECT_EQ(attribute("user.note"), "x");
+    EXPECT_EQ(mode(), 0664U);
+    attributeFailure = ENOSPC;
+    PropertyFile file(path());
+    file.setEntry(L"a", L"3");
+    EXPECT_EQ(savingFailure(file), ENOSPC);
+    attributeFailure = 0;
+    EXPECT_EQ(content(), "a=2\n");
+    EXPECT_EQ(filesInFolder(), 1);
+
+    // A list that new files get from their folder must not open a file that had none.
+    fs::remove(path());
+    write("a=1\n");
+    fs::permissions(path(), fs::perms(0660));
+    ASSERT_EQ(::setxattr(folder_.c_str(), "system.posix_acl_default", accessListWith(0).data(),
+                         accessListWith(0).size(), 0),
+              0);
+    save(L"a", L"2");
+    EXPECT_EQ(attribute(accessList), "");
+    EXPECT_EQ(mode(), 0660U);
+}
+
+TEST_F(APropertyFile, SaveSurvivesPowerFailures) {
     PropertyFile file(path(std::string(255, 'n'))); // no file system takes a longer name
     file.setEntry(L"a", L"1");
-    synchronised.clear();
+    calls.clear();
     file.save();
-    EXPECT_EQ(synchronised, "file rename folder ");
+    EXPECT_EQ(calls, "sync-file rename sync-folder ");
+}
+
+TEST_F(APropertyFile, SaveRemovesWhatKilledSavesLeft) {
+    write("");
+    std::ofstream(path(".file.backup")); // somebody's own
+    const pid_t child = ::fork();
+    if (child == 0) {
+        beforeSync = [] { ::raise(SIGKILL); };
+        save(L"a", L"1");
+    }
+    ASSERT_EQ(::waitpid(child, nullptr, 0), child);
+    EXPECT_EQ(filesInFolder(), 3);
+    // A save that is under way keeps its temporary file while another one ends.
+    beforeSync = [this] { save(L"a", L"2"); };
+    save(L"a", L"3");
+    EXPECT_EQ(content(), "a=3\n");
+    EXPECT_EQ(filesInFolder(), 2);
 }
 
 TEST_F(APropertyFile, IsUntouchedByASaveThatFails) {
@@ -314,6 +401,16 @@ TEST_F(APropertyFile, GivesNothingAwayWhenItsGroupCannotBeKept) {
     ASSERT_EQ(::seteuid(0), 0);
     EXPECT_EQ(failures, std::vector<int>({EACCES, EACCES, 0}));
     EXPECT_EQ(content(), "a=2\n");
-    EXPECT_EQ(fs::status(path()).permissions(), fs::perms(0604));
+    EXPECT_EQ(mode(), 0604U);
     EXPECT_EQ(filesInFolder(), 1);
+
+    // In an access control list, the group has an entry of its own.
+    ASSERT_EQ(::chown(path().c_str(), 1, 2), 0);
+    if (!setAttribute(accessList, accessListWith(6))) {
+        return;
+    }
+    ASSERT_EQ(::seteuid(nobody), 0);
+    EXPECT_EQ(savingFailure(file), 0);
+    ASSERT_EQ(::seteuid(0), 0);
+    EXPECT_EQ(attribute(accessList), accessListWith(0));
 }

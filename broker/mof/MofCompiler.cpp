@@ -2,6 +2,8 @@
 
 #include "mof/MofValues.h"
 
+#include <Utf8.h>
+
 #include <algorithm>
 #include <fstream>
 
@@ -13,8 +15,6 @@ namespace {
 constexpr std::size_t maximalSize = 256UL * 1024 * 1024;
 constexpr std::size_t maximalFiles = 20000;
 constexpr std::size_t maximalDepth = 64;
-
-constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
 
 // The qualifiers that the broker heeds, and those that stay with their class, as CIM declares them: they mean
 // the same in a text that does not bring their declarations.
@@ -67,8 +67,8 @@ void apply(const std::vector<MofFlavour>& flavours, QualifierDeclaration& qualif
 }
 
 std::string withoutMark(std::string text) {
-    if (text.compare(0, byteOrderMark.size(), byteOrderMark) == 0) {
-        text.erase(0, byteOrderMark.size());
+    if (text.compare(0, encoding::byteOrderMark.size(), encoding::byteOrderMark) == 0) {
+        text.erase(0, encoding::byteOrderMark.size());
     }
     return text;
 }

@@ -2,8 +2,11 @@
 
 #include "EmbeddedBroker.h"
 
+#include <Utf8.h>
+
 #include <algorithm>
 #include <charconv>
+#include <optional>
 
 namespace oxahv {
 
@@ -27,11 +30,6 @@ bool isNamePart(char c) {
     return isNameStart(c) || isDigit(c);
 }
 
-// The second and further bytes of a character in UTF-8.
-bool isContinuation(char c) {
-    return (static_cast<unsigned char>(c) & 0xC0U) == 0x80U;
-}
-
 bool isHighSurrogate(unsigned long code) {
     return code >= 0xD800 && code <= 0xDBFF;
 }
@@ -39,42 +37,11 @@ bool isLowSurrogate(unsigned long code) {
     return code >= 0xDC00 && code <= 0xDFFF;
 }
 
-void appendUtf8(std::string& text, unsigned long code) {
-    const auto add = [&](unsigned long byte) { text += static_cast<char>(static_cast<unsigned char>(byte)); };
-    if (code < 0x80) {
-        add(code);
-    } else if (code < 0x800) {
-        add(0xC0U | code >> 6U);
-        add(0x80U | (code & 0x3FU));
-    } else if (code < 0x10000) {
-        add(0xE0U | code >> 12U);
-        add(0x80U | (code >> 6U & 0x3FU));
-        add(0x80U | (code & 0x3FU));
-    } else {
-        add(0xF0U | code >> 18U);
-        add(0x80U | (code >> 12U & 0x3FU));
-        add(0x80U | (code >> 6U & 0x3FU));
-        add(0x80U | (code & 0x3FU));
-    }
-}
-
 // The code of a text's only character, when it is one that 16 bits hold; else false.
 bool decodeCharacter(std::string_view text, unsigned long long& code) {
-    const auto byte = [&](std::size_t i) { return static_cast<unsigned char>(text[i]); };
-    if (text.size() == 1 && byte(0) < 0x80) {
-        code = byte(0);
-        return true;
-    }
-    const bool isTwo = text.size() == 2 && byte(0) >= 0xC2 && byte(0) <= 0xDF;
-    const bool isThree = text.size() == 3 && (byte(0) & 0xF0U) == 0xE0U;
-    if ((!isTwo && !isThree) || !std::all_of(text.begin() + 1, text.end(), isContinuation)) {
-        return false;
-    }
-    code = byte(0) & (isTwo ? 0x1FU : 0x0FU);
-    for (std::size_t i = 1; i < text.size(); ++i) {
-        code = code << 6U | (byte(i) & 0x3FU);
-    }
-    return isTwo || (code >= 0x800 && (code < 0xD800 || code > 0xDFFF));
+    const auto character = text.empty() ? std::nullopt : encoding::takeUtf8(text);
+    code = character.value_or(0);
+    return character && text.empty() && code <= 0xFFFF;
 }
 
 constexpr std::string_view symbols = "[](){}:;,=#";
@@ -91,7 +58,7 @@ void MofSource::fail(std::size_t offset, const std::string& message) const {
     const std::size_t lineStart =
         before.find_last_of(lineEnds) + 1; // 0 on the first line, where nothing is found
     const auto column = 1 + std::count_if(before.begin() + static_cast<std::ptrdiff_t>(lineStart),
-                                          before.end(), [](char c) { return !isContinuation(c); });
+                                          before.end(), [](char c) { return !encoding::isContinuation(c); });
     throw BrokerError(name + ':' + std::to_string(line) + ':' + std::to_string(column) + ": " + message);
 }
 
@@ -254,7 +221,7 @@ std::string MofLexer::readQuoted(const char* what) {
             ++position_;
             return value;
         }
-        appendUtf8(value, readEscape());
+        encoding::appendUtf8(value, static_cast<char32_t>(readEscape()));
     }
 }
 

@@ -2,30 +2,13 @@
 
 #include "Core.h"
 
-#include <algorithm>
-
 namespace oxahv {
 
 namespace {
 
 thread_local Owner* currentOwner = nullptr;
 
-char folded(char c) {
-    return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
-}
-
 } // namespace
-
-bool sameName(std::string_view a, std::string_view b) {
-    return a.size() == b.size() &&
-           std::equal(a.begin(), a.end(), b.begin(), [](char x, char y) { return folded(x) == folded(y); });
-}
-
-std::string foldedName(std::string_view name) {
-    std::string result(name);
-    std::transform(result.begin(), result.end(), result.begin(), folded);
-    return result;
-}
 
 Object::Object(Core& core, Kind kind) : core_(core), kind_(kind) {
     core.countObject(kind, 1);

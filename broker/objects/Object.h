@@ -4,6 +4,8 @@
 
 #include "EmbeddedBroker.h"
 
+#include <Names.h>
+
 #include <atomic>
 #include <cxxabi.h>
 #include <memory>
@@ -28,9 +30,8 @@ inline void passOnTheEndOfAThread() {
     }
 }
 
-// Names of classes, properties and keys compare ignoring the case of ASCII letters.
-bool sameName(std::string_view a, std::string_view b);
-std::string foldedName(std::string_view name);
+using encoding::foldedName;
+using encoding::sameName;
 
 enum class Kind {
     instance,

@@ -1,6 +1,7 @@
 #include "PropertyFile.h"
 
 #include "PropertyText.h"
+#include "Utf8.h"
 #include "WholeFile.h"
 
 #include <algorithm>
@@ -8,12 +9,6 @@
 #include <utility>
 
 namespace TK {
-
-namespace {
-
-constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
-
-} // namespace
 
 PropertyFile::PropertyFile() = default;
 
@@ -75,9 +70,9 @@ const std::vector<PropertyFile::DamagedLine>& PropertyFile::damagedLines() const
 PropertyFile::Content PropertyFile::parse(const std::string& bytes) {
     Content content;
     std::string_view rest = bytes;
-    if (rest.substr(0, byteOrderMark.size()) == byteOrderMark) {
-        content.mark = byteOrderMark;
-        rest.remove_prefix(byteOrderMark.size());
+    if (rest.substr(0, encoding::byteOrderMark.size()) == encoding::byteOrderMark) {
+        content.mark = encoding::byteOrderMark;
+        rest.remove_prefix(encoding::byteOrderMark.size());
     }
     while (!rest.empty()) {
         const std::size_t size = std::min(rest.find('\n'), rest.size() - 1) + 1;

@@ -80,14 +80,15 @@ public:
     void load();
 
     /**
-     * Writes the file, all or nothing: whoever reads it, and whatever fails, sees the earlier content or the
-     * new one whole. The file keeps its permission bits, and its owner and group where the process may set
-     * them (where it may not set the group, the group's permissions go); a new one can be read by its owner
-     * alone. A symbolic link stays, what it names is written.
+     * Writes the file, all or nothing: a reader, and whatever fails, sees the earlier content or the new one
+     * whole. The file keeps its permission bits, its access control list and its other extended attributes,
+     * and its owner and group where the process may set them; where it may not set the group, the group loses
+     * its permissions. A new file can be read by its owner alone. A symbolic link stays, and the file that it
+     * names is written. Temporary files of earlier saves whose process was killed are removed.
      *
-     * @throws std::system_error when it cannot be written; the earlier file is then untouched, unless its
-     * folder alone could not be synchronised: then the new content is in place but may not outlive a power
-     * failure.
+     * @throws std::system_error when it cannot be written or keep an attribute; the earlier file is then
+     * untouched, unless its folder alone could not be synchronised: then the new content is in place but may
+     * not outlive a power failure.
      * @throws std::bad_alloc
      */
     void save();

@@ -58,7 +58,7 @@ std::optional<wchar_t> takeEscape(std::string_view& text) {
 // Appends what `text` stands for to `result`; a reason when it cannot be read.
 const char* unescape(std::string_view text, std::wstring& result) {
     while (!text.empty()) {
-        const std::optional<char32_t> code = takeUtf8(text);
+        const std::optional<char32_t> code = encoding::takeUtf8(text);
         if (!code) {
             return "not UTF-8";
         }
@@ -99,8 +99,8 @@ std::string_view trimmed(std::string_view text) {
 // Characters that would be invisible in the file, or would mean something to an editor or to the first line's
 // reader, and what UTF-8 cannot hold.
 bool needsCode(char32_t code) {
-    return code < 0x20 || (code >= 0x7F && code < 0xA0) || code == 0x2028 || code == 0x2029 ||
-           code == 0xFEFF || !isUnicodeScalar(code);
+    return encoding::isControl(code) || code == 0x2028 || code == 0x2029 || code == 0xFEFF ||
+           !encoding::isUnicodeScalar(code);
 }
 
 void appendCode(std::string& result, char32_t code) {
@@ -124,7 +124,7 @@ std::string escape(const std::wstring& text, std::wstring_view special) {
             if (needsCode(code)) {
                 appendCode(result, code);
             } else {
-                appendUtf8(result, code);
+                encoding::appendUtf8(result, code);
             }
             continue;
         }

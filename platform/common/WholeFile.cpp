@@ -1,60 +1,44 @@
+// Reads and replaces files whole, for property files. A replacement is written beside the file and renamed
+// over it, so that no reader, crash or full disk meets half of one.
 #include "WholeFile.h"
 
-#include <array>
-#include <cerrno>
+#include "FailedCall.h"
+#include "FileAttributes.h"
+
+#include <Descriptor.h>
+
 #include <cstdlib>
 #include <fcntl.h>
 #include <filesystem>
+#include <optional>
 #include <string_view>
+#include <sys/file.h>
 #include <sys/stat.h>
-#include <system_error>
 #include <unistd.h>
 
 namespace TK::WholeFile {
 
 namespace {
 
-// Throws the failure that errno tells.
-[[noreturn]] void fail(const char* action, const std::string& path) {
-    const int code = errno;
-    throw std::system_error(code, std::generic_category(), std::string(action) + " '" + path + "'");
+using posix::Descriptor;
+
+// Temporary files are named `.NAME.XXXXXX.saving`, X being any letter or digit.
+constexpr std::string_view anyName = "XXXXXX";
+constexpr std::string_view nameEnd = ".saving";
+
+// The name is cut, since a file system takes no more than 255 bytes.
+std::string nameStart(const std::filesystem::path& target) {
+    return '.' + target.filename().string().substr(0, 100) + '.';
 }
 
-class Descriptor {
-public:
-    explicit Descriptor(int descriptor) : descriptor_(descriptor) {}
-    ~Descriptor() {
-        if (descriptor_ >= 0) {
-            ::close(descriptor_);
-        }
-    }
-    Descriptor(const Descriptor&) = delete;
-    Descriptor& operator=(const Descriptor&) = delete;
-
-    bool isOpen() const { return descriptor_ >= 0; }
-    int get() const { return descriptor_; }
-
-    // Closes it; some file systems tell of a failed write only now.
-    bool close() {
-        const int closed = descriptor_;
-        descriptor_ = -1;
-        return ::close(closed) == 0;
-    }
-
-private:
-    int descriptor_;
-};
-
-// A temporary file beside the one that it is going to replace, and removed unless it does.
+// A temporary file beside the one that it is going to replace, and removed unless it does. A lock shows that
+// it is in use; whatever way the process dies, the kernel drops the lock.
 class Replacement {
 public:
-    explicit Replacement(const std::filesystem::path& target)
-        : target_(target),
-          path_((target.parent_path() / ('.' + target.filename().string().substr(0, longestPart) + ".XXXXXX"))
-                    .string()),
-          file_(::mkostemp(path_.data(), O_CLOEXEC)) {
-        if (!file_.isOpen()) {
-            fail("cannot create a file beside", target_);
+    explicit Replacement(const std::filesystem::path& target) : target_(target) {
+        // Another process may take the file for a stray one before it is locked, and remove it.
+        for (int attempts = 0; attempts < 10 && (!file_ || isRemoved()); ++attempts) {
+            create(target);
         }
     }
     ~Replacement() {
@@ -65,24 +49,11 @@ public:
     Replacement(const Replacement&) = delete;
     Replacement& operator=(const Replacement&) = delete;
 
-    // Takes over permissions, and owner and group as far as the process may.
-    void resemble(const struct stat& earlier) {
-        mode_t mode = earlier.st_mode & 07777U;
-        if (::fchown(file_.get(), earlier.st_uid, earlier.st_gid) != 0) {
-            // What was the owner's or the group's is not for whichever the file has now.
-            mode &= ~static_cast<mode_t>(S_ISUID);
-            if (::fchown(file_.get(), static_cast<uid_t>(-1), earlier.st_gid) != 0) {
-                mode &= ~static_cast<mode_t>(S_IRWXG | S_ISGID);
-            }
-        }
-        if (::fchmod(file_.get(), mode) != 0) {
-            fail("cannot set the permissions of", path_);
-        }
-    }
+    void resemble(const struct stat& earlier) const { takeAttributes(file_->get(), path_, target_, earlier); }
 
-    void write(std::string_view content) {
+    void write(std::string_view content) const {
         while (!content.empty()) {
-            const ssize_t written = ::write(file_.get(), content.data(), content.size());
+            const ssize_t written = ::write(file_->get(), content.data(), content.size());
             if (written >= 0) {
                 content.remove_prefix(static_cast<std::size_t>(written));
             } else if (errno != EINTR) {
@@ -92,7 +63,7 @@ public:
     }
 
     void replace() {
-        if (::fsync(file_.get()) != 0 || !file_.close()) {
+        if (::fsync(file_->get()) != 0 || !file_->close()) {
             fail("cannot write", path_);
         }
         if (::rename(path_.c_str(), target_.c_str()) != 0) {
@@ -102,14 +73,54 @@ public:
     }
 
 private:
-    // Of the target's name in the temporary one, which may be no longer than a file system takes.
-    static constexpr std::size_t longestPart = 100;
+    void create(const std::filesystem::path& target) {
+        std::string name = nameStart(target);
+        name += anyName;
+        name += nameEnd;
+        path_ = (target.parent_path() / name).string();
+        file_.emplace(::mkostemps(path_.data(), static_cast<int>(nameEnd.size()), O_CLOEXEC));
+        if (!file_->isOpen()) {
+            fail("cannot create a file beside", target_);
+        }
+        lock_.emplace(::fcntl(file_->get(), F_DUPFD_CLOEXEC, 0));
+        // On a file system without locks strays cannot be told from files in use, and stay.
+        ::flock(lock_->get(), LOCK_EX | LOCK_NB);
+    }
+
+    bool isRemoved() const {
+        struct stat status {};
+        return ::fstat(file_->get(), &status) == 0 && status.st_nlink == 0;
+    }
 
     std::string target_;
     std::string path_;
-    Descriptor file_;
+    std::optional<Descriptor> file_;
+    std::optional<Descriptor> lock_; // holds the lock while file_ is closed and the rename not yet done
     bool done_ = false;
 };
+
+void removeStray(const std::string& path) {
+    const Descriptor stray(::open(path.c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
+    if (stray.isOpen() && ::flock(stray.get(), LOCK_EX | LOCK_NB) == 0) {
+        ::unlink(path.c_str());
+    }
+}
+
+// Removes the temporary files of saves of `target` that ended with their process. What cannot be removed
+// stays.
+void removeStrays(const std::filesystem::path& target, const std::string& folder) {
+    const std::string start = nameStart(target);
+    std::error_code error;
+    for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
+         entry.increment(error)) {
+        const std::string name = entry->path().filename().string();
+        const std::size_t endAt = start.size() + anyName.size();
+        if (name.size() == endAt + nameEnd.size() && name.compare(0, start.size(), start) == 0 &&
+            name.compare(endAt, nameEnd.size(), nameEnd) == 0) {
+            removeStray(entry->path().string());
+        }
+    }
+}
 
 // The file that a path names, with a last component that is no symbolic link. The file itself need not exist.
 std::filesystem::path followed(std::filesystem::path path) {
@@ -123,6 +134,22 @@ std::filesystem::path followed(std::filesystem::path path) {
     return path;
 }
 
+// The status of the regular file at `target`; nothing when there is no file.
+std::optional<struct stat> statusOf(const std::filesystem::path& target) {
+    struct stat status {};
+    if (::stat(target.c_str(), &status) != 0) {
+        if (errno == ENOENT) {
+            return std::nullopt;
+        }
+        fail("cannot examine", target);
+    }
+    if (!S_ISREG(status.st_mode)) {
+        errno = S_ISDIR(status.st_mode) ? EISDIR : EINVAL;
+        fail("cannot replace what is no file,", target);
+    }
+    return status;
+}
+
 } // namespace
 
 std::string read(const std::string& path) {
@@ -133,15 +160,22 @@ std::string read(const std::string& path) {
         }
         fail("cannot open", path);
     }
+    // One byte more than the file has, so that its end needs no further block. What is no regular file has no
+    // size to go by, and a file may grow.
+    struct stat status {};
     std::string content;
-    std::array<char, 4096> block{};
-    for (;;) {
-        const ssize_t size = ::read(file.get(), block.data(), block.size());
+    content.resize(::fstat(file.get(), &status) == 0 ? static_cast<std::size_t>(status.st_size) + 1 : 1);
+    for (std::size_t filled = 0;;) {
+        const ssize_t size = ::read(file.get(), &content[filled], content.size() - filled);
         if (size == 0) {
+            content.resize(filled);
             return content;
         }
         if (size > 0) {
-            content.append(block.data(), static_cast<std::size_t>(size));
+            filled += static_cast<std::size_t>(size);
+            if (filled == content.size()) {
+                content.resize(2 * filled + 4096);
+            }
         } else if (errno != EINTR) {
             fail("cannot read", path);
         }
@@ -156,18 +190,11 @@ void replace(const std::string& path, const std::string& content) {
     if (!folder.isOpen()) {
         fail("cannot open folder", folderPath);
     }
-    struct stat earlier {};
-    const bool exists = ::stat(target.c_str(), &earlier) == 0;
-    if (!exists && errno != ENOENT) {
-        fail("cannot examine", target);
-    }
-    if (exists && !S_ISREG(earlier.st_mode)) {
-        errno = S_ISDIR(earlier.st_mode) ? EISDIR : EINVAL;
-        fail("cannot replace what is no file,", target);
-    }
+    const std::optional<struct stat> earlier = statusOf(target);
+    removeStrays(target, folderPath);
     Replacement replacement(target);
-    if (exists) {
-        replacement.resemble(earlier);
+    if (earlier) {
+        replacement.resemble(*earlier);
     }
     replacement.write(content);
     replacement.replace();

@@ -37,10 +37,10 @@ std::optional<std::string> messageId(const std::wstring& key) {
     std::string id;
     for (const wchar_t character : key) {
         const auto code = static_cast<char32_t>(character);
-        if (code == 0 || !isUnicodeScalar(code)) {
+        if (code == 0 || !encoding::isUnicodeScalar(code)) {
             return std::nullopt;
         }
-        appendUtf8(id, code);
+        encoding::appendUtf8(id, code);
     }
     return id.empty() ? std::nullopt : std::make_optional(std::move(id));
 }
@@ -48,7 +48,7 @@ std::optional<std::string> messageId(const std::wstring& key) {
 std::optional<std::wstring> decode(std::string_view bytes) {
     std::wstring text;
     while (!bytes.empty()) {
-        const std::optional<char32_t> code = takeUtf8(bytes);
+        const std::optional<char32_t> code = encoding::takeUtf8(bytes);
         if (!code) {
             return std::nullopt;
         }

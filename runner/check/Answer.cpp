@@ -3,7 +3,7 @@
 #include "show/Text.h"
 #include "show/Values.h"
 
-#include <strings.h>
+#include <Utf8.h>
 
 namespace {
 
@@ -22,10 +22,10 @@ Result resultOf(const CMPIObjectPath* path, const std::string& nameSpace) {
     result.className = textOf(CMGetClassName(path, nullptr));
     result.path = oxahv::pathText(path);
     result.keys = plainOf(keysOf(path), nameSpace);
-    const std::string own = lowerCase(textOf(CMGetNameSpace(path, nullptr)));
-    result.identity = (own != lowerCase(nameSpace) ? own : "") + ':' + lowerCase(result.className);
+    const std::string own = foldedName(textOf(CMGetNameSpace(path, nullptr)));
+    result.identity = (own != foldedName(nameSpace) ? own : "") + ':' + foldedName(result.className);
     for (const auto& [name, key] : result.keys) {
-        result.identity += ',' + lowerCase(name) + '=' + key.identity;
+        result.identity += ',' + foldedName(name) + '=' + key.identity;
     }
     return result;
 }
@@ -46,8 +46,8 @@ bool hasUtf8(const CMPIData& data) {
         }
         return all;
     }
-    return !isText(data) ||
-           isUtf8(data.type == CMPI_chars ? std::string(data.value.chars) : textOf(data.value.string));
+    return !isText(data) || encoding::isUtf8(data.type == CMPI_chars ? std::string(data.value.chars)
+                                                                     : textOf(data.value.string));
 }
 
 PlainData plainOf(const CMPIData& data, const std::string& nameSpace) {
@@ -67,10 +67,6 @@ PlainData plainOf(const CMPIData& data, const std::string& nameSpace) {
 }
 
 } // namespace
-
-bool NameLess::operator()(const std::string& a, const std::string& b) const {
-    return ::strcasecmp(a.c_str(), b.c_str()) < 0;
-}
 
 bool hasValue(const NamedData& values, const std::string& name) {
     const auto found = values.find(name);

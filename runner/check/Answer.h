@@ -2,6 +2,7 @@
 #pragma once
 
 #include <EmbeddedBroker.h>
+#include <Names.h>
 
 #include <map>
 #include <string>
@@ -19,11 +20,7 @@ struct PlainData {
 
 bool operator==(const PlainData& a, const PlainData& b);
 
-// Names are one whatever their case.
-struct NameLess {
-    bool operator()(const std::string& a, const std::string& b) const;
-};
-using NamedData = std::map<std::string, PlainData, NameLess>;
+using NamedData = std::map<std::string, PlainData, encoding::NameLess>;
 
 // An instance or an object path.
 struct Result {

@@ -123,7 +123,7 @@ std::vector<AssociationFilter> Associations::filters() const {
     for (const Way& way : ways_) {
         const std::string kind =
             way.associationClass + ' ' + way.role + ' ' + way.resultRole + ' ' + way.otherClass;
-        if (!kinds.insert(lowerCase(kind)).second) {
+        if (!kinds.insert(foldedName(kind)).second) {
             continue;
         }
         for (const std::string& name :

@@ -1,5 +1,7 @@
 #include "check/Child.h"
 
+#include <Descriptor.h>
+
 #include <array>
 #include <cerrno>
 #include <csignal>
@@ -13,6 +15,8 @@
 #include <unistd.h>
 
 namespace {
+
+using posix::Descriptor;
 
 constexpr char finishedMark = '.'; // no message begins with it
 
@@ -62,24 +66,6 @@ public:
 
 private:
     pid_t id_;
-};
-
-class Descriptor {
-public:
-    explicit Descriptor(int number) : number_(number) {}
-    ~Descriptor() { close(); }
-    Descriptor(const Descriptor&) = delete;
-    Descriptor& operator=(const Descriptor&) = delete;
-    int get() const { return number_; }
-    void close() {
-        if (number_ >= 0) {
-            ::close(number_);
-            number_ = -1;
-        }
-    }
-
-private:
-    int number_;
 };
 
 std::string wordsOf(int status) {

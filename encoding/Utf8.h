@@ -1,14 +1,27 @@
-// UTF-8, the encoding of files and catalogues, whatever the process's locale is. Not installed.
+// UTF-8, the encoding of files, catalogues, MOF and terminals, whatever the process's locale is.
 #pragma once
 
 #include <optional>
 #include <string>
 #include <string_view>
 
-namespace TK {
+namespace encoding {
 
-inline bool isUnicodeScalar(char32_t code) {
+// What editors of other systems put in front of a text in UTF-8.
+constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
+
+constexpr bool isUnicodeScalar(char32_t code) {
     return code < 0xD800 || (code > 0xDFFF && code <= 0x10FFFF);
+}
+
+// DEL and both sets of control characters: terminals obey the second set too.
+constexpr bool isControl(char32_t code) {
+    return code < 0x20 || (code >= 0x7F && code < 0xA0);
+}
+
+// The second and the further bytes of a character.
+constexpr bool isContinuation(char byte) {
+    return (static_cast<unsigned char>(byte) & 0xC0U) == 0x80U;
 }
 
 // `code` is a Unicode scalar value.
@@ -32,8 +45,8 @@ inline void appendUtf8(std::string& bytes, char32_t code) {
     append(0x80 | (code & 0x3F));
 }
 
-// Takes the first character off `bytes`, which are not empty; nothing, with `bytes` as they were, when they
-// do not begin with well-formed UTF-8 (overlong forms and surrogates are not).
+// Takes the first character off `bytes`, which must not be empty. Returns nothing, and leaves `bytes` alone,
+// when they do not begin with well-formed UTF-8: overlong forms and surrogates are refused.
 inline std::optional<char32_t> takeUtf8(std::string_view& bytes) {
     const auto byteAt = [&](std::size_t i) { return static_cast<unsigned char>(bytes[i]); };
     const unsigned char lead = byteAt(0);
@@ -59,7 +72,7 @@ inline std::optional<char32_t> takeUtf8(std::string_view& bytes) {
         return std::nullopt;
     }
     for (std::size_t i = 1; i < length; ++i) {
-        if ((byteAt(i) & 0xC0U) != 0x80) {
+        if (!isContinuation(bytes[i])) {
             return std::nullopt;
         }
         code = code << 6 | (byteAt(i) & 0x3FU);
@@ -71,4 +84,13 @@ inline std::optional<char32_t> takeUtf8(std::string_view& bytes) {
     return code;
 }
 
-} // namespace TK
+inline bool isUtf8(std::string_view text) {
+    while (!text.empty()) {
+        if (!takeUtf8(text)) {
+            return false;
+        }
+    }
+    return true;
+}
+
+} // namespace encoding
