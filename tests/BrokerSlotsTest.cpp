@@ -4,6 +4,7 @@
 #include "FailingMemory.h"
 #include "cmpi/Slots.h"
 
+#include <algorithm>
 #include <cstdlib>
 #include <functional>
 #include <gtest/gtest.h>
@@ -222,7 +223,11 @@ private:
                     << "argument " << i << ": " << oxahv::codeName(status.rc);
             }
         }
+        broker_.startRecording();
         call(slot, slot.arguments.size());
+        const auto calls = broker_.stopRecording();
+        EXPECT_TRUE(
+            std::any_of(calls.begin(), calls.end(), [&](const auto& one) { return one.slot == name; }));
         EXPECT_TRUE(status.rc == CMPI_RC_ERR_NOT_SUPPORTED || unsupported.count(name) == 0);
         for (unsigned int n = 1, used = n; used >= n; ++n) {
             call(slot, slot.arguments.size(), n);
