@@ -107,6 +107,7 @@ Type value(std::size_t number) {
         return static_cast<Type>(number);
     }
 }
+// Of what each fake returns: more than any slot has arguments, so that none is taken for it.
 constexpr std::size_t resultNumber = 17;
 
 template <class Return, class... Parameters>
@@ -117,6 +118,7 @@ Return note(void (*function)(), Parameters... parameters) {
     }
 }
 
+// A function of its own for each slot, since slots of one type are told apart by their functions.
 template <auto slot>
 struct Fake;
 template <class Table, class Return, class... Parameters, Return (*Table::*slot)(Parameters...)>
@@ -146,6 +148,7 @@ CMPIString* noteMessage(const char* text, CMPICount count, std::va_list& list) {
     noted += out.str() + "\n";
     return value<CMPIString*>(resultNumber);
 }
+// Templates cannot tell a variable argument list from a fixed one in every compiler: these are written out.
 #define NOTE_MESSAGE(slot, ...)                                                                  \
     template <>                                                                                  \
     struct Fake<&CMPIBrokerEncFT::slot> {                                                        \
@@ -163,6 +166,7 @@ NOTE_MESSAGE(getMessage, const char* text)
 NOTE_MESSAGE(getMessage2, CMPIMsgFileHandle, const char* text)
 #endif
 
+// Every slot is filled, so that a name that calls the wrong one is found out and does not crash.
 #define TABLE(table)                             \
     [[maybe_unused]] table& fake(const table*) { \
         static table functions{};
@@ -188,6 +192,8 @@ Record& fakeObject() {
     return record;
 }
 
+// Expects that `use` calls `function` with all its arguments in their order, and returns its result. The
+// parameters of `use` come from the list: a name that takes or returns another type does not compile.
 template <class Return, class Record, class... Rest, std::size_t... positions>
 void expectCall(const char* name, void (*function)(), Return (*use)(Record*, Rest...),
                 std::index_sequence<positions...> /*of the rest*/) {
