@@ -83,6 +83,14 @@ typedef struct _CMPIPropertyList CMPIPropertyList;
 typedef struct _CMPIPropertyListFT CMPIPropertyListFT;
 typedef struct _CMPIEnumerationFilter CMPIEnumerationFilter;
 typedef struct _CMPIEnumerationFilterFT CMPIEnumerationFilterFT;
+typedef struct _CMPISelectExp CMPISelectExp;
+typedef struct _CMPISelectExpFT CMPISelectExpFT;
+typedef struct _CMPISelectCond CMPISelectCond;
+typedef struct _CMPISelectCondFT CMPISelectCondFT;
+typedef struct _CMPISubCond CMPISubCond;
+typedef struct _CMPISubCondFT CMPISubCondFT;
+typedef struct _CMPIPredicate CMPIPredicate;
+typedef struct _CMPIPredicateFT CMPIPredicateFT;
 typedef struct _CMPIInstanceMI CMPIInstanceMI;
 typedef struct _CMPIInstanceMIFT CMPIInstanceMIFT;
 typedef struct _CMPIAssociationMI CMPIAssociationMI;
@@ -97,10 +105,6 @@ typedef struct _CMPIIndicationMIFT CMPIIndicationMIFT;
 
 /** @name Records that stay opaque */
 /** @{ */
-typedef struct _CMPISelectExp CMPISelectExp;
-typedef struct _CMPISelectCond CMPISelectCond;
-typedef struct _CMPISubCond CMPISubCond;
-typedef struct _CMPIPredicate CMPIPredicate;
 typedef struct _CMPIGcStat CMPIGcStat;
 typedef void* CMPIMsgFileHandle;
 /** @} */
@@ -143,6 +147,10 @@ typedef struct _CMPIData {
     CMPIValueState state;
     CMPIValue value;
 } CMPIData;
+
+/** Gives a select expression or a predicate the value of a property, so that it can be evaluated without an
+ * instance. `parm` is the pointer that the caller of the evaluation has passed. */
+typedef CMPIData CMPIAccessor(const char* propertyName, void* parm);
 
 /** @name Type codes */
 /** @{ */
@@ -197,6 +205,13 @@ typedef struct _CMPIData {
 #define CMPI_enumerationA (CMPI_ARRAY | CMPI_enumeration)
 /** @} */
 
+/** @name Type codes of key bindings, named as DSP0004 classifies keys */
+/** @{ */
+#define CMPI_keyInteger CMPI_sint64
+#define CMPI_keyString CMPI_string
+#define CMPI_keyBoolean CMPI_boolean
+/** @} */
+
 /** @name Masks of type codes */
 /** @{ */
 #define CMPI_SIMPLE 0x0002
@@ -205,13 +220,6 @@ typedef struct _CMPIData {
 #define CMPI_SINT 0x00C0
 #define CMPI_INTEGER 0x00C0 /**< CMPI_UINT or CMPI_SINT */
 #define CMPI_ENC 0x1000     /**< objects of the broker */
-/** @} */
-
-/** @name Types of keys, where a broker does not know the class's declaration */
-/** @{ */
-#define CMPI_keyInteger CMPI_sint64
-#define CMPI_keyString CMPI_string
-#define CMPI_keyBoolean CMPI_boolean
 /** @} */
 
 /** @name State bits of a value */
@@ -265,6 +273,45 @@ typedef struct _CMPIStatus {
 #define CMPIRole "CMPIRole"
 #define CMPIAcceptLanguage "CMPIAcceptLanguage"
 #define CMPIContentLanguage "CMPIContentLanguage"
+/** @} */
+
+/** @name Bits of the context entry #CMPIInvocationFlags: what a client asked for */
+/** @{ */
+#define CMPI_FLAG_LocalOnly 1
+#define CMPI_FLAG_DeepInheritance 2
+#define CMPI_FLAG_IncludeQualifiers 4
+#define CMPI_FLAG_IncludeClassOrigin 8
+/** @} */
+
+/**
+ * @name Bits of CMPIBrokerFT.brokerCapabilities: what a broker can do
+ * The standard gives some names the bits of all that they imply, and uses bits twice.
+ */
+/** @{ */
+#define CMPI_MB_BasicRead 0x00000001
+#define CMPI_MB_BasicWrite 0x00000003
+#define CMPI_MB_InstanceManipulation 0x00000007
+#define CMPI_MB_AssociationTraversal 0x00000009
+#define CMPI_MB_QueryExecution 0x00000011
+#define CMPI_MB_QueryNormalization 0x00000031
+#define CMPI_MB_BasicQualifierSupport 0x00000047
+#define CMPI_MB_Indications 0x00000081
+#define CMPI_MB_OSEncapsulationSupport 0x00000100
+#define CMPI_MB_Supports_MemEnhancements 0x00004000
+#define CMPI_MB_Supports_Extended_Error 0x00008000
+#define CMPI_MB_Logging 0x00010000
+#define CMPI_MB_Tracing 0x00020000
+#define CMPI_MB_PropertyFiltering 0x00040001
+#define CMPI_MB_CodepageConversion 0x00080000
+#define CMPI_MB_Class_0 CMPI_MB_BasicRead
+#define CMPI_MB_Class_1 CMPI_MB_BasicWrite
+#define CMPI_MB_Class_2 CMPI_MB_InstanceManipulation
+#define CMPI_MB_Supports_PropertyMI 0x00000100
+#define CMPI_MB_Supports_IndicationMI 0x00000200
+#define CMPI_MB_Supports_IndicationPolling 0x00000400
+#define CMPI_MB_Supports_QueryNormalization 0x00000800
+#define CMPI_MB_Supports_Qualifier 0x00001000
+#define CMPI_MB_Supports_Schema 0x00003000
 /** @} */
 
 /** How severe a logged message is. */

@@ -439,6 +439,73 @@ struct _CMPIEnumerationFilterFT {
 };
 #endif
 
+/** A query, made ready to be evaluated: which instances a client wants, or which indications. */
+struct _CMPISelectExp {
+    CMPI_CONST_SINCE_210 void* hdl;
+    CMPI_CONST_SINCE_210 CMPISelectExpFT* ft;
+};
+
+/** The functions of #CMPISelectExp. */
+struct _CMPISelectExpFT {
+    CMPIVersion ftVersion;
+    CMPIStatus (*release)(CMPISelectExp* se);
+    CMPISelectExp* (*clone)(const CMPISelectExp* se, CMPIStatus* rc);
+    CMPIBoolean (*evaluate)(const CMPISelectExp* se, const CMPIInstance* inst, CMPIStatus* rc);
+    CMPIString* (*getString)(const CMPISelectExp* se, CMPIStatus* rc);
+    CMPISelectCond* (*getDOC)(const CMPISelectExp* se, CMPIStatus* rc);
+    CMPISelectCond* (*getCOD)(const CMPISelectExp* se, CMPIStatus* rc);
+    CMPIBoolean (*evaluateUsingAccessor)(const CMPISelectExp* se, CMPIAccessor* accessor, void* parm,
+                                         CMPIStatus* rc);
+};
+
+/** The WHERE clause of a select expression in a normal form; #CMPISelectCondType says in which. */
+struct _CMPISelectCond {
+    CMPI_CONST_SINCE_210 void* hdl;
+    CMPI_CONST_SINCE_210 CMPISelectCondFT* ft;
+};
+
+/** The functions of #CMPISelectCond. */
+struct _CMPISelectCondFT {
+    CMPIVersion ftVersion;
+    CMPIStatus (*release)(CMPISelectCond* sc);
+    CMPISelectCond* (*clone)(const CMPISelectCond* sc, CMPIStatus* rc);
+    CMPICount (*getCountAndType)(const CMPISelectCond* sc, int* type, CMPIStatus* rc);
+    CMPISubCond* (*getSubCondAt)(const CMPISelectCond* sc, CMPICount index, CMPIStatus* rc);
+};
+
+/** One conjunction or disjunction of a condition in normal form. */
+struct _CMPISubCond {
+    CMPI_CONST_SINCE_210 void* hdl;
+    CMPI_CONST_SINCE_210 CMPISubCondFT* ft;
+};
+
+/** The functions of #CMPISubCond. */
+struct _CMPISubCondFT {
+    CMPIVersion ftVersion;
+    CMPIStatus (*release)(CMPISubCond* sc);
+    CMPISubCond* (*clone)(const CMPISubCond* sc, CMPIStatus* rc);
+    CMPICount (*getCount)(const CMPISubCond* sc, CMPIStatus* rc);
+    CMPIPredicate* (*getPredicateAt)(const CMPISubCond* sc, CMPICount index, CMPIStatus* rc);
+    CMPIPredicate* (*getPredicate)(const CMPISubCond* sc, const char* name, CMPIStatus* rc);
+};
+
+/** One comparison of a condition. */
+struct _CMPIPredicate {
+    CMPI_CONST_SINCE_210 void* hdl;
+    CMPI_CONST_SINCE_210 CMPIPredicateFT* ft;
+};
+
+/** The functions of #CMPIPredicate. */
+struct _CMPIPredicateFT {
+    CMPIVersion ftVersion;
+    CMPIStatus (*release)(CMPIPredicate* pr);
+    CMPIPredicate* (*clone)(const CMPIPredicate* pr, CMPIStatus* rc);
+    CMPIStatus (*getData)(const CMPIPredicate* pr, CMPIType* type, CMPIPredOp* prop, CMPIString** lhs,
+                          CMPIString** rhs);
+    CMPIBoolean (*evaluateUsingAccessor)(const CMPIPredicate* pr, CMPIAccessor* accessor, void* parm,
+                                         CMPIStatus* rc);
+};
+
 /** A provider of instances. */
 struct _CMPIInstanceMI {
     CMPI_CONST_SINCE_210 void* hdl;
@@ -544,6 +611,11 @@ struct _CMPIPropertyMIFT {
                               const CMPIObjectPath* instPath, const char* name, const CMPIData data);
     CMPIStatus (*getProperty)(CMPIPropertyMI* mi, const CMPIContext* ctx, const CMPIResult* rslt,
                               const CMPIObjectPath* instPath, const char* name);
+#if CMPI_VERSION >= 200
+    CMPIStatus (*setPropertyWithOrigin)(CMPIPropertyMI* mi, const CMPIContext* ctx, const CMPIResult* rslt,
+                                        CMPIObjectPath* instPath, const char* name, const CMPIData data,
+                                        const char* origin);
+#endif
 };
 
 /** A provider of indications. */
@@ -567,9 +639,17 @@ struct _CMPIIndicationMIFT {
                                  CMPIBoolean firstActivation);
     CMPIStatus (*deActivateFilter)(CMPIIndicationMI* mi, const CMPIContext* ctx, const CMPISelectExp* filter,
                                    const char* className, const CMPIObjectPath* classPath,
-                                   CMPIBoolean lastActivation);
+                                   CMPIBoolean lastDeActivation);
     CMPIStatus (*enableIndications)(CMPIIndicationMI* mi, const CMPIContext* ctx);
     CMPIStatus (*disableIndications)(CMPIIndicationMI* mi, const CMPIContext* ctx);
+#if CMPI_VERSION >= 210
+    CMPIStatus (*authorizeFilterCollection)(CMPIIndicationMI* mi, const CMPIContext* ctx,
+                                            const CMPIInstance* collInst);
+    CMPIStatus (*activateFilterCollection)(CMPIIndicationMI* mi, const CMPIContext* ctx,
+                                           const CMPIInstance* collInst, CMPIBoolean firstActivation);
+    CMPIStatus (*deActivateFilterCollection)(CMPIIndicationMI* mi, const CMPIContext* ctx,
+                                             const CMPIInstance* collInst, CMPIBoolean lastDeActivation);
+#endif
 };
 
 #ifdef __cplusplus

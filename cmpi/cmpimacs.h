@@ -2,360 +2,159 @@
  * @file
  * CMPI's convenience names, and what defines a provider's factory functions.
  *
- * The `CM…` names are inline functions, or macros where the includer defines `CMPI_NO_INLINE`. Each calls the
- * slot of its object's table; none checks anything. A value argument is any pointer: of a `CMPI_chars` value
- * the text itself.
+ * The names that call one slot each are in cmpicalls.h. Here are those that look into a value, set a status
+ * or return from a function; they are macros always.
  */
 #ifndef CMPIMACS_H
 #define CMPIMACS_H
 
+#include "cmpicalls.h"
 #include "cmpift.h"
 
-#define CMIsNullObject(o) ((o) == NULL || *(void* CMPI_CONST_SINCE_210*)(o) == NULL)
-#define CMIsNullValue(v) (((v).state & CMPI_nullValue) != 0)
-#define CMIsArray(v) (((v).type & CMPI_ARRAY) != 0)
+/** @name Looking at objects and values */
+/** @{ */
+#define CMIsNullObject(objptr) ((objptr) == NULL || *(void* CMPI_CONST_SINCE_210*)(objptr) == NULL)
+#define CMIsNullValue(data) (((data).state & CMPI_nullValue) != 0)
+#define CMIsKeyValue(data) (((data).state & CMPI_keyValue) != 0)
+#define CMIsArray(data) (((data).type & CMPI_ARRAY) != 0)
+/** @} */
 
 /** A copy of any object, which belongs to the caller. */
-#define CMClone(o, rc) ((o)->ft->clone((o), (rc)))
+#define CMClone(obj, rc) ((obj)->ft->clone((obj), (rc)))
 /** Releases any object. */
-#define CMRelease(o) ((o)->ft->release((o)))
+#define CMRelease(obj) ((obj)->ft->release((obj)))
 
-/** Returns from a provider function with a code. */
-#define CMReturn(code)                           \
-    do {                                         \
-        CMPIStatus cmpiStatus_ = {(code), NULL}; \
-        return cmpiStatus_;                      \
+/** The text of a CMPIString, without a status. */
+#define CMGetCharPtr(str) CMGetCharsPtr((str), NULL)
+
+/** @name What the broker says of itself */
+/** @{ */
+#define CBGetCapabilities(mb) ((mb)->bft->brokerCapabilities) /**< bits `CMPI_MB_…` */
+#define CBBrokerVersion(mb) ((mb)->bft->brokerVersion)
+#define CBBrokerName(mb) ((mb)->bft->brokerName)
+/** @} */
+
+/**
+ * @name Setting a status
+ * The status is given by a pointer that may be null. The text is a CMPIString, or characters that the broker
+ * makes one of; where it cannot, the status has no text.
+ */
+/** @{ */
+#define CMSetStatus(st, rc_) CMSetStatusWithString(st, rc_, NULL)
+#define CMSetStatusWithString(st, rc_, msg_) \
+    do {                                     \
+        CMPIStatus* cmpiStatus_ = (st);      \
+        if (cmpiStatus_ != NULL) {           \
+            cmpiStatus_->rc = (rc_);         \
+            cmpiStatus_->msg = (msg_);       \
+        }                                    \
     } while (0)
+#define CMSetStatusWithChars(mb, st, rc_, msg_) \
+    CMSetStatusWithString(st, rc_, CMNewString((mb), (msg_), NULL))
+/** @} */
 
-/** Sets a status, given by a pointer that may be null, to a code without text. */
-#define CMSetStatus(status, code)           \
-    do {                                    \
-        CMPIStatus* cmpiStatus_ = (status); \
-        if (cmpiStatus_ != NULL) {          \
-            cmpiStatus_->rc = (code);       \
-            cmpiStatus_->msg = NULL;        \
-        }                                   \
+/** @name Returning a status from a provider function */
+/** @{ */
+#define CMReturn(rc) CMReturnWithString(rc, NULL)
+#define CMReturnWithString(rc, str)             \
+    do {                                        \
+        CMPIStatus cmpiStatus_ = {(rc), (str)}; \
+        return cmpiStatus_;                     \
     } while (0)
+#define CMReturnWithChars(mb, rc, chars) CMReturnWithString(rc, CMNewString((mb), (chars), NULL))
+/** @} */
 
-#ifdef CMPI_NO_INLINE
-
-/* Making objects, and asking about classes */
-#define CMNewInstance(b, instPath, rc) ((b)->eft->newInstance((b), (instPath), (rc)))
-#define CMNewObjectPath(b, ns, cn, rc) ((b)->eft->newObjectPath((b), (ns), (cn), (rc)))
-#define CMNewArgs(b, rc) ((b)->eft->newArgs((b), (rc)))
-#define CMNewString(b, data, rc) ((b)->eft->newString((b), (data), (rc)))
-#define CMNewArray(b, size, type, rc) ((b)->eft->newArray((b), (size), (type), (rc)))
-#define CMNewDateTime(b, rc) ((b)->eft->newDateTime((b), (rc)))
-#define CMNewDateTimeFromBinary(b, binTime, interval, rc) \
-    ((b)->eft->newDateTimeFromBinary((b), (binTime), (interval), (rc)))
-#define CMNewDateTimeFromChars(b, datetime, rc) ((b)->eft->newDateTimeFromChars((b), (datetime), (rc)))
-#define CMClassPathIsA(b, classPath, className, rc) \
-    ((b)->eft->classPathIsA((b), (classPath), (className), (rc)))
-
-/* Instances */
-#define CMGetProperty(o, name, rc) ((o)->ft->getProperty((o), (name), (rc)))
-#define CMGetPropertyAt(o, index, name, rc) ((o)->ft->getPropertyAt((o), (index), (name), (rc)))
-#define CMGetPropertyCount(o, rc) ((o)->ft->getPropertyCount((o), (rc)))
-#define CMSetProperty(o, name, value, type) ((o)->ft->setProperty((o), (name), (CMPIValue*)(value), (type)))
-#define CMGetObjectPath(o, rc) ((o)->ft->getObjectPath((o), (rc)))
-#define CMSetPropertyFilter(o, properties, keyList) ((o)->ft->setPropertyFilter((o), (properties), (keyList)))
-
-/* Object paths */
-#define CMAddKey(o, key, value, type) ((o)->ft->addKey((o), (key), (CMPIValue*)(value), (type)))
-#define CMGetKey(o, key, rc) ((o)->ft->getKey((o), (key), (rc)))
-#define CMGetKeyAt(o, index, name, rc) ((o)->ft->getKeyAt((o), (index), (name), (rc)))
-#define CMGetKeyCount(o, rc) ((o)->ft->getKeyCount((o), (rc)))
-#define CMGetClassName(o, rc) ((o)->ft->getClassName((o), (rc)))
-#define CMSetClassName(o, cn) ((o)->ft->setClassName((o), (cn)))
-#define CMGetNameSpace(o, rc) ((o)->ft->getNameSpace((o), (rc)))
-#define CMSetNameSpace(o, ns) ((o)->ft->setNameSpace((o), (ns)))
-#define CMGetHostname(o, rc) ((o)->ft->getHostname((o), (rc)))
-#define CMSetHostname(o, hn) ((o)->ft->setHostname((o), (hn)))
-
-/* A method's arguments */
-#define CMGetArg(o, name, rc) ((o)->ft->getArg((o), (name), (rc)))
-#define CMGetArgAt(o, index, name, rc) ((o)->ft->getArgAt((o), (index), (name), (rc)))
-#define CMGetArgCount(o, rc) ((o)->ft->getArgCount((o), (rc)))
-#define CMAddArg(o, name, value, type) ((o)->ft->addArg((o), (name), (CMPIValue*)(value), (type)))
-
-/* Strings */
-#define CMGetCharsPtr(o, rc) ((o)->ft->getCharPtr((o), (rc)))
-
-/* Dates and times */
-#define CMGetStringFormat(o, rc) ((o)->ft->getStringFormat((o), (rc)))
-#define CMGetBinaryFormat(o, rc) ((o)->ft->getBinaryFormat((o), (rc)))
-#define CMIsInterval(o, rc) ((o)->ft->isInterval((o), (rc)))
-
-/* Arrays */
-#define CMGetArrayCount(o, rc) ((o)->ft->getSize((o), (rc)))
-#define CMGetArrayType(o, rc) ((o)->ft->getSimpleType((o), (rc)))
-#define CMGetArrayElementAt(o, index, rc) ((o)->ft->getElementAt((o), (index), (rc)))
-#define CMSetArrayElementAt(o, index, value, type) \
-    ((o)->ft->setElementAt((o), (index), (CMPIValue*)(value), (type)))
-
-/* Enumerations */
-#define CMGetNext(o, rc) ((o)->ft->getNext((o), (rc)))
-#define CMHasNext(o, rc) ((o)->ft->hasNext((o), (rc)))
-#define CMToArray(o, rc) ((o)->ft->toArray((o), (rc)))
-
-/* Results */
-#define CMReturnData(o, value, type) ((o)->ft->returnData((o), (CMPIValue*)(value), (type)))
-#define CMReturnInstance(o, inst) ((o)->ft->returnInstance((o), (inst)))
-#define CMReturnObjectPath(o, op) ((o)->ft->returnObjectPath((o), (op)))
-#define CMReturnDone(o) ((o)->ft->returnDone((o)))
-
-/* Contexts */
-#define CMGetContextEntry(o, name, rc) ((o)->ft->getEntry((o), (name), (rc)))
-#define CMAddContextEntry(o, name, value, type) ((o)->ft->addEntry((o), (name), (CMPIValue*)(value), (type)))
-#define CMGetContextEntryAt(o, index, name, rc) ((o)->ft->getEntryAt((o), (index), (name), (rc)))
-#define CMGetContextEntryCount(o, rc) ((o)->ft->getEntryCount((o), (rc)))
-
-#else
-
-/* The value argument of a slot, from any pointer. */
-#ifdef __cplusplus
-#define CMPI_VALUE(pointer) static_cast<const CMPIValue*>(pointer)
-#else
-#define CMPI_VALUE(pointer) ((const CMPIValue*)(pointer))
+/**
+ * @name Messages with insertions
+ * The last argument of CMGetMessage and CMGetMessage2 is `CMFmtArgsN`, with N insertions `CMFmt…`:
+ * @code
+ * CMGetMessage(broker, "id", "{0} of {1}", NULL, CMFmtArgs2(CMFmtUint(3), CMFmtChars("four")))
+ * @endcode
+ * Each insertion is a type and a value, in the width that a broker reads from a variable argument list.
+ */
+/** @{ */
+#define CMGetMessage(mb, msgId, defMsg, rc, args) ((mb)->eft->getMessage((mb), (msgId), (defMsg), (rc), args))
+#if CMPI_VERSION >= 200
+#define CMGetMessage2(mb, msgId, msgFileHandle, defMsg, rc, args) \
+    ((mb)->eft->getMessage2((mb), (msgId), (msgFileHandle), (defMsg), (rc), args))
 #endif
+#define CMFmtSint(v) CMPI_sint32, ((long)(v))
+#define CMFmtUint(v) CMPI_uint32, ((unsigned long)(v))
+#define CMFmtSint64(v) CMPI_sint64, ((long long)(v))
+#define CMFmtUint64(v) CMPI_uint64, ((unsigned long long)(v))
+#define CMFmtReal(v) CMPI_real64, ((double)(v))
+#define CMFmtBoolean(v) CMPI_boolean, ((int)(v))
+#define CMFmtChars(v) CMPI_chars, ((const char*)(v))
+#define CMFmtString(v) CMPI_string, ((const CMPIString*)(v))
+#define CMFmtArgs0() 0
+#define CMFmtArgs1(v1) 1, v1
+#define CMFmtArgs2(v1, v2) 2, v1, v2
+#define CMFmtArgs3(v1, v2, v3) 3, v1, v2, v3
+#define CMFmtArgs4(v1, v2, v3, v4) 4, v1, v2, v3, v4
+#define CMFmtArgs5(v1, v2, v3, v4, v5) 5, v1, v2, v3, v4, v5
+#define CMFmtArgs6(v1, v2, v3, v4, v5, v6) 6, v1, v2, v3, v4, v5, v6
+#define CMFmtArgs7(v1, v2, v3, v4, v5, v6, v7) 7, v1, v2, v3, v4, v5, v6, v7
+#define CMFmtArgs8(v1, v2, v3, v4, v5, v6, v7, v8) 8, v1, v2, v3, v4, v5, v6, v7, v8
+#define CMFmtArgs9(v1, v2, v3, v4, v5, v6, v7, v8, v9) 9, v1, v2, v3, v4, v5, v6, v7, v8, v9
+#define CMFmtArgs10(v1, v2, v3, v4, v5, v6, v7, v8, v9, v10) 10, v1, v2, v3, v4, v5, v6, v7, v8, v9, v10
+/** @} */
 
-/* Making objects, and asking about classes */
-
-static inline CMPIInstance* CMNewInstance(const CMPIBroker* b, const CMPIObjectPath* instPath,
-                                          CMPIStatus* rc) {
-    return b->eft->newInstance(b, instPath, rc);
-}
-static inline CMPIObjectPath* CMNewObjectPath(const CMPIBroker* b, const char* ns, const char* cn,
-                                              CMPIStatus* rc) {
-    return b->eft->newObjectPath(b, ns, cn, rc);
-}
-static inline CMPIArgs* CMNewArgs(const CMPIBroker* b, CMPIStatus* rc) {
-    return b->eft->newArgs(b, rc);
-}
-static inline CMPIString* CMNewString(const CMPIBroker* b, const char* data, CMPIStatus* rc) {
-    return b->eft->newString(b, data, rc);
-}
-static inline CMPIArray* CMNewArray(const CMPIBroker* b, CMPICount size, CMPIType type, CMPIStatus* rc) {
-    return b->eft->newArray(b, size, type, rc);
-}
-static inline CMPIDateTime* CMNewDateTime(const CMPIBroker* b, CMPIStatus* rc) {
-    return b->eft->newDateTime(b, rc);
-}
-static inline CMPIDateTime* CMNewDateTimeFromBinary(const CMPIBroker* b, CMPIUint64 binTime,
-                                                    CMPIBoolean interval, CMPIStatus* rc) {
-    return b->eft->newDateTimeFromBinary(b, binTime, interval, rc);
-}
-static inline CMPIDateTime* CMNewDateTimeFromChars(const CMPIBroker* b, const char* datetime,
-                                                   CMPIStatus* rc) {
-    return b->eft->newDateTimeFromChars(b, datetime, rc);
-}
-static inline CMPIBoolean CMClassPathIsA(const CMPIBroker* b, const CMPIObjectPath* classPath,
-                                         const char* className, CMPIStatus* rc) {
-    return b->eft->classPathIsA(b, classPath, className, rc);
-}
-
-/* Instances */
-
-static inline CMPIData CMGetProperty(const CMPIInstance* o, const char* name, CMPIStatus* rc) {
-    return o->ft->getProperty(o, name, rc);
-}
-static inline CMPIData CMGetPropertyAt(const CMPIInstance* o, CMPICount index, CMPIString** name,
-                                       CMPIStatus* rc) {
-    return o->ft->getPropertyAt(o, index, name, rc);
-}
-static inline CMPICount CMGetPropertyCount(const CMPIInstance* o, CMPIStatus* rc) {
-    return o->ft->getPropertyCount(o, rc);
-}
-static inline CMPIStatus CMSetProperty(const CMPIInstance* o, const char* name, const void* value,
-                                       CMPIType type) {
-    return o->ft->setProperty(o, name, CMPI_VALUE(value), type);
-}
-static inline CMPIObjectPath* CMGetObjectPath(const CMPIInstance* o, CMPIStatus* rc) {
-    return o->ft->getObjectPath(o, rc);
-}
-static inline CMPIStatus CMSetPropertyFilter(const CMPIInstance* o, const char** properties,
-                                             const char** keyList) {
-    return o->ft->setPropertyFilter(o, properties, keyList);
-}
-
-/* Object paths */
-
-static inline CMPIStatus CMAddKey(const CMPIObjectPath* o, const char* key, const void* value,
-                                  const CMPIType type) {
-    return o->ft->addKey(o, key, CMPI_VALUE(value), type);
-}
-static inline CMPIData CMGetKey(const CMPIObjectPath* o, const char* key, CMPIStatus* rc) {
-    return o->ft->getKey(o, key, rc);
-}
-static inline CMPIData CMGetKeyAt(const CMPIObjectPath* o, CMPICount index, CMPIString** name,
-                                  CMPIStatus* rc) {
-    return o->ft->getKeyAt(o, index, name, rc);
-}
-static inline CMPICount CMGetKeyCount(const CMPIObjectPath* o, CMPIStatus* rc) {
-    return o->ft->getKeyCount(o, rc);
-}
-static inline CMPIString* CMGetClassName(const CMPIObjectPath* o, CMPIStatus* rc) {
-    return o->ft->getClassName(o, rc);
-}
-static inline CMPIStatus CMSetClassName(const CMPIObjectPath* o, const char* cn) {
-    return o->ft->setClassName(o, cn);
-}
-static inline CMPIString* CMGetNameSpace(const CMPIObjectPath* o, CMPIStatus* rc) {
-    return o->ft->getNameSpace(o, rc);
-}
-static inline CMPIStatus CMSetNameSpace(const CMPIObjectPath* o, const char* ns) {
-    return o->ft->setNameSpace(o, ns);
-}
-static inline CMPIString* CMGetHostname(const CMPIObjectPath* o, CMPIStatus* rc) {
-    return o->ft->getHostname(o, rc);
-}
-static inline CMPIStatus CMSetHostname(const CMPIObjectPath* o, const char* hn) {
-    return o->ft->setHostname(o, hn);
-}
-
-/* A method's arguments */
-
-static inline CMPIData CMGetArg(const CMPIArgs* o, const char* name, CMPIStatus* rc) {
-    return o->ft->getArg(o, name, rc);
-}
-static inline CMPIData CMGetArgAt(const CMPIArgs* o, CMPICount index, CMPIString** name, CMPIStatus* rc) {
-    return o->ft->getArgAt(o, index, name, rc);
-}
-static inline CMPICount CMGetArgCount(const CMPIArgs* o, CMPIStatus* rc) {
-    return o->ft->getArgCount(o, rc);
-}
-static inline CMPIStatus CMAddArg(const CMPIArgs* o, const char* name, const void* value,
-                                  const CMPIType type) {
-    return o->ft->addArg(o, name, CMPI_VALUE(value), type);
-}
-
-/* Strings */
-
-static inline CMPI_CONST_SINCE_210 char* CMGetCharsPtr(const CMPIString* o, CMPIStatus* rc) {
-    return o->ft->getCharPtr(o, rc);
-}
-
-/* Dates and times */
-
-static inline CMPIString* CMGetStringFormat(const CMPIDateTime* o, CMPIStatus* rc) {
-    return o->ft->getStringFormat(o, rc);
-}
-static inline CMPIUint64 CMGetBinaryFormat(const CMPIDateTime* o, CMPIStatus* rc) {
-    return o->ft->getBinaryFormat(o, rc);
-}
-static inline CMPIBoolean CMIsInterval(const CMPIDateTime* o, CMPIStatus* rc) {
-    return o->ft->isInterval(o, rc);
-}
-
-/* Arrays */
-
-static inline CMPICount CMGetArrayCount(const CMPIArray* o, CMPIStatus* rc) {
-    return o->ft->getSize(o, rc);
-}
-static inline CMPIType CMGetArrayType(const CMPIArray* o, CMPIStatus* rc) {
-    return o->ft->getSimpleType(o, rc);
-}
-static inline CMPIData CMGetArrayElementAt(const CMPIArray* o, CMPICount index, CMPIStatus* rc) {
-    return o->ft->getElementAt(o, index, rc);
-}
-static inline CMPIStatus CMSetArrayElementAt(const CMPIArray* o, CMPICount index, const void* value,
-                                             CMPIType type) {
-    return o->ft->setElementAt(o, index, CMPI_VALUE(value), type);
-}
-
-/* Enumerations */
-
-static inline CMPIData CMGetNext(const CMPIEnumeration* o, CMPIStatus* rc) {
-    return o->ft->getNext(o, rc);
-}
-static inline CMPIBoolean CMHasNext(const CMPIEnumeration* o, CMPIStatus* rc) {
-    return o->ft->hasNext(o, rc);
-}
-static inline CMPIArray* CMToArray(const CMPIEnumeration* o, CMPIStatus* rc) {
-    return o->ft->toArray(o, rc);
-}
-
-/* Results */
-
-static inline CMPIStatus CMReturnData(const CMPIResult* o, const void* value, const CMPIType type) {
-    return o->ft->returnData(o, CMPI_VALUE(value), type);
-}
-static inline CMPIStatus CMReturnInstance(const CMPIResult* o, const CMPIInstance* inst) {
-    return o->ft->returnInstance(o, inst);
-}
-static inline CMPIStatus CMReturnObjectPath(const CMPIResult* o, const CMPIObjectPath* op) {
-    return o->ft->returnObjectPath(o, op);
-}
-static inline CMPIStatus CMReturnDone(const CMPIResult* o) {
-    return o->ft->returnDone(o);
-}
-
-/* Contexts */
-
-static inline CMPIData CMGetContextEntry(const CMPIContext* o, const char* name, CMPIStatus* rc) {
-    return o->ft->getEntry(o, name, rc);
-}
-static inline CMPIStatus CMAddContextEntry(const CMPIContext* o, const char* name, const void* value,
-                                           const CMPIType type) {
-    return o->ft->addEntry(o, name, CMPI_VALUE(value), type);
-}
-static inline CMPIData CMGetContextEntryAt(const CMPIContext* o, CMPICount index, CMPIString** name,
-                                           CMPIStatus* rc) {
-    return o->ft->getEntryAt(o, index, name, rc);
-}
-static inline CMPICount CMGetContextEntryCount(const CMPIContext* o, CMPIStatus* rc) {
-    return o->ft->getEntryCount(o, rc);
-}
-
-#undef CMPI_VALUE
-
+/* The slots of later versions that a provider need not have. They are there and null, since a CIM server of
+ * that version reads them. */
+#if CMPI_VERSION >= 200
+#define CMPI_NO_PROPERTY_ORIGIN , NULL
+#else
+#define CMPI_NO_PROPERTY_ORIGIN
 #endif
-
-/* The slots of version 2.1 that a provider need not have. */
 #if CMPI_VERSION >= 210
 #define CMPI_NO_FILTERED_INSTANCES , NULL
 #define CMPI_NO_FILTERED_ASSOCIATIONS , NULL, NULL
+#define CMPI_NO_FILTER_COLLECTIONS , NULL, NULL, NULL
 #else
 #define CMPI_NO_FILTERED_INSTANCES
 #define CMPI_NO_FILTERED_ASSOCIATIONS
+#define CMPI_NO_FILTER_COLLECTIONS
 #endif
 
 /**
  * @name Factories of a provider written as functions
  * Each defines the factory function of the MI `miname` for the functions of its kind, whose names begin with
  * `pfx`. `mbvar` is the variable that keeps the broker, `hook` a statement that is run when the CIM server
- * calls the factory; it may be empty.
+ * calls the factory; it may be empty. It can use the factory's `brkr`, `ctx` and `rc`, and the record `mi`.
  */
 /** @{ */
 
 /** A `hook` that does nothing. */
 #define CMNoHook
+/** A `hook` that calls the provider's function `pfx##mitype##Initialize(&mi, ctx, rc)`; `mitype` is
+ * `Instance`, `Association`, `Method`, `Property` or `Indication`. */
+#define CMInitHook(pfx, mitype) pfx##mitype##Initialize(&mi, ctx, rc)
 
 /** Functions: `pfx##Cleanup`, `pfx##EnumInstanceNames`, `pfx##EnumInstances`, `pfx##GetInstance`,
  * `pfx##CreateInstance`, `pfx##ModifyInstance`, `pfx##DeleteInstance`, `pfx##ExecQuery`. */
-#define CMInstanceMIStub(pfx, miname, mbvar, hook)                           \
-    static CMPI_CONST_SINCE_210 CMPIInstanceMIFT miname##InstanceTable_ = {  \
-        CMPICurrentVersion,                                                  \
-        CMPICurrentVersion,                                                  \
-        "instance" #miname,                                                  \
-        pfx##Cleanup,                                                        \
-        pfx##EnumInstanceNames,                                              \
-        pfx##EnumInstances,                                                  \
-        pfx##GetInstance,                                                    \
-        pfx##CreateInstance,                                                 \
-        pfx##ModifyInstance,                                                 \
-        pfx##DeleteInstance,                                                 \
-        pfx##ExecQuery CMPI_NO_FILTERED_INSTANCES};                          \
-    CMPI_EXTERN_C CMPI_EXPORT CMPIInstanceMI* miname##_Create_InstanceMI(    \
-        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_);  \
-    CMPI_EXTERN_C CMPI_EXPORT CMPIInstanceMI* miname##_Create_InstanceMI(    \
-        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_) { \
-        static CMPIInstanceMI mi = {NULL, &miname##InstanceTable_};          \
-        (void)ctx_;                                                          \
-        mbvar = brkr_;                                                       \
-        hook;                                                                \
-        CMSetStatus(rc_, CMPI_RC_OK);                                        \
-        return &mi;                                                          \
+#define CMInstanceMIStub(pfx, miname, mbvar, hook)                          \
+    static CMPI_CONST_SINCE_210 CMPIInstanceMIFT miname##InstanceTable_ = { \
+        CMPICurrentVersion,                                                 \
+        CMPICurrentVersion,                                                 \
+        "instance" #miname,                                                 \
+        pfx##Cleanup,                                                       \
+        pfx##EnumInstanceNames,                                             \
+        pfx##EnumInstances,                                                 \
+        pfx##GetInstance,                                                   \
+        pfx##CreateInstance,                                                \
+        pfx##ModifyInstance,                                                \
+        pfx##DeleteInstance,                                                \
+        pfx##ExecQuery CMPI_NO_FILTERED_INSTANCES};                         \
+    CMPI_EXTERN_C CMPI_EXPORT CMPIInstanceMI* miname##_Create_InstanceMI(   \
+        const CMPIBroker* brkr, const CMPIContext* ctx, CMPIStatus* rc);    \
+    CMPI_EXTERN_C CMPI_EXPORT CMPIInstanceMI* miname##_Create_InstanceMI(   \
+        const CMPIBroker* brkr, const CMPIContext* ctx, CMPIStatus* rc) {   \
+        static CMPIInstanceMI mi = {NULL, &miname##InstanceTable_};         \
+        (void)ctx;                                                          \
+        mbvar = brkr;                                                       \
+        CMSetStatus(rc, CMPI_RC_OK);                                        \
+        hook;                                                               \
+        return &mi;                                                         \
     }
 
 /** Functions: `pfx##AssociationCleanup`, `pfx##Associators`, `pfx##AssociatorNames`, `pfx##References`,
@@ -367,14 +166,14 @@ static inline CMPICount CMGetContextEntryCount(const CMPIContext* o, CMPIStatus*
         pfx##Associators,      pfx##AssociatorNames,                               \
         pfx##References,       pfx##ReferenceNames CMPI_NO_FILTERED_ASSOCIATIONS}; \
     CMPI_EXTERN_C CMPI_EXPORT CMPIAssociationMI* miname##_Create_AssociationMI(    \
-        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_);        \
+        const CMPIBroker* brkr, const CMPIContext* ctx, CMPIStatus* rc);           \
     CMPI_EXTERN_C CMPI_EXPORT CMPIAssociationMI* miname##_Create_AssociationMI(    \
-        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_) {       \
+        const CMPIBroker* brkr, const CMPIContext* ctx, CMPIStatus* rc) {          \
         static CMPIAssociationMI mi = {NULL, &miname##AssociationTable_};          \
-        (void)ctx_;                                                                \
-        mbvar = brkr_;                                                             \
+        (void)ctx;                                                                 \
+        mbvar = brkr;                                                              \
+        CMSetStatus(rc, CMPI_RC_OK);                                               \
         hook;                                                                      \
-        CMSetStatus(rc_, CMPI_RC_OK);                                              \
         return &mi;                                                                \
     }
 
@@ -383,51 +182,53 @@ static inline CMPICount CMGetContextEntryCount(const CMPIContext* o, CMPIStatus*
     static CMPI_CONST_SINCE_210 CMPIMethodMIFT miname##MethodTable_ = {                                   \
         CMPICurrentVersion, CMPICurrentVersion, "method" #miname, pfx##MethodCleanup, pfx##InvokeMethod}; \
     CMPI_EXTERN_C CMPI_EXPORT CMPIMethodMI* miname##_Create_MethodMI(                                     \
-        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_);                               \
+        const CMPIBroker* brkr, const CMPIContext* ctx, CMPIStatus* rc);                                  \
     CMPI_EXTERN_C CMPI_EXPORT CMPIMethodMI* miname##_Create_MethodMI(                                     \
-        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_) {                              \
+        const CMPIBroker* brkr, const CMPIContext* ctx, CMPIStatus* rc) {                                 \
         static CMPIMethodMI mi = {NULL, &miname##MethodTable_};                                           \
-        (void)ctx_;                                                                                       \
-        mbvar = brkr_;                                                                                    \
+        (void)ctx;                                                                                        \
+        mbvar = brkr;                                                                                     \
+        CMSetStatus(rc, CMPI_RC_OK);                                                                      \
         hook;                                                                                             \
-        CMSetStatus(rc_, CMPI_RC_OK);                                                                     \
         return &mi;                                                                                       \
     }
 
 /** Functions: `pfx##PropertyCleanup`, `pfx##SetProperty`, `pfx##GetProperty`. */
-#define CMPropertyMIStub(pfx, miname, mbvar, hook)                           \
-    static CMPI_CONST_SINCE_210 CMPIPropertyMIFT miname##PropertyTable_ = {  \
-        CMPICurrentVersion,   CMPICurrentVersion, "property" #miname,        \
-        pfx##PropertyCleanup, pfx##SetProperty,   pfx##GetProperty};         \
-    CMPI_EXTERN_C CMPI_EXPORT CMPIPropertyMI* miname##_Create_PropertyMI(    \
-        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_);  \
-    CMPI_EXTERN_C CMPI_EXPORT CMPIPropertyMI* miname##_Create_PropertyMI(    \
-        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_) { \
-        static CMPIPropertyMI mi = {NULL, &miname##PropertyTable_};          \
-        (void)ctx_;                                                          \
-        mbvar = brkr_;                                                       \
-        hook;                                                                \
-        CMSetStatus(rc_, CMPI_RC_OK);                                        \
-        return &mi;                                                          \
+#define CMPropertyMIStub(pfx, miname, mbvar, hook)                                           \
+    static CMPI_CONST_SINCE_210 CMPIPropertyMIFT miname##PropertyTable_ = {                  \
+        CMPICurrentVersion,   CMPICurrentVersion, "property" #miname,                        \
+        pfx##PropertyCleanup, pfx##SetProperty,   pfx##GetProperty CMPI_NO_PROPERTY_ORIGIN}; \
+    CMPI_EXTERN_C CMPI_EXPORT CMPIPropertyMI* miname##_Create_PropertyMI(                    \
+        const CMPIBroker* brkr, const CMPIContext* ctx, CMPIStatus* rc);                     \
+    CMPI_EXTERN_C CMPI_EXPORT CMPIPropertyMI* miname##_Create_PropertyMI(                    \
+        const CMPIBroker* brkr, const CMPIContext* ctx, CMPIStatus* rc) {                    \
+        static CMPIPropertyMI mi = {NULL, &miname##PropertyTable_};                          \
+        (void)ctx;                                                                           \
+        mbvar = brkr;                                                                        \
+        CMSetStatus(rc, CMPI_RC_OK);                                                         \
+        hook;                                                                                \
+        return &mi;                                                                          \
     }
 
 /** Functions: `pfx##IndicationCleanup`, `pfx##AuthorizeFilter`, `pfx##MustPoll`, `pfx##ActivateFilter`,
  * `pfx##DeActivateFilter`, `pfx##EnableIndications`, `pfx##DisableIndications`. */
-#define CMIndicationMIStub(pfx, miname, mbvar, hook)                                                  \
-    static CMPI_CONST_SINCE_210 CMPIIndicationMIFT miname##IndicationTable_ = {                       \
-        CMPICurrentVersion,     CMPICurrentVersion,     "indication" #miname, pfx##IndicationCleanup, \
-        pfx##AuthorizeFilter,   pfx##MustPoll,          pfx##ActivateFilter,  pfx##DeActivateFilter,  \
-        pfx##EnableIndications, pfx##DisableIndications};                                             \
-    CMPI_EXTERN_C CMPI_EXPORT CMPIIndicationMI* miname##_Create_IndicationMI(                         \
-        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_);                           \
-    CMPI_EXTERN_C CMPI_EXPORT CMPIIndicationMI* miname##_Create_IndicationMI(                         \
-        const CMPIBroker* brkr_, const CMPIContext* ctx_, CMPIStatus* rc_) {                          \
-        static CMPIIndicationMI mi = {NULL, &miname##IndicationTable_};                               \
-        (void)ctx_;                                                                                   \
-        mbvar = brkr_;                                                                                \
-        hook;                                                                                         \
-        CMSetStatus(rc_, CMPI_RC_OK);                                                                 \
-        return &mi;                                                                                   \
+#define CMIndicationMIStub(pfx, miname, mbvar, hook)                                 \
+    static CMPI_CONST_SINCE_210 CMPIIndicationMIFT miname##IndicationTable_ = {      \
+        CMPICurrentVersion,     CMPICurrentVersion,                                  \
+        "indication" #miname,   pfx##IndicationCleanup,                              \
+        pfx##AuthorizeFilter,   pfx##MustPoll,                                       \
+        pfx##ActivateFilter,    pfx##DeActivateFilter,                               \
+        pfx##EnableIndications, pfx##DisableIndications CMPI_NO_FILTER_COLLECTIONS}; \
+    CMPI_EXTERN_C CMPI_EXPORT CMPIIndicationMI* miname##_Create_IndicationMI(        \
+        const CMPIBroker* brkr, const CMPIContext* ctx, CMPIStatus* rc);             \
+    CMPI_EXTERN_C CMPI_EXPORT CMPIIndicationMI* miname##_Create_IndicationMI(        \
+        const CMPIBroker* brkr, const CMPIContext* ctx, CMPIStatus* rc) {            \
+        static CMPIIndicationMI mi = {NULL, &miname##IndicationTable_};              \
+        (void)ctx;                                                                   \
+        mbvar = brkr;                                                                \
+        CMSetStatus(rc, CMPI_RC_OK);                                                 \
+        hook;                                                                        \
+        return &mi;                                                                  \
     }
 /** @} */
 
@@ -679,8 +480,12 @@ struct CMPIPropertyAdapter {
     }
     static CMPIPropertyMI* create(const char* name, const CMPIBroker* broker, const CMPIContext* context,
                                   CMPIStatus* rc) {
-        static CMPI_CONST_SINCE_210 CMPIPropertyMIFT table = {
-            CMPICurrentVersion, CMPICurrentVersion, name, cleanup, setProperty, getProperty};
+        static CMPI_CONST_SINCE_210 CMPIPropertyMIFT table = {CMPICurrentVersion,
+                                                              CMPICurrentVersion,
+                                                              name,
+                                                              cleanup,
+                                                              setProperty,
+                                                              getProperty CMPI_NO_PROPERTY_ORIGIN};
         static CMPIPropertyMI mi = {&base, &table};
         return base.template acquire<Provider>(broker, context, rc) ? &mi : nullptr;
     }
@@ -717,10 +522,10 @@ struct CMPIIndicationAdapter {
     }
     static CMPIStatus deActivateFilter(CMPIIndicationMI* mi, const CMPIContext* ctx,
                                        const CMPISelectExp* filter, const char* className,
-                                       const CMPIObjectPath* classPath, CMPIBoolean lastActivation) {
+                                       const CMPIObjectPath* classPath, CMPIBoolean lastDeActivation) {
         return CMPIProviderBase::guarded([&] {
             return static_cast<Provider*>(CMPIProviderBase::of(mi).object())
-                ->deActivateFilter(ctx, filter, className, classPath, lastActivation);
+                ->deActivateFilter(ctx, filter, className, classPath, lastDeActivation);
         });
     }
     static CMPIStatus enableIndications(CMPIIndicationMI* mi, const CMPIContext* ctx) {
@@ -736,9 +541,16 @@ struct CMPIIndicationAdapter {
     static CMPIIndicationMI* create(const char* name, const CMPIBroker* broker, const CMPIContext* context,
                                     CMPIStatus* rc) {
         static CMPI_CONST_SINCE_210 CMPIIndicationMIFT table = {
-            CMPICurrentVersion, CMPICurrentVersion, name,           cleanup,
-            authorizeFilter,    mustPoll,           activateFilter, deActivateFilter,
-            enableIndications,  disableIndications};
+            CMPICurrentVersion,
+            CMPICurrentVersion,
+            name,
+            cleanup,
+            authorizeFilter,
+            mustPoll,
+            activateFilter,
+            deActivateFilter,
+            enableIndications,
+            disableIndications CMPI_NO_FILTER_COLLECTIONS};
         static CMPIIndicationMI mi = {&base, &table};
         return base.template acquire<Provider>(broker, context, rc) ? &mi : nullptr;
     }

@@ -1,17 +1,10 @@
-/* A provider in C with every kind of MI, which uses every convenience name. It returns what it is sent, so
- * that a request shows which functions the tables call.
- */
-#include <cmpidt.h>
-#include <cmpift.h>
+/* A provider in C that returns what it is sent, so that a request shows how the broker serves it. */
 #include <cmpimacs.h>
-#include <cmpios.h>
-#include <cmpipl.h>
 
 /* The tables fix the parameters. */
 #pragma GCC diagnostic ignored "-Wunused-parameter"
 
 static const CMPIBroker* broker;
-static int factoryCalls = 0;
 
 /* The parameters that the functions of an MI begin with. */
 #define REQUEST(kind) \
@@ -61,7 +54,7 @@ static CMPIStatus CEnumInstanceNames(REQUEST(Instance)) {
 /* As an upcall: the instance of every name. */
 static CMPIStatus CEnumInstances(REQUEST(Instance), const char** properties) {
     CMPIStatus status = {CMPI_RC_OK, NULL};
-    CMPIEnumeration* names = broker->bft->enumerateInstanceNames(broker, context, path, &status);
+    CMPIEnumeration* names = CBEnumInstanceNames(broker, context, path, &status);
     CMPIArray* all = CMToArray(names, NULL);
     if (CMGetArrayType(all, NULL) != CMPI_ref || CMGetArrayCount(all, NULL) != 1) {
         CMSetStatus(&status, CMPI_RC_ERR_FAILED);
@@ -91,56 +84,14 @@ static CMPIStatus CInvokeMethod(REQUEST(Method), const char* method, const CMPIA
     static CMPIStatus name(__VA_ARGS__) {    \
         CMReturn(CMPI_RC_ERR_NOT_SUPPORTED); \
     }
-#define CLEANUP(name, kind) UNSERVED(name, CMPI##kind##MI* mi, const CMPIContext* context, CMPIBoolean ending)
-#define FILTER                                                                                            \
-    CMPIIndicationMI *mi, const CMPIContext *context, const CMPISelectExp *filter, const char *className, \
-        const CMPIObjectPath *path
 
-CLEANUP(CCleanup, Instance)
+UNSERVED(CCleanup, CMPIInstanceMI* mi, const CMPIContext* context, CMPIBoolean ending)
 UNSERVED(CGetInstance, REQUEST(Instance), const char** properties)
 UNSERVED(CCreateInstance, REQUEST(Instance), const CMPIInstance* instance)
 UNSERVED(CModifyInstance, REQUEST(Instance), const CMPIInstance* instance, const char** properties)
 UNSERVED(CDeleteInstance, REQUEST(Instance))
 UNSERVED(CExecQuery, REQUEST(Instance), const char* query, const char* language)
-CLEANUP(CAssociationCleanup, Association)
-UNSERVED(CAssociators, REQUEST(Association), const char* assocClass, const char* resultClass,
-         const char* role, const char* resultRole, const char** properties)
-UNSERVED(CAssociatorNames, REQUEST(Association), const char* assocClass, const char* resultClass,
-         const char* role, const char* resultRole)
-UNSERVED(CReferences, REQUEST(Association), const char* resultClass, const char* role,
-         const char** properties)
-UNSERVED(CReferenceNames, REQUEST(Association), const char* resultClass, const char* role)
-CLEANUP(CMethodCleanup, Method)
-CLEANUP(CPropertyCleanup, Property)
-UNSERVED(CSetProperty, REQUEST(Property), const char* name, const CMPIData data)
-UNSERVED(CGetProperty, REQUEST(Property), const char* name)
-CLEANUP(CIndicationCleanup, Indication)
-UNSERVED(CAuthorizeFilter, FILTER, const char* owner)
-UNSERVED(CMustPoll, FILTER)
-UNSERVED(CActivateFilter, FILTER, CMPIBoolean isFirst)
-UNSERVED(CDeActivateFilter, FILTER, CMPIBoolean isLast)
-UNSERVED(CEnableIndications, CMPIIndicationMI* mi, const CMPIContext* context)
-UNSERVED(CDisableIndications, CMPIIndicationMI* mi, const CMPIContext* context)
+UNSERVED(CMethodCleanup, CMPIMethodMI* mi, const CMPIContext* context, CMPIBoolean ending)
 
 CMInstanceMIStub(C, CProvider, broker, CMNoHook)
-CMAssociationMIStub(C, CProvider, broker, )
-CMMethodMIStub(C, CProvider, broker, ++factoryCalls)
-CMPropertyMIStub(C, CProvider, broker, CMNoHook)
-CMIndicationMIStub(C, CProvider, broker, CMNoHook)
-
-/* The names that no request above needs. Nothing calls it: that it compiles is enough. */
-CMPI_EXPORT void CRemainingNames(CMPIInstance* instance, CMPIContext* context);
-CMPI_EXPORT void CRemainingNames(CMPIInstance* instance, CMPIContext* context) {
-    CMPIString* name = CMNewString(broker, "name", NULL);
-    CMPIArgs* arguments = CMNewArgs(broker, NULL);
-    CMPIDateTime* now = CMNewDateTime(broker, NULL);
-    CMPIObjectPath* path = CMGetObjectPath(instance, NULL);
-    CMPIData data = CMGetProperty(instance, "Text", NULL);
-    CMAddContextEntry(context, "entry", CMGetCharsPtr(CMGetStringFormat(now, NULL), NULL), CMPI_chars);
-    data = CMGetContextEntryAt(context, CMGetContextEntryCount(context, NULL) - 1, &name, NULL);
-    data = CMGetPropertyAt(instance, CMGetPropertyCount(instance, NULL) - 1, &name, NULL);
-    data = CMGetArrayElementAt(data.value.array, 0, NULL);
-    CMAddArg(arguments, "data", &data.value, data.type);
-    data = CMClassPathIsA(broker, path, "Demo", NULL) ? CMGetKey(path, "key", NULL)
-                                                      : CMGetArg(arguments, "data", NULL);
-}
+CMMethodMIStub(C, CProvider, broker, CMNoHook)
