@@ -460,7 +460,7 @@ struct Reply {
     std::vector<CMPIData> data;               ///< returned by returnData; a method's return value
     CMPIArgs* out = nullptr;                  ///< a method's output arguments
     bool done = false;                        ///< whether the provider called returnDone
-    bool isServed = true; ///< whether there was a provider to ask, of a class that may be asked for
+    bool isServed = true; ///< whether there was a provider to ask, and not all of them refused the class
     /** Whether the code is `CMPI_RC_OK`. */
     bool ok() const { return code == CMPI_RC_OK; }
 };

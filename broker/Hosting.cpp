@@ -450,6 +450,7 @@ Reply Hosting::request(const CMPIContext* context, const CMPIObjectPath* handle,
     const std::function<void(std::size_t)>* const progress = std::exchange(own->progress, nullptr);
     Reply reply = refused(CMPI_RC_ERR_NOT_SUPPORTED, "no provider serves this for class " + path->className);
     reply.isServed = false;
+    bool isAsked = false;
     for (const std::shared_ptr<HostedProvider>& provider : find<MI>(*path, associationClass)) {
         if (provider->servesAll() && Ongoing::includes(provider.get(), &operation, path->className)) {
             continue;
@@ -465,12 +466,15 @@ Reply Hosting::request(const CMPIContext* context, const CMPIObjectPath* handle,
             result.reply.code = status.rc;
             result.reply.message = message;
         }
-        if (!reply.isServed || !isRefusal(result.reply)) { // the first refusal is the one to tell
+        const bool isRefused = provider->servesAll() && isRefusal(result.reply);
+        if (!isRefused || !isAsked) { // the first refusal is the one to tell
             reply = std::move(result.reply);
+            reply.isServed = !isRefused;
         }
-        if (!isRefusal(reply)) {
+        if (!isRefused) {
             break;
         }
+        isAsked = true;
     }
     return reply;
 }

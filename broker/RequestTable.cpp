@@ -69,8 +69,9 @@ void tellUnserved(Core& core, Reply& reply, const CMPIObjectPath* handle, CMPIrc
     if (reply.isServed) {
         return;
     }
-    core.tellUnserved(ObjectPath::of(handle)->className);
-    if (reply.code == CMPI_RC_ERR_NOT_SUPPORTED) {
+    const std::string& className = ObjectPath::of(handle)->className;
+    core.tellUnserved(className);
+    if (!core.classes.any() || core.classes.find(className) != nullptr) {
         reply.code = code;
     }
 }

@@ -18,6 +18,7 @@ using Texts = std::set<std::string>;
 const std::map<std::string, std::string> expectedFindings = {
     {"None", ""},
     {"Crash", "crash "},
+    {"CallsUp", "crash "},
     {"CrashWithChild", "crash "},
     {"CrashInFault", "crash@faults crash@faults "},
     {"NotServed", "not-served "},
@@ -161,6 +162,29 @@ TEST_F(TheCheck, FindsCrashesOutsideOfRequests) {
         EXPECT_EQ(report["findings"].size(), c.isServed ? 3U : 1U);
         EXPECT_EQ(report["classes"][1]["served"], c.isServed);
     }
+}
+
+TEST_F(TheCheck, SaysWhichLibraryAnUpcallLacks) {
+    const File mof("class Faulty_CallsUp { [Key] string Name; string Text; uint32 Number; datetime When; };"
+                   "class Other_Thing {};");
+    const std::string mofOption = "--mof " + mof.path() + ' ';
+    const std::string get = "gi 'Faulty_CallsUp.Name=\"a\"'";
+    const std::string other = "--library " TEST_PROVIDER " --serves Other_Thing ";
+    EXPECT_EQ(shell(RUNNER " " + library_ + mofOption + get + " 2>&1 | cat").output,
+              "oxahv-provider: the provider crashed: aborted after it asked for class Other_Thing, which no "
+              "loaded library serves; load that one too, with a further --library\n");
+    EXPECT_EQ(run(library_ + other + mofOption + get).status, 0);
+    EXPECT_EQ(run("--provider FaultyProvider " + other + library_ + mofOption + get).status, 2)
+        << "a provider's name is of the library before it";
+
+    const Json findings = reportOf(library_ + mofOption + "check --class Faulty_CallsUp", 1)["findings"];
+    const std::string text = findings[0]["text"];
+    EXPECT_NE(text.find(" after it asked for class Other_Thing"), std::string::npos) << text;
+    const Json others =
+        reportOf(library_ + other + mofOption + "check --class Faulty_CallsUp", 1)["findings"];
+    EXPECT_TRUE(std::all_of(others.begin(), others.end(), [](const Json& finding) {
+        return finding["pass"] == "faults";
+    })) << others;
 }
 
 // As when the provider compares the class with a name that is written wrongly.

@@ -6,6 +6,7 @@
 #include <chrono>
 #include <csignal>
 #include <cstddef>
+#include <cstdlib>
 #include <iostream>
 #include <stdexcept>
 #include <string>
@@ -204,6 +205,16 @@ struct Link {
     bool isIncluded;
 };
 
+// Takes for granted that there is an instance of another library's class, as many providers do.
+void callUp(const Target& target, const CMPIContext* context) {
+    CMPIObjectPath* const other =
+        made(CMNewObjectPath(broker, target.nameSpace.c_str(), "Other_Thing", nullptr));
+    CMPIEnumeration* const names = broker->bft->enumerateInstanceNames(broker, context, other, nullptr);
+    if (CMGetNext(names, nullptr).value.ref == nullptr) {
+        std::abort();
+    }
+}
+
 // What the context wants the provider to do: to crash when it is loaded, or at its end.
 std::string crash;
 
@@ -259,7 +270,7 @@ static CMPIStatus FaultyEnumInstances(CMPIInstanceMI*, const CMPIContext*, const
     });
 }
 
-static CMPIStatus FaultyGetInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+static CMPIStatus FaultyGetInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                     const CMPIObjectPath* path, const char** properties) {
     static const std::thread::id firstThread = std::this_thread::get_id();
     return answer(result, path, [&](const Target& target) {
@@ -272,6 +283,9 @@ static CMPIStatus FaultyGetInstance(CMPIInstanceMI*, const CMPIContext*, const C
             std::this_thread::sleep_for(std::chrono::minutes(1));
             std::cerr << "the child is left over\n";
             ::_exit(0);
+        }
+        if (target.has("CallsUp")) {
+            callUp(target, context);
         }
         if (target.has("Crash") || target.has("CrashWithChild")) {
             std::raise(SIGKILL);
