@@ -31,6 +31,10 @@ public:
     void tell(const BrokerMessage& message) const;
     void setMessageHandler(std::function<void(const BrokerMessage&)> handler);
 
+    // Says that an upcall found no provider.
+    void tellUnserved(const std::string& className) const;
+    void setUnservedHandler(std::function<void(const std::string&)> handler);
+
     void setPathDelivery(PathDelivery delivery);
     PathDelivery pathDelivery() const;
 
@@ -43,6 +47,7 @@ private:
         counts_{}; // before the owner, whose objects are counted to the last
     mutable std::shared_mutex handlerMutex_;
     std::function<void(const BrokerMessage&)> handler_;
+    std::function<void(const std::string&)> unservedHandler_;
     mutable std::shared_mutex deliveryMutex_;
     PathDelivery delivery_;
     std::shared_mutex contextMutex_;

@@ -39,6 +39,18 @@ void EmbeddedBroker::Impl::setMessageHandler(std::function<void(const BrokerMess
     handler_.swap(handler);
 }
 
+void EmbeddedBroker::Impl::tellUnserved(const std::string& className) const {
+    const std::shared_lock<std::shared_mutex> lock(handlerMutex_);
+    if (unservedHandler_) {
+        unservedHandler_(className);
+    }
+}
+
+void EmbeddedBroker::Impl::setUnservedHandler(std::function<void(const std::string&)> handler) {
+    const std::unique_lock<std::shared_mutex> lock(handlerMutex_);
+    unservedHandler_.swap(handler);
+}
+
 void EmbeddedBroker::Impl::setPathDelivery(PathDelivery delivery) {
     const std::unique_lock<std::shared_mutex> lock(deliveryMutex_);
     std::swap(delivery_, delivery);
@@ -181,6 +193,10 @@ LiveObjects EmbeddedBroker::liveObjects() const {
 
 void EmbeddedBroker::setMessageHandler(std::function<void(const BrokerMessage&)> handler) {
     impl_->setMessageHandler(std::move(handler));
+}
+
+void EmbeddedBroker::setUnservedHandler(std::function<void(const std::string& className)> handler) {
+    impl_->setUnservedHandler(std::move(handler));
 }
 
 } // namespace oxahv

@@ -35,8 +35,9 @@ they are an array of objects {"class", "namespace", "path", "properties"}.)";
 constexpr const char* checkFooter =
     R"(Does with each class what clients do: names, instances, each by its name, one that does not exist,
 property lists, associations from both ends with every filter, methods; and compares all with the
-class's declaration. Then again with untyped keys, from several threads at once, and with the
-broker's calls failing in turn: of each slot the first 100 of a request, and the last. A method
+class's declaration. Then again as other servers do it (every mode of --keys, bare new instances,
+changed paths), from several threads at once, and with the broker's calls failing in turn: of each
+slot the first 100 of a request, and the last. In the end the library has to be unloaded. A method
 that --method names is called many times so, and does its work each time: name none that must not
 be repeated. The provider runs in child processes: a crash or a hang is a finding. JSON is an array
 of one object {"library", "provider", "passes", "requests", "classes", "findings"}; a finding is
@@ -62,13 +63,15 @@ struct Words {
 
     void putInto(Options& options) const {
         options.format = format == "json" ? Format::json : Format::mof;
-        options.keyMode = keyModes.at(keyMode);
-        options.newInstances = newInstances == "bare" ? oxahv::NewInstances::bare : oxahv::NewInstances::full;
+        options.hasConduct = keyMode != "exact" || newInstances != "full" || !pathChanges.empty();
+        Conduct& conduct = options.conduct;
+        conduct.keyMode = keyModes.at(keyMode);
+        conduct.newInstances = newInstances == "bare" ? oxahv::NewInstances::bare : oxahv::NewInstances::full;
         for (const std::string& change : pathChanges) {
-            options.pathDelivery.reversesKeys = options.pathDelivery.reversesKeys || change == "reversed";
-            options.pathDelivery.changesCase = options.pathDelivery.changesCase || change == "case";
+            conduct.pathDelivery.reversesKeys = conduct.pathDelivery.reversesKeys || change == "reversed";
+            conduct.pathDelivery.changesCase = conduct.pathDelivery.changesCase || change == "case";
             if (change == "host") {
-                options.pathDelivery.hostName = "host.example.com";
+                conduct.pathDelivery.hostName = "host.example.com";
             }
         }
     }
@@ -82,10 +85,57 @@ struct Words {
     };
 };
 
+// Names with commas between them; none in an empty text.
+std::vector<std::string> namesIn(const std::string& text) {
+    std::vector<std::string> names;
+    std::istringstream stream(text);
+    for (std::string name; std::getline(stream, name, ',');) {
+        names.push_back(name);
+    }
+    return names;
+}
+
+// Each --provider and --serves is of the --library before it, or of the first one where none is.
+class LibraryOptions {
+public:
+    explicit LibraryOptions(std::vector<Library>& libraries) : libraries_(libraries) {}
+
+    void addTo(CLI::App& app) {
+        add(app, "--library", "a provider's library; repeatable", "FILE", [this](const std::string& file) {
+            if (isAhead_) {
+                libraries_.back().file = file;
+                isAhead_ = false;
+            } else {
+                libraries_.push_back({file});
+            }
+        })->required();
+        add(app, "--provider", "the MI name in it; else the file's stem without 'lib'", "NAME",
+            [this](const std::string& name) { current().provider = name; });
+        add(app, "--serves", "the classes that it serves; else all that it answers for", "CLASS,...",
+            [this](const std::string& text) { current().classes = namesIn(text); });
+    }
+
+private:
+    static CLI::Option* add(CLI::App& app, const char* name, const char* help, const char* type,
+                            const std::function<void(const std::string&)>& take) {
+        return app.add_option_function<std::string>(name, take, help)
+            ->type_name(type)
+            ->multi_option_policy(CLI::MultiOptionPolicy::TakeLast)
+            ->trigger_on_parse();
+    }
+    Library& current() {
+        if (libraries_.empty()) {
+            libraries_.emplace_back();
+            isAhead_ = true;
+        }
+        return libraries_.back();
+    }
+
+    std::vector<Library>& libraries_;
+    bool isAhead_ = false; // the last one's file is still to come
+};
+
 void addOptions(CLI::App& app, Options& options, Words& words) {
-    app.add_option("--library", options.library, "the provider's library")->required()->type_name("FILE");
-    app.add_option("--provider", options.provider, "the MI name; else the file's stem without 'lib'")
-        ->type_name("NAME");
     app.add_option("--mof", options.mofFiles, "declare the classes of a MOF file; repeatable")
         ->type_name("FILE")
         ->allow_extra_args(false);
@@ -132,16 +182,6 @@ void addFilters(CLI::App& command, Takes takes, oxahv::AssociationFilter& filter
         command.add_option("--result-role", filter.resultRole, "only what is the value of this reference")
             ->type_name("NAME");
     }
-}
-
-// Names with commas between them; none in an empty text.
-std::vector<std::string> namesIn(const std::string& text) {
-    std::vector<std::string> names;
-    std::istringstream stream(text);
-    for (std::string name; std::getline(stream, name, ',');) {
-        names.push_back(name);
-    }
-    return names;
 }
 
 void addPropertyList(CLI::App& command, Operands& operands) {
@@ -206,6 +246,8 @@ int parseAndRun(int argc, char** argv) {
     Options options;
     Words words;
     Operands operands;
+    LibraryOptions libraries(options.libraries);
+    libraries.addTo(app);
     addOptions(app, options, words);
     for (const Verb& verb : verbs()) {
         addVerb(app, verb, operands);

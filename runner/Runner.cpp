@@ -1,6 +1,7 @@
 #include "Runner.h"
 
 #include "Arguments.h"
+#include "check/CrashLine.h"
 #include "show/ProgressLine.h"
 #include "show/Text.h"
 
@@ -177,8 +178,14 @@ CMPIObjectPath* targetOf(Request& request, const Options& options, const Verb& v
     }
 }
 
-std::string providerName(const Options& options) {
-    return options.provider.empty() ? nameOf(options.library) : options.provider;
+std::string providerName(const Library& library) {
+    return library.provider.empty() ? nameOf(library.file) : library.provider;
+}
+
+void apply(EmbeddedBroker& broker, const Conduct& conduct) {
+    broker.setKeyMode(conduct.keyMode);
+    broker.setNewInstances(conduct.newInstances);
+    broker.setPathDelivery(conduct.pathDelivery);
 }
 
 void prepare(EmbeddedBroker& broker, const Options& options) {
@@ -194,14 +201,14 @@ void prepare(EmbeddedBroker& broker, const Options& options) {
 }
 
 // A name without a folder would be looked for among the system's libraries.
-void loadProvider(EmbeddedBroker& broker, const Options& options) {
-    const std::string name = providerName(options);
+static void load(EmbeddedBroker& broker, const Library& library) {
+    const std::string name = providerName(library);
     try {
-        broker.load(std::filesystem::absolute(options.library), name);
+        broker.load(std::filesystem::absolute(library.file), name, library.classes);
     } catch (const oxahv::BrokerError& error) {
         const std::string message = error.what();
         const bool isLoaded = message.rfind("cannot load", 0) != 0;
-        const bool isFile = std::filesystem::is_regular_file(options.library);
+        const bool isFile = std::filesystem::is_regular_file(library.file);
         throw oxahv::BrokerError(message +
                                  (isLoaded ? "; is " + name + " its MI name? Else give it with --provider"
                                   : isFile ? "; ldd shows what the library needs and what it lacks"
@@ -209,13 +216,18 @@ void loadProvider(EmbeddedBroker& broker, const Options& options) {
     }
 }
 
+void loadProviders(EmbeddedBroker& broker, const Options& options) {
+    for (const Library& library : options.libraries) {
+        load(broker, library);
+    }
+}
+
 int run(const Options& options, const Verb& verb, const Operands& operands) {
     EmbeddedBroker broker;
     prepare(broker, options);
-    loadProvider(broker, options);
-    broker.setKeyMode(options.keyMode);
-    broker.setNewInstances(options.newInstances);
-    broker.setPathDelivery(options.pathDelivery);
+    tellCrashesInOneLine(broker);
+    loadProviders(broker, options);
+    apply(broker, options.conduct);
     for (const std::string& fault : options.faults) {
         inject(broker, fault);
     }

@@ -9,15 +9,28 @@
 #include <string>
 #include <vector>
 
+// One provider of a library.
+struct Library {
+    std::string file;
+    std::string provider{};             // the MI name; empty: by the file's name
+    std::vector<std::string> classes{}; // that it serves; empty: all that it answers for
+};
+
+// In what the broker is like one server or another.
+struct Conduct {
+    oxahv::KeyMode keyMode = oxahv::KeyMode::exact;
+    oxahv::NewInstances newInstances = oxahv::NewInstances::full;
+    oxahv::PathDelivery pathDelivery{};
+};
+void apply(oxahv::EmbeddedBroker& broker, const Conduct& conduct);
+
 struct Options {
-    std::string library;
-    std::string provider; // empty: by the library's name
+    std::vector<Library> libraries; // the first is the one that a check is about
     std::string nameSpace = "root/cimv2";
     Format format = Format::mof;
     bool showsTraces = false;
-    oxahv::KeyMode keyMode = oxahv::KeyMode::exact;
-    oxahv::NewInstances newInstances = oxahv::NewInstances::full;
-    oxahv::PathDelivery pathDelivery;
+    Conduct conduct;
+    bool hasConduct = false; // whether the user has asked for any
     std::vector<std::string> mofFiles;
     std::vector<std::string> contextEntries; // NAME=TEXT
     std::vector<std::string> faults;         // SLOT:N[:CODE]
@@ -57,13 +70,13 @@ CMPIObjectPath* targetOf(oxahv::Request& request, const Options& options, const 
                          const Operands& operands);
 
 // The MI name: the option, or what the library's file stands for.
-std::string providerName(const Options& options);
+std::string providerName(const Library& library);
 
 // Gives the broker the classes and the context entries. Throws oxahv::BrokerError.
 void prepare(oxahv::EmbeddedBroker& broker, const Options& options);
 
-// Loads the provider. Throws oxahv::BrokerError.
-void loadProvider(oxahv::EmbeddedBroker& broker, const Options& options);
+// Loads the providers. Throws oxahv::BrokerError.
+void loadProviders(oxahv::EmbeddedBroker& broker, const Options& options);
 
 // Loads the provider and performs the verb. Prints results on the standard output and errors on the standard
 // error stream. Returns the exit status; throws oxahv::BrokerError for what keeps the request from being

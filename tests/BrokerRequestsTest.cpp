@@ -293,6 +293,70 @@ TEST_F(ARequest, FindsItsProviderByClass) {
     EXPECT_EQ(request.enumerateInstanceNames(nullptr).code, CMPI_RC_ERR_INVALID_HANDLE);
 }
 
+// Of an upcall for a class that nobody serves.
+TEST_F(ARequest, IsAnsweredAsByAServerWhereNobodyServesTheClass) {
+    EmbeddedBroker own;
+    own.declare(ClassDeclaration("Demo").key("K", CMPI_string).method("Start", CMPI_uint32));
+    own.declare(ClassDeclaration("Served"));
+    std::string unserved;
+    own.setUnservedHandler([&](const std::string& className) { unserved += className + ' '; });
+    own.host("Tested", {createInstanceMI}, {"Served"});
+    serve = [](const CMPIContext* context, const CMPIResult*, const CMPIObjectPath*) {
+        CMPIStatus status = {CMPI_RC_OK, nullptr};
+        CMPIObjectPath* const demo = CMNewObjectPath(broker, "root", "Demo", nullptr);
+        const CMPIEnumeration* const lists[] = {
+            broker->bft->enumerateInstanceNames(broker, context, demo, &status),
+            broker->bft->enumerateInstances(broker, context, demo, nullptr, &status),
+            broker->bft->associatorNames(broker, context, demo, nullptr, nullptr, nullptr, nullptr, &status),
+            broker->bft->references(broker, context, demo, nullptr, nullptr, nullptr, &status)};
+        for (const CMPIEnumeration* const list : lists) {
+            EXPECT_TRUE(list != nullptr && CMHasNext(list, nullptr) == 0);
+        }
+        EXPECT_EQ(status.rc, CMPI_RC_OK);
+        broker->bft->getInstance(broker, context, demo, nullptr, &status);
+        EXPECT_EQ(status.rc, CMPI_RC_ERR_NOT_FOUND);
+        broker->bft->invokeMethod(broker, context, demo, "Start", nullptr, nullptr, &status);
+        EXPECT_EQ(status.rc, CMPI_RC_ERR_METHOD_NOT_AVAILABLE);
+        EXPECT_EQ(broker->bft->deleteInstance(broker, context, demo).rc, CMPI_RC_ERR_NOT_SUPPORTED);
+        demo->ft->setClassName(demo, "None");
+        EXPECT_EQ(broker->bft->enumerateInstances(broker, context, demo, nullptr, &status), nullptr);
+        EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_CLASS);
+        CMReturn(CMPI_RC_OK);
+    };
+    Request request(own);
+    EXPECT_TRUE(request.enumerateInstanceNames(request.objectPath("root", "Served")).ok());
+    EXPECT_EQ(unserved, "Demo Demo Demo Demo Demo Demo Demo None ");
+}
+
+// Without a list of classes: whoever does not refuse the class, and not who calls up.
+TEST_F(ARequest, FindsItsProviderAmongThoseThatServeAll) {
+    unsigned int calls = 0;
+    serve = [&](const CMPIContext* context, const CMPIResult* result, const CMPIObjectPath* p) -> CMPIStatus {
+        const std::string name = CMGetCharsPtr(CMGetClassName(p, nullptr), nullptr);
+        ++calls;
+        if (name == "Refused") {
+            CMReturn(CMPI_RC_ERR_INVALID_CLASS);
+        }
+        if (name == "Another" || name == "Own") {
+            CMPIEnumeration* const found = broker->bft->enumerateInstanceNames(
+                broker, context, CMNewObjectPath(broker, "root", name.c_str(), nullptr), nullptr);
+            return CMReturnObjectPath(result, CMGetNext(found, nullptr).value.ref);
+        }
+        return echo(context, result, p);
+    };
+    const auto ask = [&](const char* name) {
+        calls = 0;
+        return request_.enumerateInstanceNames(request_.objectPath("root", name)).code;
+    };
+    EXPECT_EQ(ask("Refused"), CMPI_RC_ERR_INVALID_CLASS);
+    EXPECT_EQ(ask("Own"), CMPI_RC_ERR_INVALID_HANDLE) << "the upcall found nobody but its caller";
+    EXPECT_EQ(calls, 1U) << "and did not run for ever";
+    broker_.load(TEST_PROVIDER, "TestProvider");
+    EXPECT_EQ(ask("Refused"), CMPI_RC_OK);
+    EXPECT_EQ(ask("Another"), CMPI_RC_OK);
+    EXPECT_EQ(calls, 1U);
+}
+
 TEST_F(ARequest, TellsHowFarItHasCome) {
     std::vector<std::size_t> counts;
     request_.setProgressHandler([&](std::size_t results) { counts.push_back(results); });

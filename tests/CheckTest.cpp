@@ -18,11 +18,17 @@ using Texts = std::set<std::string>;
 const std::map<std::string, std::string> expectedFindings = {
     {"None", ""},
     {"Crash", "crash "},
+    {"CallsUp", "crash "},
     {"CrashWithChild", "crash "},
     {"CrashInFault", "crash@faults crash@faults "},
     {"NotServed", "not-served "},
     {"Failed", "failed "},
     {"UntypedKeys", "failed@untyped keys failed@untyped keys "},
+    {"CharsKeys", "failed@chars keys failed@chars keys "},
+    {"BareKeys", "null-key@bare instances "},
+    {"KeyOrder", "failed@reversed keys failed@reversed keys absent@reversed keys keys-unread@reversed keys "},
+    {"KeyCase", "failed@other case failed@other case "},
+    {"Host", "failed@host failed@host "},
     {"Exception", "exception "},
     {"NotACode", "not-a-code "},
     {"Absent", "absent "},
@@ -41,6 +47,8 @@ const std::map<std::string, std::string> expectedFindings = {
     {"PropertyList", "property-list "},
     {"ListIgnored", "list-ignored list-ignored "},
     {"Associated", ""},
+    {"AssociatedChars",
+     "keys-unread@chars keys keys-unread@chars keys keys-unread@chars keys keys-unread@chars keys "},
     {"AssociationsDiffer", "associations-differ "},
     {"AssociationEnd", "association-end "},
     {"AssociationOneSided", "one-sided "},
@@ -61,7 +69,7 @@ std::string faultyClasses() {
                        "class Faulty_Hang : Faulty_Base {}; class Faulty_HangClosed : Faulty_Base {};";
     for (const auto& [name, findings] : expectedFindings) {
         text += "class Faulty_" + name + " : Faulty_Base {";
-        text += name == "UntypedKeys" ? "[Key] uint16 Index; };" : "};";
+        text += name == "UntypedKeys" || name == "KeyOrder" ? "[Key] uint16 Index; };" : "};";
     }
     return text;
 }
@@ -125,7 +133,9 @@ TEST_F(TheCheck, FindsNothingInTheExample) {
                      " check --threads 8 --method 'OXATK_ComputerSystem.SetAssetTag Tag=\"1 2\"'",
                  0);
     EXPECT_EQ(report["findings"], Json::array());
-    EXPECT_EQ(report["passes"], Json({"exact keys", "untyped keys", "threads", "faults"}));
+    EXPECT_EQ(report["passes"],
+              Json({"exact keys", "untyped keys", "signed keys", "chars keys", "text keys", "bare instances",
+                    "reversed keys", "other case", "host", "threads", "faults", "unloading"}));
     Texts served;
     for (const Json& checked : report["classes"]) {
         if (checked["served"]) {
@@ -154,6 +164,56 @@ TEST_F(TheCheck, FindsCrashesOutsideOfRequests) {
     }
 }
 
+TEST_F(TheCheck, SaysWhichLibraryAnUpcallLacks) {
+    const File mof("class Faulty_CallsUp { [Key] string Name; string Text; uint32 Number; datetime When; };"
+                   "class Other_Thing {};");
+    const std::string mofOption = "--mof " + mof.path() + ' ';
+    const std::string get = "gi 'Faulty_CallsUp.Name=\"a\"'";
+    const std::string other = "--library " TEST_PROVIDER " --serves Other_Thing ";
+    EXPECT_EQ(shell(RUNNER " " + library_ + mofOption + get + " 2>&1 | cat").output,
+              "oxahv-provider: the provider crashed: aborted after it asked for class Other_Thing, which no "
+              "loaded library serves; load that one too, with a further --library\n");
+    EXPECT_EQ(run(library_ + other + mofOption + get).status, 0);
+    EXPECT_EQ(run("--provider FaultyProvider " + other + library_ + mofOption + get).status, 2)
+        << "a provider's name is of the library before it";
+
+    const Json findings = reportOf(library_ + mofOption + "check --class Faulty_CallsUp", 1)["findings"];
+    const std::string text = findings[0]["text"];
+    EXPECT_NE(text.find(" after it asked for class Other_Thing"), std::string::npos) << text;
+    const Json others =
+        reportOf(library_ + other + mofOption + "check --class Faulty_CallsUp", 1)["findings"];
+    EXPECT_TRUE(std::all_of(others.begin(), others.end(), [](const Json& finding) {
+        return finding["pass"] == "faults";
+    })) << others;
+}
+
+// As when the provider compares the class with a name that is written wrongly.
+TEST_F(TheCheck, MindsAClassThatIsRefusedAmongItsSisters) {
+    const File mof(
+        "class Faulty_None { [Key] string Name; string Text; uint32 Number; datetime When; };"
+        "class Faulty_NotServed { [Key] string Name; }; class Other_Class { [Key] string Name; };");
+    const Json findings = reportOf(library_ + "--mof " + mof.path() + " check", 1)["findings"];
+    ASSERT_EQ(findings.size(), 1U) << findings;
+    EXPECT_EQ(findings[0]["check"], "not-served");
+    EXPECT_EQ(findings[0]["class"], "Faulty_NotServed");
+}
+
+TEST_F(TheCheck, NamesWhatKeepsALibraryMapped) {
+    const Json findings = reportOf("--library " STAYING_PROVIDER " --provider FaultyProvider --mof " +
+                                       mof_.path() + " check --class Faulty_None",
+                                   1)["findings"];
+    ASSERT_EQ(findings.size(), 1U) << findings;
+    EXPECT_EQ(findings[0]["check"], "stays-mapped");
+    const std::string text = findings[0]["text"];
+#ifdef __clang__
+    EXPECT_NE(text.find("it is linked with -z nodelete"), std::string::npos) << text;
+#else
+    EXPECT_NE(text.find("unique symbols, to which other libraries bind: Shared<int>::count;"),
+              std::string::npos)
+        << text;
+#endif
+}
+
 TEST_F(TheCheck, PrintsATableWithColoursOnATerminalAlone) {
     const std::string arguments = faulty_ + "check --class Faulty_NotDone --class Faulty_Date";
     const std::string output = run(arguments).output;
@@ -161,7 +221,7 @@ TEST_F(TheCheck, PrintsATableWithColoursOnATerminalAlone) {
                            "checked     Faulty_Date: 2 instances\n"
                            "error  date  Faulty_Date: '20261301000000.000000+000'\n"
                            "    ei Faulty_Date\n"
-                           "    a text for a date or an interval is none; pass: exact keys, 26 times\n"
+                           "    a text for a date or an interval is none; pass: exact keys, 117 times\n"
                            "warning  not-done  Faulty_NotDone: ein does not call returnDone\n",
                            0),
               0U)
@@ -181,7 +241,8 @@ TEST_F(TheCheck, SaysWhatKeepsItFromChecking) {
         {faulty_ + "check --class Faulty_Type --method Faulty_None.Call",
          "method Faulty_None.Call is of no class that is checked; name the class with --class"},
         {faulty_ + "--keys chars check",
-         "check puts faults and key modes on the provider itself: leave --fault and --keys out"},
+         "check puts faults, keys, instances and paths on the provider itself: leave --fault, --keys, "
+         "--new-instance and --path out"},
         {"--library " HOST_PROVIDER " --mof " + mof_.path() + " check",
          "the provider serves none of the classes; its answer for Faulty_Absent is "
          "CMPI_RC_ERR_INVALID_CLASS: this provider does not serve class Faulty_Absent; name its MOF files "

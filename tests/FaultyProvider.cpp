@@ -6,6 +6,7 @@
 #include <chrono>
 #include <csignal>
 #include <cstddef>
+#include <cstdlib>
 #include <iostream>
 #include <stdexcept>
 #include <string>
@@ -30,8 +31,7 @@ std::string textOf(const CMPIString* string) {
 struct Target {
     explicit Target(const CMPIObjectPath* path)
         : nameSpace(textOf(CMGetNameSpace(path, nullptr))), className(textOf(CMGetClassName(path, nullptr))) {
-        const CMPIData name = CMGetKey(path, "Name", nullptr);
-        key = name.type == CMPI_string && !CMIsNullValue(name) ? textOf(name.value.string) : "";
+        readKey(path);
         if (key != "b" && (has("KeyMissing") || has("Absent"))) {
             key = "a";
         }
@@ -42,6 +42,28 @@ struct Target {
     std::string nameSpace;
     std::string className;
     std::string key;
+    bool isChars = false;
+
+private:
+    // The name that is the path's key. The faults are those of providers that know one server only.
+    void readKey(const CMPIObjectPath* path) {
+        CMPIData name = CMGetKey(path, "Name", nullptr);
+        if (has("KeyCase") || has("KeyOrder")) {
+            CMPIString* keyName = nullptr;
+            name = CMGetKeyAt(path, 0, &keyName, nullptr);
+            name.type = has("KeyCase") && textOf(keyName) != "Name" ? CMPI_null : name.type;
+        }
+        isChars = name.type == CMPI_chars;
+        const bool isHosted = has("Host") && !textOf(CMGetHostname(path, nullptr)).empty();
+        if (CMIsNullValue(name) || isHosted || (isChars && has("CharsKeys"))) {
+            return;
+        }
+        if (isChars) {
+            key = name.value.chars;
+        } else if (name.type == CMPI_string) {
+            key = textOf(name.value.string);
+        }
+    }
 };
 
 template <class Handle>
@@ -66,12 +88,21 @@ CMPIObjectPath* pathOf(const Target& target, const std::string& className, const
     if (!target.has("KeyMissing")) {
         require(CMAddKey(path, "Name", key.c_str(), CMPI_chars));
     }
-    if (target.has("UntypedKeys")) {
+    if (target.has("UntypedKeys") || target.has("KeyOrder")) {
         CMPIValue number = {};
         number.uint16 = 1;
         require(CMAddKey(path, "Index", &number, CMPI_uint16));
     }
     return path;
+}
+
+// The keys as properties, which a new instance has of some servers only.
+void setKeys(CMPIInstance* instance, const CMPIObjectPath* path) {
+    for (CMPICount i = 0; i < CMGetKeyCount(path, nullptr); ++i) {
+        CMPIString* name = nullptr;
+        const CMPIData key = CMGetKeyAt(path, i, &name, nullptr);
+        CMSetProperty(instance, textOf(name).c_str(), &key.value, key.type);
+    }
 }
 
 CMPIInstance* newInstance(const Target& target, const CMPIObjectPath* path, const char** properties) {
@@ -83,6 +114,9 @@ CMPIInstance* newInstance(const Target& target, const CMPIObjectPath* path, cons
     made(instance);
     if (properties != nullptr && !target.has("ListIgnored")) {
         require(CMSetPropertyFilter(instance, target.has("PropertyList") ? nothing : properties, nullptr));
+    }
+    if (!target.has("BareKeys")) {
+        setKeys(instance, path);
     }
     return instance;
 }
@@ -148,7 +182,8 @@ bool isOfClass(const char* filter, CMPIObjectPath* path) {
 
 struct Link {
     Link(const Target& target, const Filter& filter) {
-        if (target.key.empty() || !target.begins("Faulty_Associat")) {
+        const bool isUnread = target.isChars && target.has("AssociatedChars");
+        if (target.key.empty() || isUnread || !target.begins("Faulty_Associat")) {
             throw Failure{CMPI_RC_ERR_NOT_SUPPORTED};
         }
         path = made(CMNewObjectPath(broker, target.nameSpace.c_str(), "Faulty_Link", nullptr));
@@ -169,6 +204,16 @@ struct Link {
     CMPIObjectPath* other;
     bool isIncluded;
 };
+
+// Takes for granted that there is an instance of another library's class, as many providers do.
+void callUp(const Target& target, const CMPIContext* context) {
+    CMPIObjectPath* const other =
+        made(CMNewObjectPath(broker, target.nameSpace.c_str(), "Other_Thing", nullptr));
+    CMPIEnumeration* const names = broker->bft->enumerateInstanceNames(broker, context, other, nullptr);
+    if (CMGetNext(names, nullptr).value.ref == nullptr) {
+        std::abort();
+    }
+}
 
 // What the context wants the provider to do: to crash when it is loaded, or at its end.
 std::string crash;
@@ -225,7 +270,7 @@ static CMPIStatus FaultyEnumInstances(CMPIInstanceMI*, const CMPIContext*, const
     });
 }
 
-static CMPIStatus FaultyGetInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+static CMPIStatus FaultyGetInstance(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
                                     const CMPIObjectPath* path, const char** properties) {
     static const std::thread::id firstThread = std::this_thread::get_id();
     return answer(result, path, [&](const Target& target) {
@@ -238,6 +283,9 @@ static CMPIStatus FaultyGetInstance(CMPIInstanceMI*, const CMPIContext*, const C
             std::this_thread::sleep_for(std::chrono::minutes(1));
             std::cerr << "the child is left over\n";
             ::_exit(0);
+        }
+        if (target.has("CallsUp")) {
+            callUp(target, context);
         }
         if (target.has("Crash") || target.has("CrashWithChild")) {
             std::raise(SIGKILL);
@@ -338,3 +386,14 @@ extern "C" CMPI_EXPORT CMPIInstanceMI* FaultyProvider_Create_InstanceMI(const CM
     crashAt("load");
     return FaultyInstances_Create_InstanceMI(theBroker, context, status);
 }
+
+#ifdef STAYS_MAPPED
+// There is one of it in a process, which keeps the library that has it.
+template <class>
+struct __attribute__((visibility("default"))) Shared {
+    static inline int count = 0;
+};
+extern "C" CMPI_EXPORT int* countOfAll() {
+    return &Shared<int>::count;
+}
+#endif

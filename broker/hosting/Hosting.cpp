@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <dlfcn.h>
 #include <future>
+#include <iterator>
 
 namespace oxahv {
 
@@ -111,6 +112,54 @@ Reply refused(CMPIrc code, std::string message = {}) {
     reply.message = std::move(message);
     return reply;
 }
+
+// Whether a provider has said that the class is not its own.
+bool isRefusal(const Reply& reply) {
+    return (reply.code == CMPI_RC_ERR_NOT_SUPPORTED || reply.code == CMPI_RC_ERR_INVALID_CLASS) &&
+           reply.instances.empty() && reply.objectPaths.empty();
+}
+
+// What the thread is inside of. A provider that calls up for a class of another may be the only one that is
+// asked, and would call up for ever.
+class Ongoing {
+public:
+    Ongoing(const HostedProvider* provider, const void* operation, const std::string& className)
+        : provider_(provider), operation_(operation), className_(className), outer_(innermost) {
+        innermost = this;
+    }
+    ~Ongoing() { innermost = outer_; }
+    Ongoing(const Ongoing&) = delete;
+    Ongoing& operator=(const Ongoing&) = delete;
+
+    static bool includes(const HostedProvider* provider) {
+        return any([&](const Ongoing& one) { return one.provider_ == provider; });
+    }
+    static bool includes(const HostedProvider* provider, const void* operation,
+                         const std::string& className) {
+        return any([&](const Ongoing& one) {
+            return one.provider_ == provider && one.operation_ == operation &&
+                   sameName(one.className_, className);
+        });
+    }
+
+private:
+    template <class Predicate>
+    static bool any(const Predicate& is) {
+        for (const Ongoing* one = innermost; one != nullptr; one = one->outer_) {
+            if (is(*one)) {
+                return true;
+            }
+        }
+        return false;
+    }
+
+    static thread_local const Ongoing* innermost;
+    const HostedProvider* provider_;
+    const void* operation_;
+    const std::string& className_;
+    const Ongoing* outer_;
+};
+thread_local const Ongoing* Ongoing::innermost = nullptr;
 
 // Calls a slot of an MI; a provider may leave one empty.
 template <class MI, class... Parameters, class... Given>
@@ -349,22 +398,29 @@ void Hosting::unload(const std::string& name) {
 }
 
 template <class MI>
-std::shared_ptr<HostedProvider> Hosting::find(const ObjectPath& path,
-                                              std::string_view associationClass) const {
+std::vector<std::shared_ptr<HostedProvider>> Hosting::find(const ObjectPath& path,
+                                                           std::string_view associationClass) const {
     const std::shared_lock<std::shared_mutex> lock(mutex_);
-    const auto first = [&](const auto& matches) {
-        const auto found = std::find_if(providers_.begin(), providers_.end(), [&](const auto& provider) {
-            return provider->template mi<MI>() != nullptr && matches(*provider);
-        });
-        return found != providers_.end() ? *found : nullptr;
+    const auto have = [&](const auto& matches) {
+        std::vector<std::shared_ptr<HostedProvider>> found;
+        std::copy_if(providers_.begin(), providers_.end(), std::back_inserter(found),
+                     [&](const auto& provider) {
+                         return provider->template mi<MI>() != nullptr && matches(*provider);
+                     });
+        return found;
     };
     const std::string_view wanted = associationClass.empty() ? path.className : associationClass;
-    auto provider = first([&](const HostedProvider& p) { return p.serves(core_.classes, wanted); });
-    if (provider == nullptr && std::is_same_v<MI, CMPIAssociationMI> && associationClass.empty()) {
-        provider = first(
-            [](const HostedProvider&) { return true; }); // an association lists its own class, not its ends'
+    auto found = have([&](const HostedProvider& p) { return p.serves(core_.classes, wanted); });
+    if (!found.empty()) {
+        found.resize(1);
+        return found;
     }
-    return provider != nullptr ? provider : first([](const HostedProvider& p) { return p.servesAll(); });
+    const bool isOfAny = std::is_same_v<MI, CMPIAssociationMI> && associationClass.empty();
+    // An association's provider lists its own class, not those of its ends.
+    found = have([&](const HostedProvider& p) { return isOfAny || p.servesAll(); });
+    std::stable_partition(found.begin(), found.end(),
+                          [](const auto& provider) { return !Ongoing::includes(provider.get()); });
+    return found;
 }
 
 CMPIObjectPath* Hosting::deliver(const CMPIObjectPath* handle) const {
@@ -386,23 +442,41 @@ Reply Hosting::request(const CMPIContext* context, const CMPIObjectPath* handle,
         return refused(CMPI_RC_ERR_INVALID_HANDLE);
     }
     if (core_.classes.any() && core_.classes.find(path->className) == nullptr) {
-        return refused(CMPI_RC_ERR_INVALID_CLASS, "class " + path->className + " is not declared");
+        Reply unknown = refused(CMPI_RC_ERR_INVALID_CLASS, "class " + path->className + " is not declared");
+        unknown.isServed = false;
+        return unknown;
     }
-    const std::shared_ptr<HostedProvider> provider = find<MI>(*path, associationClass);
-    if (provider == nullptr) {
-        return refused(CMPI_RC_ERR_NOT_SUPPORTED, "no provider serves this for class " + path->className);
+    static const char operation = 0; // its address is another for each MI function
+    const std::function<void(std::size_t)>* const progress = std::exchange(own->progress, nullptr);
+    Reply reply = refused(CMPI_RC_ERR_NOT_SUPPORTED, "no provider serves this for class " + path->className);
+    reply.isServed = false;
+    bool isAsked = false;
+    for (const std::shared_ptr<HostedProvider>& provider : find<MI>(*path, associationClass)) {
+        if (provider->servesAll() && Ongoing::includes(provider.get(), &operation, path->className)) {
+            continue;
+        }
+        const Ongoing ongoing(provider.get(), &operation, path->className);
+        Result result(core_, Owner::current(core_));
+        result.progress = progress;
+        const CMPIObjectPath* const delivered = deliver(handle);
+        std::string message;
+        const CMPIStatus status =
+            guarded([&] { return function(provider->mi<MI>(), &result, delivered); }, message);
+        if (status.rc != CMPI_RC_OK) { // else an error that the provider returned as a result stands
+            result.reply.code = status.rc;
+            result.reply.message = message;
+        }
+        const bool isRefused = provider->servesAll() && isRefusal(result.reply);
+        if (!isRefused || !isAsked) { // the first refusal is the one to tell
+            reply = std::move(result.reply);
+            reply.isServed = !isRefused;
+        }
+        if (!isRefused) {
+            break;
+        }
+        isAsked = true;
     }
-    Result result(core_, Owner::current(core_));
-    result.progress = std::exchange(own->progress, nullptr);
-    const CMPIObjectPath* const delivered = deliver(handle);
-    std::string message;
-    const CMPIStatus status =
-        guarded([&] { return function(provider->mi<MI>(), &result, delivered); }, message);
-    if (status.rc != CMPI_RC_OK) { // else an error that the provider returned as a result stands
-        result.reply.code = status.rc;
-        result.reply.message = message;
-    }
-    return std::move(result.reply);
+    return reply;
 }
 
 Reply Hosting::enumerateInstances(const CMPIContext* context, const CMPIObjectPath* path,

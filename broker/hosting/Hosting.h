@@ -61,9 +61,10 @@ public:
     CMPIObjectPath* deliver(const CMPIObjectPath* handle) const;
 
 private:
+    // Whom to ask, in order: one that names the class, or all that may serve it.
     template <class MI>
-    std::shared_ptr<HostedProvider> find(const ObjectPath& path,
-                                         std::string_view associationClass = {}) const;
+    std::vector<std::shared_ptr<HostedProvider>> find(const ObjectPath& path,
+                                                      std::string_view associationClass) const;
     template <class MI, class Function>
     Reply request(const CMPIContext* context, const CMPIObjectPath* handle, const Function& function,
                   std::string_view associationClass = {});

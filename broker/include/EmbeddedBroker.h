@@ -43,11 +43,11 @@
 #include <cmpift.h>
 #include <cmpimacs.h>
 
-#include "Declarations.h"
 #include "Request.h"
 #include "TKExport.h"
 #include "Testing.h"
 #include "Text.h"
+#include "classes/Declarations.h"
 
 #include <functional>
 #include <memory>
@@ -191,6 +191,14 @@ public:
     std::vector<Call> stopRecording();
     /** Counts of the objects that are alive now. */
     LiveObjects liveObjects() const;
+    /**
+     * Receives the name of the class whenever an upcall finds no provider. The upcall is answered as a CIM
+     * server does: an empty enumeration, `CMPI_RC_ERR_NOT_FOUND`, `CMPI_RC_ERR_METHOD_NOT_AVAILABLE`, else
+     * `CMPI_RC_ERR_NOT_SUPPORTED`.
+     * @param handler called on the provider's thread, by several at once; null: nobody. The earlier one is
+     * called no more when this returns. A handler must not set another.
+     */
+    void setUnservedHandler(std::function<void(const std::string& className)> handler);
     /** Receives what providers write through the `logMessage` and `trace` slots; null: dropped. Called on
      * their threads, by several at once; the earlier handler is called no more when this returns. A handler
      * must not set another. */

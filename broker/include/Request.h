@@ -34,6 +34,7 @@ struct Reply {
     std::vector<CMPIData> data;               ///< returned by returnData; a method's return value
     CMPIArgs* out = nullptr;                  ///< a method's output arguments
     bool done = false;                        ///< whether the provider called returnDone
+    bool isServed = true; ///< whether there was a provider to ask, and not all of them refused the class
     /** Whether the code is `CMPI_RC_OK`. */
     bool ok() const { return code == CMPI_RC_OK; }
 };
@@ -52,11 +53,13 @@ struct AssociationFilter {
  * gets the code without the message.
  *
  * The operations find the provider by the class of the path, call its MI function, and collect what it
- * returns. Each asks one provider, the first that serves the class; of several with associations, a request
- * names the association class of the one that it means. The path is delivered as the broker's KeyMode and
- * PathDelivery say. With declarations, an unknown class answers `CMPI_RC_ERR_INVALID_CLASS`, a method that
- * its class does not have `CMPI_RC_ERR_METHOD_NOT_FOUND`; a class that no provider serves answers
- * `CMPI_RC_ERR_NOT_SUPPORTED`. None of them throws, but for `std::bad_alloc`.
+ * returns. Each asks the first provider that serves the class; of several with associations, a request names
+ * the association class of the one that it means. Of providers that serve all classes, the next is asked
+ * where one refuses the class (`CMPI_RC_ERR_NOT_SUPPORTED`, `CMPI_RC_ERR_INVALID_CLASS`) without a result;
+ * one that calls up comes last, and never gets the call that it is in once more. The path is delivered as the
+ * broker's KeyMode and PathDelivery say. With declarations, an unknown class answers
+ * `CMPI_RC_ERR_INVALID_CLASS`, a method that its class does not have `CMPI_RC_ERR_METHOD_NOT_FOUND`; a class
+ * that no provider serves answers `CMPI_RC_ERR_NOT_SUPPORTED`. None of them throws, but for `std::bad_alloc`.
  */
 class TK_EXPORT Request {
 public:

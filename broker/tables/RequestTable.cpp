@@ -49,7 +49,21 @@ const Reply& succeeded(const Reply& reply) {
     return reply;
 }
 
-CMPIEnumeration* enumerationOf(Core& core, const Reply& reply, CMPIType type) {
+// What a server without a provider for the class answers. The program may want to know: few providers
+// expect it.
+void tellUnserved(Core& core, Reply& reply, const CMPIObjectPath* handle, CMPIrc code) {
+    if (reply.isServed) {
+        return;
+    }
+    const std::string& className = ObjectPath::of(handle)->className;
+    core.tellUnserved(className);
+    if (!core.classes.any() || core.classes.find(className) != nullptr) {
+        reply.code = code;
+    }
+}
+
+CMPIEnumeration* enumerationOf(Core& core, Reply reply, const CMPIObjectPath* asked, CMPIType type) {
+    tellUnserved(core, reply, asked, CMPI_RC_OK);
     succeeded(reply);
     auto enumeration = std::make_unique<Enumeration>(core, type);
     CMPIValue value = {};
@@ -78,38 +92,45 @@ const char* orEmpty(const char* text) {
 }
 
 CMPIEnumeration* enumerateInstanceNames(Core& core, const CMPIContext* context, const CMPIObjectPath* path) {
-    return enumerationOf(core, core.hosting.enumerateInstanceNames(context, path), CMPI_ref);
+    return enumerationOf(core, core.hosting.enumerateInstanceNames(context, path), path, CMPI_ref);
 }
 
 CMPIEnumeration* enumerateInstances(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
                                     const char** properties) {
-    return enumerationOf(core, core.hosting.enumerateInstances(context, path, properties), CMPI_instance);
+    return enumerationOf(core, core.hosting.enumerateInstances(context, path, properties), path,
+                         CMPI_instance);
 }
 
 CMPIInstance* getInstance(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
                           const char** properties) {
-    const Reply reply = core.hosting.getInstance(context, path, properties);
+    Reply reply = core.hosting.getInstance(context, path, properties);
+    tellUnserved(core, reply, path, CMPI_RC_ERR_NOT_FOUND);
     return firstOf(reply, reply.instances);
 }
 
 CMPIObjectPath* createInstance(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
                                const CMPIInstance* instance) {
-    const Reply reply = core.hosting.createInstance(context, path, instance);
+    Reply reply = core.hosting.createInstance(context, path, instance);
+    tellUnserved(core, reply, path, CMPI_RC_ERR_NOT_SUPPORTED);
     return firstOf(reply, reply.objectPaths);
 }
 
 void modifyInstance(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
                     const CMPIInstance* instance, const char** properties) {
-    succeeded(core.hosting.modifyInstance(context, path, instance, properties));
+    Reply reply = core.hosting.modifyInstance(context, path, instance, properties);
+    tellUnserved(core, reply, path, CMPI_RC_ERR_NOT_SUPPORTED);
+    succeeded(reply);
 }
 
 void deleteInstance(Core& core, const CMPIContext* context, const CMPIObjectPath* path) {
-    succeeded(core.hosting.deleteInstance(context, path));
+    Reply reply = core.hosting.deleteInstance(context, path);
+    tellUnserved(core, reply, path, CMPI_RC_ERR_NOT_SUPPORTED);
+    succeeded(reply);
 }
 
 CMPIEnumeration* execQuery(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
                            const char* query, const char* language) {
-    return enumerationOf(core, core.hosting.execQuery(context, path, query, language), CMPI_instance);
+    return enumerationOf(core, core.hosting.execQuery(context, path, query, language), path, CMPI_instance);
 }
 
 CMPIEnumeration* associators(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
@@ -117,7 +138,8 @@ CMPIEnumeration* associators(Core& core, const CMPIContext* context, const CMPIO
                              const char* resultRole, const char** properties) {
     const AssociationFilter filter = {orEmpty(associationClass), orEmpty(resultClass), orEmpty(role),
                                       orEmpty(resultRole)};
-    return enumerationOf(core, core.hosting.associators(context, path, filter, properties), CMPI_instance);
+    return enumerationOf(core, core.hosting.associators(context, path, filter, properties), path,
+                         CMPI_instance);
 }
 
 CMPIEnumeration* associatorNames(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
@@ -125,19 +147,20 @@ CMPIEnumeration* associatorNames(Core& core, const CMPIContext* context, const C
                                  const char* resultRole) {
     const AssociationFilter filter = {orEmpty(associationClass), orEmpty(resultClass), orEmpty(role),
                                       orEmpty(resultRole)};
-    return enumerationOf(core, core.hosting.associatorNames(context, path, filter), CMPI_ref);
+    return enumerationOf(core, core.hosting.associatorNames(context, path, filter), path, CMPI_ref);
 }
 
 CMPIEnumeration* references(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
                             const char* resultClass, const char* role, const char** properties) {
     const AssociationFilter filter = {"", orEmpty(resultClass), orEmpty(role), ""};
-    return enumerationOf(core, core.hosting.references(context, path, filter, properties), CMPI_instance);
+    return enumerationOf(core, core.hosting.references(context, path, filter, properties), path,
+                         CMPI_instance);
 }
 
 CMPIEnumeration* referenceNames(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
                                 const char* resultClass, const char* role) {
     const AssociationFilter filter = {"", orEmpty(resultClass), orEmpty(role), ""};
-    return enumerationOf(core, core.hosting.referenceNames(context, path, filter), CMPI_ref);
+    return enumerationOf(core, core.hosting.referenceNames(context, path, filter), path, CMPI_ref);
 }
 
 CMPIData invokeMethod(Core& core, const CMPIContext* context, const CMPIObjectPath* path, const char* method,
@@ -146,7 +169,9 @@ CMPIData invokeMethod(Core& core, const CMPIContext* context, const CMPIObjectPa
     if (out != nullptr && wanted == nullptr) {
         throw Failure{CMPI_RC_ERR_INVALID_HANDLE};
     }
-    const Reply reply = succeeded(core.hosting.invokeMethod(context, path, required(method), in));
+    Reply reply = core.hosting.invokeMethod(context, path, required(method), in);
+    tellUnserved(core, reply, path, CMPI_RC_ERR_METHOD_NOT_AVAILABLE);
+    succeeded(reply);
     if (wanted != nullptr) {
         wanted->values = Arguments::of(reply.out)->values;
     }

@@ -84,6 +84,7 @@ Answer answerOf(const oxahv::Reply& reply, const std::string& nameSpace) {
     answer.isDone = reply.done;
     for (const CMPIInstance* const instance : reply.instances) {
         answer.results.push_back(resultOf(CMGetObjectPath(instance, nullptr), nameSpace));
+        answer.results.back().isInstance = true;
         answer.results.back().properties = plainOf(propertiesOf(instance), nameSpace);
     }
     for (const CMPIObjectPath* const path : reply.objectPaths) {

@@ -27,6 +27,7 @@ struct Result {
     std::string className;
     std::string path;     // as a command line takes it
     std::string identity; // the same for all paths of one instance, whatever their order of keys
+    bool isInstance = false;
     NamedData keys;
     NamedData properties; // of an instance
 };

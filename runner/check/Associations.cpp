@@ -85,7 +85,7 @@ void Associations::checkOwnEnds() {
             continue;
         }
         const std::optional<Answer> seen = client_.askPlainly(queryOf("rn", end.referredPath));
-        const bool isSeen = !seen || isRefusal(seen->code) ||
+        const bool isSeen = !seen || seen->code == CMPI_RC_ERR_NOT_SUPPORTED ||
                             std::any_of(seen->results.begin(), seen->results.end(),
                                         [&](const Result& result) { return result.identity == identity_; });
         if (!isSeen) {

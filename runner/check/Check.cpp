@@ -1,7 +1,9 @@
 #include "check/Check.h"
 
+#include "check/CrashLine.h"
 #include "check/Examination.h"
 #include "check/Strain.h"
+#include "check/Unloading.h"
 #include "show/ProgressLine.h"
 #include "show/Text.h"
 #include "show/Values.h"
@@ -10,6 +12,7 @@
 #include <chrono>
 #include <iostream>
 #include <map>
+#include <set>
 #include <unistd.h>
 
 namespace {
@@ -20,27 +23,48 @@ using oxahv::KeyMode;
 
 struct Pass {
     const char* name;
-    KeyMode keyMode;
-    bool reports; // what any request shows; the passes after the first two look for something else
+    Conduct conduct;
+    bool reports; // what any request shows; the last passes look for something else
     void (*strain)(Client& client);
 };
-constexpr Pass passes[] = {
-    {"exact keys", KeyMode::exact, true, nullptr},
-    {"untyped keys", KeyMode::untyped, true, nullptr},
-    {"threads", KeyMode::exact, false, strainByThreads},
-    {"faults", KeyMode::exact, false, strainByFaults},
-};
+
+const std::vector<Pass>& passes() {
+    constexpr auto full = oxahv::NewInstances::full;
+    static const std::vector<Pass> all = {
+        {"exact keys", {}, true, nullptr},
+        {"untyped keys", {KeyMode::untyped}, true, strainByConduct},
+        {"signed keys", {KeyMode::signedIntegers}, true, strainByConduct},
+        {"chars keys", {KeyMode::chars}, true, strainByConduct},
+        {"text keys", {KeyMode::text}, true, strainByConduct},
+        {"bare instances", {KeyMode::exact, oxahv::NewInstances::bare}, true, nullptr},
+        {"reversed keys", {KeyMode::exact, full, {true, false, ""}}, true, strainByConduct},
+        {"other case", {KeyMode::exact, full, {false, true, ""}}, true, strainByConduct},
+        {"host", {KeyMode::exact, full, {false, false, "host.example.com"}}, true, strainByConduct},
+        {"threads", {}, false, strainByThreads},
+        {"faults", {}, false, strainByFaults},
+    };
+    return all;
+}
+constexpr const char* unloadingPass = "unloading";
 
 // In the child
 
 constexpr const char* loading = "loading the provider";
 constexpr const char* cleaningUp = "the provider's cleanup";
 
+void unloadProviders(Client& client) {
+    client.doing(cleaningUp, [&] {
+        for (const Library& library : client.options().libraries) {
+            client.broker().unload(providerName(library));
+        }
+    });
+}
+
 void endProvider(Client& client, std::size_t before) {
     if (client.task().skipped.count(cleaningUp) != 0) {
         return;
     }
-    client.doing(cleaningUp, [&] { client.broker().unload(providerName(client.options())); });
+    unloadProviders(client);
     const std::size_t after = client.broker().liveObjects().total();
     if (after > before) {
         client.find(CheckKind::leftOver, cleaningUp,
@@ -48,23 +72,60 @@ void endProvider(Client& client, std::size_t before) {
     }
 }
 
+void load(Client& client) {
+    client.broker().setUnservedHandler([&client](const std::string& className) {
+        client.tell({Message::Kind::unserved, 0, className});
+    });
+    client.doing(loading, [&] { loadProviders(client.broker(), client.options()); });
+}
+
 void runTask(EmbeddedBroker& broker, const Options& options, const CheckTask& task, const Pass& pass,
              ChildOutput& output) {
     Client client(broker, options, task, output, pass.reports);
     const std::size_t before = broker.liveObjects().total();
     try {
-        client.doing(loading, [&] { loadProvider(broker, options); });
-        broker.setKeyMode(pass.keyMode);
+        load(client);
+        apply(broker, pass.conduct);
         Examination(client).run();
         client.setReports(true);
         if (pass.strain != nullptr) {
             pass.strain(client);
-        } else {
+        }
+        if (pass.reports) {
             endProvider(client, before);
         }
     } catch (const std::exception& exception) {
         client.tell({Message::Kind::unusable, 0, exception.what()});
     }
+    broker.setUnservedHandler(nullptr);
+}
+
+// Sends what every client sends, unloads the libraries and looks whether they are gone.
+void runUnloading(EmbeddedBroker& broker, const Options& options, const CheckTask& task,
+                  const std::vector<std::string>& classes, ChildOutput& output) {
+    Client client(broker, options, task, output, false); // what the requests show has been told
+    try {
+        load(client);
+        for (const std::string& className : classes) {
+            client.askPlainly(queryOf("ei", className));
+            const std::optional<Answer> names = client.askPlainly(queryOf("ein", className));
+            if (names && !names->results.empty()) {
+                client.askPlainly(queryOf("gi", names->results.front().path));
+            }
+        }
+        unloadProviders(client);
+        client.setReports(true);
+        for (const Library& library : options.libraries) {
+            const std::string why = whyStillMapped(library.file);
+            if (!why.empty()) {
+                client.find(CheckKind::staysMapped, cleaningUp,
+                            providerName(library) + " stays mapped when it is unloaded: " + why);
+            }
+        }
+    } catch (const std::exception& exception) {
+        client.tell({Message::Kind::unusable, 0, exception.what()});
+    }
+    broker.setUnservedHandler(nullptr);
 }
 
 // In the parent
@@ -74,8 +135,8 @@ public:
     CheckRun(const Options& options, const CheckOptions& checkOptions)
         : options_(options), checkOptions_(checkOptions) {
         prepare(broker_, options_);
-        report_.library = options_.library;
-        report_.provider = providerName(options_);
+        report_.library = options_.libraries.front().file;
+        report_.provider = providerName(options_.libraries.front());
     }
 
     CheckReport run();
@@ -85,7 +146,10 @@ private:
     MethodCall methodCall(const std::string& text) const;
     void runClass(std::size_t position, std::size_t count);
     void runPass(const Pass& pass, CheckTask& task, CheckedClass& checked);
-    bool runOnce(const Pass& pass, CheckTask& task, CheckedClass& checked);
+    bool runOnce(CheckTask& task, CheckedClass& checked, const std::function<void(ChildOutput&)>& work);
+    std::vector<std::string> servedClasses() const;
+    void mindRefusals();
+    void unload(const std::vector<std::string>& classes);
     void receive(const Message& message, CheckedClass& checked);
     void reportEnd(const ChildResult& result, CheckTask& task);
 
@@ -98,6 +162,8 @@ private:
     ProgressLine progress_;
     std::string place_;                         // for the progress
     std::map<std::size_t, std::string> atWork_; // the child's requests that have begun and not ended
+    std::string unserved_;                      // the class of the child's last upcall that found no provider
+    std::set<std::string> skipped_;             // all that has ended or blocked the provider
 };
 
 std::vector<std::string> CheckRun::classNames() const {
@@ -160,9 +226,10 @@ CheckReport CheckRun::run() {
     for (const std::string& text : checkOptions_.methods) {
         methods_.push_back(methodCall(text));
     }
-    for (const Pass& pass : passes) {
+    for (const Pass& pass : passes()) {
         report_.passes.emplace_back(pass.name);
     }
+    report_.passes.emplace_back(unloadingPass);
     for (const std::string& name : classNames()) {
         report_.classes.push_back({name, false, 0, ""});
     }
@@ -181,14 +248,62 @@ CheckReport CheckRun::run() {
             return std::move(report_);
         }
     }
-    const bool isServed = std::any_of(report_.classes.begin(), report_.classes.end(),
-                                      [](const CheckedClass& checked) { return checked.isServed; });
-    if (!isServed && report_.findings.empty()) {
+    mindRefusals();
+    const std::vector<std::string> served = servedClasses();
+    if (!served.empty()) {
+        unload(served);
+    }
+    if (served.empty() && report_.findings.empty()) {
         throw BrokerError("the provider serves none of the classes; its answer for " +
                           report_.classes.front().name + " is " + report_.classes.front().answer +
                           "; name its MOF files with --mof");
     }
     return std::move(report_);
+}
+
+std::vector<std::string> CheckRun::servedClasses() const {
+    std::vector<std::string> names;
+    for (const CheckedClass& checked : report_.classes) {
+        if (checked.isServed) {
+            names.push_back(checked.name);
+        }
+    }
+    return names;
+}
+
+// The part of a class's name that says whose it is.
+std::string schemaOf(const std::string& className) {
+    return lowerCase(className.substr(0, className.find('_')));
+}
+
+// Classes of others, such as the standard's, are refused rightly. That one of the provider's own schema is
+// not known to it is most often a mistake in a name.
+void CheckRun::mindRefusals() {
+    std::set<std::string> schemas;
+    for (const std::string& name : servedClasses()) {
+        schemas.insert(schemaOf(name));
+    }
+    for (const CheckedClass& checked : report_.classes) {
+        const bool isNamed = !checkOptions_.classes.empty(); // then its refusal has been told
+        if (!checked.isServed && !isNamed && schemas.count(schemaOf(checked.name)) != 0) {
+            report_.findings.add({CheckKind::notServed, checked.name, passes().front().name,
+                                  textOf(queryOf("ein", checked.name)),
+                                  checked.answer + "; it serves other classes of this schema: is the name"
+                                                   " written rightly where it looks at it?"});
+        }
+    }
+}
+
+void CheckRun::unload(const std::vector<std::string>& classes) {
+    CheckTask task;
+    task.pass = unloadingPass;
+    task.skipped = skipped_;
+    place_ = std::string(unloadingPass) + ": ";
+    if (task.skipped.count(cleaningUp) == 0) {
+        CheckedClass unused;
+        runOnce(task, unused,
+                [&](ChildOutput& output) { runUnloading(broker_, options_, task, classes, output); });
+    }
 }
 
 void CheckRun::runClass(std::size_t position, std::size_t count) {
@@ -202,9 +317,10 @@ void CheckRun::runClass(std::size_t position, std::size_t count) {
             task.methods.push_back(call);
         }
     }
-    for (const Pass& pass : passes) {
+    for (const Pass& pass : passes()) {
         place_ = '[' + std::to_string(position + 1) + '/' + std::to_string(count) + "] " + pass.name + ": ";
         task.pass = pass.name;
+        task.conduct = pass.conduct;
         runPass(pass, task, checked);
         if (!checked.isServed) {
             break;
@@ -216,7 +332,8 @@ void CheckRun::runClass(std::size_t position, std::size_t count) {
 void CheckRun::runPass(const Pass& pass, CheckTask& task, CheckedClass& checked) {
     constexpr int mostAttempts = 20;
     for (int attempt = 0; attempt < mostAttempts; ++attempt) {
-        const bool isFinished = runOnce(pass, task, checked);
+        const bool isFinished = runOnce(
+            task, checked, [&](ChildOutput& output) { runTask(broker_, options_, task, pass, output); });
         canLoad_ = task.skipped.count(loading) == 0;
         if (isFinished || !canLoad_) {
             return;
@@ -227,13 +344,14 @@ void CheckRun::runPass(const Pass& pass, CheckTask& task, CheckedClass& checked)
                               " crashes and hangs; what follows is not checked"});
 }
 
-bool CheckRun::runOnce(const Pass& pass, CheckTask& task, CheckedClass& checked) {
+bool CheckRun::runOnce(CheckTask& task, CheckedClass& checked,
+                       const std::function<void(ChildOutput&)>& work) {
     atWork_.clear();
+    unserved_.clear();
     std::cout.flush();
-    const ChildResult result =
-        runInChild([&](ChildOutput& output) { runTask(broker_, options_, task, pass, output); },
-                   [&](const std::string& line) { receive(messageOf(line), checked); },
-                   std::chrono::seconds(checkOptions_.timeoutSeconds));
+    const ChildResult result = runInChild(
+        work, [&](const std::string& line) { receive(messageOf(line), checked); },
+        std::chrono::seconds(checkOptions_.timeoutSeconds));
     if (result.end == ChildEnd::finished) {
         return true;
     }
@@ -261,6 +379,9 @@ void CheckRun::receive(const Message& message, CheckedClass& checked) {
     case Message::Kind::classRefused:
         checked.answer = message.text;
         break;
+    case Message::Kind::unserved:
+        unserved_ = message.text;
+        break;
     case Message::Kind::unusable:
         throw BrokerError(message.text);
     }
@@ -284,10 +405,12 @@ void CheckRun::reportEnd(const ChildResult& result, CheckTask& task) {
     for (const auto& [number, text] : atWork_) {
         requests += (requests.empty() ? "" : " | ") + text;
         task.skipped.insert(text);
+        skipped_.insert(text);
     }
     const bool isCrash = result.end == ChildEnd::crashed;
     const std::string what =
-        isCrash ? result.text : "no answer for " + std::to_string(checkOptions_.timeoutSeconds) + " s";
+        (isCrash ? result.text : "no answer for " + std::to_string(checkOptions_.timeoutSeconds) + " s") +
+        (isCrash && !unserved_.empty() ? " after " + unservedWords(unserved_) : "");
     report_.findings.add({isCrash ? CheckKind::crash : CheckKind::hang, task.className, task.pass, requests,
                           atWork_.empty() ? what : briefly(atWork_.begin()->second) + ": " + what});
 }
@@ -295,9 +418,10 @@ void CheckRun::reportEnd(const ChildResult& result, CheckTask& task) {
 } // namespace
 
 int runCheck(const Options& options, const CheckOptions& checkOptions) {
-    if (!options.faults.empty() || options.keyMode != KeyMode::exact) {
+    if (!options.faults.empty() || options.hasConduct) {
         throw BrokerError(
-            "check puts faults and key modes on the provider itself: leave --fault and --keys out");
+            "check puts faults, keys, instances and paths on the provider itself: leave --fault, "
+            "--keys, --new-instance and --path out");
     }
     const CheckReport report = CheckRun(options, checkOptions).run();
     const bool isColoured = ::isatty(STDOUT_FILENO) == 1 && std::getenv("NO_COLOR") == nullptr;

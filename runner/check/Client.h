@@ -25,6 +25,7 @@ struct CheckTask {
     std::string className;
     std::string pass;
     bool isNamed = false; // by the user, who so says that the provider serves it
+    Conduct conduct{};
     std::vector<MethodCall> methods;
     unsigned int threads = 4;
     std::set<std::string> skipped; // the queries that have ended or blocked the provider
@@ -32,10 +33,11 @@ struct CheckTask {
 
 // Messages of the child, as its parent reads them.
 struct Message {
-    enum class Kind { begin, end, finding, classServed, classRefused, unusable };
+    enum class Kind { begin, end, finding, classServed, classRefused, unserved, unusable };
     Kind kind = Kind::begin;
     std::size_t number = 0; // of a query; of a class that is served, its instances
-    std::string text;       // of a query; of a refusal, the answer; of what makes the check impossible, why
+    std::string text; // of a query; of a refusal, the answer; the class of an upcall that found no provider;
+                      // of what makes the check impossible, why
     Finding finding{};
 };
 std::string lineOf(const Message& message);

@@ -124,8 +124,11 @@ void checkKeys(Client& client, const std::string& request, const Result& result)
         const auto value = result.properties.find(property.name);
         if (key == result.keys.end()) {
             client.find(CheckKind::keyMissing, request, "key " + property.name);
-        } else if (key->second.isNull || (value != result.properties.end() && value->second.isNull)) {
+        } else if (key->second.isNull) {
             client.find(CheckKind::nullKey, request, "key " + property.name);
+        } else if (result.isInstance && (value == result.properties.end() || value->second.isNull)) {
+            client.find(CheckKind::nullKey, request,
+                        "property " + property.name + " is a key and has no value in the instance");
         }
     }
 }
@@ -227,7 +230,7 @@ bool Examination::enumerate() {
     }
     const auto take = [&](const char* verb, const std::optional<Answer>& answer, Results& results) {
         const std::string request = textOf(queryOf(verb, className));
-        if (answer && !answer->ok() && !isRefusal(answer->code)) {
+        if (answer && !answer->ok() && answer->code != CMPI_RC_ERR_NOT_SUPPORTED) {
             client_.fail(request, verb, *answer);
         }
         if (!answer || !answer->ok()) {

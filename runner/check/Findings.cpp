@@ -41,7 +41,8 @@ void printFinding(std::ostream& out, const Finding& finding, bool isColoured) {
     const Check& check = checkOf(finding.kind);
     const char* const colour = check.severity == Severity::error ? "\033[31m" : "\033[33m";
     out << (isColoured ? colour : "") << wordOf(check.severity) << (isColoured ? "\033[0m" : "") << "  "
-        << check.name << "  " << finding.className << ": " << printable(finding.text) << '\n';
+        << check.name << "  " << finding.className << (finding.className.empty() ? "" : ": ")
+        << printable(finding.text) << '\n';
     if (!finding.request.empty()) {
         out << "    " << printable(finding.request) << '\n';
     }
@@ -137,6 +138,10 @@ const std::vector<Check>& checks() {
          "a method's results are not what its class declares"},
         {CheckKind::threadsDiffer, "threads-differ", error, "several threads at once get other results"},
         {CheckKind::leftOver, "left-over", error, "objects of the broker are not released"},
+        {CheckKind::keysUnread, "keys-unread", error,
+         "the answer is another when the keys come as other servers deliver them"},
+        {CheckKind::staysMapped, "stays-mapped", error,
+         "the library cannot be unloaded: to replace it under a running server crashes that"},
         {CheckKind::notDone, "not-done", warning, "the provider does not tell the broker that it is done"},
     };
     return all;

@@ -39,6 +39,8 @@ enum class CheckKind {
     methodResult,
     threadsDiffer,
     leftOver,
+    keysUnread,
+    staysMapped,
     notDone
 };
 
@@ -54,10 +56,10 @@ const std::vector<Check>& checks();
 
 struct Finding {
     CheckKind kind = CheckKind::crash;
-    std::string className;
-    std::string pass;    // the first one that showed it
-    std::string request; // the verb and its operands, as the command line takes them; empty if none
-    std::string text;    // what exactly is wrong
+    std::string className; // empty: the library itself
+    std::string pass;      // the first one that showed it
+    std::string request;   // the verb and its operands, as the command line takes them; empty if none
+    std::string text;      // what exactly is wrong
     std::size_t count = 1;
 };
 

@@ -1,5 +1,7 @@
 #include "check/Strain.h"
 
+#include "check/Examination.h"
+
 #include <algorithm>
 #include <chrono>
 #include <iterator>
@@ -199,6 +201,32 @@ void failEach(Client& client, const Client::Asked& asked) {
 }
 
 } // namespace
+
+// A method does its work each time, and is not repeated. A failure has been told.
+void strainByConduct(Client& client) {
+    const std::vector<Client::Asked> all = client.asked();
+    const auto askAgain = [&](const Query& query, const Conduct& conduct) {
+        apply(client.broker(), conduct);
+        return client.askPlainly(query);
+    };
+    for (const Client::Asked& asked : all) {
+        const Verb& verb = *asked.query.verb;
+        const bool isTold = asked.code != CMPI_RC_OK && !isRefusal(asked.code);
+        if (verb.target == Target::ofClass || verb.takes == Takes::method || isTold) {
+            continue;
+        }
+        const std::optional<Answer> before = askAgain(asked.query, client.task().conduct);
+        const std::optional<Answer> plain = askAgain(asked.query, {});
+        const std::optional<Answer> after = askAgain(asked.query, client.task().conduct);
+        if (!before || !plain || !after || differenceOf(*before, *plain).structure.empty()) {
+            continue;
+        }
+        for (const std::string& text : differenceOf(*after, *plain).structure) {
+            client.find(CheckKind::keysUnread, textOf(asked.query), verb.name + (": " + text));
+        }
+    }
+    apply(client.broker(), client.task().conduct);
+}
 
 void strainByThreads(Client& client) {
     std::vector<Query> queries;

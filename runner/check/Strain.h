@@ -4,6 +4,10 @@
 
 #include "check/Client.h"
 
+// Compares the answers about single instances with those that come when the broker delivers their paths as
+// they are.
+void strainByConduct(Client& client);
+
 // Compares what several threads at once get with what one got before and after. What changes from one time to
 // the next by itself, such as the free memory, is left out.
 void strainByThreads(Client& client);

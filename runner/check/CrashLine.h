@@ -1,0 +1,14 @@
+// A crash of the provider in a request, for which no process is left that could say more than one line.
+#pragma once
+
+#include <EmbeddedBroker.h>
+
+#include <string>
+
+// From now on a crash of this process writes one line on the standard error stream, and ends it by the same
+// signal. Takes the broker's handler of upcalls that find no provider: what a provider does not expect of
+// those is the likeliest cause.
+void tellCrashesInOneLine(oxahv::EmbeddedBroker& broker);
+
+// What an upcall for the class has to do with a crash.
+std::string unservedWords(const std::string& className);
