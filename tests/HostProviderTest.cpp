@@ -4,7 +4,6 @@
 #include "AssetTag.h"
 #include "FailureWays.h"
 #include "HostTime.h"
-#include "Keys.h"
 #include "TestLocales.h"
 
 #include <atomic>
@@ -231,36 +230,84 @@ TEST_F(TheHostProvider, ShowsTheMachine) {
     EXPECT_EQ(os.rfind(R"(Caption="It\"s an OS" )", 0), 0U) << os;
 }
 
-TEST_F(TheHostProvider, FindsInstancesByKeysOfEveryUnsignedWidth) {
-    const auto reading = [&](unsigned long long number, CMPIType type) {
+TEST_F(TheHostProvider, AnswersTheSameWhateverAServerDoesWithKeysAndPaths) {
+    broker_.compileMof(MOF_FOLDER "/CIMSuperclasses.mof");
+    broker_.compileMof(MOF_FOLDER "/OXAHost.mof");
+    const std::vector<std::string> wanted = {"ElementName"};
+    const auto answers = [&] {
+        std::string text = setTag("<") + ' '; // refused, so that nothing changes
+        for (const char* const className :
+             {"OXATK_ComputerSystem", "OXATK_OperatingSystem", "OXATK_EthernetPort", "OXATK_NumericSensor",
+              "OXATK_AssetIDDetails", "OXATK_RunningOS"}) {
+            text += textOf(request_.enumerateInstances(path(className)));
+            const Reply names = request_.enumerateInstanceNames(path(className));
+            for (const CMPIObjectPath* const name : names.objectPaths) {
+                const Reply one = request_.getInstance(name);
+                text += one.message + textOf(one) + textOf(request_.getInstance(name, &wanted)) +
+                        textOf(request_.associatorNames(name)) + textOf(request_.references(name));
+            }
+        }
+        return text;
+    };
+    const std::string expected = answers();
+    EXPECT_NE(expected.find("SensorNumber=15 Reading=2.0"), std::string::npos) << expected;
+    const oxahv::PathDelivery deliveries[] = {{},
+                                              {true, false, ""},
+                                              {false, true, ""},
+                                              {false, false, "host.example"},
+                                              {true, true, "host.example"}};
+    for (const KeyMode mode :
+         {KeyMode::exact, KeyMode::untyped, KeyMode::chars, KeyMode::signedIntegers, KeyMode::text}) {
+        for (const auto instances : {oxahv::NewInstances::full, oxahv::NewInstances::bare}) {
+            for (const oxahv::PathDelivery& delivery : deliveries) {
+                broker_.setKeyMode(mode);
+                broker_.setNewInstances(instances);
+                broker_.setPathDelivery(delivery);
+                EXPECT_EQ(answers(), expected)
+                    << "mode " << static_cast<int>(mode) << " bare " << static_cast<int>(instances)
+                    << " reversed " << delivery.reversesKeys << " case " << delivery.changesCase << " host "
+                    << delivery.hostName;
+            }
+        }
+    }
+}
+
+TEST_F(TheHostProvider, ReadsNumberKeysOfEveryTypeInTheirRange) {
+    const auto reading = [&](const CMPIValue& value, CMPIType type) {
         CMPIObjectPath* const sensor = path(sensorPath);
-        CMPIValue value = {};
-        value.uint64 = number;
         CMAddKey(sensor, "SensorNumber", &value, type);
         const Reply reply = request_.getInstance(sensor);
         return reply.ok() ? oxahv::valueText(CMGetProperty(reply.instances.at(0), "Reading", nullptr))
                           : oxahv::codeName(reply.code);
     };
-    for (const KeyMode mode : {KeyMode::exact, KeyMode::untyped}) {
-        broker_.setKeyMode(mode);
-        for (const std::string& text : {systemPath, osPath, portPath, detailsPath, sensorPath}) {
-            const Reply reply = request_.getInstance(path(text));
-            ASSERT_EQ(reply.instances.size(), 1U) << text << reply.message;
-            EXPECT_EQ(oxahv::pathText(CMGetObjectPath(reply.instances[0], nullptr)), text);
-        }
-        for (const CMPIType type :
-             {CMPIType{CMPI_uint8}, CMPIType{CMPI_uint16}, CMPIType{CMPI_uint32}, CMPIType{CMPI_uint64}}) {
-            EXPECT_EQ(reading(15, type), "2.0");
-            EXPECT_EQ(reading(2, type), "CMPI_RC_ERR_NOT_FOUND");
-        }
-        EXPECT_EQ(reading(65536 + 5, CMPI_uint32), "CMPI_RC_ERR_NOT_FOUND") << "not cut to 16 bits";
-        EXPECT_EQ(reading(5, CMPI_sint64), "CMPI_RC_ERR_INVALID_PARAMETER") << "no moniker holds a sign";
+    const auto readingOf = [&](long long number, CMPIType type) {
+        CMPIValue value = {};
+        value.sint64 = number;
+        return reading(value, type);
+    };
+    for (const CMPIType type :
+         {CMPIType{CMPI_uint8}, CMPIType{CMPI_uint16}, CMPIType{CMPI_uint32}, CMPIType{CMPI_uint64},
+          CMPIType{CMPI_sint8}, CMPIType{CMPI_sint16}, CMPIType{CMPI_sint32}, CMPIType{CMPI_sint64}}) {
+        EXPECT_EQ(readingOf(15, type), "2.0") << type;
+        EXPECT_EQ(readingOf(2, type), "CMPI_RC_ERR_NOT_FOUND") << type;
+        EXPECT_EQ(readingOf(-5, type), "CMPI_RC_ERR_NOT_FOUND") << type;
     }
-    TK::Moniker keys;
-    keys.addKey("Wide", 65536ULL);
-    keys.addKey("Blank", static_cast<unsigned char>(32));
-    EXPECT_EQ(keyNumber<unsigned short>(keys, "wide"), std::nullopt);
-    EXPECT_EQ(keyNumber<unsigned int>(keys, "Blank"), std::nullopt) << "a moniker cannot read it back";
+    EXPECT_EQ(readingOf(65536 + 5, CMPI_uint32), "CMPI_RC_ERR_NOT_FOUND") << "not cut to 16 bits";
+    EXPECT_EQ(readingOf(65536 + 5, CMPI_sint64), "CMPI_RC_ERR_NOT_FOUND");
+    const std::pair<const char*, const char*> texts[] = {
+        {"5", "1.5"},
+        {"-5", "CMPI_RC_ERR_NOT_FOUND"},
+        {"", "CMPI_RC_ERR_NOT_FOUND"},
+        {"5x", "CMPI_RC_ERR_NOT_FOUND"},
+        {" 5", "CMPI_RC_ERR_NOT_FOUND"},
+        {"65541", "CMPI_RC_ERR_NOT_FOUND"},
+        {"18446744073709551621", "CMPI_RC_ERR_NOT_FOUND"},
+    };
+    for (const auto& [text, expected] : texts) {
+        CMPIValue value = {};
+        value.string = CMNewString(broker_.handle(), text, nullptr);
+        EXPECT_EQ(reading(value, CMPI_string), expected) << text;
+    }
 }
 
 TEST_F(TheHostProvider, LeavesTheServersLocaleAsItIs) {
@@ -285,18 +332,24 @@ TEST_F(TheHostProvider, LeavesTheServersLocaleAsItIs) {
 }
 
 TEST_F(TheHostProvider, StoresAcceptableAssetTagsAlone) {
+    // What the declaration says to be taken.
+    EXPECT_EQ(setTag("/etc/a|b;`c` d> 'e' & \"f\""), "0");
+    EXPECT_EQ(tag(), R"(1 "/etc/a|b;`c` d> 'e' & \"f\"")");
     EXPECT_EQ(setTag("Prüfstand 7 = €"), "0");
-    for (const std::string& refused : {std::string(), std::string(65, 'x'), std::string("<b>"),
-                                       std::string("a\nb"), std::string("\xff")}) {
+    for (const std::string& refused :
+         {std::string(), std::string(65, 'x'), std::string("<b>"), std::string("a\nb"), std::string("\xff"),
+          std::string(" a"), std::string("a "), std::string("a\u3000"), std::string("a%b"),
+          std::string("a\\b"), std::string("a$b"), std::string("a:b"), std::string("wWw.a"),
+          std::string("a WAP.b")}) {
         EXPECT_EQ(setTag(refused), "5") << refused;
-        EXPECT_EQ(tag(), "1 \"Prüfstand 7 = €\"");
+        EXPECT_EQ(tag(), "2 \"Prüfstand 7 = €\"");
     }
     std::string umlauts; // counted in characters
     for (int i = 0; i < 64; ++i) {
         umlauts += "ä";
     }
     EXPECT_EQ(setTag(umlauts), "0");
-    EXPECT_EQ(tag(), "2 \"" + umlauts + '"');
+    EXPECT_EQ(tag(), "3 \"" + umlauts + '"');
 }
 
 TEST_F(TheHostProvider, TellsWhyATagCannotBeSaved) {

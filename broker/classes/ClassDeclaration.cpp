@@ -1,7 +1,7 @@
 // What a program says of a class before it is declared. Nothing is checked here: the broker checks a
 // declaration when it is declared, since only then the superclass is known.
 
-#include "classes/Declarations.h"
+#include "Declarations.h"
 #include "classes/NamedDeclaration.h"
 
 namespace oxahv {

@@ -2,7 +2,7 @@
 // them.
 #pragma once
 
-#include "classes/Declarations.h"
+#include "classes/DeclaredClass.h"
 #include "objects/Value.h"
 
 #include <atomic>

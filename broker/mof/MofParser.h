@@ -1,7 +1,7 @@
 // The grammar of MOF: from words to a tree of what is written, not yet of what it means.
 #pragma once
 
-#include "classes/Declarations.h"
+#include "Declarations.h"
 #include "mof/MofLexer.h"
 
 #include <optional>

@@ -70,14 +70,28 @@ TEST_F(FileSystemProvider, ReturnsTheKeyAndTheListedPropertiesAlone) {
 // [properties]
 
 // [keys]
-TEST_F(FileSystemProvider, TakesKeysOfEveryKindThatServersDeliver) {
-    for (const oxahv::KeyMode mode :
-         {oxahv::KeyMode::exact, oxahv::KeyMode::untyped, oxahv::KeyMode::chars}) {
-        broker.setKeyMode(mode);
-        oxahv::Request request(broker);
-        const auto* path =
-            request.objectPathFromText("Demo_FileSystem.Root=\"/\"", "root/cimv2");
-        EXPECT_EQ(request.getInstance(path).code, CMPI_RC_OK) << static_cast<int>(mode);
+TEST_F(FileSystemProvider, AnswersTheSameWhateverAServerDoesWithKeysAndPaths) {
+    using oxahv::KeyMode;
+    using oxahv::NewInstances;
+    const oxahv::PathDelivery otherPaths = {true, true, "host.example"};
+    for (const KeyMode keys : {KeyMode::exact, KeyMode::untyped, KeyMode::chars,
+                               KeyMode::signedIntegers, KeyMode::text}) {
+        for (const NewInstances instances : {NewInstances::full, NewInstances::bare}) {
+            for (const oxahv::PathDelivery& paths : {oxahv::PathDelivery{}, otherPaths}) {
+                SCOPED_TRACE(testing::Message()
+                             << "keys " << static_cast<int>(keys) << " instances "
+                             << static_cast<int>(instances) << " host " << paths.hostName);
+                broker.setKeyMode(keys);
+                broker.setNewInstances(instances);
+                broker.setPathDelivery(paths);
+                oxahv::Request request(broker);
+                const oxahv::Reply reply = request.getInstance(
+                    request.objectPathFromText("Demo_FileSystem.Root=\"/\"", "root/cimv2"));
+                ASSERT_EQ(reply.instances.size(), 1U) << reply.message;
+                const CMPIData root = CMGetProperty(reply.instances[0], "Root", nullptr);
+                EXPECT_EQ(oxahv::valueText(root), "\"/\"");
+            }
+        }
     }
 }
 // [keys]

@@ -19,13 +19,17 @@ constexpr const char* tagEntry = "AssetTag";
 constexpr const char* dateEntry = "AssetTagDate";
 constexpr const char* countEntry = "AssetTagChanges";
 
+bool isBlank(wchar_t c) {
+    return std::iswspace(static_cast<std::wint_t>(c)) != 0;
+}
+
 } // namespace
 
 bool isAcceptableAssetTag(const std::string& text) {
     constexpr std::size_t longest = 64; // MaxLen of the method's parameter
     std::wstring characters;
     return TK::ProviderUtilities::ConvertMultiByteToWideChar(text, characters) && !characters.empty() &&
-           characters.size() <= longest &&
+           characters.size() <= longest && !isBlank(characters.front()) && !isBlank(characters.back()) &&
            std::none_of(characters.begin(), characters.end(),
                         [](wchar_t c) { return std::iswcntrl(static_cast<std::wint_t>(c)) != 0; }) &&
            TK::ProviderUtilities::ValidateInput(characters, L"");

@@ -11,8 +11,9 @@ struct AssetTag {
     unsigned int changes = 0; // how often it was set
 };
 
-// Whether a text may be an asset tag: one to 64 characters, none of them a control character, nothing that
-// the library's screen for users' texts refuses. The text is in the encoding of LC_CTYPE.
+// Whether a text may be an asset tag: one to 64 characters, none of them a control character, no blank at an
+// end, nothing that the library's screen for users' texts refuses. A tag with blanks at its ends would read
+// back without them from the file. The text is in the encoding of LC_CTYPE.
 bool isAcceptableAssetTag(const std::string& text);
 
 // A property file. The objects of all threads take turns by TK::_fileMutex.

@@ -128,7 +128,7 @@ void setAlias(const Machine& machine, const std::string& alias, CMPIInstance* in
 void fillEthernetPort(const Machine& machine, const Moniker& keys, CMPIInstance* instance) {
     constexpr unsigned short ethernet = 2;
     constexpr unsigned short wakeOnLan = 3;
-    EthernetPort port = machine.host.ethernetPort(keyText(keys, "DeviceID").value_or(""));
+    EthernetPort port = machine.host.ethernetPort(ownKey<std::string>(keys, "DeviceID"));
     const bool isUp = port.state == "up";
     // Some drivers tell no state, though the port may work.
     const bool isUnknown = port.state.empty() || port.state == "unknown";
@@ -180,7 +180,7 @@ std::vector<Moniker> numericSensorNames(const Machine& machine) {
 }
 
 void fillNumericSensor(const Machine& machine, const Moniker& keys, CMPIInstance* instance) {
-    const auto number = keyNumber<unsigned short>(keys, sensorNumber);
+    const auto number = ownKey<unsigned short>(keys, sensorNumber);
     for (const LoadAverage& average : machine.host.loadAverages()) {
         if (average.minutes == number) {
             setElementName(instance, L"Numeric sensor", std::to_string(average.minutes));

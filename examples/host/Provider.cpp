@@ -134,6 +134,7 @@ CMPIInstance* newInstance(CMPIObjectPath* path, const char** properties) {
 CMPIInstance* instanceOf(const HostClass& hostClass, const Moniker& keys, const std::string& nameSpace,
                          const char** properties) {
     CMPIInstance* const instance = newInstance(pathOf(hostClass, keys, nameSpace), properties);
+    setKeyProperties(instance, keys);
     hostClass.fill(machine(), keys, instance);
     return instance;
 }
@@ -158,11 +159,9 @@ const HostClass& classOf(const CMPIObjectPath* path) {
 }
 
 Moniker keysOf(const HostClass& hostClass, const CMPIObjectPath* path) {
-    Moniker request;
-    ProviderUtilities::transformObjectPathToMoniker(path, request);
     const std::vector<Moniker> names = hostClass.names(machine());
-    const auto named = std::find_if(names.begin(), names.end(),
-                                    [&](const Moniker& keys) { return isNamedBy(request, keys); });
+    const auto named =
+        std::find_if(names.begin(), names.end(), [&](const Moniker& keys) { return isNamedBy(path, keys); });
     if (named == names.end()) {
         throw Refusal{CMPI_RC_ERR_NOT_FOUND, "no instance of that name"};
     }

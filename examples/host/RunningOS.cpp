@@ -2,7 +2,6 @@
 
 #include "Keys.h"
 
-using TK::Moniker;
 using TK::ProviderUtilities;
 
 namespace {
@@ -53,9 +52,7 @@ CMPIInstance* runningOsInstance(const std::string& nameSpace, const char** prope
 void requireRunningOs(const CMPIObjectPath* path) {
     for (const End& end : runningOsEnds()) {
         const CMPIObjectPath* const named = reference(path, end.role);
-        Moniker keys;
-        ProviderUtilities::transformObjectPathToMoniker(named, keys);
-        if (&classOf(named) != end.hostClass || !isNamedBy(keys, end.keys)) {
+        if (&classOf(named) != end.hostClass || !isNamedBy(named, end.keys)) {
             throw Refusal{CMPI_RC_ERR_NOT_FOUND, "no instance of that name"};
         }
     }

@@ -8,6 +8,7 @@
 #include "show/Text.h"
 #include "show/Values.h"
 
+#include <Names.h>
 #include <algorithm>
 #include <chrono>
 #include <iostream>
@@ -273,7 +274,7 @@ std::vector<std::string> CheckRun::servedClasses() const {
 
 // The part of a class's name that says whose it is.
 std::string schemaOf(const std::string& className) {
-    return lowerCase(className.substr(0, className.find('_')));
+    return encoding::foldedName(className.substr(0, className.find('_')));
 }
 
 // Classes of others, such as the standard's, are refused rightly. That one of the provider's own schema is

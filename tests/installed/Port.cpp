@@ -13,11 +13,13 @@ CMPIStatus PortGetInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult
                            const CMPIObjectPath* path, const char**) try {
     using PU = TK::ProviderUtilities;
     TK_TRACE_ENTERING_PARAMETERS(category, " path=" << path);
-    TK::Moniker keys;
-    PU::transformObjectPathToMoniker(path, keys);
+    const CMPIData key = CMGetKey(path, "DeviceID", nullptr);
     std::string name;
-    keys.selectKey(0);
-    keys.getValue(name); // throws when the client sent no key, or one that is no text
+    if (key.type == CMPI_chars && key.value.chars != nullptr) { // some servers; others: CMPI_string
+        name = key.value.chars;
+    } else if (key.type != CMPI_string || !PU::getKeyProperty(path, "DeviceID", name)) {
+        CMReturn(CMPI_RC_ERR_INVALID_PARAMETER);
+    }
     if (name != "eth0") {
         CMReturn(CMPI_RC_ERR_NOT_FOUND);
     }
@@ -25,12 +27,12 @@ CMPIStatus PortGetInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult
     if (reply == nullptr) {
         CMReturn(CMPI_RC_ERR_FAILED);
     }
-    PU::transformMonikerToObjectPath(keys, &reply);
+    PU::setKeyProperty(reply, "DeviceID", name);
     CMPIInstance* port = PU::createInstance(broker, reply);
     if (port == nullptr) {
         CMReturn(CMPI_RC_ERR_FAILED);
     }
-    PU::setProperty(port, "ElementName", name);
+    PU::setProperty(port, "DeviceID", name); // not every server takes it from the path
     PU::setProperty(port, "Speed", 1'000'000'000ULL);
     TK_TRACE_EXITING(category);
     CMReturnInstance(result, port);

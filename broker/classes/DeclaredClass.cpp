@@ -1,6 +1,6 @@
 // Declares classes: checks each against its superclass, and gives it what it inherits.
 
-#include "classes/Declarations.h"
+#include "classes/DeclaredClass.h"
 
 #include "classes/NamedDeclaration.h"
 
