@@ -17,9 +17,9 @@ namespace {
 std::array<char, 512> unserved;
 std::atomic<std::size_t> unservedSize{0};
 
-std::size_t write(const char* text, std::size_t size) {
-    const ssize_t written = ::write(STDERR_FILENO, text, size);
-    return written > 0 ? static_cast<std::size_t>(written) : 0;
+// A line that cannot be written is lost: the process is at its end.
+void write(const char* text, std::size_t size) {
+    [[maybe_unused]] const ssize_t written = ::write(STDERR_FILENO, text, size);
 }
 
 const char* nameOf(int number) {
@@ -44,7 +44,7 @@ void tell(int number) {
     write(nameOf(number), std::strlen(nameOf(number)));
     write(unserved.data(), unservedSize.load());
     write("\n", 1);
-    ::raise(number);
+    static_cast<void>(::raise(number));
 }
 
 void noteUnserved(const std::string& className) {
