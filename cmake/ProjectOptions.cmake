@@ -40,9 +40,10 @@ set(oxahv_hardening
     -fstack-protector-strong
     -fstack-clash-protection
     $<$<IN_LIST:${CMAKE_SYSTEM_PROCESSOR},x86_64;i686>:-fcf-protection>)
-# Fortified libc calls need the optimizer, and sanitizers bring checks of their own.
-if(NOT OXAHV_SANITIZE)
-    list(APPEND oxahv_hardening $<$<NOT:$<CONFIG:Debug>>:-D_FORTIFY_SOURCE=2>)
+# Fortified libc calls need the optimizer, and sanitizers bring checks of their own. A distribution that sets a level in its
+# flags keeps it; some compilers have one built in.
+if(NOT OXAHV_SANITIZE AND NOT "${CMAKE_C_FLAGS} ${CMAKE_CXX_FLAGS}" MATCHES "_FORTIFY_SOURCE=")
+    list(APPEND oxahv_hardening $<$<NOT:$<CONFIG:Debug>>:-U_FORTIFY_SOURCE> $<$<NOT:$<CONFIG:Debug>>:-D_FORTIFY_SOURCE=2>)
 endif()
 
 # Warnings, hidden symbols, hardening and sanitizers for one target.

@@ -3,10 +3,16 @@
 #include "HVLogger.h"
 #include "HVMessageBuffer.h"
 
+#include <atomic>
 #include <cstdio>
+#include <fcntl.h>
 #include <fstream>
 #include <gtest/gtest.h>
+#include <sstream>
 #include <stdexcept>
+#include <sys/resource.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
 #include <system_error>
 #include <thread>
 #include <unistd.h>
@@ -102,6 +108,78 @@ TEST_F(TheLogger, LeavesNoFileOpenWhenMemoryRunsOut) {
         hasFailed = failing::ended();
         EXPECT_EQ(nextDescriptor() == next, hasFailed) << n;
     }
+}
+
+TEST_F(TheLogger, OutlivesItsReader) {
+    ASSERT_EQ(::mkfifo(path_.c_str(), 0600), 0);
+    const int reader = ::open(path_.c_str(), O_RDONLY | O_NONBLOCK);
+    HVLogger::setFileSink(path_);
+    HVLogger::setThreshold(0);
+    ::close(reader);
+    log(4000); // SIGPIPE would end this program, now or when it is let through again
+}
+
+TEST_F(TheLogger, BeginsANewLineAfterAFullDisk) {
+    HVLogger::setFileSink(path_);
+    HVLogger::setThreshold(0);
+    rlimit earlier{};
+    ASSERT_EQ(::getrlimit(RLIMIT_FSIZE, &earlier), 0);
+    rlimit full{20, earlier.rlim_max};
+    ASSERT_EQ(::setrlimit(RLIMIT_FSIZE, &full), 0);
+    log(4000, "cut here"); // SIGXFSZ would end this program
+    log(4000, "lost");
+    full.rlim_cur = 60;
+    ASSERT_EQ(::setrlimit(RLIMIT_FSIZE, &full), 0);
+    log(4000, "whole");
+    log(4000, "cut again");
+    ASSERT_EQ(::setrlimit(RLIMIT_FSIZE, &earlier), 0);
+    HVLogger::setFileSink(path_); // knows the cut line by the file
+    log(4000, "last");
+    std::ostringstream content;
+    content << std::ifstream(path_).rdbuf();
+    EXPECT_EQ(content.str(),
+              "log 4000 Test cut he\nlog 4000 Test whole\nlog 4000 Test cut a\nlog 4000 Test last\n");
+}
+
+TEST_F(TheLogger, LogsInChildrenForkedWhileAnotherThreadLogs) {
+    std::atomic<bool> isInSink{false};
+    std::atomic<bool> mayLeave{false};
+    HVLogger::setSink([&](const HVLog::Message& message) {
+        isInSink = true;
+        while (!mayLeave && message.text == "slow") {
+            std::this_thread::yield();
+        }
+        if (message.text == "fork" && ::fork() == 0) {
+            throw std::runtime_error("in the child");
+        }
+    });
+    HVLogger::setThreshold(0);
+    std::thread other([] { log(4000, "slow"); });
+    while (!isInSink) {
+        std::this_thread::yield();
+    }
+    const auto logInChild = [] {
+        ::alarm(20); // instead of hanging
+        log(4000);
+        HVLogger::setLevel(1, true);
+        ::_exit(0);
+    };
+    const pid_t child = ::fork();
+    if (child == 0) {
+        logInChild();
+    }
+    int status = 0;
+    ASSERT_EQ(::waitpid(child, &status, 0), child);
+    EXPECT_EQ(status, 0);
+    mayLeave = true;
+    other.join();
+    try {
+        log(4000, "fork");
+    } catch (const std::runtime_error&) {
+        logInChild();
+    }
+    ASSERT_GT(::wait(&status), 0);
+    EXPECT_EQ(status, 0);
 }
 
 TEST_F(TheLogger, WritesWholeLinesToAFileFromManyThreads) {

@@ -33,16 +33,21 @@
 #include "TKExport.h"
 
 #include <cstddef>
-#include <map>
+#include <memory>
 #include <string>
 #include <vector>
 
 namespace TK {
 
+class PropertyContent;
+
 /** A property file, or the like in memory. Can be derived from. */
 class TK_EXPORT PropertyFile {
 public:
-    /** Creates an empty one in memory alone: load() and save() do nothing. */
+    /**
+     * Creates an empty one in memory alone: load() and save() do nothing.
+     * @throws std::bad_alloc
+     */
     PropertyFile();
 
     /**
@@ -107,28 +112,8 @@ public:
     const std::vector<DamagedLine>& damagedLines() const;
 
 private:
-    struct Line {
-        std::string text;
-        std::string end; // "\n", "\r\n", or empty for a last line without
-    };
-    struct Entry {
-        std::size_t line; // index
-        std::size_t valueStart;
-        std::wstring value;
-    };
-    struct Content {
-        std::string mark; // the byte order mark, if any
-        std::vector<Line> lines;
-        std::map<std::wstring, Entry> entries;
-        std::vector<DamagedLine> damaged;
-    };
-
-    TK_HIDDEN static Content parse(const std::string& bytes);
-    TK_HIDDEN std::string bytes() const;
-    TK_HIDDEN std::string lineEnd() const;
-
     std::string path_;
-    Content content_;
+    std::unique_ptr<PropertyContent> content_;
 };
 
 } // namespace TK

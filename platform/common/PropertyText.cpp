@@ -55,9 +55,25 @@ std::optional<wchar_t> takeEscape(std::string_view& text) {
     return std::nullopt;
 }
 
-// Appends what `text` stands for to `result`; a reason when it cannot be read.
-const char* unescape(std::string_view text, std::wstring& result) {
+bool isPlain(char byte) {
+    return byte != '\\' && byte != '\0' && static_cast<unsigned char>(byte) < 0x80;
+}
+
+// How many bytes at the start stand for themselves: in most texts all of them.
+std::size_t plainSize(std::string_view text) {
+    return static_cast<std::size_t>(std::find_if_not(text.begin(), text.end(), isPlain) - text.begin());
+}
+
+// Goes through what is written, handing on runs of plain bytes, and single characters for all else. Returns
+// the reason when it cannot be read.
+template <class OnPlain, class OnCharacter>
+const char* walk(std::string_view text, OnPlain&& onPlain, OnCharacter&& onCharacter) {
     while (!text.empty()) {
+        if (const std::size_t size = plainSize(text); size != 0) {
+            onPlain(text.substr(0, size));
+            text.remove_prefix(size);
+            continue;
+        }
         const std::optional<char32_t> code = encoding::takeUtf8(text);
         if (!code) {
             return "not UTF-8";
@@ -65,15 +81,11 @@ const char* unescape(std::string_view text, std::wstring& result) {
         if (*code == 0) {
             return "NUL character";
         }
-        if (*code != U'\\') {
-            result += static_cast<wchar_t>(*code);
-            continue;
-        }
-        const std::optional<wchar_t> character = takeEscape(text);
+        const auto character = *code == U'\\' ? takeEscape(text) : static_cast<wchar_t>(*code);
         if (!character) {
             return "unknown escape";
         }
-        result += *character;
+        onCharacter(*character);
     }
     return nullptr;
 }
@@ -112,12 +124,22 @@ void appendCode(std::string& result, char32_t code) {
     result += '}';
 }
 
+// Most characters: those that are written as they are in every place.
+bool isAlwaysPlain(wchar_t character) {
+    return character > L' ' && character < 0x7F && character != L'\\' && character != L'=' &&
+           character != L'#';
+}
+
 // Escapes `text`; `special` characters always, a space at its ends alone.
-std::string escape(const std::wstring& text, std::wstring_view special) {
+std::string escape(std::wstring_view text, std::wstring_view special) {
     std::string result;
     result.reserve(text.size());
     for (std::size_t i = 0; i < text.size(); ++i) {
         const wchar_t character = text[i];
+        if (isAlwaysPlain(character)) {
+            result += static_cast<char>(character);
+            continue;
+        }
         const bool inside = i > 0 && i + 1 < text.size();
         if (character == L' ' ? inside : special.find(character) == std::wstring_view::npos) {
             const auto code = static_cast<char32_t>(character);
@@ -140,7 +162,7 @@ std::string escape(const std::wstring& text, std::wstring_view special) {
 
 } // namespace
 
-Line parse(std::string_view text) {
+Line split(std::string_view text) {
     Line line;
     const std::string_view content = trimmed(text);
     if (content.empty() || content.front() == '#') {
@@ -152,19 +174,43 @@ Line parse(std::string_view text) {
         return line;
     }
     line.isEntry = true;
+    line.key = trimmed(text.substr(0, separator));
+    line.value = trimmed(text.substr(separator + 1));
     line.valueStart = std::min(text.find_first_not_of(blanks, separator + 1), text.size());
-    line.damage = unescape(trimmed(text.substr(0, separator)), line.key);
-    if (line.damage == nullptr) {
-        line.damage = unescape(trimmed(text.substr(separator + 1)), line.value);
-    }
     return line;
 }
 
-std::string escapeKey(const std::wstring& key) {
+const char* check(std::string_view written) {
+    return walk(
+        written, [](std::string_view) {}, [](wchar_t) {});
+}
+
+const char* read(std::string_view written, std::wstring& result) {
+    return walk(
+        written,
+        [&](std::string_view plain) {
+            const std::size_t size = result.size();
+            result.resize(size + plain.size());
+            std::copy(plain.begin(), plain.end(), result.begin() + static_cast<std::ptrdiff_t>(size));
+        },
+        [&](wchar_t character) { result += character; });
+}
+
+bool readsAs(std::string_view written, std::wstring_view text) {
+    bool isSame = true;
+    const auto compare = [&](const auto& part) {
+        isSame = isSame && text.size() >= part.size() && std::equal(part.begin(), part.end(), text.begin());
+        text.remove_prefix(isSame ? part.size() : 0);
+    };
+    walk(written, compare, [&](wchar_t character) { compare(std::wstring_view(&character, 1)); });
+    return isSame && text.empty();
+}
+
+std::string escapeKey(std::wstring_view key) {
     return escape(key, L"\n\r\t\\=#");
 }
 
-std::string escapeValue(const std::wstring& value) {
+std::string escapeValue(std::wstring_view value) {
     return escape(value, L"\n\r\t\\");
 }
 

@@ -1,3 +1,4 @@
+// Converts between wide and narrow text by the C library, and without it where the result is known.
 #include "StringConversion.h"
 
 #include <algorithm>
@@ -6,6 +7,7 @@
 #include <cwchar>
 #include <langinfo.h>
 #include <string_view>
+#include <type_traits>
 
 namespace TK {
 
@@ -25,15 +27,42 @@ wchar_t escape(unsigned char byte) {
     return static_cast<wchar_t>(byte < 0x80 ? byte : escapedByte + byte);
 }
 
+template <class Character>
+constexpr auto codeOf(Character character) {
+    // Which of char and wchar_t have a sign is up to the machine.
+    return static_cast<std::make_unsigned_t<Character>>(character);
+}
+
+// The characters that ISO 646 has in every country, without control characters. In every encoding that a
+// locale can have they are the bytes of ASCII, while no other character is among them: one that combines
+// with a letter, a byte that changes the state.
+constexpr std::array<bool, 0x80> invariantCharacters = [] {
+    std::array<bool, 0x80> result{};
+    for (std::size_t code = 0x20; code < 0x7F; ++code) {
+        result[code] = true;
+    }
+    for (const char national : std::string_view("#$@[\\]^`{|}~")) {
+        result[static_cast<std::size_t>(national)] = false;
+    }
+    return result;
+}();
+
+// Whether the locale has no say in a text. Keys and numbers are such texts, and asking the locale would take
+// longer than converting them.
+template <class Text>
+bool isInvariant(const Text& text) {
+    return std::all_of(text.begin(), text.end(), [](auto character) {
+        return codeOf(character) < 0x80 && invariantCharacters[codeOf(character)];
+    });
+}
+
 // Whether ASCII characters are their own bytes, with no state to them: then they need no conversion.
 bool asciiIsPlain() {
     const std::string_view codeset = ::nl_langinfo(CODESET);
     return codeset == "UTF-8" || codeset == "ANSI_X3.4-1968" || codeset.substr(0, 9) == "ISO-8859-";
 }
 
-bool isAscii(wchar_t character) {
-    return character >= 0 && character < 0x80;
-}
+constexpr auto isAscii = [](auto character) { return codeOf(character) < 0x80; };
 
 // The part of a text, most often all of it, that needs no conversion.
 template <class Text>
@@ -48,6 +77,9 @@ std::size_t plainSize(const Text& text, bool plain) {
 // and brings out a character that an encoding holds back to see what follows.
 
 std::string make_string(const std::wstring& text) {
+    if (isInvariant(text)) {
+        return {text.begin(), text.end()};
+    }
     const bool plain = asciiIsPlain();
     const std::size_t start = plainSize(text, plain);
     std::string result(text.data(), text.data() + start);
@@ -83,6 +115,9 @@ std::string make_string(const char* text) {
 }
 
 std::wstring make_wstring(const std::string& text) {
+    if (isInvariant(text)) {
+        return {text.begin(), text.end()};
+    }
     const bool plain = asciiIsPlain();
     const std::size_t start = plainSize(text, plain);
     std::wstring result(text.data(), text.data() + start);
@@ -93,7 +128,7 @@ std::wstring make_wstring(const std::string& text) {
     const char* const end = text.data() + text.size() + 1;
     std::mbstate_t state{};
     for (const char* position = text.data() + start; position != end;) {
-        if (plain && isAscii(static_cast<unsigned char>(*position))) {
+        if (plain && isAscii(*position)) {
             result += static_cast<wchar_t>(*position++);
             continue;
         }

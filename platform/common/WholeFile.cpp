@@ -8,8 +8,10 @@
 #include <Descriptor.h>
 
 #include <cstdlib>
+#include <dirent.h>
 #include <fcntl.h>
 #include <filesystem>
+#include <memory>
 #include <optional>
 #include <string_view>
 #include <sys/file.h>
@@ -106,18 +108,20 @@ void removeStray(const std::string& path) {
     }
 }
 
+bool isTemporaryName(std::string_view name, std::string_view start) {
+    const std::size_t endAt = start.size() + anyName.size();
+    return name.size() == endAt + nameEnd.size() && name.substr(0, start.size()) == start &&
+           name.substr(endAt) == nameEnd;
+}
+
 // Removes the temporary files of saves of `target` that ended with their process. What cannot be removed
-// stays.
+// stays. The standard library's iterator would end the process when memory runs out.
 void removeStrays(const std::filesystem::path& target, const std::string& folder) {
     const std::string start = nameStart(target);
-    std::error_code error;
-    for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
-         entry.increment(error)) {
-        const std::string name = entry->path().filename().string();
-        const std::size_t endAt = start.size() + anyName.size();
-        if (name.size() == endAt + nameEnd.size() && name.compare(0, start.size(), start) == 0 &&
-            name.compare(endAt, nameEnd.size(), nameEnd) == 0) {
-            removeStray(entry->path().string());
+    const std::unique_ptr<DIR, int (*)(DIR*)> entries(::opendir(folder.c_str()), ::closedir);
+    while (const dirent* const entry = entries != nullptr ? ::readdir(entries.get()) : nullptr) {
+        if (isTemporaryName(&entry->d_name[0], start)) {
+            removeStray(folder + '/' + &entry->d_name[0]);
         }
     }
 }

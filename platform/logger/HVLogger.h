@@ -15,7 +15,7 @@
  *
  * **Threads.** Everything here may be called from any thread at any time. The sink is run by one thread at a
  * time, so lines never mix. A message that the sink itself causes is dropped. A sink calls none of the
- * setters and not reset(), which wait until it has ended.
+ * setters and not reset(), which wait until it has ended. A child that is forked at any time can log.
  *
  * **Encoding.** Texts are bytes in any encoding and are written as they are.
  */
@@ -78,11 +78,14 @@ public:
 
     /** @name Where messages go
      * One sink at a time; a new one takes the earlier one's place, which no thread runs any more when these
-     * return.
+     * return. The two sinks for lines drop what they cannot write, on a full disk or to a closed pipe, and
+     * send no signal; a line that was cut ends before the next one begins.
      */
     /** @{ */
-    /** Hands messages to a function. @param sink called for each message; an empty function switches logging
-     * off. */
+    /**
+     * Hands messages to a function.
+     * @param sink called for each message; an empty function switches logging off.
+     */
     static void setSink(std::function<void(const Message&)> sink);
     /** Writes a line per message to the standard error stream. */
     static void setStderrSink();

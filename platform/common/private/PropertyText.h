@@ -8,15 +8,25 @@ namespace TK::PropertyText {
 
 struct Line {
     const char* damage = nullptr; // why the line cannot be read
-    bool isEntry = false;         // else it is a comment or empty
-    std::wstring key;
-    std::wstring value;
-    std::size_t valueStart = 0; // in the line
+    bool isEntry = false;         // else it is a comment, empty or damaged
+    std::string_view key;         // as written, without the blanks at its ends
+    std::string_view value;       // likewise
+    std::size_t valueStart = 0;   // in the line
 };
 
-Line parse(std::string_view text);
+// Finds the parts of a line, and reads neither escapes nor characters.
+Line split(std::string_view text);
 
-std::string escapeKey(const std::wstring& key);
-std::string escapeValue(const std::wstring& value);
+// These take a key or a value as it is written. They return null, or the reason why it cannot be read.
+
+const char* check(std::string_view written);
+// Appends what is written to `result`.
+const char* read(std::string_view written, std::wstring& result);
+
+// Whether something readable is written that reads as `text`.
+bool readsAs(std::string_view written, std::wstring_view text);
+
+std::string escapeKey(std::wstring_view key);
+std::string escapeValue(std::wstring_view value);
 
 } // namespace TK::PropertyText
