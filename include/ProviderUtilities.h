@@ -33,17 +33,18 @@
 #include "Moniker.h"
 #include "TKExport.h"
 
-// Some CIM servers' CMPI headers use pthread types and `__cdecl` without bringing either.
+// Some CIM servers' CMPI headers use pthread types and `__cdecl`, a calling convention that Linux lacks,
+// without declaring either.
 #include <pthread.h>
-#ifndef __cdecl
-/** A calling convention that this platform does not have. */
-#define __cdecl // NOLINT(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
-#endif
 #ifndef CMPI_PLATFORM_LINUX_GENERIC_GNU
 #define CMPI_PLATFORM_LINUX_GENERIC_GNU
 #endif
+#pragma push_macro("__cdecl")
+#undef __cdecl
+#define __cdecl // NOLINT(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
 #include <cmpidt.h>
 #include <cmpift.h>
+#pragma pop_macro("__cdecl")
 
 #include <string>
 #include <vector>

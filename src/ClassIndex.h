@@ -1,8 +1,7 @@
-// Where a class's name stands in the class table, found by a hash in place of a search.
+// Finds the row of the class table that holds a name, by a hash instead of a search.
 //
-// The hash takes the name's length and sixteen of its characters. It is made when this is compiled: the first
-// seed is taken that gives every class a slot of its own, so that a name has to be compared with one row at
-// most.
+// The hash uses the name's length and sixteen of its characters. The compiler builds its table: it takes the
+// first seed that gives every class a slot of its own, so that a name is compared with at most one row.
 #pragma once
 
 #include "ClassTable.h"
@@ -10,6 +9,8 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
+#include <strings.h>
 #include <utility>
 
 namespace TK {
@@ -25,9 +26,9 @@ constexpr std::size_t nameLength(const char* name) {
     return length;
 }
 
-// Eight characters with the bit set that tells lower case from upper: all capitalisations of a name look the
-// same. What else looks the same then is told apart when the name is compared. Written as one expression,
-// since compilers make one load of that.
+// Eight characters with the case bit set, so that all capitalisations of a name hash alike. Other characters
+// that coincide then are found out by the comparison. One expression, because compilers turn it into one
+// load.
 template <std::size_t... i>
 constexpr std::uint64_t foldedBlock(const char* characters, std::index_sequence<i...> /*places*/) {
     return ((std::uint64_t{static_cast<unsigned char>(characters[i])} << (8 * i)) | ...) |
@@ -46,16 +47,16 @@ public:
         }
     }
 
-    // The row that a name can only stand in, if it stands in one at all; classCount when there is none. The
-    // length is between shortestClassName and longestClassName.
+    // The only row that can hold the name; classCount when none can. The length is between shortestClassName
+    // and longestClassName.
     constexpr std::size_t rowOf(const char* name, std::size_t length) const {
         return rows_[slotOf(name, length)];
     }
 
 private:
-    static constexpr unsigned int slotBits = 11; // of 133 classes, some seed in 75 puts no two in one slot
+    static constexpr unsigned int slotBits = 11; // with 133 classes, one seed in 75 is free of collisions
 
-    // The first character is the same for all, so the block at the beginning leaves it out.
+    // Every name begins with the same character, so the first block leaves it out.
     constexpr std::size_t slotOf(const char* name, std::size_t length) const {
         const std::uint64_t first = foldedBlock(name + 1) + length;
         const std::uint64_t last = foldedBlock(name + length - 8);
@@ -77,7 +78,7 @@ private:
         return true;
     }
 
-    // The search begins where it ends today, since compilers limit how long it may take.
+    // The search starts at the seed that it finds today, because compilers limit constant evaluation.
     std::uint64_t seed_ = 0x9E3779B97F4A7E99U;
     std::array<unsigned char, std::size_t{1} << slotBits> rows_{};
 };
@@ -85,5 +86,37 @@ private:
 static_assert(classCount < 255, "a row's number fits a byte");
 
 constexpr ClassIndex classIndex;
+
+// The row with that name, by comparing all of them; classCount when there is none.
+inline std::size_t searchRow(const char* name) {
+    std::size_t row = 0;
+    while (row < classCount && strcasecmp(name, classTable[row].name) != 0) {
+        ++row;
+    }
+    return row;
+}
+
+inline bool isAscii(const char* name, std::size_t length) {
+    unsigned char bits = 0;
+    for (std::size_t i = 0; i < length; ++i) {
+        bits |= static_cast<unsigned char>(name[i]);
+    }
+    return bits < 0x80;
+}
+
+// The row with that name, as searchRow finds it. The index folds ASCII only, while strcasecmp folds by the
+// locale: in a Turkish one a byte above 0x7F equals an i. So strcasecmp confirms the index's row, and a name
+// with such bytes that is not confirmed is searched for.
+inline std::size_t findRow(const char* name) {
+    const std::size_t length = std::strlen(name);
+    if (length < shortestClassName || length > longestClassName) {
+        return classCount;
+    }
+    const std::size_t row = classIndex.rowOf(name, length);
+    if (row != classCount && strcasecmp(name, classTable[row].name) == 0) {
+        return row;
+    }
+    return isAscii(name, length) ? classCount : searchRow(name);
+}
 
 } // namespace TK

@@ -5,14 +5,14 @@
 
 namespace TK {
 
-// A row of the class table. The name stands in the row itself, so that the table needs no relocation.
+// A row of the class table. It holds the name itself and no pointer, so that the table needs no relocation.
 struct ClassEntry {
     unsigned short id;
     char name[46];
 };
 
-// Every class, the extension's last. Three ids are shared by two classes each: 150, 151 and 152. No name
-// stands twice.
+// Every class, the extension's last. Three ids are shared by two classes each: 150, 151 and 152. Names are
+// unique.
 constexpr ClassEntry classTable[] = {
     {1, "OXATK_ComputerSystem"},
     {2, "OXATK_SoftwareIdentity"},

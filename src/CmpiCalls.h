@@ -10,7 +10,12 @@
 
 #include "ProviderUtilities.h"
 
+// Some servers' headers use it without a definition, as ProviderUtilities.h explains.
+#pragma push_macro("__cdecl")
+#undef __cdecl
+#define __cdecl // NOLINT(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
 #include <cmpimacs.h>
+#pragma pop_macro("__cdecl")
 
 namespace TK::cmpi {
 

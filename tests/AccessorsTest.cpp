@@ -3,6 +3,10 @@
 #include "BrokerTest.h"
 #include "TestLocales.h"
 
+#ifdef __cdecl
+#error "ProviderUtilities.h leaves a macro of its own defined"
+#endif
+
 using PU = TK::ProviderUtilities;
 
 namespace {
