@@ -65,4 +65,20 @@ private:
     std::vector<Served> classes_;
 };
 
+inline void AssociationProvider::associations(const Operation& operation, Instances& reply) {
+    if (classes_.empty()) {
+        throw Refusal(CMPI_RC_ERR_NOT_SUPPORTED, "this provider lists no associations");
+    }
+    for (const Served& served : classes_) {
+        if (operation.filter_ == nullptr ||
+            operation.passes(operation.filter_->associationClass, served.className)) {
+            (this->*served.function)(operation, reply);
+        }
+    }
+}
+
+inline Instance AssociationProvider::end(const Operation& operation, const Path& path) {
+    return operation.fetch(path);
+}
+
 } // namespace oxahv

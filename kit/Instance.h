@@ -57,10 +57,41 @@ private:
     friend class Operation;
     friend class Instances;
 
+    // A reference of an association, to one of its ends.
+    struct End {
+        std::string role;
+        CMPIObjectPath* path;
+    };
+
+    Instance(const CMPIBroker* broker, CMPIInstance* handle, CMPIObjectPath* path)
+        : broker_(broker), handle_(handle), path_(path) {}
+
     const CMPIBroker* broker_;
     CMPIInstance* handle_;
-    CMPIObjectPath* path_ = nullptr;
+    CMPIObjectPath* path_ = nullptr; // null for one that Operation::instance has not made
     bool isWanted_ = true;
+    bool isAssociation_ = false; // whether its references are noted, since a client asks by them
+    std::vector<End> ends_;
 };
+
+inline Value::Value(const Instance& value) : Value(value.handle()) {}
+
+inline Path Instance::path() const {
+    if (path_ != nullptr) {
+        return {broker_, path_};
+    }
+    detail::Status status;
+    return {broker_, detail::made(CMGetObjectPath(handle_, &status), status, "tell the path of an instance")};
+}
+
+inline Instance& Instance::set(const char* name, const Value& value) {
+    if (CMPIObjectPath* const end = isAssociation_ ? detail::ValueAccess::referenceIn(value) : nullptr) {
+        ends_.push_back({name, end});
+    }
+    if (handle_ != nullptr) {
+        detail::ValueAccess::giveProperty(broker_, handle_, name, value);
+    }
+    return *this;
+}
 
 } // namespace oxahv

@@ -83,4 +83,46 @@ private:
     std::vector<Served> classes_;
 };
 
+inline void InstanceProvider::enumerate(const Operation& operation, Instances& reply) {
+    for (const Served& served : classes_) {
+        if (operation.isFor(served.className)) {
+            return (this->*served.function)(operation, reply);
+        }
+    }
+    if (classes_.empty()) {
+        throw Refusal(CMPI_RC_ERR_NOT_SUPPORTED, "this provider lists no instances");
+    }
+    throw Refusal(CMPI_RC_ERR_INVALID_CLASS,
+                  std::string("this provider does not serve class ") + operation.className());
+}
+
+inline void InstanceProvider::enumerateNames(const Operation& operation, Names& reply) {
+    const Operation names(operation, detail::Wanted::names);
+    Instances instances(names, reply);
+    enumerate(names, instances);
+}
+
+inline void InstanceProvider::get(const Operation& operation, Instances& reply) {
+    const Operation one(operation, detail::Wanted::oneInstance);
+    Instances matching(one, reply.names_, true);
+    enumerate(one, matching);
+}
+
+inline Path InstanceProvider::create(const Operation& /*operation*/, const Instance& /*wanted*/) {
+    throw Refusal(CMPI_RC_ERR_NOT_SUPPORTED, "this provider makes no instances");
+}
+
+inline void InstanceProvider::modify(const Operation& /*operation*/, const Instance& /*wanted*/) {
+    throw Refusal(CMPI_RC_ERR_NOT_SUPPORTED, "this provider changes no instances");
+}
+
+inline void InstanceProvider::remove(const Operation& /*operation*/) {
+    throw Refusal(CMPI_RC_ERR_NOT_SUPPORTED, "this provider deletes no instances");
+}
+
+inline void InstanceProvider::query(const Operation& /*operation*/, const char* /*query*/,
+                                    const char* /*language*/, Instances& /*reply*/) {
+    throw Refusal(CMPI_RC_ERR_NOT_SUPPORTED, "this provider knows no query language");
+}
+
 } // namespace oxahv

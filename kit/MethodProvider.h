@@ -5,7 +5,9 @@
 #pragma once
 
 #include "Operation.h"
+#include "detail/Methods.h"
 
+#include <cstddef>
 #include <memory>
 #include <vector>
 
@@ -52,13 +54,39 @@ protected:
      * @param name the method's name in any case; with a class and a point before it, it is found for that
      * class and those derived from it alone. A literal, or what lives as long as the provider.
      * @param function a member function of the provider's class.
-     * @param parameters their names, as many as the function has parameters beside the request.
+     * @param parameters their names, as many as the function has parameters beside the request; literals, or
+     * what lives as long as the provider.
+     * @throws std::bad_alloc
      */
     template <class Function, std::size_t count>
-    void method(const char* name, Function function, const char* const (&parameters)[count]);
+    void method(const char* name, Function function, const char* const (&parameters)[count]) {
+        using Signature = detail::Signature<Function>;
+        static_assert(count == Signature::named, "a name for each parameter beside the request");
+        methods_.push_back(std::make_unique<detail::BoundMethod<Function>>(name, function, parameters));
+    }
     /** Registers a method without parameters. */
     template <class Function>
-    void method(const char* name, Function function);
+    void method(const char* name, Function function) {
+        static_assert(detail::Signature<Function>::named == 0,
+                      "a name for each parameter beside the request");
+        methods_.push_back(std::make_unique<detail::BoundMethod<Function>>(name, function, nullptr));
+    }
+
+private:
+    friend struct detail::Service;
+    void invoke(const detail::MethodCall& call);
+
+    std::vector<std::unique_ptr<detail::Method>> methods_;
 };
+
+inline void MethodProvider::invoke(const detail::MethodCall& call) {
+    for (const std::unique_ptr<detail::Method>& method : methods_) {
+        if (method->isFor(call)) {
+            return method->call(*this, call);
+        }
+    }
+    throw Refusal(CMPI_RC_ERR_METHOD_NOT_FOUND,
+                  std::string("class ") + call.operation.className() + " has no method " + call.name);
+}
 
 } // namespace oxahv

@@ -70,4 +70,37 @@ private:
     CMPIObjectPath* handle_;
 };
 
+inline Value::Value(const Path& value) : Value(value.handle()) {}
+
+} // namespace oxahv
+
+#include "detail/Write.h" // which compares paths, and so needs the class
+
+namespace oxahv {
+
+inline Path& Path::addKey(const char* name, const Value& value) {
+    detail::ValueAccess::giveKey(broker_, handle_, name, value);
+    return *this;
+}
+
+inline bool Path::names(const Path& other) const {
+    detail::Status status;
+    detail::Status otherStatus;
+    const CMPICount count = CMGetKeyCount(handle_, &status);
+    const CMPICount otherCount = CMGetKeyCount(other.handle_, &otherStatus);
+    detail::require(status, "count the keys");
+    detail::require(otherStatus, "count the keys");
+    if (count != otherCount || !isClass(other.className())) {
+        return false;
+    }
+    for (CMPICount i = 0; i < count; ++i) {
+        const detail::NamedKey key(handle_, i);
+        const detail::Found sent = detail::keyOf(other.broker_, other.handle_, key.name);
+        if (!sent.isThere || !detail::ValueAccess::isSame(key.data, sent)) {
+            return false;
+        }
+    }
+    return true;
+}
+
 } // namespace oxahv

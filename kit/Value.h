@@ -32,7 +32,7 @@
  */
 #pragma once
 
-#include "detail/Cmpi.h"
+#include "detail/Read.h"
 
 #include <array>
 #include <chrono>
@@ -216,15 +216,7 @@ public:
     /** The broker's own date/time; null is NULL. */
     Value(const CMPIDateTime* value) : Value(CMPI_dateTime, &CMPIValue::dateTime, value) {}
     /** What the broker handed out, of whatever type. */
-    Value(const CMPIData& value)
-        : form_(detail::isNull(value) ? Form::null : Form::plain), type_(value.type) {
-        value_ = value.value;
-        if (type_ == CMPI_chars) {
-            form_ = form_ == Form::null || value.value.chars == nullptr ? Form::null : Form::chars;
-            type_ = CMPI_string;
-            source_ = {value.value.chars, 0};
-        }
-    }
+    Value(const CMPIData& value);
     /** The value, or NULL. */
     template <class T>
     Value(const std::optional<T>& value) : Value(value ? Value(*value) : Value(Null{detail::typeOf<T>()})) {}
@@ -285,6 +277,26 @@ private:
         Source source_;
     };
 };
+
+inline Value::Value(const CMPIData& value) : type_(value.type) {
+    detail::Integer integer = {};
+    if (detail::isNull(value)) {
+        type_ = value.type == CMPI_chars ? CMPI_string : value.type;
+    } else if (value.type == CMPI_chars) {
+        form_ = value.value.chars != nullptr ? Form::chars : Form::null;
+        type_ = CMPI_string;
+        source_ = {value.value.chars, 0};
+    } else if (detail::readInteger(value, integer)) {
+        form_ = Form::integer;
+        integer_ = integer.bits;
+    } else if (value.type == CMPI_real32 || value.type == CMPI_real64) {
+        form_ = Form::real;
+        real_ = value.type == CMPI_real32 ? value.value.real32 : value.value.real64;
+    } else {
+        form_ = Form::plain;
+        value_ = value.value;
+    }
+}
 
 /** A key of an instance, with its name, as in `{"Name", "eth0"}`. Refers to what it was made from. */
 struct Key {
