@@ -28,15 +28,47 @@ TK::DateTime zonedDate() {
     return date;
 }
 
-// What a client sends: a key or argument with its value.
-struct Sent {
-    CMPIType type;
-    std::function<void(CMPIValue&)> fill;
-};
+// Adds a key to what a client sends.
+using Sent = std::function<void(CMPIObjectPath* path, const char* name)>;
 
 template <class T>
 Sent sent(CMPIType type, T CMPIValue::*member, T value) {
-    return {type, [=](CMPIValue& record) { record.*member = value; }};
+    return [=](CMPIObjectPath* path, const char* name) {
+        CMPIValue record = {};
+        record.*member = value;
+        CMAddKey(path, name, &record, type);
+    };
+}
+
+Sent sent(const char* text, CMPIType type = CMPI_chars) {
+    return [=](CMPIObjectPath* path, const char* name) { CMAddKey(path, name, text, type); };
+}
+
+std::string textOf(const std::string& value) {
+    return value;
+}
+std::string textOf(const std::wstring& value) {
+    return TK::make_string(value);
+}
+std::string textOf(Instant value) {
+    return std::to_string(value.time_since_epoch().count());
+}
+std::string textOf(std::chrono::hours value) {
+    return std::to_string(value.count()) + " h";
+}
+std::string textOf(const TK::DateTime& value) {
+    return value;
+}
+std::string textOf(const Path& value) {
+    return value.className();
+}
+template <class Number, std::enable_if_t<std::is_arithmetic_v<Number>, int> = 0>
+std::string textOf(Number value) {
+    return std::to_string(value);
+}
+template <class T>
+std::string textOf(const std::optional<T>& value) {
+    return value ? textOf(*value) : "nothing";
 }
 
 } // namespace
@@ -61,22 +93,23 @@ protected:
         expect(property, value, text, value);
     }
 
-    // What becomes of a key, of any type, that a client sends, when the provider reads it as T.
+    // What becomes of a key that a client sends when the provider reads it as T; of a refusal, its text.
     template <class T>
-    std::string read(const Sent& value) {
+    std::string read(const Sent& key) {
         oxahv::EmbeddedBroker lenient; // without classes, it takes what comes
         lenient.host("KitProbe", probeFactories);
         oxahv::Request request(lenient);
         CMPIObjectPath* const item = request.objectPath("root/cimv2", "Kit_Item");
-        CMPIValue record = {};
-        value.fill(record);
-        CMAddKey(item, "NUMBER", &record, value.type);
+        if (key) {
+            key(item, "KEY");
+        }
         std::string text;
         probe.enumerate = [&](const Operation& operation, Instances& /*reply*/) {
-            text = std::to_string(operation.key<T>("Number"));
+            text = textOf(operation.key<T>("Key"));
         };
         const Reply reply = request.enumerateInstances(item);
-        return reply.ok() ? text : failureOf(reply);
+        EXPECT_EQ(reply.code, reply.message.empty() ? CMPI_RC_OK : CMPI_RC_ERR_INVALID_PARAMETER);
+        return text + reply.message;
     }
 };
 
@@ -188,61 +221,86 @@ TEST_F(KitValues, ThatCimCannotRepresentAreRefused) {
 }
 
 TEST_F(KitValues, OfRequestsAreReadInAnyWidthWithinTheirRange) {
-    const std::string invalid = "CMPI_RC_ERR_INVALID_PARAMETER key Number ";
-    const auto text = [](const char* characters) {
-        return Sent{CMPI_chars, [=](CMPIValue& record) { record.chars = const_cast<char*>(characters); }};
-    };
+    const char* const outside = "key Key is out of range";
+    const char* const none = "key Key is no integer";
     const struct {
         Sent sent;
         const char* asUnsigned16;
         const char* asSigned8;
         const char* asSigned64;
     } cases[] = {
-        {sent(CMPI_uint8, &CMPIValue::uint8, CMPIUint8{200}), "200", "is out of range", "200"},
+        {sent(CMPI_uint8, &CMPIValue::uint8, CMPIUint8{200}), "200", outside, "200"},
         {sent(CMPI_uint16, &CMPIValue::uint16, CMPIUint16{127}), "127", "127", "127"},
-        {sent(CMPI_uint32, &CMPIValue::uint32, 65536U), "is out of range", "is out of range", "65536"},
-        {sent(CMPI_uint64, &CMPIValue::uint64, ~0ULL), "is out of range", "is out of range", "is out of range"},
-        {sent(CMPI_sint8, &CMPIValue::sint8, CMPISint8{-128}), "is out of range", "-128", "-128"},
-        {sent(CMPI_sint16, &CMPIValue::sint16, CMPISint16{-129}), "is out of range", "is out of range", "-129"},
-        {sent(CMPI_sint32, &CMPIValue::sint32, 65535), "65535", "is out of range", "65535"},
+        {sent(CMPI_uint32, &CMPIValue::uint32, 65536U), outside, outside, "65536"},
+        {sent(CMPI_uint64, &CMPIValue::uint64, ~0ULL), outside, outside, outside},
+        {sent(CMPI_sint8, &CMPIValue::sint8, CMPISint8{-128}), outside, "-128", "-128"},
+        {sent(CMPI_sint16, &CMPIValue::sint16, CMPISint16{-129}), outside, outside, "-129"},
+        {sent(CMPI_sint32, &CMPIValue::sint32, 65535), "65535", outside, "65535"},
         {sent(CMPI_sint64, &CMPIValue::sint64, 5LL), "5", "5", "5"},
-        {sent(CMPI_boolean, &CMPIValue::boolean, CMPIBoolean{1}), "is no integer", "is no integer", "is no integer"},
-        {sent(CMPI_real64, &CMPIValue::real64, 1.0), "is no integer", "is no integer", "is no integer"},
-    };
-    const auto expected = [&](const std::string& outcome) {
-        return outcome.find(' ') != std::string::npos ? invalid + outcome : outcome;
+        {sent("0"), "0", "0", "0"},
+        {sent("-128"), outside, "-128", "-128"},
+        {sent("-9223372036854775808"), outside, outside, "-9223372036854775808"},
+        {sent("9223372036854775807"), outside, outside, "9223372036854775807"},
+        {sent("9223372036854775808"), outside, outside, outside},
+        {sent("-9223372036854775809"), outside, outside, outside},
+        {sent("18446744073709551616"), outside, outside, outside},
+        {sent("99999999999999999999x"), none, none, none},
+        {sent(""), none, none, none},
+        {sent("-"), none, none, none},
+        {sent("+1"), none, none, none},
+        {sent("1 "), none, none, none},
+        {sent(CMPI_boolean, &CMPIValue::boolean, CMPIBoolean{1}), none, none, none},
+        {sent(CMPI_char16, &CMPIValue::char16, CMPIChar16{1}), none, none, none},
+        {sent(CMPI_real64, &CMPIValue::real64, 1.0), none, none, none},
+        {nullptr, "key Key is missing", "key Key is missing", "key Key is missing"},
+        {sent(nullptr, CMPI_uint16), "key Key is NULL", "key Key is NULL", "key Key is NULL"},
     };
     for (const auto& c : cases) {
-        SCOPED_TRACE(oxahv::typeName(c.sent.type));
-        EXPECT_EQ(read<std::uint16_t>(c.sent), expected(c.asUnsigned16));
-        EXPECT_EQ(read<std::int8_t>(c.sent), expected(c.asSigned8));
-        EXPECT_EQ(read<std::int64_t>(c.sent), expected(c.asSigned64));
+        SCOPED_TRACE(&c - cases);
+        EXPECT_EQ(read<std::uint16_t>(c.sent), c.asUnsigned16);
+        EXPECT_EQ(read<std::int8_t>(c.sent), c.asSigned8);
+        EXPECT_EQ(read<long>(c.sent), c.asSigned64);
     }
-    const std::pair<const char*, const char*> texts[] = {
-        {"0", "0"},
-        {"-9223372036854775808", "-9223372036854775808"},
-        {"9223372036854775807", "9223372036854775807"},
-        {"9223372036854775808", "is out of range"},
-        {"-9223372036854775809", "is out of range"},
-        {"18446744073709551616", "is out of range"},
-        {"", "is no integer"},
-        {"-", "is no integer"},
-        {"+1", "is no integer"},
-        {"1 ", "is no integer"},
-        {"0x10", "is no integer"},
-    };
-    for (const auto& [characters, outcome] : texts) {
-        CMPIObjectPath* const item = CMNewObjectPath(broker_.handle(), "root/cimv2", "Kit_Free", nullptr);
-        CMAddKey(item, "Number", characters, CMPI_chars);
-        const oxahv::detail::Found found = oxahv::detail::keyOf(broker_.handle(), item, "Number");
-        std::string result;
-        try {
-            result = std::to_string(oxahv::detail::as<std::int64_t>(found));
-        } catch (const oxahv::Refusal& refusal) {
-            result = refusal.what();
-        }
-        EXPECT_EQ(result, std::string(outcome).find(' ') != std::string::npos ? std::string("key Number ") + outcome : outcome)
-            << characters;
+}
+
+TEST_F(KitValues, OfRequestsAreReadByTheirType) {
+    const Sent text = sent("\u00fc");
+    const Sent number = sent(CMPI_uint8, &CMPIValue::uint8, CMPIUint8{7});
+    const Sent real = sent(CMPI_real64, &CMPIValue::real64, 1e300);
+    const Sent date = sent("20231114231320.123456+060");
+    EXPECT_EQ(read<std::string>(text), "\u00fc");
+    EXPECT_EQ(read<std::wstring>(sent("x")), "x");
+    EXPECT_EQ(read<std::wstring>(sent("\xff")), "key Key is no text in UTF-8");
+    EXPECT_EQ(read<std::string>(number), "key Key is no text");
+    EXPECT_EQ(read<bool>(sent("true")), "1");
+    EXPECT_EQ(read<bool>(sent("FALSE")), "0");
+    EXPECT_EQ(read<bool>(sent("yes")), "key Key is no boolean");
+    EXPECT_EQ(read<bool>(number), "key Key is no boolean");
+    EXPECT_EQ(read<char16_t>(sent(CMPI_char16, &CMPIValue::char16, CMPIChar16{65})), "65");
+    EXPECT_EQ(read<char16_t>(number), "key Key is no character");
+    EXPECT_EQ(read<double>(sent(CMPI_real32, &CMPIValue::real32, 0.5F)), "0.500000");
+    EXPECT_EQ(read<float>(real), "key Key is out of range");
+    EXPECT_EQ(read<float>(number), "key Key is no real number");
+    EXPECT_EQ(read<Instant>(date), "1700000000123456");
+    EXPECT_EQ(read<Instant>(sent("20240229000000.000000-001")), "1709164860000000");
+    EXPECT_EQ(read<TK::DateTime>(date), "2023-11-14 23:13:20.123456+060");
+    for (const char* wrong : {"20231314231320.123456+060", "20231114241320.123456+060", "2023111423132*.******+060",
+                              "20231114231320.123456+06", "00000001010000.000000:000", "x"}) {
+        EXPECT_EQ(read<Instant>(sent(wrong)), "key Key is no point in time") << wrong;
+        EXPECT_EQ(read<TK::DateTime>(sent(wrong)), "key Key is no point in time") << wrong;
     }
-    static_cast<void>(text);
+    EXPECT_EQ(read<Instant>(number), "key Key is no date/time");
+    EXPECT_EQ(read<std::chrono::hours>(sent("00000001010000.000000:000")), "25 h");
+    EXPECT_EQ(read<std::chrono::hours>(date), "key Key is no interval");
+    EXPECT_EQ(read<std::optional<Path>>(nullptr), "nothing");
+    EXPECT_EQ(read<std::optional<int>>(sent(nullptr, CMPI_sint32)), "nothing");
+    EXPECT_EQ(read<std::optional<int>>(sent("x")), "key Key is no integer");
+    EXPECT_EQ(read<Path>(text), "key Key is no reference");
+    const auto year9999 = sent("99991231235959.000000+000");
+    probe.enumerate = nullptr;
+    EXPECT_EQ(read<Instant>(year9999), "253402300799000000");
+    CMPIObjectPath* const item = path("Kit_Item");
+    CMAddKey(item, "Name", "99991231235959.000000+000", CMPI_chars);
+    EXPECT_THROW(Path(broker_.handle(), item).key<std::chrono::system_clock::time_point>("Name"), oxahv::Refusal)
+        << "nanoseconds do not reach that far";
 }
