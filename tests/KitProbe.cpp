@@ -78,24 +78,28 @@ KitTest::KitTest() {
         value.property(std::string(type.name) + 'A', static_cast<CMPIType>(type.type | CMPI_ARRAY));
     }
     broker_.declare(value);
-    broker_.declare(Declaration("Kit_Item")
-                        .key("Name", CMPI_string)
-                        .key("Number", CMPI_uint16)
-                        .property("Size", CMPI_uint64)
-                        .property("Note", CMPI_string)
-                        .method("Add", CMPI_uint32,
-                                {{"Left", CMPI_uint8}, {"Right", CMPI_sint16}, {"Sum", CMPI_sint32, "", true, true}})
-                        .method("Describe", CMPI_string,
-                                {{"Values", CMPI_stringA},
-                                 {"When", CMPI_dateTime},
-                                 {"Peer", CMPI_ref},
-                                 {"Text", CMPI_string, "", false, true},
-                                 {"Other", CMPI_boolean, "", false, true}})
-                        .method("Reset", CMPI_uint32)
-                        .method("Unserved", CMPI_uint32));
-    broker_.declare(Declaration("Kit_Part").superclass("Kit_Item"));
     broker_.declare(
-        Declaration("Kit_Link").association().key("Left", CMPI_ref).key("Right", CMPI_ref).property("Note", CMPI_string));
+        Declaration("Kit_Item")
+            .key("Name", CMPI_string)
+            .key("Number", CMPI_uint16)
+            .property("Size", CMPI_uint64)
+            .property("Note", CMPI_string)
+            .method("Add", CMPI_uint32,
+                    {{"Left", CMPI_uint8}, {"Right", CMPI_sint16}, {"Sum", CMPI_sint32, "", true, true}})
+            .method("Describe", CMPI_string,
+                    {{"Values", CMPI_stringA},
+                     {"When", CMPI_dateTime},
+                     {"Peer", CMPI_ref},
+                     {"Text", CMPI_string, "", false, true},
+                     {"Other", CMPI_boolean, "", false, true}})
+            .method("Reset", CMPI_uint32)
+            .method("Unserved", CMPI_uint32));
+    broker_.declare(Declaration("Kit_Part").superclass("Kit_Item"));
+    broker_.declare(Declaration("Kit_Link")
+                        .association()
+                        .key("Left", CMPI_ref)
+                        .key("Right", CMPI_ref)
+                        .property("Note", CMPI_string));
     broker_.declare(Declaration("Kit_OwnLink").superclass("Kit_Link"));
     broker_.host("KitProbe", probeFactories);
 }
@@ -107,9 +111,9 @@ KitTest::~KitTest() {
     probe.create = nullptr;
 }
 
-oxahv::Reply
-KitTest::enumerate(const std::function<void(const oxahv::Operation&, oxahv::Instances&)>& function,
-                   const std::string& className) {
+oxahv::Reply KitTest::enumerate(
+    const std::function<void(const oxahv::Operation&, oxahv::Instances&)>& function,
+    const std::string& className) {
     probe.enumerate = function;
     return request_.enumerateInstances(path(className));
 }

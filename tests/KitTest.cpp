@@ -1,6 +1,7 @@
 // Values of the kit: set, read back, and read from what a client sends.
 
 #include "KitProbe.h"
+#include "TestLocales.h"
 
 #include <array>
 #include <chrono>
@@ -85,6 +86,7 @@ protected:
         ASSERT_TRUE(reply.ok()) << failureOf(reply);
         const CMPIData data = CMGetProperty(reply.instances.at(0), property, nullptr);
         EXPECT_EQ(oxahv::valueText(data), text);
+        const ThreadLocale utf8("C.UTF-8"); // as the provider's functions have
         EXPECT_EQ(Instance(broker_.handle(), reply.instances[0]).get<Read>(property), read);
         EXPECT_FALSE(Instance(broker_.handle(), reply.instances[0]).get<std::optional<Read>>("char16A"));
     }
@@ -156,7 +158,8 @@ TEST_F(KitValues, AreTakenFromWhateverTheProviderHas) {
     expect("string", L"wide", "\"wide\"", std::wstring(L"wide"));
     expect("string", std::optional<std::string>("there"), "\"there\"");
     // Without a type of their own, literals are of the one that the class declares.
-    for (const char* number : {"uint8", "uint16", "uint32", "uint64", "sint8", "sint16", "sint32", "sint64"}) {
+    for (const char* number :
+         {"uint8", "uint16", "uint32", "uint64", "sint8", "sint16", "sint32", "sint64"}) {
         expect(number, 42, "42", std::int64_t{42});
     }
     expect("sint8", -1L, "-1");
@@ -217,7 +220,8 @@ TEST_F(KitValues, ThatCimCannotRepresentAreRefused) {
     EXPECT_EQ(failure("real32", 0.1), mismatch + "real32");
     EXPECT_EQ(failure("string", 1), mismatch + "string");
     EXPECT_EQ(failure("uint8A", std::vector<int>{1, 256}), mismatch + "uint8A");
-    EXPECT_EQ(failure("Misspelt", 1), "CMPI_RC_ERR_NO_SUCH_PROPERTY the broker did not set property Misspelt");
+    EXPECT_EQ(failure("Misspelt", 1),
+              "CMPI_RC_ERR_NO_SUCH_PROPERTY the broker did not set property Misspelt");
 }
 
 TEST_F(KitValues, OfRequestsAreReadInAnyWidthWithinTheirRange) {
@@ -284,8 +288,9 @@ TEST_F(KitValues, OfRequestsAreReadByTheirType) {
     EXPECT_EQ(read<Instant>(date), "1700000000123456");
     EXPECT_EQ(read<Instant>(sent("20240229000000.000000-001")), "1709164860000000");
     EXPECT_EQ(read<TK::DateTime>(date), "2023-11-14 23:13:20.123456+060");
-    for (const char* wrong : {"20231314231320.123456+060", "20231114241320.123456+060", "2023111423132*.******+060",
-                              "20231114231320.123456+06", "00000001010000.000000:000", "x"}) {
+    for (const char* wrong :
+         {"20231314231320.123456+060", "20231114241320.123456+060", "2023111423132*.******+060",
+          "20231114231320.123456+06", "00000001010000.000000:000", "x"}) {
         EXPECT_EQ(read<Instant>(sent(wrong)), "key Key is no point in time") << wrong;
         EXPECT_EQ(read<TK::DateTime>(sent(wrong)), "key Key is no point in time") << wrong;
     }
@@ -301,6 +306,7 @@ TEST_F(KitValues, OfRequestsAreReadByTheirType) {
     EXPECT_EQ(read<Instant>(year9999), "253402300799000000");
     CMPIObjectPath* const item = path("Kit_Item");
     CMAddKey(item, "Name", "99991231235959.000000+000", CMPI_chars);
-    EXPECT_THROW(Path(broker_.handle(), item).key<std::chrono::system_clock::time_point>("Name"), oxahv::Refusal)
+    EXPECT_THROW(Path(broker_.handle(), item).key<std::chrono::system_clock::time_point>("Name"),
+                 oxahv::Refusal)
         << "nanoseconds do not reach that far";
 }
