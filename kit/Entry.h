@@ -35,7 +35,7 @@
 /**
  * Defines the factory functions of a provider, `NAME_Create_InstanceMI`, `NAME_Create_AssociationMI` and
  * `NAME_Create_MethodMI`: those of the kinds that the class derives from. At namespace scope, once in a
- * library for each name.
+ * library for each name, and followed by a semicolon.
  *
  * The server's first call of a factory makes an object of the class, for each broker one that all kinds
  * share; the last `cleanup` destroys it. Its constructor takes a `const oxahv::Context&`, the server's, or

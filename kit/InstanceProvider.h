@@ -23,7 +23,7 @@ namespace oxahv {
  *         }
  *     }
  * };
- * OXAHV_PROVIDER(DemoPort, Ports)
+ * OXAHV_PROVIDER(DemoPort, Ports);
  * @endcode
  *
  * **Threads.** A CIM server calls these functions from any number of threads at once, on one object: what
