@@ -43,11 +43,11 @@
 #include <cmpift.h>
 #include <cmpimacs.h>
 
+#include "Declarations.h"
 #include "Request.h"
 #include "TKExport.h"
 #include "Testing.h"
 #include "Text.h"
-#include "classes/Declarations.h"
 
 #include <functional>
 #include <memory>
