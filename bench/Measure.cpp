@@ -166,11 +166,11 @@ private:
     double atOnce_ = std::numeric_limits<double>::infinity();
 };
 
-double allocationsOf(const rows::Row& row) {
+double allocationsOf(const rows::Run& run, double units) {
     constexpr std::size_t calls = 16;
     const std::size_t before = blocksTaken;
-    row.operation(calls);
-    return static_cast<double>(blocksTaken - before) / (calls * row.units);
+    run(calls);
+    return static_cast<double>(blocksTaken - before) / (calls * units);
 }
 
 void measure(benchmark::State& state, const rows::Row& row) {
@@ -184,14 +184,18 @@ void measure(benchmark::State& state, const rows::Row& row) {
     if (floor.exists()) {
         state.counters["floor_ns"] = floor.perUnit();
         state.counters["at_most_floor"] = row.atMostFloor;
+        state.counters["over_floor"] = row.overFloor;
     }
     if (naive.exists()) {
         state.counters["naive_ns"] = naive.perUnit();
         state.counters["times_faster"] = row.timesFaster;
     }
     if (!row.isGrowth()) {
-        state.counters["allocations"] = allocationsOf(row);
-        state.counters["allocations_at_most"] = row.allocations;
+        state.counters["allocations"] = allocationsOf(row.operation, row.units);
+        state.counters["allocations_at_most"] =
+            row.allocationsOverFloor < 0
+                ? row.allocations
+                : allocationsOf(row.floor, row.floorUnits) + row.allocationsOverFloor;
     }
     state.SetLabel(row.floorName);
 }

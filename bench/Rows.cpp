@@ -1,5 +1,9 @@
 #include "Rows.h"
 
+#ifdef OXAHVBENCH_KIT
+#include "Kit.h"
+#endif
+
 #include "ClassTable.h"
 #include "Floors.h"
 #include "Naive.h"
@@ -170,6 +174,15 @@ public:
         last().floorName = std::move(name);
         last().floor = repeat(std::move(run));
         last().atMostFloor = atMost;
+        return *this;
+    }
+
+    // The same with the nanoseconds and the blocks of memory that the operation may take beyond it.
+    template <class Floor>
+    Table& floorBelow(std::string name, Floor run, double nanoseconds, double blocks) {
+        floor(std::move(name), std::move(run), 0);
+        last().overFloor = nanoseconds;
+        last().allocationsOverFloor = blocks;
         return *this;
     }
 
@@ -963,6 +976,10 @@ void addRequest(Table& table) {
         .floor("the broker's calls alone", callTheBroker, 0)
         .timesFaster(4.5)
         .allocations(blocks);
+#ifdef OXAHVBENCH_KIT
+    table.add("getInstance by the kit", kit::serveByKit)
+        .floorBelow("a table written by hand", kit::serveByHand, 150, 1);
+#endif
 }
 
 // Growth: what a unit costs in a large input, against what it costs in a small one.

@@ -38,9 +38,11 @@ struct Row {
     double units = 1;
     double floorUnits = 1;
     // Goals; 0 stands for none.
-    double atMostFloor = 0;  // the operation's time, in times of the floor's
-    double timesFaster = 0;  // the naive build's time, in times of the operation's
-    double allocations = -1; // blocks of memory per unit, at most; -1 when nothing is said
+    double atMostFloor = 0;           // the operation's time, in times of the floor's
+    double overFloor = 0;             // nanoseconds that the operation may take beyond the floor
+    double timesFaster = 0;           // the naive build's time, in times of the operation's
+    double allocations = -1;          // blocks of memory per unit, at most; -1 when nothing is said
+    double allocationsOverFloor = -1; // the same, beyond the floor's
 
     // Whether it tells what a unit costs in a large input: its floor is the same operation on a small one.
     bool isGrowth() const { return floorUnits != units; }

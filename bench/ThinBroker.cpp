@@ -183,6 +183,24 @@ CMPIDateTimeFT makeDateTimeTable() {
 }
 CMPIDateTimeFT dateTimeTable = makeDateTimeTable();
 
+// Results
+
+CMPIStatus returnInstance(const CMPIResult* /*result*/, const CMPIInstance* /*instance*/) {
+    return ok;
+}
+
+CMPIStatus returnDone(const CMPIResult* /*result*/) {
+    return ok;
+}
+
+CMPIResultFT makeResultTable() {
+    CMPIResultFT table = {};
+    table.returnInstance = returnInstance;
+    table.returnDone = returnDone;
+    return table;
+}
+CMPIResultFT resultTable = makeResultTable();
+
 // The broker
 
 CMPIInstance* newInstance(const CMPIBroker* /*broker*/, const CMPIObjectPath* /*path*/,
@@ -259,7 +277,8 @@ Objects& objects() {
                           {&text, &argsTable},
                           className,
                           {nullptr, &arrayTable},
-                          {nullptr, &dateTimeTable}};
+                          {nullptr, &dateTimeTable},
+                          {nullptr, &resultTable}};
     return all;
 }
 

@@ -29,6 +29,7 @@ struct Objects {
     CMPIString text;              // what the broker makes of any text
     CMPIArray array;              // what it makes of any array
     CMPIDateTime dateTime;        // what it makes of any date
+    CMPIResult result;            // takes everything
 };
 
 // The prepared objects. Their function tables may be exchanged while no other thread uses them.

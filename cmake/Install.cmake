@@ -9,7 +9,7 @@ function(oxahv_install_library target component development export)
     install(TARGETS ${target} EXPORT ${export}
         LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} COMPONENT ${component} NAMELINK_COMPONENT ${development})
 endfunction()
-install(TARGETS oxahvexport oxahvcmpi oxahvlibrarycmpi EXPORT oxahvproviderutilities-targets)
+install(TARGETS oxahvexport oxahvcmpi oxahvlibrarycmpi oxahvproviderkit EXPORT oxahvproviderutilities-targets)
 foreach(name common locale logger)
     oxahv_install_library(oxahv${name} ${name} development oxahvproviderutilities-targets)
 endforeach()
@@ -19,6 +19,8 @@ oxahv_install_library(oxahvbroker broker broker_development oxahvbroker-targets)
 set(oxahv_include ${CMAKE_INSTALL_INCLUDEDIR}/oxahv)
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/ ${PROJECT_SOURCE_DIR}/export/
     DESTINATION ${oxahv_include} COMPONENT development FILES_MATCHING PATTERN "*.h")
+install(DIRECTORY ${PROJECT_SOURCE_DIR}/kit/
+    DESTINATION ${oxahv_include}/kit COMPONENT development FILES_MATCHING PATTERN "*.h")
 install(DIRECTORY
     ${PROJECT_SOURCE_DIR}/platform/common/
     ${PROJECT_SOURCE_DIR}/platform/locale/
@@ -56,10 +58,10 @@ if(CMPI_INCLUDE_DIR)
 else()
     set(oxahv_pc_cmpi "\${includedir}/oxahv/cmpi")
 endif()
-foreach(name oxahvproviderutilities oxahvbroker)
+foreach(name oxahvproviderutilities oxahvproviderkit oxahvbroker)
     configure_file(${PROJECT_SOURCE_DIR}/cmake/${name}.pc.in ${PROJECT_BINARY_DIR}/${name}.pc @ONLY)
 endforeach()
-install(FILES ${PROJECT_BINARY_DIR}/oxahvproviderutilities.pc
+install(FILES ${PROJECT_BINARY_DIR}/oxahvproviderutilities.pc ${PROJECT_BINARY_DIR}/oxahvproviderkit.pc
     DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig COMPONENT development)
 install(FILES ${PROJECT_BINARY_DIR}/oxahvbroker.pc
     DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig COMPONENT broker_development)

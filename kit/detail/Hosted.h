@@ -1,0 +1,85 @@
+// A provider's object in a CIM server: made by the first factory call, destroyed by the last cleanup.
+#pragma once
+
+#include "../AssociationProvider.h"
+#include "../InstanceProvider.h"
+#include "../MethodProvider.h"
+#include "Utf8Thread.h"
+
+#include <mutex>
+#include <string>
+
+namespace oxahv::detail {
+
+struct Hosted;
+
+// What a library keeps of one provider. It has no destructor: at the end of a process, requests may still
+// run.
+struct Module {
+    const char* name;
+    std::mutex mutex{};
+    Hosted* first = nullptr; // of each broker one; guarded by the mutex
+};
+
+// The object for one broker, with the records by which that broker calls it.
+struct Hosted {
+    Hosted(Module& itsModule, const CMPIBroker* itsBroker, const char* itsCategory)
+        : module(itsModule), broker(itsBroker), category(itsCategory) {}
+
+    Module& module;
+    const CMPIBroker* broker;
+    std::string category;
+    Utf8Locale locale{};
+    unsigned int users = 0; // factory calls without their cleanup; guarded by the module's mutex
+    Hosted* next = nullptr; // likewise
+
+    void* object = nullptr;
+    void (*destroy)(void* object) = nullptr;
+    // The object as what it serves; null for what it does not.
+    InstanceProvider* instances = nullptr;
+    AssociationProvider* associations = nullptr;
+    MethodProvider* methods = nullptr;
+
+    CMPIInstanceMIFT instanceTable{};
+    CMPIAssociationMIFT associationTable{};
+    CMPIMethodMIFT methodTable{};
+    CMPIInstanceMI instanceMI{this, &instanceTable};
+    CMPIAssociationMI associationMI{this, &associationTable};
+    CMPIMethodMI methodMI{this, &methodTable};
+};
+
+template <class MI>
+Hosted& hostedOf(const MI* mi) {
+    return *static_cast<Hosted*>(const_cast<void*>(static_cast<const void*>(mi->hdl)));
+}
+
+// Makes the object of a provider's class.
+using Construct = void (*)(Hosted& hosted, const Context& context);
+
+template <class Provider>
+void construct(Hosted& hosted, const Context& context) {
+    static_assert(
+        std::is_convertible_v<Provider*, InstanceProvider*> ||
+            std::is_convertible_v<Provider*, AssociationProvider*> ||
+            std::is_convertible_v<Provider*, MethodProvider*>,
+        "a provider derives from InstanceProvider, AssociationProvider or MethodProvider, publicly");
+    Provider* object = nullptr;
+    if constexpr (std::is_constructible_v<Provider, const Context&>) {
+        object = new Provider(context);
+    } else {
+        object = new Provider();
+    }
+    hosted.object = object;
+    hosted.destroy = [](void* provider) { delete static_cast<Provider*>(provider); };
+    if constexpr (std::is_convertible_v<Provider*, InstanceProvider*>) {
+        hosted.instances = object;
+    }
+    if constexpr (std::is_convertible_v<Provider*, AssociationProvider*>) {
+        hosted.associations = object;
+    }
+    if constexpr (std::is_convertible_v<Provider*, MethodProvider*>) {
+        hosted.methods = object;
+    }
+}
+
+} // namespace oxahv::detail

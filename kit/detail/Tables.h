@@ -1,0 +1,233 @@
+// The function tables of CMPI over the classes of the kit.
+#pragma once
+
+#include "Answer.h"
+
+namespace oxahv::detail {
+
+// Ends the object when its last kind has been cleaned up.
+inline CMPIStatus release(Hosted& hosted) {
+    Module& module = hosted.module;
+    {
+        const std::lock_guard<std::mutex> lock(module.mutex);
+        if (--hosted.users != 0) {
+            return {CMPI_RC_OK, nullptr};
+        }
+        Hosted** place = &module.first;
+        while (*place != &hosted) {
+            place = &(*place)->next;
+        }
+        *place = hosted.next;
+    }
+    const CMPIBroker* const broker = hosted.broker;
+    const std::string category = std::move(hosted.category);
+    try {
+        const std::unique_ptr<Hosted> owner(&hosted);
+        const Utf8Thread utf8(hosted.locale);
+        hosted.destroy(hosted.object);
+        return {CMPI_RC_OK, nullptr};
+    } catch (...) {
+        return statusOfException(broker, category, "cleanup");
+    }
+}
+
+// Instances
+
+inline CMPIStatus cleanupInstances(CMPIInstanceMI* mi, const CMPIContext* /*context*/, CMPIBoolean /*ends*/) {
+    return release(hostedOf(mi));
+}
+
+inline CMPIStatus enumerateInstanceNames(CMPIInstanceMI* mi, const CMPIContext* context,
+                                         const CMPIResult* result, const CMPIObjectPath* path) {
+    const Hosted& hosted = hostedOf(mi);
+    return Service::answer({hosted, __func__, context, result, path},
+                           [&](const Operation& operation, Names& reply) {
+                               hosted.instances->enumerateNames(operation, reply);
+                           });
+}
+
+inline CMPIStatus enumerateInstances(CMPIInstanceMI* mi, const CMPIContext* context, const CMPIResult* result,
+                                     const CMPIObjectPath* path, const char** properties) {
+    const Hosted& hosted = hostedOf(mi);
+    return Service::answer({hosted, __func__, context, result, path, properties},
+                           [&](const Operation& operation, Names& reply) {
+                               Service::list(*hosted.instances, operation, reply);
+                           });
+}
+
+inline CMPIStatus getInstance(CMPIInstanceMI* mi, const CMPIContext* context, const CMPIResult* result,
+                              const CMPIObjectPath* path, const char** properties) {
+    const Hosted& hosted = hostedOf(mi);
+    return Service::answer(
+        {hosted, __func__, context, result, path, properties},
+        [&](const Operation& operation, Names& reply) { Service::get(*hosted.instances, operation, reply); });
+}
+
+inline CMPIStatus createInstance(CMPIInstanceMI* mi, const CMPIContext* context, const CMPIResult* result,
+                                 const CMPIObjectPath* path, const CMPIInstance* instance) {
+    const Hosted& hosted = hostedOf(mi);
+    return Service::answer({hosted, __func__, context, result, path},
+                           [&](const Operation& operation, Names& reply) {
+                               reply.add(hosted.instances->create(operation, {hosted.broker, instance}));
+                           });
+}
+
+inline CMPIStatus modifyInstance(CMPIInstanceMI* mi, const CMPIContext* context, const CMPIResult* result,
+                                 const CMPIObjectPath* path, const CMPIInstance* instance,
+                                 const char** properties) {
+    const Hosted& hosted = hostedOf(mi);
+    return Service::answer({hosted, __func__, context, result, path, properties},
+                           [&](const Operation& operation, Names& /*reply*/) {
+                               hosted.instances->modify(operation, {hosted.broker, instance});
+                           });
+}
+
+inline CMPIStatus deleteInstance(CMPIInstanceMI* mi, const CMPIContext* context, const CMPIResult* result,
+                                 const CMPIObjectPath* path) {
+    const Hosted& hosted = hostedOf(mi);
+    return Service::answer(
+        {hosted, __func__, context, result, path},
+        [&](const Operation& operation, Names& /*reply*/) { hosted.instances->remove(operation); });
+}
+
+inline CMPIStatus execQuery(CMPIInstanceMI* mi, const CMPIContext* context, const CMPIResult* result,
+                            const CMPIObjectPath* path, const char* query, const char* language) {
+    const Hosted& hosted = hostedOf(mi);
+    return Service::answer({hosted, __func__, context, result, path},
+                           [&](const Operation& operation, Names& reply) {
+                               Service::query(*hosted.instances, operation, query, language, reply);
+                           });
+}
+
+// Associations. Of a request for references, the result class is the association's.
+
+inline CMPIStatus cleanupAssociations(CMPIAssociationMI* mi, const CMPIContext* /*context*/,
+                                      CMPIBoolean /*ends*/) {
+    return release(hostedOf(mi));
+}
+
+inline CMPIStatus associate(const ServerCall& call) {
+    return Service::answer(call, [&](const Operation& operation, Names& reply) {
+        Service::associate(*call.hosted.associations, operation, reply);
+    });
+}
+
+inline CMPIStatus associators(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
+                              const CMPIObjectPath* path, const char* associationClass,
+                              const char* resultClass, const char* role, const char* resultRole,
+                              const char** properties) {
+    EndFilter filter = {{associationClass}, {resultClass}, role, resultRole};
+    return associate(
+        {hostedOf(mi), __func__, context, result, path, properties, Wanted::associators, &filter});
+}
+
+inline CMPIStatus associatorNames(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
+                                  const CMPIObjectPath* path, const char* associationClass,
+                                  const char* resultClass, const char* role, const char* resultRole) {
+    EndFilter filter = {{associationClass}, {resultClass}, role, resultRole};
+    return associate(
+        {hostedOf(mi), __func__, context, result, path, nullptr, Wanted::associatorNames, &filter});
+}
+
+inline CMPIStatus references(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
+                             const CMPIObjectPath* path, const char* resultClass, const char* role,
+                             const char** properties) {
+    EndFilter filter = {{resultClass}, {nullptr}, role, nullptr};
+    return associate(
+        {hostedOf(mi), __func__, context, result, path, properties, Wanted::references, &filter});
+}
+
+inline CMPIStatus referenceNames(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
+                                 const CMPIObjectPath* path, const char* resultClass, const char* role) {
+    EndFilter filter = {{resultClass}, {nullptr}, role, nullptr};
+    return associate(
+        {hostedOf(mi), __func__, context, result, path, nullptr, Wanted::referenceNames, &filter});
+}
+
+// Methods
+
+inline CMPIStatus cleanupMethods(CMPIMethodMI* mi, const CMPIContext* /*context*/, CMPIBoolean /*ends*/) {
+    return release(hostedOf(mi));
+}
+
+inline CMPIStatus invokeMethod(CMPIMethodMI* mi, const CMPIContext* context, const CMPIResult* result,
+                               const CMPIObjectPath* path, const char* method, const CMPIArgs* in,
+                               CMPIArgs* out) {
+    const Hosted& hosted = hostedOf(mi);
+    ServerCall call = {hosted, __func__, context, result, path};
+    call.method = method;
+    return Service::answer(call, [&](const Operation& operation, Names& /*reply*/) {
+        Service::invoke(*hosted.methods, {operation, method, result, in, out});
+    });
+}
+
+// The tables are filled by the order of their members, whose names differ between headers. Slots that are
+// newer than CMPI 1.0 come last and stay empty.
+#pragma GCC diagnostic push
+#pragma GCC diagnostic ignored "-Wmissing-field-initializers"
+inline void fillTables(Hosted& hosted) {
+    const char* const name = hosted.module.name;
+    hosted.instanceTable = {CMPICurrentVersion,     CMPICurrentVersion, name,        cleanupInstances,
+                            enumerateInstanceNames, enumerateInstances, getInstance, createInstance,
+                            modifyInstance,         deleteInstance,     execQuery};
+    hosted.associationTable = {CMPICurrentVersion, CMPICurrentVersion, name,       cleanupAssociations,
+                               associators,        associatorNames,    references, referenceNames};
+    hosted.methodTable = {CMPICurrentVersion, CMPICurrentVersion, name, cleanupMethods, invokeMethod};
+}
+#pragma GCC diagnostic pop
+
+// Factories
+
+inline Hosted& find(Module& module, const CMPIBroker* broker, const CMPIContext* context,
+                    const char* category, Construct construct) {
+    for (Hosted* hosted = module.first; hosted != nullptr; hosted = hosted->next) {
+        if (hosted->broker == broker) {
+            return *hosted;
+        }
+    }
+    auto hosted = std::make_unique<Hosted>(module, broker, category);
+    fillTables(*hosted);
+    const Utf8Thread utf8(hosted->locale);
+    construct(*hosted, Context(broker, context));
+    hosted->next = module.first;
+    module.first = hosted.get();
+    return *hosted.release();
+}
+
+// The object for a broker, made where it is not there yet; null with a status when it cannot be.
+inline Hosted* acquire(Module& module, const CMPIBroker* broker, const CMPIContext* context,
+                       const char* category, Construct construct, CMPIStatus* status) {
+    CMPIStatus own = {CMPI_RC_OK, nullptr};
+    Hosted* hosted = nullptr;
+    try {
+        const std::lock_guard<std::mutex> lock(module.mutex);
+        hosted = &find(module, broker, context, category, construct);
+        ++hosted->users;
+    } catch (...) {
+        own = statusOfException(broker, category, "create");
+    }
+    if (status != nullptr) {
+        *status = own;
+    }
+    return hosted;
+}
+
+template <class Provider, class = void>
+struct CategoryOf {
+    static const char* of(const Module& module) { return module.name; }
+};
+template <class Provider>
+struct CategoryOf<Provider, std::void_t<decltype(Provider::traceCategory)>> {
+    static const char* of(const Module& /*module*/) { return Provider::traceCategory; }
+};
+
+// The record of one kind.
+template <class Provider, class MI>
+MI* makeMI(Module& module, const CMPIBroker* broker, const CMPIContext* context, CMPIStatus* status,
+           MI Hosted::*record) {
+    Hosted* const hosted =
+        acquire(module, broker, context, CategoryOf<Provider>::of(module), construct<Provider>, status);
+    return hosted != nullptr ? &(hosted->*record) : nullptr;
+}
+
+} // namespace oxahv::detail
