@@ -47,6 +47,7 @@ write_basic_package_version_file(
 install(FILES
     ${PROJECT_BINARY_DIR}/oxahvproviderutilities-config.cmake
     ${PROJECT_BINARY_DIR}/oxahvproviderutilities-config-version.cmake
+    ${PROJECT_SOURCE_DIR}/cmake/OxahvProvider.cmake
     DESTINATION ${oxahv_package_dir} COMPONENT development)
 
 # The prefix is found from where the .pc file lies, so that an installed copy can be moved.

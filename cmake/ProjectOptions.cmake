@@ -7,14 +7,8 @@ set(CMAKE_C_STANDARD 11)
 set(CMAKE_C_EXTENSIONS OFF)
 set(CMAKE_POSITION_INDEPENDENT_CODE ON)
 
-# Not set for a project that embeds this one: its compiler may know warnings that nobody has seen here.
-if(PROJECT_IS_TOP_LEVEL)
-    if(NOT CMAKE_BUILD_TYPE AND NOT CMAKE_CONFIGURATION_TYPES)
-        set(CMAKE_BUILD_TYPE RelWithDebInfo CACHE STRING "Kind of build" FORCE)
-    endif()
-    if(NOT DEFINED CMAKE_COMPILE_WARNING_AS_ERROR)
-        set(CMAKE_COMPILE_WARNING_AS_ERROR ON)
-    endif()
+if(PROJECT_IS_TOP_LEVEL AND NOT CMAKE_BUILD_TYPE AND NOT CMAKE_CONFIGURATION_TYPES)
+    set(CMAKE_BUILD_TYPE RelWithDebInfo CACHE STRING "Kind of build" FORCE)
 endif()
 
 # An installed copy finds its libraries from where it lies, so that it can be moved; in the system's own folder the dynamic

@@ -34,8 +34,9 @@
  * this header, so that a process has one set of them. GCC makes them unique global objects, which the dynamic
  * linker shares even between libraries loaded with local symbols; the price is that the first library to
  * bring them stays loaded after `dlclose`. Clang makes them weak: a library can be unloaded, but one that is
- * loaded with local symbols may have a set of its own. Neither changes what is traced. The buffers have no
- * destructor, so a thread may outlive the library.
+ * loaded with local symbols may have a set of its own. A provider that exports its factories alone, as
+ * `oxahv_add_provider` makes it, has a set of its own too and is unloaded. None of this changes what is
+ * traced. The buffers have no destructor, so a thread may outlive the library.
  */
 #pragma once
 

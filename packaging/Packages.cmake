@@ -123,7 +123,7 @@ It shows the replies as MOF or JSON, traces, and injects faults. No CIM
 server is needed."
         BINARIES)
 endif()
-if(TARGET oxahostprovider)
+if(TARGET OXAHostProvider)
     oxahv_package(example oxahv-host-provider admin
         "CIM provider for this machine - example"
 "This provider serves the computer system, its operating system and its network

@@ -42,6 +42,7 @@ public:
     }
     Otherwise(const Otherwise&) = delete;
     Otherwise& operator=(const Otherwise&) = delete;
+    ~Otherwise() { real_ = nullptr; } // may be a local variable of the test's
 
     Object* handle() { return &object_; }
 

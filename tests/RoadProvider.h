@@ -1,6 +1,6 @@
 // A provider that takes each request the library's whole road: the path's keys into a moniker and back, an
 // instance with properties of every kind, and the texts, dates and names that belong to them. As a library it
-// is TestRoadProvider.
+// is libRoad.so.
 #pragma once
 
 #include <ProviderUtilities.h>

@@ -17,7 +17,7 @@ set(oxahost_type_association 3)
 set(oxahost_type_method 5)
 
 set(OXAHOST_PROVIDER OXAHostProvider)
-get_target_property(OXAHOST_LOCATION oxahostprovider OUTPUT_NAME)
+set(OXAHOST_LOCATION ${OXAHOST_PROVIDER})
 set(OXAHOST_SECTIONS)
 set(OXAHOST_CAPABILITIES)
 set(capability 0)

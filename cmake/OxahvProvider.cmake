@@ -1,0 +1,39 @@
+# A library that CIM servers load. An installed copy and this tree offer the same function.
+
+# oxahv_add_provider(NAME [SOURCE…]) makes the target NAME, the module libNAME.so with the provider NAME. It exports the
+# factories NAME_Create_… alone, which lets a server unload it: GCC makes data of inline functions unique in the process, and
+# a library that exports such data stays mapped for good.
+function(oxahv_add_provider name)
+    add_library(${name} MODULE ${ARGN})
+    target_link_libraries(${name} PRIVATE oxahv::providerutilities)
+    set_target_properties(${name} PROPERTIES
+        C_VISIBILITY_PRESET hidden
+        CXX_VISIBILITY_PRESET hidden
+        VISIBILITY_INLINES_HIDDEN ON)
+
+    set(exports ${CMAKE_CURRENT_BINARY_DIR}/${name}.map)
+    file(CONFIGURE OUTPUT ${exports} CONTENT "{ global: ${name}_Create_*; local: *; };\n")
+    target_link_options(${name} PRIVATE -Wl,--version-script=${exports})
+    set_property(TARGET ${name} APPEND PROPERTY LINK_DEPENDS ${exports})
+    # Clang leaves a sanitizer's runtime to the program, so with one some symbols are undefined here.
+    if(NOT "${CMAKE_CXX_FLAGS} ${CMAKE_MODULE_LINKER_FLAGS}" MATCHES "-fsanitize")
+        set(sanitizers $<FILTER:$<TARGET_PROPERTY:${name},COMPILE_OPTIONS>,INCLUDE,^-fsanitize>)
+        target_link_options(${name} PRIVATE $<$<STREQUAL:${sanitizers},>:-Wl,--no-undefined>)
+    endif()
+
+    # Servers want the library in a folder of their own, often by a copy: what is relative holds where that folder lies below
+    # the libraries', the absolute folder everywhere. The system's own folders need neither.
+    get_target_property(is_installed oxahv::providerutilities IMPORTED)
+    if(is_installed)
+        get_target_property(library oxahv::providerutilities LOCATION)
+        cmake_path(GET library PARENT_PATH folder)
+    else()
+        include(GNUInstallDirs)
+        set(folder ${CMAKE_INSTALL_FULL_LIBDIR})
+    endif()
+    if(NOT folder IN_LIST CMAKE_CXX_IMPLICIT_LINK_DIRECTORIES)
+        set_target_properties(${name} PROPERTIES
+            BUILD_RPATH "$ORIGIN/.."
+            INSTALL_RPATH "$ORIGIN/..;${folder}")
+    endif()
+endfunction()
