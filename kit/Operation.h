@@ -7,6 +7,7 @@
 #include "Context.h"
 #include "Instance.h"
 
+#include <algorithm>
 #include <string>
 
 namespace oxahv {
@@ -173,12 +174,14 @@ void eachKey(const Keys* keys, const CMPIObjectPath* path, const Function& funct
 } // namespace detail
 
 inline bool Operation::wants(const char* property) const {
-    for (const char** name = properties_; name != nullptr && *name != nullptr; ++name) {
-        if (detail::sameName(*name, property)) {
-            return true;
-        }
+    if (properties_ == nullptr) {
+        return true;
     }
-    return properties_ == nullptr;
+    const char** name = properties_;
+    while (*name != nullptr && !detail::sameName(*name, property)) {
+        ++name;
+    }
+    return *name != nullptr;
 }
 
 inline Path Operation::path(const char* className, Keys keys) const {
@@ -199,13 +202,10 @@ inline bool Operation::hasKeys(const char* className, Keys keys) const {
     if (count != keys.size() || !isFor(className)) {
         return false;
     }
-    for (const Key& key : keys) {
+    return std::all_of(keys.begin(), keys.end(), [this](const Key& key) {
         const detail::Found sent = detail::keyOf(broker(), path_.handle(), key.name);
-        if (!sent.isThere || !detail::ValueAccess::isSame(key.value, sent)) {
-            return false;
-        }
-    }
-    return true;
+        return sent.isThere && detail::ValueAccess::isSame(key.value, sent);
+    });
 }
 
 inline Instance Operation::instance(const char* className, Keys keys) const {

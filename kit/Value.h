@@ -140,6 +140,8 @@ constexpr CMPIType typeOf() {
  */
 class Value {
 public:
+    Value& operator=(const Value&) = delete;
+
     /** @name From a C++ value
      * Texts, dates, paths, instances and arrays are read when the value is set.
      */
@@ -162,6 +164,7 @@ public:
             real_ = value;
         } else {
             form_ = Form::integer;
+            // NOLINTNEXTLINE(bugprone-signed-char-misuse): a number of CIM, in two's complement
             integer_ = static_cast<std::uint64_t>(value);
         }
     }
@@ -250,7 +253,6 @@ private:
     };
 
     Value(const Value&) = default;
-    Value& operator=(const Value&) = delete;
     explicit Value(Null null) : type_(null.type) {}
     template <class Object>
     Value(CMPIType type, Object* CMPIValue::*member, const Object* object)

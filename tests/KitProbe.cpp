@@ -1,5 +1,7 @@
 #include "KitProbe.h"
 
+#include <cstdlib>
+
 Probe probe;
 
 const std::vector<ValueType> valueTypes = {
@@ -70,6 +72,7 @@ const oxahv::ProviderFactories probeFactories = {KitProbe_Create_InstanceMI, Kit
                                                  KitProbe_Create_MethodMI};
 
 KitTest::KitTest() {
+    ::unsetenv("LOCPATH"); // or the C library's newlocale, which a provider calls, would lose a list of it
     using Declaration = oxahv::ClassDeclaration;
     Declaration value("Kit_Value");
     value.key("Id", CMPI_uint32).property("embedded", CMPI_instance);

@@ -319,7 +319,9 @@ TEST_F(KitRequests, RunInUtf8AndLeaveTheServersLocale) {
     expectNote();
     EXPECT_EQ(std::setlocale(LC_ALL, nullptr), std::string("C"));
     {
+        ::setenv("LOCPATH", TEST_LOCALES, 1);
         const ThreadLocale latin("de_DE.ISO-8859-1");
+        ::unsetenv("LOCPATH");
         expectNote();
         EXPECT_EQ(enumerate([](auto& /*operation*/, auto& /*reply*/) {
                       throw oxahv::Refusal(CMPI_RC_ERR_FAILED, ::nl_langinfo_l(DAY_1, ::uselocale(nullptr)));
@@ -433,7 +435,7 @@ TEST_F(KitRequests, AnswerWithACodeWhateverFailsBelowThem) {
     }
 }
 
-TEST_F(KitRequests, AreServedSideBySide) {
+TEST_F(KitRequests, AreServedAtOnce) {
     std::atomic<unsigned int> failures{0};
     std::vector<std::thread> threads(4);
     for (std::thread& thread : threads) {

@@ -21,7 +21,10 @@ Handle* writable(const Handle* handle) {
 }
 
 struct Status : CMPIStatus {
-    Status() : CMPIStatus{CMPI_RC_OK, nullptr} {}
+    Status() : CMPIStatus() {
+        rc = CMPI_RC_OK;
+        msg = nullptr;
+    }
     Status(const CMPIStatus& status) : CMPIStatus(status) {} // NOLINT(*-explicit-*): the broker's is one
     bool failed() const { return rc != CMPI_RC_OK; }
 };

@@ -393,6 +393,21 @@ Duration durationOf(const Found& found, std::int64_t micros) {
 }
 
 template <class T>
+T numberIn(const Found& found) {
+    static_assert(!std::is_same_v<T, char> && !std::is_same_v<T, wchar_t> && !std::is_same_v<T, char32_t> &&
+                      !std::is_same_v<T, long double>,
+                  "CIM has no such type");
+    using Limits = std::numeric_limits<T>;
+    if constexpr (std::is_floating_point_v<T>) {
+        return static_cast<T>(realIn(found, static_cast<double>(Limits::max())));
+    } else if constexpr (std::is_signed_v<T>) {
+        return static_cast<T>(signedIn(found, Limits::min(), Limits::max()));
+    } else {
+        return static_cast<T>(unsignedIn(found, Limits::max()));
+    }
+}
+
+template <class T>
 T as(const Found& found) {
     if constexpr (IsOptional<T>::value) {
         return found.isNull() ? T() : T(as<typename T::value_type>(found));
@@ -409,18 +424,8 @@ T as(const Found& found) {
         return characterIn(found);
     } else if constexpr (std::is_enum_v<T>) {
         return static_cast<T>(as<std::underlying_type_t<T>>(found));
-    } else if constexpr (std::is_integral_v<T>) {
-        static_assert(!std::is_same_v<T, char> && !std::is_same_v<T, wchar_t> && !std::is_same_v<T, char32_t>,
-                      "CIM has no such type");
-        using Limits = std::numeric_limits<T>;
-        if constexpr (std::is_signed_v<T>) {
-            return static_cast<T>(signedIn(found, Limits::min(), Limits::max()));
-        } else {
-            return static_cast<T>(unsignedIn(found, Limits::max()));
-        }
-    } else if constexpr (std::is_floating_point_v<T>) {
-        static_assert(!std::is_same_v<T, long double>, "CIM has no such type");
-        return static_cast<T>(realIn(found, static_cast<double>(std::numeric_limits<T>::max())));
+    } else if constexpr (std::is_arithmetic_v<T>) {
+        return numberIn<T>(found);
     } else if constexpr (std::is_same_v<T, std::string>) {
         return textOf(found);
     } else if constexpr (std::is_same_v<T, std::wstring>) {
