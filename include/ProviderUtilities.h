@@ -39,12 +39,14 @@
 #ifndef CMPI_PLATFORM_LINUX_GENERIC_GNU
 #define CMPI_PLATFORM_LINUX_GENERIC_GNU
 #endif
+/** @cond */
 #pragma push_macro("__cdecl")
 #undef __cdecl
 #define __cdecl // NOLINT(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
 #include <cmpidt.h>
 #include <cmpift.h>
 #pragma pop_macro("__cdecl")
+/** @endcond */
 
 #include <string>
 #include <vector>
