@@ -32,6 +32,7 @@ namespace oxahv {
  */
 class AssociationProvider {
 public:
+    /** A provider that serves nothing yet. */
     AssociationProvider() = default;
     virtual ~AssociationProvider() = default;
     AssociationProvider(const AssociationProvider&) = delete;

@@ -37,6 +37,7 @@ namespace oxahv {
  */
 class InstanceProvider {
 public:
+    /** A provider that serves nothing yet. */
     InstanceProvider() = default;
     virtual ~InstanceProvider() = default;
     InstanceProvider(const InstanceProvider&) = delete;

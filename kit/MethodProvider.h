@@ -43,6 +43,7 @@ namespace oxahv {
  */
 class MethodProvider {
 public:
+    /** A provider that serves nothing yet. */
     MethodProvider() = default;
     virtual ~MethodProvider() = default;
     MethodProvider(const MethodProvider&) = delete;

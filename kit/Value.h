@@ -271,6 +271,7 @@ private:
     Form form_ = Form::null;
     CMPIType type_ = CMPI_null;
     Element element_ = nullptr;
+    /** @cond its members, which are private, would be listed */
     union {
         CMPIValue value_ = {};
         std::uint64_t integer_;
@@ -278,6 +279,7 @@ private:
         std::int64_t micros_;
         Source source_;
     };
+    /** @endcond */
 };
 
 inline Value::Value(const CMPIData& value) : type_(value.type) {
