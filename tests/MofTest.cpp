@@ -28,7 +28,7 @@ struct Words {
     std::string operator()(const std::string& value) const {
         std::string text = "\"";
         for (const char c : value) { // control characters by their number
-            text += c >= 0 && c < ' ' ? '<' + std::to_string(c) + '>' : std::string(1, c);
+            text += static_cast<unsigned char>(c) < ' ' ? '<' + std::to_string(c) + '>' : std::string(1, c);
         }
         return text + '"';
     }

@@ -98,7 +98,7 @@ TEST_P(Conversion, TakesEveryByteSequenceThatTheCLibraryTakes) {
     for (int round = 0; round < 5000; ++round) {
         std::wstring text(random() % 20, L'\0');
         std::generate(text.begin(), text.end(), [&random] {
-            const wchar_t limits[] = {0x80, 0x100, 0x800, 0xD900, 0x10000, lastCodePoint + 3, -1};
+            const wchar_t limits[] = {0x80, 0x100, 0x800, 0xD900, 0x10000, lastCodePoint + 3, 0};
             const wchar_t limit = limits[random() % 7];
             return limit > 0 ? static_cast<wchar_t>(random() % static_cast<unsigned int>(limit))
                              : static_cast<wchar_t>(random());

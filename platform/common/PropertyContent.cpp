@@ -36,20 +36,20 @@ PropertyContent::PropertyContent(std::string bytes) : read_(std::move(bytes)) {
 
 void PropertyContent::readLine(std::size_t begin, std::size_t size, unsigned char endSize) {
     const PropertyText::Line line = PropertyText::split(std::string_view(read_).substr(begin, size));
-    lines_.push_back({begin, size, line.valueStart, false, endSize});
+    lines_.push_back({begin, size, line.key, line.value, false, endSize});
     if (line.damage != nullptr) {
         damaged_.push_back({lines_.size(), line.damage});
     } else if (line.isEntry) {
-        addEntry(line);
+        addEntry();
     }
 }
 
 // Adds the last line to the index, unless it cannot be read.
-void PropertyContent::addEntry(const PropertyText::Line& line) {
+void PropertyContent::addEntry() {
     std::wstring key;
-    const char* damage = PropertyText::read(line.key, key);
+    const char* damage = PropertyText::read(keyOf(lines_.back()), key);
     if (damage == nullptr) {
-        damage = PropertyText::check(line.value);
+        damage = PropertyText::check(valueOf(lines_.back()));
     }
     if (damage != nullptr) {
         damaged_.push_back({lines_.size(), damage});
@@ -68,7 +68,7 @@ void PropertyContent::addEntry(const PropertyText::Line& line) {
 PropertyContent::Index::iterator PropertyContent::find(std::wstring_view key, std::size_t hash) {
     const auto [first, last] = index_.equal_range(hash);
     const auto found = std::find_if(first, last, [&](const auto& entry) {
-        return PropertyText::readsAs(PropertyText::split(textOf(lines_[entry.second])).key, key);
+        return PropertyText::readsAs(keyOf(lines_[entry.second]), key);
     });
     return found == last ? index_.end() : found;
 }
@@ -78,11 +78,19 @@ std::string_view PropertyContent::textOf(const Line& line) const {
                           : std::string_view(read_).substr(line.begin, line.size);
 }
 
+std::string_view PropertyContent::keyOf(const Line& line) const {
+    return line.key.of(textOf(line));
+}
+
+std::string_view PropertyContent::valueOf(const Line& line) const {
+    return line.value.of(textOf(line));
+}
+
 std::wstring PropertyContent::value(const std::wstring& key) {
     std::wstring value;
     const auto entry = find(key, hashOf(key));
     if (entry != index_.end()) {
-        PropertyText::read(PropertyText::split(textOf(lines_[entry->second])).value, value);
+        PropertyText::read(valueOf(lines_[entry->second]), value);
     }
     return value;
 }
@@ -95,32 +103,36 @@ void PropertyContent::set(const std::wstring& key, std::wstring_view value) {
         return;
     }
     Line& line = lines_[entry->second];
-    if (!PropertyText::readsAs(PropertyText::split(textOf(line)).value, value)) {
+    if (!PropertyText::readsAs(valueOf(line), value)) {
         change(line, value);
     }
 }
 
 // Replaces a line's value. What is before it stays as somebody has written it.
 void PropertyContent::change(Line& line, std::wstring_view value) {
-    std::string text(textOf(line).substr(0, line.valueStart));
+    std::string text(textOf(line).substr(0, line.value.start));
     text += PropertyText::escapeValue(value);
+    const std::size_t valueSize = text.size() - line.value.start;
     if (line.isWritten) {
         written_[line.begin] = std::move(text);
-        return;
+    } else {
+        written_.push_back(std::move(text));
+        line.begin = written_.size() - 1;
+        line.isWritten = true;
     }
-    written_.push_back(std::move(text));
-    line.begin = written_.size() - 1;
-    line.isWritten = true;
+    line.value.size = valueSize;
 }
 
 void PropertyContent::append(const std::wstring& key, std::size_t hash, std::wstring_view value) {
     std::string text = PropertyText::escapeKey(key) + '=';
     const std::size_t valueStart = text.size();
     text += PropertyText::escapeValue(value);
+    const PropertyText::Part writtenKey{0, valueStart - 1};
+    const PropertyText::Part writtenValue{valueStart, text.size() - valueStart};
     written_.push_back(std::move(text)); // without a line that leads to it, it does not count
     const auto entry = index_.emplace(hash, lines_.size());
     try {
-        lines_.push_back({written_.size() - 1, 0, valueStart, true, newEndSize()});
+        lines_.push_back({written_.size() - 1, 0, writtenKey, writtenValue, true, newEndSize()});
     } catch (...) {
         index_.erase(entry);
         throw;

@@ -12,8 +12,6 @@ namespace TK::PropertyText {
 
 namespace {
 
-constexpr std::string_view blanks = " \t";
-
 struct Escape {
     char letter;
     wchar_t character;
@@ -102,10 +100,19 @@ std::size_t findSeparator(std::string_view text) {
     return std::string_view::npos;
 }
 
-std::string_view trimmed(std::string_view text) {
-    text.remove_prefix(std::min(text.find_first_not_of(blanks), text.size()));
-    text.remove_suffix(text.size() - (text.find_last_not_of(blanks) + 1));
-    return text;
+bool isBlank(char c) {
+    return c == ' ' || c == '\t';
+}
+
+// What is between two places of a text, without the blanks at both ends.
+Part trimmedPart(std::string_view text, std::size_t begin, std::size_t end) {
+    while (begin < end && isBlank(text[begin])) {
+        ++begin;
+    }
+    while (begin < end && isBlank(text[end - 1])) {
+        --end;
+    }
+    return {begin, end - begin};
 }
 
 // Characters that would be invisible in the file, or would mean something to an editor or to the first line's
@@ -164,7 +171,7 @@ std::string escape(std::wstring_view text, std::wstring_view special) {
 
 Line split(std::string_view text) {
     Line line;
-    const std::string_view content = trimmed(text);
+    const std::string_view content = trimmedPart(text, 0, text.size()).of(text);
     if (content.empty() || content.front() == '#') {
         return line;
     }
@@ -174,9 +181,8 @@ Line split(std::string_view text) {
         return line;
     }
     line.isEntry = true;
-    line.key = trimmed(text.substr(0, separator));
-    line.value = trimmed(text.substr(separator + 1));
-    line.valueStart = std::min(text.find_first_not_of(blanks, separator + 1), text.size());
+    line.key = trimmedPart(text, 0, separator);
+    line.value = trimmedPart(text, separator + 1, text.size());
     return line;
 }
 

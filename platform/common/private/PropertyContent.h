@@ -31,16 +31,19 @@ private:
     struct Line {
         std::size_t begin; // in read_, or the index in written_
         std::size_t size;  // in read_, without the end
-        std::size_t valueStart;
+        PropertyText::Part key;
+        PropertyText::Part value;
         bool isWritten;
         unsigned char endSize; // 0, 1 for LF, 2 for CRLF
     };
     using Index = std::unordered_multimap<std::size_t, std::size_t>; // hash of a key -> line
 
     void readLine(std::size_t begin, std::size_t size, unsigned char endSize);
-    void addEntry(const PropertyText::Line& line);
+    void addEntry();
     Index::iterator find(std::wstring_view key, std::size_t hash);
     std::string_view textOf(const Line& line) const;
+    std::string_view keyOf(const Line& line) const;
+    std::string_view valueOf(const Line& line) const;
     unsigned char newEndSize() const;
     void change(Line& line, std::wstring_view value);
     void append(const std::wstring& key, std::size_t hash, std::wstring_view value);

@@ -6,12 +6,19 @@
 
 namespace TK::PropertyText {
 
+// Of the text of a line.
+struct Part {
+    std::size_t start = 0;
+    std::size_t size = 0;
+
+    std::string_view of(std::string_view text) const { return text.substr(start, size); }
+};
+
 struct Line {
     const char* damage = nullptr; // why the line cannot be read
     bool isEntry = false;         // else it is a comment, empty or damaged
-    std::string_view key;         // as written, without the blanks at its ends
-    std::string_view value;       // likewise
-    std::size_t valueStart = 0;   // in the line
+    Part key;                     // as written, without the blanks at its ends
+    Part value;                   // likewise
 };
 
 // Finds the parts of a line, and reads neither escapes nor characters.

@@ -1,0 +1,16 @@
+# Toolchain: GCC for 64-bit ARM on another machine (Debian: g++-aarch64-linux-gnu). Where qemu-user is installed, tests run
+# under it. OXAHV_ARM64_ROOT is a folder with further packages for that machine.
+set(CMAKE_SYSTEM_NAME Linux)
+set(CMAKE_SYSTEM_PROCESSOR aarch64)
+set(CMAKE_C_COMPILER aarch64-linux-gnu-gcc)
+set(CMAKE_CXX_COMPILER aarch64-linux-gnu-g++)
+set(CMAKE_FIND_ROOT_PATH /usr/aarch64-linux-gnu ${OXAHV_ARM64_ROOT})
+list(APPEND CMAKE_TRY_COMPILE_PLATFORM_VARIABLES OXAHV_ARM64_ROOT)
+set(CMAKE_FIND_ROOT_PATH_MODE_PROGRAM NEVER)
+set(CMAKE_FIND_ROOT_PATH_MODE_LIBRARY ONLY)
+set(CMAKE_FIND_ROOT_PATH_MODE_INCLUDE ONLY)
+set(CMAKE_FIND_ROOT_PATH_MODE_PACKAGE ONLY)
+find_program(OXAHV_QEMU qemu-aarch64)
+if(OXAHV_QEMU)
+    set(CMAKE_CROSSCOMPILING_EMULATOR ${OXAHV_QEMU} -L /usr/aarch64-linux-gnu)
+endif()
