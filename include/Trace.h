@@ -79,7 +79,7 @@ constexpr int messageLevelCode = 6000;    ///< messages
  */
 /** @{ */
 /** A C text; null appears as "(null)". */
-inline std::string_view traceView(const char* text) {
+[[gnu::noinline]] inline std::string_view traceView(const char* text) {
     return text != nullptr ? std::string_view(text) : std::string_view("(null)");
 }
 /** The decimal digits of a number. */
