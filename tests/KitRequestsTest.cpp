@@ -115,11 +115,17 @@ TEST_F(KitRequests, OfInstancesFollowFromAllOfThem) {
     EXPECT_EQ(textOf(request_.enumerateInstances(path("kit_item"))), one + two);
     EXPECT_TRUE(request_.enumerateInstances(path("Kit_Item")).done);
     EXPECT_EQ(textOf(request_.enumerateInstanceNames(path("Kit_Item"))), both);
-    for (const KeyMode mode : {KeyMode::exact, KeyMode::untyped, KeyMode::chars}) {
+    for (const KeyMode mode :
+         {KeyMode::exact, KeyMode::untyped, KeyMode::chars, KeyMode::signedIntegers, KeyMode::text}) {
         broker_.setKeyMode(mode);
         EXPECT_EQ(get(onePath), one);
         EXPECT_EQ(get("kit_item.NUMBER=2,NAME=\"two\""), two);
     }
+    broker_.setNewInstances(oxahv::NewInstances::bare);
+    EXPECT_EQ(get(onePath), one);
+    broker_.injectFault("getKey", {CMPI_RC_ERR_NOT_FOUND, false, 0, 1, 0}); // as if names had another case
+    EXPECT_EQ(get("kit_item.NUMBER=2,NAME=\"two\""), two);
+    broker_.clearFaults();
     const std::vector<std::string> wanted = {"note"};
     EXPECT_EQ(get(onePath, &wanted), "[Name=\"one\" Number=1 Note=\"\u00fc\u20ac\"] ");
     EXPECT_EQ(get(twoPath, &wanted), "[Name=\"two\" Number=2] ");
