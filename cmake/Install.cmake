@@ -17,7 +17,7 @@ oxahv_install_library(oxahvproviderutilities runtime development oxahvproviderut
 oxahv_install_library(oxahvbroker broker broker_development oxahvbroker-targets)
 
 set(oxahv_include ${CMAKE_INSTALL_INCLUDEDIR}/oxahv)
-install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/ ${PROJECT_SOURCE_DIR}/export/
+install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/ ${PROJECT_SOURCE_DIR}/export/ ${PROJECT_BINARY_DIR}/export/include/
     DESTINATION ${oxahv_include} COMPONENT development FILES_MATCHING PATTERN "*.h")
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/kit/
     DESTINATION ${oxahv_include}/kit COMPONENT development FILES_MATCHING PATTERN "*.h")

@@ -11,6 +11,13 @@ if(PROJECT_IS_TOP_LEVEL AND NOT CMAKE_BUILD_TYPE AND NOT CMAKE_CONFIGURATION_TYP
     set(CMAKE_BUILD_TYPE RelWithDebInfo CACHE STRING "Kind of build" FORCE)
 endif()
 
+# Installs one part, where anything is installed at all.
+macro(oxahv_install)
+    if(OXAHV_INSTALL)
+        install(${ARGN})
+    endif()
+endmacro()
+
 # An installed copy finds its libraries from where it lies, so that it can be moved; in the system's own folder the dynamic
 # linker finds them. Paths in the build tree are relative too: a file does not depend on where it was built.
 include(GNUInstallDirs)

@@ -1,5 +1,6 @@
 // oxahv-provider: the command line.
 
+#include "OxahvVersion.h"
 #include "Runner.h"
 #include "check/Check.h"
 #include "show/Text.h"
@@ -254,7 +255,7 @@ int parseAndRun(int argc, char** argv) {
     }
     CheckOptions checkOptions;
     addCheck(app, checkOptions);
-    app.set_version_flag("--version", "oxahv-provider " OXAHV_VERSION);
+    app.set_version_flag("--version", "oxahv-provider " OXAHV_VERSION_STRING);
     app.get_formatter()->label("SUBCOMMAND", "VERB");
     app.require_subcommand(1);
     app.footer(footer);
