@@ -105,6 +105,7 @@ void takeAttributes(int file, const std::string& path, const std::string& model,
         if (!keepsGroup) {
             closeToGroup(*list);
         }
+        // NOLINTNEXTLINE(clang-analyzer-cplusplus.InnerPointer)
         if (::fsetxattr(file, accessList.data(), list->data(), list->size(), 0) != 0) {
             fail("cannot keep the access control list of", model);
         }

@@ -3,6 +3,7 @@
 
 #include <unistd.h>
 
+// NOLINTNEXTLINE(cert-dcl58-cpp): a namespace of our own, not one of the standard
 namespace posix {
 
 // Closes the descriptor at its end. A negative number, such as a failed open() returns, is no open file.
