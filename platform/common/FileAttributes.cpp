@@ -102,11 +102,11 @@ void takeAttributes(int file, const std::string& path, const std::string& model,
         mode &= ~static_cast<mode_t>(list ? S_ISGID : S_IRWXG | S_ISGID);
     }
     if (list) {
+        std::string& entries = *list;
         if (!keepsGroup) {
-            closeToGroup(*list);
+            closeToGroup(entries);
         }
-        // NOLINTNEXTLINE(clang-analyzer-cplusplus.InnerPointer)
-        if (::fsetxattr(file, accessList.data(), list->data(), list->size(), 0) != 0) {
+        if (::fsetxattr(file, accessList.data(), entries.data(), entries.size(), 0) != 0) {
             fail("cannot keep the access control list of", model);
         }
     } else if (::fremovexattr(file, accessList.data()) != 0 && !isMissing()) {

@@ -42,8 +42,7 @@ constexpr std::array<bool, 0x80> invariantCharacters = [] {
         result[code] = true;
     }
     for (const char national : std::string_view("#$@[\\]^`{|}~")) {
-        // NOLINTNEXTLINE(bugprone-signed-char-misuse): ASCII alone comes here
-        result[static_cast<std::size_t>(national)] = false;
+        result[codeOf(national)] = false;
     }
     return result;
 }();

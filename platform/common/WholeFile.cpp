@@ -22,7 +22,7 @@ namespace TK::WholeFile {
 
 namespace {
 
-using posix::Descriptor;
+using files::Descriptor;
 
 // Temporary files are named `.NAME.XXXXXX.saving`, X being any letter or digit.
 constexpr std::string_view anyName = "XXXXXX";

@@ -179,7 +179,7 @@ bool endsInsideLine(const std::string& path) {
     if (::stat(path.c_str(), &status) != 0 || !S_ISREG(status.st_mode) || status.st_size == 0) {
         return false;
     }
-    const posix::Descriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
+    const files::Descriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
     char last = '\n';
     return ::pread(file.get(), &last, 1, status.st_size - 1) == 1 && last != '\n';
 }
@@ -198,7 +198,7 @@ struct LogFile {
     explicit LogFile(const std::string& path)
         : file(openLog(path)), lines(file.get(), endsInsideLine(path)) {}
 
-    posix::Descriptor file;
+    files::Descriptor file;
     LineWriter lines;
 };
 

@@ -3,8 +3,8 @@
 
 #include <unistd.h>
 
-// NOLINTNEXTLINE(cert-dcl58-cpp): a namespace of our own, not one of the standard
-namespace posix {
+// Not posix, the name of the folder: C++ reserves that namespace.
+namespace files {
 
 // Closes the descriptor at its end. A negative number, such as a failed open() returns, is no open file.
 class Descriptor {
@@ -28,4 +28,4 @@ private:
     int number_;
 };
 
-} // namespace posix
+} // namespace files

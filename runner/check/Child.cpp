@@ -16,7 +16,7 @@
 
 namespace {
 
-using posix::Descriptor;
+using files::Descriptor;
 
 constexpr char finishedMark = '.'; // no message begins with it
 
