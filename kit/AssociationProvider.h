@@ -5,6 +5,7 @@
 #pragma once
 
 #include "Replies.h"
+#include "detail/MemberFunction.h"
 
 #include <vector>
 
@@ -54,7 +55,7 @@ protected:
      */
     template <class Class>
     void associate(const char* className, void (Class::*function)(const Operation&, Instances&)) {
-        classes_.push_back({className, static_cast<Function>(function)});
+        classes_.push_back({className, detail::memberOfBase<Function>(function)});
     }
 
 private:

@@ -5,6 +5,7 @@
 #pragma once
 
 #include "Replies.h"
+#include "detail/MemberFunction.h"
 
 #include <vector>
 
@@ -72,7 +73,7 @@ protected:
      */
     template <class Class>
     void serve(const char* className, void (Class::*function)(const Operation&, Instances&)) {
-        classes_.push_back({className, static_cast<Function>(function)});
+        classes_.push_back({className, detail::memberOfBase<Function>(function)});
     }
 
 private:
