@@ -59,7 +59,7 @@ public:
 
     /**
      * Whether another path names the same object: the same class and keys, in any order, names in any case,
-     * numbers in any type. Namespaces are compared by nobody: a client may leave them out of a reference.
+     * numbers in any type. Namespaces are not compared: a client may leave them out of a reference.
      * @throws Refusal `CMPI_RC_ERR_INVALID_PARAMETER` when a key cannot be compared: NULL, or a text where
      * the other path has a number or reference; else the broker's status.
      */
@@ -74,33 +74,4 @@ inline Value::Value(const Path& value) : Value(value.handle()) {}
 
 } // namespace oxahv
 
-#include "detail/Write.h" // which compares paths, and so needs the class
-
-namespace oxahv {
-
-inline Path& Path::addKey(const char* name, const Value& value) {
-    detail::ValueAccess::giveKey(broker_, handle_, name, value);
-    return *this;
-}
-
-inline bool Path::names(const Path& other) const {
-    detail::Status status;
-    detail::Status otherStatus;
-    const CMPICount count = CMGetKeyCount(handle_, &status);
-    const CMPICount otherCount = CMGetKeyCount(other.handle_, &otherStatus);
-    detail::require(status, "count the keys");
-    detail::require(otherStatus, "count the keys");
-    if (count != otherCount || !isClass(other.className())) {
-        return false;
-    }
-    for (CMPICount i = 0; i < count; ++i) {
-        const detail::NamedKey key(handle_, i);
-        const detail::Found sent = detail::keyOf(other.broker_, other.handle_, key.name);
-        if (!sent.isThere || !detail::ValueAccess::isSame(key.data, sent)) {
-            return false;
-        }
-    }
-    return true;
-}
-
-} // namespace oxahv
+#include "detail/Write.h" // the members that hand values over; after the class, which it needs

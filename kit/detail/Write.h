@@ -405,3 +405,32 @@ inline bool ValueAccess::isSame(const Value& value, const Found& sent) {
 }
 
 } // namespace oxahv::detail
+
+namespace oxahv {
+
+inline Path& Path::addKey(const char* name, const Value& value) {
+    detail::ValueAccess::giveKey(broker_, handle_, name, value);
+    return *this;
+}
+
+inline bool Path::names(const Path& other) const {
+    detail::Status status;
+    detail::Status otherStatus;
+    const CMPICount count = CMGetKeyCount(handle_, &status);
+    const CMPICount otherCount = CMGetKeyCount(other.handle_, &otherStatus);
+    detail::require(status, "count the keys");
+    detail::require(otherStatus, "count the keys");
+    if (count != otherCount || !isClass(other.className())) {
+        return false;
+    }
+    for (CMPICount i = 0; i < count; ++i) {
+        const detail::NamedKey key(handle_, i);
+        const detail::Found sent = detail::keyOf(other.broker_, other.handle_, key.name);
+        if (!sent.isThere || !detail::ValueAccess::isSame(key.data, sent)) {
+            return false;
+        }
+    }
+    return true;
+}
+
+} // namespace oxahv
