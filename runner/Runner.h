@@ -16,7 +16,7 @@ struct Library {
     std::vector<std::string> classes{}; // that it serves; empty: all that it answers for
 };
 
-// In what the broker is like one server or another.
+// How the broker serves requests, where CIM servers differ.
 struct Conduct {
     oxahv::KeyMode keyMode = oxahv::KeyMode::exact;
     oxahv::NewInstances newInstances = oxahv::NewInstances::full;

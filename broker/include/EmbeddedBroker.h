@@ -25,7 +25,7 @@
  * owner, unless the caller released it before. What a `clone` slot or `prepareAttachThread` returned belongs
  * to its caller, who releases it with its `release` slot; what is left then dies with the broker. A part of
  * an object, such as a property's string, dies with the object, or earlier when another value takes its place
- * or a filter removes it; its release does nothing. An object may be used after its release by nobody. A
+ * or a filter removes it; its release does nothing. Nobody may use an object after its release. A
  * memory mark frees what the current owner has got since.
  *
  * **Encoding.** All texts are UTF-8; a CMPIString keeps its bytes as they came.

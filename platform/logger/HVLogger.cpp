@@ -112,7 +112,7 @@ void change(Change&& apply) {
 }
 
 // Keeps the signals of a failed write from a thread. A closed pipe and a file that has reached its limit
-// would end the process, although a log that cannot be written is to stop nobody's request.
+// would end the process, although a log that cannot be written must not fail a request.
 class WithoutWriteSignals {
 public:
     WithoutWriteSignals() {

@@ -289,8 +289,8 @@ void CheckRun::mindRefusals() {
         if (!checked.isServed && !isNamed && schemas.count(schemaOf(checked.name)) != 0) {
             report_.findings.add({CheckKind::notServed, checked.name, passes().front().name,
                                   textOf(queryOf("ein", checked.name)),
-                                  checked.answer + "; it serves other classes of this schema: is the name"
-                                                   " written rightly where it looks at it?"});
+                                  checked.answer + "; it serves other classes of this schema: does it"
+                                                   " compare the class with a misspelt name?"});
         }
     }
 }

@@ -1,4 +1,5 @@
-// A crash of the provider in a request, for which no process is left that could say more than one line.
+// Reports a crash of the provider in a plain request. The crash ends this process, so its signal handler
+// writes the report, which is one line.
 #pragma once
 
 #include <EmbeddedBroker.h>

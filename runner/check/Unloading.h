@@ -3,5 +3,6 @@
 
 #include <string>
 
-// Empty when the library is mapped no more; else why it is, for a person. Knows ELF files of this machine.
+// Empty once the library is unmapped; otherwise a sentence that explains why it still is mapped. Reads ELF
+// files of this machine.
 std::string whyStillMapped(const std::string& library);
