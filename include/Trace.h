@@ -45,16 +45,13 @@
 #include "StringConversion.h"
 #include "TKExport.h"
 
-#include <algorithm>
-#include <charconv>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
-#include <limits>
-#include <locale>
+#include <ios>
 #include <ostream>
-#include <sstream>
 #include <string>
+#include <string_view>
 #include <type_traits>
 
 namespace TK {
@@ -77,47 +74,110 @@ constexpr int messageLevelCode = 6000;    ///< messages
 /** @} */
 
 /** @name Putting a text together
- * The pieces of a trace's text, copied one behind the other: what `snprintf` would make of them, at a
- * fraction of its cost. They are inlined where a trace point stands, since most pieces are constants there:
- * then the compiler knows their lengths, and a piece is a few moves. Each copies as much as fits before `end`
- * and returns where the next piece begins.
+ * What `snprintf` would make of the pieces, at a fraction of its cost. One copy of this code serves all trace
+ * points of a module.
  */
 /** @{ */
-/** A text of known size. */
-[[gnu::always_inline]] inline char* tracePiece(char* to, const char* end, const char* text,
-                                               std::size_t size) {
-    const auto room = static_cast<std::size_t>(end - to);
-    if (size > room) {
-        std::memcpy(to, text, room);
-        return to + room;
-    }
-    std::memcpy(to, text, size);
-    return to + size;
-}
 /** A C text; null appears as "(null)". */
-[[gnu::always_inline]] inline char* tracePiece(char* to, const char* end, const char* text) {
-    if (text == nullptr) {
-        text = "(null)";
+[[gnu::noinline]] inline std::string_view traceView(const char* text) {
+    return text != nullptr ? std::string_view(text) : std::string_view("(null)");
+}
+/** The decimal digits of a number. */
+class TK_HIDDEN TraceNumber {
+public:
+    explicit TraceNumber(int number) {
+        auto rest = static_cast<unsigned int>(number);
+        rest = number < 0 ? 0U - rest : rest;
+        do {
+            characters_[--begin_] = static_cast<char>('0' + rest % 10);
+            rest /= 10;
+        } while (rest != 0);
+        if (number < 0) {
+            characters_[--begin_] = '-';
+        }
     }
-    return tracePiece(to, end, text, std::strlen(text));
+    /** The number of characters. */
+    std::size_t size() const { return mostSize - begin_; }
+    /** Copies them, and what follows them up to the most that there can be: a few moves. */
+    void copyTo(char* to) const { std::memcpy(to, characters_ + begin_, mostSize); }
+    /** The characters; they belong to this object. */
+    std::string_view view() const { return {characters_ + begin_, size()}; }
+
+    static constexpr std::size_t mostSize = sizeof "-2147483648" - 1; ///< of the longest number
+
+private:
+    char characters_[2 * mostSize] = {};
+    std::size_t begin_ = mostSize;
+};
+/** @name One piece, to a place that has room for it; returns where the next one begins. */
+/** @{ */
+inline char* tracePiece(char* to, std::string_view text) {
+    std::memcpy(to, text.data(), text.size());
+    return to + text.size();
 }
-/** A number in decimal digits. */
-inline char* tracePiece(char* to, const char* end, int number) {
-    char digits[std::numeric_limits<int>::digits10 + 2]; // NOLINT(*-member-init): written next
-    const char* const last = std::to_chars(digits, digits + sizeof digits, number).ptr;
-    const std::size_t size =
-        std::min(static_cast<std::size_t>(last - digits), static_cast<std::size_t>(end - to));
-    std::memcpy(to, digits, size);
-    return to + size;
+inline char* tracePiece(char* to, const TraceNumber& number) {
+    number.copyTo(to);
+    return to + number.size();
 }
-/** Fills a buffer with the pieces, up to its last byte but one, and the rest of it with zeros. */
+/** @} */
+/** @name One piece, as much as fits before `end`. */
+/** @{ */
+[[gnu::noinline]] TK_HIDDEN inline char* tracePiece(char* to, const char* end, std::string_view text) {
+    return to + text.copy(to, static_cast<std::size_t>(end - to));
+}
+inline char* tracePiece(char* to, const char* end, const TraceNumber& number) {
+    return tracePiece(to, end, number.view());
+}
+/** @} */
+/** Fills a buffer with the pieces, up to its last byte but one, and the rest of it with zeros. Inlined into
+ * the few functions below, where the compiler knows the sizes of most pieces; otherwise each is a call. */
 template <class... Pieces>
-[[gnu::always_inline]] inline char* traceText(char (&buffer)[traceBufferSize], Pieces... pieces) {
+[[gnu::always_inline]] inline char* traceText(char (&buffer)[traceBufferSize], const Pieces&... pieces) {
     char* const end = buffer + sizeof buffer;
     char* to = buffer;
-    ((to = tracePiece(to, end - 1, pieces)), ...);
+    if ((pieces.size() + ...) < sizeof buffer - TraceNumber::mostSize) {
+        ((to = tracePiece(to, pieces)), ...);
+    } else {
+        ((to = tracePiece(to, end - 1, pieces)), ...);
+    }
     std::memset(to, 0, static_cast<std::size_t>(end - to));
     return buffer;
+}
+/** The text of an entry, an exit or a message. */
+[[gnu::noinline]] TK_HIDDEN inline char* traceFlow(char (&buffer)[traceBufferSize], std::string_view subject,
+                                                   std::string_view file, int line, MessageType type) {
+    using View = std::string_view;
+    switch (type) {
+    case ENTERING:
+    case EXITING:
+        return traceText(buffer, type == ENTERING ? View("ENTERING: ") : View("EXITING: "), subject,
+                         View("() in "), file, View(" [Line: "), TraceNumber(line), View("]"));
+    case MESSAGE:
+        return traceText(buffer, View("MESSAGE [File: "), file, View(", Line: "), TraceNumber(line),
+                         View("]: "), subject);
+    }
+    return traceText(buffer, View());
+}
+/** The text of a variable, whose value is a text or a number. */
+template <class Value>
+[[gnu::noinline]] TK_HIDDEN inline char* traceVariable(char (&buffer)[traceBufferSize], std::string_view name,
+                                                       std::string_view file, int line, const Value& value) {
+    using View = std::string_view;
+    return traceText(buffer, View("VARIABLE: '"), name, View("' has Value '"), value, View("' at line "),
+                     TraceNumber(line), View(" in "), file);
+}
+/** The text of an entry or an exit with parameters. */
+[[gnu::noinline]] TK_HIDDEN inline char* traceParameters(char (&buffer)[traceBufferSize],
+                                                         std::string_view function, std::string_view file,
+                                                         int line, std::string_view parameters,
+                                                         MessageType type) {
+    using View = std::string_view;
+    if (type != ENTERING && type != EXITING) {
+        return traceText(buffer, View());
+    }
+    return traceText(buffer, type == ENTERING ? View("ENTERING: ") : View("EXITING: "), function,
+                     View("() in "), file, View(" [Line: "), TraceNumber(line), View("],Parameters List: "),
+                     parameters);
 }
 /** @} */
 
@@ -125,6 +185,8 @@ template <class... Pieces>
  * Each zeroes its own buffer, formats its text into it and returns the buffer. The buffer is the calling
  * thread's; it holds the text until that thread calls the same function again. Null texts appear as "(null)".
  * A text is cut at 511 bytes. Nothing is thrown.
+ *
+ * They are always inlined, so that a library exports their buffers alone.
  *
  * @param file the name of the source file, without directories.
  * @param line the line in it.
@@ -139,16 +201,7 @@ template <class... Pieces>
 [[gnu::always_inline]] inline TK_EXPORT char* trace(const char* subject, const char* file, unsigned int line,
                                                     MessageType type) {
     static thread_local char messageBuffer[traceBufferSize];
-    const auto shownLine = static_cast<int>(line);
-    switch (type) {
-    case ENTERING:
-        return traceText(messageBuffer, "ENTERING: ", subject, "() in ", file, " [Line: ", shownLine, "]");
-    case EXITING:
-        return traceText(messageBuffer, "EXITING: ", subject, "() in ", file, " [Line: ", shownLine, "]");
-    case MESSAGE:
-        return traceText(messageBuffer, "MESSAGE [File: ", file, ", Line: ", shownLine, "]: ", subject);
-    }
-    return traceText(messageBuffer, "");
+    return traceFlow(messageBuffer, traceView(subject), traceView(file), static_cast<int>(line), type);
 }
 
 /**
@@ -159,8 +212,8 @@ template <class... Pieces>
 [[gnu::always_inline]] inline TK_EXPORT char* trace(const char* name, const char* file, unsigned int line,
                                                     unsigned int value) {
     static thread_local char messageBuffer[traceBufferSize];
-    return traceText(messageBuffer, "VARIABLE: '", name, "' has Value '", static_cast<int>(value),
-                     "' at line ", static_cast<int>(line), " in ", file);
+    return traceVariable(messageBuffer, traceView(name), traceView(file), static_cast<int>(line),
+                         TraceNumber(static_cast<int>(value)));
 }
 
 /**
@@ -171,8 +224,8 @@ template <class... Pieces>
 [[gnu::always_inline]] inline TK_EXPORT char* trace(const char* name, const char* file, unsigned int line,
                                                     const char* value) {
     static thread_local char messageBuffer[traceBufferSize];
-    return traceText(messageBuffer, "VARIABLE: '", name, "' has Value '", value, "' at line ",
-                     static_cast<int>(line), " in ", file);
+    return traceVariable(messageBuffer, traceView(name), traceView(file), static_cast<int>(line),
+                         traceView(value));
 }
 
 /**
@@ -186,53 +239,41 @@ template <class... Pieces>
                                                         unsigned int line, const char* parameters,
                                                         MessageType type) {
     static thread_local char messageBuffer[traceBufferSize];
-    const auto shownLine = static_cast<int>(line);
-    switch (type) {
-    case ENTERING:
-        return traceText(messageBuffer, "ENTERING: ", function, "() in ", file, " [Line: ", shownLine,
-                         "],Parameters List: ", parameters);
-    case EXITING:
-        return traceText(messageBuffer, "EXITING: ", function, "() in ", file, " [Line: ", shownLine,
-                         "],Parameters List: ", parameters);
-    case MESSAGE:
-        break;
-    }
-    return traceText(messageBuffer, "");
+    return traceParameters(messageBuffer, traceView(function), traceView(file), static_cast<int>(line),
+                           traceView(parameters), type);
 }
 /** @} */
 
 /**
- * Puts a parameter list together for a message buffer. Texts and addresses, which is what most lists are made
- * of, are collected here, as far as a trace can show them; the buffer's stream, which is dear to build, is
- * asked for only when something else is inserted, and from there on everything goes through it. The list
- * reads the same either way.
+ * Puts a parameter list together for a message buffer. Texts and addresses, which most lists consist of, are
+ * collected here, as far as a trace can show them. The buffer's stream, which costs more than all the rest,
+ * is built only when something else is inserted, and then takes everything that follows. The list reads the
+ * same either way.
  */
-class TraceParameters {
+class TK_HIDDEN TraceParameters {
 public:
     /** An empty list. @param buffer empty; has to outlive this object. */
     explicit TraceParameters(HVLog::HVMessageBuffer& buffer) : buffer_(buffer) {}
 
     /** Appends a C text; a null pointer ends the list. */
-    [[gnu::always_inline]] TraceParameters& operator<<(const char* text) {
-        if (text == nullptr) {
-            ended_ = true;
-        } else if (!ended_) {
-            end_ = tracePiece(end_, list_ + sizeof list_ - 1, text);
-        }
-        return *this;
+    TraceParameters& operator<<(const char* text) {
+        // Most names are literals, whose sizes the compiler knows.
+        return text != nullptr && __builtin_constant_p(__builtin_strlen(text))
+                   ? append({text, __builtin_strlen(text)})
+                   : appendText(text);
     }
 
     /** Appends a text. What follows a NUL would be cut off where the list is read as a C string: the list
      * ends there. */
-    TraceParameters& operator<<(const std::string& text) {
-        *this << text.c_str();
-        ended_ = ended_ || std::strlen(text.c_str()) != text.size();
-        return *this;
+    [[gnu::noinline]] TraceParameters& operator<<(const std::string& text) {
+        const std::size_t size = std::strlen(text.c_str());
+        append({text.data(), size});
+        return size == text.size() ? *this : appendText(nullptr);
     }
 
     /** Appends the text that a pointer to characters leads to, of any other pointer the address. */
     template <class T, std::enable_if_t<!std::is_function_v<T>, int> = 0>
-    [[gnu::always_inline]] decltype(auto) operator<<(T* pointer) {
+    decltype(auto) operator<<(T* pointer) {
         using Pointee = std::remove_cv_t<T>;
         if constexpr (std::is_same_v<Pointee, char>) {
             return *this << static_cast<const char*>(pointer);
@@ -249,55 +290,97 @@ public:
         return stream() << value;
     }
 
-    /** The list, when all of it was collected here; valid until the next insertion. */
-    const char* text() {
+    /** @name The list's text, from the result of its last insertion
+     * Valid until the next insertion or reset.
+     */
+    /** @{ */
+    /** Of a list that ends here. */
+    const char* text(TraceParameters& /*inserted*/) { return streaming_ ? text(stream()) : collected(); }
+    /** Of a list that ends in the buffer's stream. */
+    const char* text(std::ostream& inserted) { return buffer_.str(inserted).c_str(); }
+    /** @} */
+
+    /** Makes the list empty. */
+    void reset() {
+        end_ = list_;
+        digits_ = Digits::unknown;
+        ended_ = false;
+        streaming_ = false;
+    }
+
+private:
+    [[gnu::noinline]] TraceParameters& appendText(const char* text) {
+        if (text != nullptr) {
+            return append(text);
+        }
+        if (streaming_) {
+            stream().setstate(std::ios_base::badbit);
+        }
+        ended_ = true;
+        return *this;
+    }
+
+    [[gnu::noinline]] TraceParameters& append(std::string_view text) {
+        if (streaming_) {
+            stream() << text;
+        } else if (!ended_) {
+            const auto room = static_cast<std::size_t>(list_ + sizeof list_ - 1 - end_);
+            const std::size_t size = text.size() < room ? text.size() : room;
+            std::memcpy(end_, text.data(), size);
+            end_ += size;
+        }
+        return *this;
+    }
+
+    const char* collected() {
         *end_ = '\0';
         return list_;
     }
 
-private:
-    TraceParameters& address(const void* pointer) {
-        if (!digitsArePlain_) {
-            // A stream knows how.
-            std::ostringstream digits;
-            digits.exceptions(std::ios_base::badbit); // or lack of memory would cut the address short
-            digits << pointer;
-            return *this << digits.str();
+    [[gnu::noinline]] TraceParameters& address(const void* pointer) {
+        if (digits_ == Digits::unknown) {
+            digits_ = std::locale() == std::locale::classic() ? Digits::plain : Digits::ofLocale;
         }
-        if (pointer == nullptr) {
-            return *this << "0";
+        if (streaming_ || digits_ == Digits::ofLocale) {
+            stream() << pointer; // the locale may group the digits
+            return *this;
         }
-        char digits[sizeof "0x" + 2 * sizeof pointer] = {'0', 'x'};
-        std::to_chars(digits + 2, digits + sizeof digits - 1, reinterpret_cast<std::uintptr_t>(pointer), 16);
-        return *this << static_cast<const char*>(digits);
+        char digits[sizeof "0x" - 1 + 2 * sizeof pointer]; // NOLINT(*-member-init): written from the end
+        char* const end = digits + sizeof digits;
+        char* begin = end;
+        auto rest = reinterpret_cast<std::uintptr_t>(pointer);
+        do {
+            *--begin = "0123456789abcdef"[rest % 16];
+            rest /= 16;
+        } while (rest != 0);
+        if (pointer != nullptr) {
+            *--begin = 'x';
+            *--begin = '0';
+        }
+        return append({begin, static_cast<std::size_t>(end - begin)});
     }
 
-    std::ostream& stream() {
-        std::ostream& stream = buffer_ << text();
+    [[gnu::noinline]] std::ostream& stream() {
+        if (streaming_) {
+            return buffer_;
+        }
+        std::ostream& stream = buffer_ << collected();
         if (ended_) {
             stream.setstate(std::ios_base::badbit);
         }
+        streaming_ = true;
         return stream;
     }
 
+    enum class Digits { unknown, plain, ofLocale }; // as the global locale writes numbers
+
     HVLog::HVMessageBuffer& buffer_;
-    bool digitsArePlain_ = std::locale() == std::locale::classic(); // another locale may group them
-    bool ended_ = false;                                            // by a null text
+    Digits digits_ = Digits::unknown;
+    bool ended_ = false;     // by a null text
+    bool streaming_ = false; // through the buffer's stream
     char* end_ = list_;
     char list_[traceBufferSize]; // NOLINT(*-member-init): written as far as it is read
 };
-
-/** @name The text of a parameter list, from the result of its last insertion */
-/** @{ */
-/** Of a list that was collected whole; valid as long as the list. */
-inline const char* traceList(HVLog::HVMessageBuffer& /*buffer*/, TraceParameters& inserted) {
-    return inserted.text();
-}
-/** Of a list that went through the buffer's stream; belongs to the buffer. */
-inline const char* traceList(HVLog::HVMessageBuffer& buffer, std::ostream& inserted) {
-    return buffer.str(inserted).c_str();
-}
-/** @} */
 
 /** The part of a path after its last slash; a constant for a constant path. */
 constexpr const char* traceFileName(const char* path) {
@@ -327,52 +410,122 @@ inline const char* traceValue(const std::string& value) {
 }
 /** @} */
 
+/**
+ * One pass of a trace point. Each of its functions formats the text and makes the next of the two logger
+ * calls; it returns whether there is another to make, so that a trace point is a loop whose body, the
+ * evaluation of its arguments, is compiled once. Used by the macros below alone.
+ */
+class TK_HIDDEN TracePoint {
+public:
+    /** At a place in the source. */
+    [[gnu::noinline]] TracePoint(const char* function, const char* file, int line)
+        : function_(function), file_(file), line_(line) {}
+    [[gnu::noinline]] ~TracePoint() = default;
+    TracePoint(const TracePoint&) = delete;
+    TracePoint& operator=(const TracePoint&) = delete;
+
+    /** Entry. */
+    [[gnu::noinline]] bool entering(const std::string& category) {
+        return log(category, flowLevelCode, trace(function_, file_, line(), ENTERING));
+    }
+    /** Exit. */
+    [[gnu::noinline]] bool exiting(const std::string& category) {
+        return log(category, flowLevelCode, trace(function_, file_, line(), EXITING));
+    }
+    /** A message. */
+    [[gnu::noinline]] bool message(const std::string& category, const char* text) {
+        return log(category, messageLevelCode, trace(text, file_, line(), MESSAGE));
+    }
+    /** The value of a number. */
+    [[gnu::noinline]] bool variable(const std::string& category, const char* name, unsigned int value) {
+        return log(category, flowLevelCode, trace(name, file_, line(), value));
+    }
+    /** The value of a text. */
+    [[gnu::noinline]] bool variable(const std::string& category, const char* name, const char* value) {
+        return log(category, flowLevelCode, trace(name, file_, line(), value));
+    }
+    /** Entry or exit with parameters. */
+    bool parameters(const std::string& category, const char* list, MessageType type) {
+        return log(category, parametersLevelCode, tracepara(function_, file_, line(), list, type));
+    }
+
+private:
+    unsigned int line() const { return static_cast<unsigned int>(line_); }
+
+    [[gnu::noinline]] bool log(const std::string& category, int level, const char* text) {
+        const std::string& message = message_.str(message_ << text);
+        logged_ = !logged_;
+        if (logged_) {
+            HVLog::HVLogger::logLevelMessage(function_, file_, line_, category, level, nullptr, 0, 0,
+                                             message);
+        } else {
+            HVLog::HVLogger::traceLevelMessage(function_, file_, line_, category, level, nullptr, 0, 0,
+                                               message);
+        }
+        return logged_;
+    }
+
+    const char* function_;
+    const char* file_;
+    int line_;
+    bool logged_ = false; // the first of the two calls was made
+    HVLog::HVMessageBuffer message_;
+};
+
+/** One pass of a trace point with parameter list. Used by the macros below alone. */
+class TK_HIDDEN TraceListPoint {
+public:
+    /** At a place in the source, on entry or exit. */
+    [[gnu::noinline]] TraceListPoint(const char* function, const char* file, int line, MessageType type)
+        : list(buffer_), type_(type), point_(function, file, line) {}
+    [[gnu::noinline]] ~TraceListPoint() = default;
+    TraceListPoint(const TraceListPoint&) = delete;
+    TraceListPoint& operator=(const TraceListPoint&) = delete;
+
+    /** As those of TracePoint. @param inserted the result of the last insertion into `list`. */
+    template <class Inserted>
+    [[gnu::noinline]] bool log(const std::string& category, Inserted& inserted) {
+        const bool more = point_.parameters(category, list.text(inserted), type_);
+        list.reset();
+        return more;
+    }
+
+private:
+    HVLog::HVMessageBuffer buffer_; // made before the message's, and destroyed after it
+
+public:
+    TraceParameters list; ///< what the insertions go to
+
+private:
+    MessageType type_;
+    TracePoint point_;
+};
+
 } // namespace TK
 
-/** Makes the two logger calls of one trace point; `text` is formatted for each. Used by the macros below
- * alone. */
-#define TK_TRACE_POINT_(category, level, text)                                 \
-    ::HVLog::HVLogger::logLevelMessage(                                        \
-        __func__, tkTraceFile, __LINE__, category, level, nullptr, 0, 0,       \
-        tkTraceMessage.str(tkTraceMessage << static_cast<const char*>(text))); \
-    ::HVLog::HVLogger::traceLevelMessage(                                      \
-        __func__, tkTraceFile, __LINE__, category, level, nullptr, 0, 0,       \
-        tkTraceMessage.str(tkTraceMessage << static_cast<const char*>(text)))
-
-/** A trace point without parameter list. Used by the macros below alone. */
-#define TK_TRACE_TEXT_(category, level, text)                              \
+/** A trace point: an object of a class, and a loop that repeats `step` while it returns true. Used by the
+ * macros below alone. */
+#define TK_TRACE_POINT_(step, Class, ...)                                  \
     do {                                                                   \
         constexpr const char* tkTraceFile = ::TK::traceFileName(__FILE__); \
-        ::HVLog::HVMessageBuffer tkTraceMessage;                           \
-        TK_TRACE_POINT_(category, level, text);                            \
+        ::TK::Class tkTracePoint(__func__, tkTraceFile, __VA_ARGS__);      \
+        do {                                                               \
+        } while (tkTracePoint.step);                                       \
     } while (false)
 
 /** A trace point with parameter list. Used by the macros below alone. */
-#define TK_TRACE_PARAMETERS_(category, insertions, type)                                                    \
-    do {                                                                                                    \
-        constexpr const char* tkTraceFile = ::TK::traceFileName(__FILE__);                                  \
-        ::HVLog::HVMessageBuffer tkTraceParameters;                                                         \
-        ::HVLog::HVMessageBuffer tkTraceMessage;                                                            \
-        TK_TRACE_POINT_(                                                                                    \
-            category, ::TK::parametersLevelCode,                                                            \
-            ::TK::tracepara(                                                                                \
-                __func__, tkTraceFile, __LINE__,                                                            \
-                ::TK::traceList(tkTraceParameters, ::TK::TraceParameters(tkTraceParameters) << insertions), \
-                type));                                                                                     \
-    } while (false)
+#define TK_TRACE_PARAMETERS_(category, insertions, type) \
+    TK_TRACE_POINT_(log(category, tkTracePoint.list << insertions), TraceListPoint, __LINE__, type)
 
 /**
  * @name Trace points
  * See the top of this file. `category` is a `std::string` (or what converts to one), evaluated twice.
  */
 /** @{ */
-/** Entry to the operation that it stands in. */
-#define TK_TRACE_ENTERING(category)               \
-    TK_TRACE_TEXT_(category, ::TK::flowLevelCode, \
-                   ::TK::trace(__func__, tkTraceFile, __LINE__, ::TK::ENTERING))
-/** Exit from the operation that it stands in. */
-#define TK_TRACE_EXITING(category) \
-    TK_TRACE_TEXT_(category, ::TK::flowLevelCode, ::TK::trace(__func__, tkTraceFile, __LINE__, ::TK::EXITING))
+/** Entry to the function that contains it. */
+#define TK_TRACE_ENTERING(category) TK_TRACE_POINT_(entering(category), TracePoint, __LINE__)
+/** Exit from the function that contains it. */
+#define TK_TRACE_EXITING(category) TK_TRACE_POINT_(exiting(category), TracePoint, __LINE__)
 /** Entry with parameters: `TK_TRACE_ENTERING_PARAMETERS(category, " broker=" << broker << " name=" << name)`.
  */
 #define TK_TRACE_ENTERING_PARAMETERS(category, insertions) \
@@ -381,11 +534,9 @@ inline const char* traceValue(const std::string& value) {
 #define TK_TRACE_EXITING_PARAMETERS(category, insertions) \
     TK_TRACE_PARAMETERS_(category, insertions, ::TK::EXITING)
 /** A message: a C string. */
-#define TK_TRACE_MESSAGE(category, text) \
-    TK_TRACE_TEXT_(category, ::TK::messageLevelCode, ::TK::trace(text, tkTraceFile, __LINE__, ::TK::MESSAGE))
+#define TK_TRACE_MESSAGE(category, text) TK_TRACE_POINT_(message(category, text), TracePoint, __LINE__)
 /** The value of a variable: `name` is a C string, `value` an integer, `bool`, enumeration, C string or
  * `std::string`. */
-#define TK_TRACE_VARIABLE(category, name, value)  \
-    TK_TRACE_TEXT_(category, ::TK::flowLevelCode, \
-                   ::TK::trace(name, tkTraceFile, __LINE__, ::TK::traceValue(value)))
+#define TK_TRACE_VARIABLE(category, name, value) \
+    TK_TRACE_POINT_(variable(category, name, ::TK::traceValue(value)), TracePoint, __LINE__)
 /** @} */

@@ -3,8 +3,11 @@
 #include "LoggerCalls.h"
 
 #include <gtest/gtest.h>
+#include <limits>
+#include <locale>
 #include <stdexcept>
 #include <string>
+#include <vector>
 
 namespace {
 
@@ -32,7 +35,24 @@ std::ostream& operator<<(std::ostream& stream, const Speed& speed) {
     return stream << speed.value << " Mbit/s";
 }
 
+class GroupedDigits : public std::numpunct<char> {
+    char do_thousands_sep() const override { return ','; }
+    std::string do_grouping() const override { return "\3"; }
+};
+
+// The message buffers made and destroyed since the last test; the program's definitions take the logger's
+// place.
+std::vector<const void*> made;
+std::vector<const void*> destroyed;
+
 } // namespace
+
+HVLog::HVMessageBuffer::HVMessageBuffer() {
+    made.push_back(this);
+}
+HVLog::HVMessageBuffer::~HVMessageBuffer() {
+    destroyed.push_back(this);
+}
 
 TEST_F(ATracePoint, HandsItsTextToBothFunctionsOfTheLogger) {
     const void* const pointer = &category;
@@ -58,12 +78,16 @@ TEST_F(ATracePoint, ShowsAVariableAsANumberOrATextByItsType) {
     TK_TRACE_VARIABLE(category, "v", Colour::blue);
     TK_TRACE_VARIABLE(category, "v", 4294967295U);
     TK_TRACE_VARIABLE(category, "v", static_cast<unsigned short>(65535));
+    TK_TRACE_VARIABLE(category, "v", 0x1'0000'0007ULL);
+    TK_TRACE_VARIABLE(category, "v", std::numeric_limits<long long>::min());
+    TK_TRACE_VARIABLE(category, "v", -2147483647 - 1);
     TK_TRACE_VARIABLE(category, "v", text);
     TK_TRACE_VARIABLE(category, "v", array);
     TK_TRACE_VARIABLE(category, "v", none);
     TK_TRACE_VARIABLE(category, "v", "100%n%s");
     std::string expected;
-    for (const char* const value : {"1", "1", "-1", "65535", "text", "array", "(null)", "100%n%s"}) {
+    for (const char* const value :
+         {"1", "1", "-1", "65535", "7", "0", "-2147483648", "text", "array", "(null)", "100%n%s"}) {
         expected += variable(module, "TestBody", "v", value);
     }
     EXPECT_EQ(takeTraces(), expected);
@@ -82,6 +106,27 @@ TEST_F(ATracePoint, TakesAnyInsertionsUpToANullText) {
     EXPECT_EQ(takeTraces(), parameters(" object=" + address(&object) + " null=0 text=te%xt") +
                                 parameters(" a=100 Mbit/s b=ff") + parameters(" nothing") +
                                 parameters(" object=" + address(&object) + " text=") + parameters(" text="));
+}
+
+TEST_F(ATracePoint, WritesAddressesAsTheGlobalLocaleDoes) {
+    const std::locale earlier = std::locale::global(std::locale(std::locale::classic(), new GroupedDigits));
+    const int object = 0;
+    const char* const none = nullptr;
+    const std::string shown = address(&object);
+    TK_TRACE_ENTERING_PARAMETERS(category, " a=" << &object << " b=" << std::string("x") << " c=" << &object);
+    TK_TRACE_ENTERING_PARAMETERS(category, " a=" << &object << " b=" << none << " c=" << &object << 1);
+    std::locale::global(earlier);
+    EXPECT_NE(shown.find(','), std::string::npos);
+    EXPECT_EQ(takeTraces(),
+              parameters(" a=" + shown + " b=x c=" + shown) + parameters(" a=" + shown + " b="));
+}
+
+TEST_F(ATracePoint, DestroysTheBufferOfItsParametersLast) {
+    made.clear();
+    destroyed.clear();
+    TK_TRACE_EXITING_PARAMETERS(category, " n=" << 1);
+    ASSERT_EQ(made.size(), 2U);
+    EXPECT_EQ(destroyed, std::vector<const void*>({made[1], made[0]}));
 }
 
 TEST_F(ATracePoint, EvaluatesItsArgumentsForEachOfTheTwoCalls) {
@@ -122,4 +167,14 @@ TEST(TheFormattingFunctions, TakeNullTextsAndTypesOutsideTheirOwn) {
     EXPECT_STREQ(TK::trace(nullptr, nullptr, 3, TK::MESSAGE), "MESSAGE [File: (null), Line: 3]: (null)");
     EXPECT_STREQ(TK::trace("f", "F.cpp", 3, static_cast<TK::MessageType>(3)), "");
     EXPECT_STREQ(TK::tracepara("f", "F.cpp", 3, " a=1", TK::MESSAGE), "");
+}
+
+TEST(TheFormattingFunctions, EachKeepItsLastText) {
+    const char* const flow = TK::trace("f", "F.cpp", 1, TK::ENTERING);
+    const char* const number = TK::trace("n", "F.cpp", 2, 7U);
+    const char* const text = TK::trace("t", "F.cpp", 3, "x");
+    TK::tracepara("f", "F.cpp", 4, " a=1", TK::ENTERING);
+    EXPECT_STREQ(flow, "ENTERING: f() in F.cpp [Line: 1]");
+    EXPECT_STREQ(number, "VARIABLE: 'n' has Value '7' at line 2 in F.cpp");
+    EXPECT_STREQ(text, "VARIABLE: 't' has Value 'x' at line 3 in F.cpp");
 }

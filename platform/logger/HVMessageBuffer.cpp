@@ -39,8 +39,9 @@ const std::string& HVMessageBuffer::str(std::ostream& /*inserted*/) {
 
 void HVMessageBuffer::append(const char* characters, std::size_t count) {
     if (taken_) {
-        text_.clear();
         taken_ = false;
+        text_.assign(characters, count);
+        return;
     }
     // Most messages come in several pieces; they get room for all of them at once.
     constexpr std::size_t usualSize = 255;
@@ -51,7 +52,9 @@ void HVMessageBuffer::append(const char* characters, std::size_t count) {
 }
 
 const std::string& HVMessageBuffer::take() {
-    append("", 0);
+    if (taken_) {
+        text_.clear(); // nothing was inserted since
+    }
     taken_ = true;
     ended_ = false;
     if (stream_) {
