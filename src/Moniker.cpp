@@ -15,18 +15,18 @@ const char* const notSelected = "Key is not selected.";
 const char* const notReadable =
     "Either the Key is not selected or the value is not compatible with the requested data type.";
 
-// Whether streams write and read plain digits, as std::to_chars and std::from_chars do at a fraction of the
-// cost. Any other global locale may group digits and know other white space.
+// Whether streams write and read plain digits; then std::to_chars and std::from_chars do the same at a
+// fraction of the cost. Any other global locale may group digits and know other white space.
 bool digitsArePlain() {
     return std::locale() == std::locale::classic();
 }
 
-// The text of a number as a default stream of the global locale writes it. The stream would swallow a failed
-// allocation and hand out a short text; with badbit raising exceptions it passes std::bad_alloc on instead.
-template <class Number>
-std::string textOf(Number number) {
+// The text of a number as a default stream of the global locale writes it, which is the same for every
+// unsigned type. The stream would swallow a failed allocation and hand out a short text; with badbit raising
+// exceptions it passes std::bad_alloc on instead.
+std::string textOf(unsigned long long number) {
     if (digitsArePlain()) {
-        std::array<char, std::numeric_limits<Number>::digits10 + 1>
+        std::array<char, std::numeric_limits<unsigned long long>::digits10 + 1>
             digits; // NOLINT(*-member-init): written next
         return {digits.data(), std::to_chars(digits.data(), digits.data() + digits.size(), number).ptr};
     }
@@ -36,8 +36,8 @@ std::string textOf(Number number) {
     return stream.str();
 }
 
-// A character is no number to a stream: it writes the byte itself.
-std::string textOf(unsigned char byte) {
+// A stream writes a character as the byte itself, not as a number.
+std::string textOfByte(unsigned char byte) {
     return {static_cast<char>(byte)};
 }
 
@@ -49,17 +49,19 @@ void extract(const std::string& text, Value& value) {
     stream >> value;
 }
 
-// Reads what textOf wrote.
+// Reads what textOf wrote. No locale reads a larger number from it, so every type is read as the widest.
 template <class Number>
 void numberOf(const std::string& text, Number& number) {
+    unsigned long long widest = number;
     if (digitsArePlain()) {
-        std::from_chars(text.data(), text.data() + text.size(), number);
+        std::from_chars(text.data(), text.data() + text.size(), widest);
     } else {
-        extract(text, number);
+        extract(text, widest);
     }
+    number = static_cast<Number>(widest);
 }
 
-// A stream skips white space, finds nothing behind it, and leaves `byte` as it is.
+// A stream skips white space, finds nothing after it, and leaves `byte` as it is.
 void numberOf(const std::string& text, unsigned char& byte) {
     if (!digitsArePlain()) {
         extract(text, byte);
@@ -83,8 +85,7 @@ Moniker::Moniker() = default;
 Moniker::Moniker(const Moniker& other) = default;
 // NOLINTNEXTLINE(cert-oop54-cpp,bugprone-unhandled-self-assignment): a moniker may be assigned to itself
 Moniker& Moniker::operator=(const Moniker& other) {
-    // The list is copied first: when memory runs out, the selection must not be one of a list that never
-    // came.
+    // The list is copied first: when memory runs out, the selection must still belong to the old list.
     std::vector<KeyComponent> copy(other.keys);
     keys.swap(copy);
     keySelected = other.keySelected;
@@ -138,7 +139,7 @@ unsigned short Moniker::addKey(std::string name, const std::string& value) {
 }
 
 unsigned short Moniker::addKey(std::string name, unsigned char value) {
-    return append(COMPONENT_UINT8, std::move(name), textOf(value));
+    return append(COMPONENT_UINT8, std::move(name), textOfByte(value));
 }
 
 unsigned short Moniker::addKey(std::string name, unsigned short value) {
