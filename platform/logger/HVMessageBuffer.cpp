@@ -1,12 +1,82 @@
 #include "HVMessageBuffer.h"
 
+#include <array>
+#include <atomic>
+#include <cstdint>
 #include <cstring>
 #include <new>
+#include <utility>
 
 namespace HVLog {
 
+namespace {
+
+// Messages get room for this much at once, since most come in several pieces.
+constexpr std::size_t usualSize = 255;
+// No more than this is kept for the next message.
+constexpr std::size_t largestKept = 4096;
+
+// A place that keeps the memory of a message that is gone for one that is to come. Nobody waits for it: who
+// finds it busy goes to the heap.
+class alignas(64) SpareText {
+public:
+    // What the state says until a place is used first, so that it needs no construction when the library is
+    // loaded, and after the library's end.
+    constexpr SpareText() : none_() {}
+    ~SpareText() {
+        if (state_.exchange(State::busy, std::memory_order_acquire) == State::kept) {
+            text_.~basic_string();
+        }
+    }
+    SpareText(const SpareText&) = delete;
+    SpareText& operator=(const SpareText&) = delete;
+
+    // Swaps the memory that is kept, if any, for that of `text`, which is empty.
+    void take(std::string& text) {
+        State expected = State::kept;
+        if (state_.compare_exchange_strong(expected, State::busy, std::memory_order_acquire)) {
+            text.swap(text_);
+            text_.~basic_string();
+            state_.store(State::empty, std::memory_order_release);
+        }
+    }
+
+    // Keeps the memory of `text`, when there is none yet.
+    void give(std::string& text) {
+        State expected = State::empty;
+        if (state_.compare_exchange_strong(expected, State::busy, std::memory_order_acquire)) {
+            text.clear();
+            new (&text_) std::string(std::move(text));
+            state_.store(State::kept, std::memory_order_release);
+        }
+    }
+
+private:
+    enum class State : unsigned char { empty, busy, kept };
+
+    std::atomic<State> state_{State::empty};
+    union {
+        char none_;
+        std::string text_;
+    };
+};
+
+std::array<SpareText, 32> spareTexts;
+
+// Threads find different places by where their stacks lie, so that they rarely meet at one.
+SpareText& spareText(const void* onStack) {
+    const auto address = static_cast<std::uint64_t>(reinterpret_cast<std::uintptr_t>(onStack));
+    return spareTexts[(address >> 16U) * 0x9E3779B97F4A7C15U >> 59U];
+}
+
+} // namespace
+
 HVMessageBuffer::HVMessageBuffer() = default;
-HVMessageBuffer::~HVMessageBuffer() = default;
+HVMessageBuffer::~HVMessageBuffer() {
+    if (text_.capacity() >= usualSize && text_.capacity() <= largestKept) {
+        spareText(this).give(text_);
+    }
+}
 
 HVMessageBuffer& HVMessageBuffer::operator<<(const char* text) {
     if (stream_) {
@@ -43,9 +113,10 @@ void HVMessageBuffer::append(const char* characters, std::size_t count) {
         text_.assign(characters, count);
         return;
     }
-    // Most messages come in several pieces; they get room for all of them at once.
-    constexpr std::size_t usualSize = 255;
     if (const std::size_t size = text_.size() + count; size > text_.capacity() && size < usualSize) {
+        if (text_.empty()) {
+            spareText(this).take(text_);
+        }
         text_.reserve(usualSize);
     }
     text_.append(characters, count);
