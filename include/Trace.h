@@ -82,32 +82,36 @@ constexpr int messageLevelCode = 6000;    ///< messages
 [[gnu::noinline]] inline std::string_view traceView(const char* text) {
     return text != nullptr ? std::string_view(text) : std::string_view("(null)");
 }
-/** The decimal digits of a number. */
+/** A number in decimal digits. */
 class TK_HIDDEN TraceNumber {
 public:
-    explicit TraceNumber(int number) {
-        auto rest = static_cast<unsigned int>(number);
-        rest = number < 0 ? 0U - rest : rest;
-        do {
-            characters_[--begin_] = static_cast<char>('0' + rest % 10);
-            rest /= 10;
-        } while (rest != 0);
-        if (number < 0) {
-            characters_[--begin_] = '-';
+    explicit TraceNumber(int number)
+        : isNegative_(number < 0),
+          rest_(isNegative_ ? 0U - static_cast<unsigned int>(number) : static_cast<unsigned int>(number)) {
+        size_ = isNegative_ ? 2 : 1;
+        for (unsigned int rest = rest_; rest >= 10; rest /= 10) {
+            ++size_;
         }
     }
     /** The number of characters. */
-    std::size_t size() const { return mostSize - begin_; }
-    /** Copies them, and what follows them up to the most that there can be: a few moves. */
-    void copyTo(char* to) const { std::memcpy(to, characters_ + begin_, mostSize); }
-    /** The characters; they belong to this object. */
-    std::string_view view() const { return {characters_ + begin_, size()}; }
+    std::size_t size() const { return size_; }
+    /** Writes them where they belong, since the processor waits for bytes that are copied at once. */
+    [[gnu::noinline]] void write(char* to) const {
+        *to = '-';
+        char* end = to + size_;
+        unsigned int rest = rest_;
+        do {
+            *--end = static_cast<char>('0' + rest % 10);
+            rest /= 10;
+        } while (rest != 0);
+    }
 
     static constexpr std::size_t mostSize = sizeof "-2147483648" - 1; ///< of the longest number
 
 private:
-    char characters_[2 * mostSize] = {};
-    std::size_t begin_ = mostSize;
+    bool isNegative_;
+    unsigned int rest_;
+    std::size_t size_;
 };
 /** @name One piece, to a place that has room for it; returns where the next one begins. */
 /** @{ */
@@ -116,7 +120,7 @@ inline char* tracePiece(char* to, std::string_view text) {
     return to + text.size();
 }
 inline char* tracePiece(char* to, const TraceNumber& number) {
-    number.copyTo(to);
+    number.write(to);
     return to + number.size();
 }
 /** @} */
@@ -126,7 +130,9 @@ inline char* tracePiece(char* to, const TraceNumber& number) {
     return to + text.copy(to, static_cast<std::size_t>(end - to));
 }
 inline char* tracePiece(char* to, const char* end, const TraceNumber& number) {
-    return tracePiece(to, end, number.view());
+    char digits[TraceNumber::mostSize]; // NOLINT(*-member-init): written next
+    number.write(digits);
+    return tracePiece(to, end, {digits, number.size()});
 }
 /** @} */
 /** Fills a buffer with the pieces, up to its last byte but one, and the rest of it with zeros. Inlined into
@@ -135,7 +141,7 @@ template <class... Pieces>
 [[gnu::always_inline]] inline char* traceText(char (&buffer)[traceBufferSize], const Pieces&... pieces) {
     char* const end = buffer + sizeof buffer;
     char* to = buffer;
-    if ((pieces.size() + ...) < sizeof buffer - TraceNumber::mostSize) {
+    if ((pieces.size() + ...) < sizeof buffer) {
         ((to = tracePiece(to, pieces)), ...);
     } else {
         ((to = tracePiece(to, end - 1, pieces)), ...);
@@ -200,7 +206,7 @@ template <class Value>
  */
 [[gnu::always_inline]] inline TK_EXPORT char* trace(const char* subject, const char* file, unsigned int line,
                                                     MessageType type) {
-    static thread_local char messageBuffer[traceBufferSize];
+    alignas(64) static thread_local char messageBuffer[traceBufferSize];
     return traceFlow(messageBuffer, traceView(subject), traceView(file), static_cast<int>(line), type);
 }
 
@@ -211,7 +217,7 @@ template <class Value>
  */
 [[gnu::always_inline]] inline TK_EXPORT char* trace(const char* name, const char* file, unsigned int line,
                                                     unsigned int value) {
-    static thread_local char messageBuffer[traceBufferSize];
+    alignas(64) static thread_local char messageBuffer[traceBufferSize];
     return traceVariable(messageBuffer, traceView(name), traceView(file), static_cast<int>(line),
                          TraceNumber(static_cast<int>(value)));
 }
@@ -223,7 +229,7 @@ template <class Value>
  */
 [[gnu::always_inline]] inline TK_EXPORT char* trace(const char* name, const char* file, unsigned int line,
                                                     const char* value) {
-    static thread_local char messageBuffer[traceBufferSize];
+    alignas(64) static thread_local char messageBuffer[traceBufferSize];
     return traceVariable(messageBuffer, traceView(name), traceView(file), static_cast<int>(line),
                          traceView(value));
 }
@@ -238,7 +244,7 @@ template <class Value>
 [[gnu::always_inline]] inline TK_EXPORT char* tracepara(const char* function, const char* file,
                                                         unsigned int line, const char* parameters,
                                                         MessageType type) {
-    static thread_local char messageBuffer[traceBufferSize];
+    alignas(64) static thread_local char messageBuffer[traceBufferSize];
     return traceParameters(messageBuffer, traceView(function), traceView(file), static_cast<int>(line),
                            traceView(parameters), type);
 }
@@ -324,13 +330,14 @@ private:
         if (streaming_) {
             stream() << text;
         } else if (!ended_) {
-            const auto room = static_cast<std::size_t>(list_ + sizeof list_ - 1 - end_);
-            const std::size_t size = text.size() < room ? text.size() : room;
+            const std::size_t size = text.size() < room() ? text.size() : room();
             std::memcpy(end_, text.data(), size);
             end_ += size;
         }
         return *this;
     }
+
+    std::size_t room() const { return static_cast<std::size_t>(list_ + sizeof list_ - 1 - end_); }
 
     const char* collected() {
         *end_ = '\0';
@@ -345,19 +352,31 @@ private:
             stream() << pointer; // the locale may group the digits
             return *this;
         }
-        char digits[sizeof "0x" - 1 + 2 * sizeof pointer]; // NOLINT(*-member-init): written from the end
-        char* const end = digits + sizeof digits;
-        char* begin = end;
-        auto rest = reinterpret_cast<std::uintptr_t>(pointer);
-        do {
-            *--begin = "0123456789abcdef"[rest % 16];
-            rest /= 16;
-        } while (rest != 0);
-        if (pointer != nullptr) {
-            *--begin = 'x';
-            *--begin = '0';
+        if (!ended_ && room() >= addressSize) {
+            end_ = writeAddress(end_, pointer); // at once: copying bytes just written is slow
+            return *this;
         }
-        return append({begin, static_cast<std::size_t>(end - begin)});
+        char digits[addressSize]; // NOLINT(*-member-init): written next
+        return append({digits, static_cast<std::size_t>(writeAddress(digits, pointer) - digits)});
+    }
+
+    static constexpr std::size_t addressSize = sizeof "0x" - 1 + 2 * sizeof(void*); // of the longest
+
+    static char* writeAddress(char* to, const void* pointer) {
+        const auto number = reinterpret_cast<std::uintptr_t>(pointer);
+        if (number != 0) {
+            *to++ = '0';
+            *to++ = 'x';
+        }
+        unsigned int shift = 0;
+        for (std::uintptr_t rest = number; rest > 0xF; rest >>= 4U) {
+            shift += 4;
+        }
+        for (; shift != 0; shift -= 4) {
+            *to++ = "0123456789abcdef"[(number >> shift) & 0xFU];
+        }
+        *to++ = "0123456789abcdef"[number & 0xFU];
+        return to;
     }
 
     [[gnu::noinline]] std::ostream& stream() {

@@ -31,12 +31,11 @@ public:
     SpareText(const SpareText&) = delete;
     SpareText& operator=(const SpareText&) = delete;
 
-    // Swaps the memory that is kept, if any, for that of `text`, which is empty.
+    // Hands the memory that is kept, if any, to `text`, which is empty and owns none.
     void take(std::string& text) {
         State expected = State::kept;
         if (state_.compare_exchange_strong(expected, State::busy, std::memory_order_acquire)) {
-            text.swap(text_);
-            text_.~basic_string();
+            text = std::move(text_); // which owns nothing then
             state_.store(State::empty, std::memory_order_release);
         }
     }
@@ -113,11 +112,13 @@ void HVMessageBuffer::append(const char* characters, std::size_t count) {
         text_.assign(characters, count);
         return;
     }
-    if (const std::size_t size = text_.size() + count; size > text_.capacity() && size < usualSize) {
+    if (const std::size_t size = text_.size() + count; size > text_.capacity()) {
         if (text_.empty()) {
             spareText(this).take(text_);
         }
-        text_.reserve(usualSize);
+        if (size < usualSize && text_.capacity() < usualSize) {
+            text_.reserve(usualSize);
+        }
     }
     text_.append(characters, count);
 }
