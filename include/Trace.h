@@ -78,8 +78,9 @@ constexpr int messageLevelCode = 6000;    ///< messages
  * points of a module.
  */
 /** @{ */
-/** A C text; null appears as "(null)". */
-[[gnu::noinline]] inline std::string_view traceView(const char* text) {
+/** A C text; null appears as "(null)". Not inlined, or compilers would conclude in a caller that its text may
+ * be null. */
+[[gnu::noinline]] TK_HIDDEN inline std::string_view traceView(const char* text) {
     return text != nullptr ? std::string_view(text) : std::string_view("(null)");
 }
 /** A number in decimal digits. */
@@ -262,11 +263,15 @@ public:
     explicit TraceParameters(HVLog::HVMessageBuffer& buffer) : buffer_(buffer) {}
 
     /** Appends a C text; a null pointer ends the list. */
-    TraceParameters& operator<<(const char* text) {
-        // Most names are literals, whose sizes the compiler knows.
-        return text != nullptr && __builtin_constant_p(__builtin_strlen(text))
-                   ? append({text, __builtin_strlen(text)})
-                   : appendText(text);
+    [[gnu::noinline]] TraceParameters& operator<<(const char* text) {
+        if (text != nullptr) {
+            return append(text);
+        }
+        if (streaming_) {
+            stream().setstate(std::ios_base::badbit);
+        }
+        ended_ = true;
+        return *this;
     }
 
     /** Appends a text. What follows a NUL would be cut off where the list is read as a C string: the list
@@ -274,7 +279,7 @@ public:
     [[gnu::noinline]] TraceParameters& operator<<(const std::string& text) {
         const std::size_t size = std::strlen(text.c_str());
         append({text.data(), size});
-        return size == text.size() ? *this : appendText(nullptr);
+        return size == text.size() ? *this : *this << static_cast<const char*>(nullptr);
     }
 
     /** Appends the text that a pointer to characters leads to, of any other pointer the address. */
@@ -315,17 +320,6 @@ public:
     }
 
 private:
-    [[gnu::noinline]] TraceParameters& appendText(const char* text) {
-        if (text != nullptr) {
-            return append(text);
-        }
-        if (streaming_) {
-            stream().setstate(std::ios_base::badbit);
-        }
-        ended_ = true;
-        return *this;
-    }
-
     [[gnu::noinline]] TraceParameters& append(std::string_view text) {
         if (streaming_) {
             stream() << text;
