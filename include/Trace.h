@@ -78,9 +78,9 @@ constexpr int messageLevelCode = 6000;    ///< messages
  * points of a module.
  */
 /** @{ */
-/** A C text; null appears as "(null)". Not inlined, or compilers would conclude in a caller that its text may
- * be null. */
-[[gnu::noinline]] TK_HIDDEN inline std::string_view traceView(const char* text) {
+/** A C text; null appears as "(null)". Only functions that are not inlined use it, or compilers would
+ * conclude in a caller that its text may be null. */
+inline std::string_view traceView(const char* text) {
     return text != nullptr ? std::string_view(text) : std::string_view("(null)");
 }
 /** A number in decimal digits. */
@@ -151,9 +151,11 @@ template <class... Pieces>
     return buffer;
 }
 /** The text of an entry, an exit or a message. */
-[[gnu::noinline]] TK_HIDDEN inline char* traceFlow(char (&buffer)[traceBufferSize], std::string_view subject,
-                                                   std::string_view file, int line, MessageType type) {
+[[gnu::noinline]] TK_HIDDEN inline char* traceFlow(char (&buffer)[traceBufferSize], const char* subjectText,
+                                                   const char* fileName, int line, MessageType type) {
     using View = std::string_view;
+    const View subject = traceView(subjectText);
+    const View file = traceView(fileName);
     switch (type) {
     case ENTERING:
     case EXITING:
@@ -165,26 +167,35 @@ template <class... Pieces>
     }
     return traceText(buffer, View());
 }
-/** The text of a variable, whose value is a text or a number. */
+/** The text of a variable, whose value is a piece. */
 template <class Value>
-[[gnu::noinline]] TK_HIDDEN inline char* traceVariable(char (&buffer)[traceBufferSize], std::string_view name,
-                                                       std::string_view file, int line, const Value& value) {
+inline char* traceValueText(char (&buffer)[traceBufferSize], const char* name, const char* file, int line,
+                            const Value& value) {
     using View = std::string_view;
-    return traceText(buffer, View("VARIABLE: '"), name, View("' has Value '"), value, View("' at line "),
-                     TraceNumber(line), View(" in "), file);
+    return traceText(buffer, View("VARIABLE: '"), traceView(name), View("' has Value '"), value,
+                     View("' at line "), TraceNumber(line), View(" in "), traceView(file));
+}
+/** The text of a variable that is a number. */
+[[gnu::noinline]] TK_HIDDEN inline char* traceVariable(char (&buffer)[traceBufferSize], const char* name,
+                                                       const char* file, int line, int value) {
+    return traceValueText(buffer, name, file, line, TraceNumber(value));
+}
+/** The text of a variable that is a text. */
+[[gnu::noinline]] TK_HIDDEN inline char* traceVariable(char (&buffer)[traceBufferSize], const char* name,
+                                                       const char* file, int line, const char* value) {
+    return traceValueText(buffer, name, file, line, traceView(value));
 }
 /** The text of an entry or an exit with parameters. */
 [[gnu::noinline]] TK_HIDDEN inline char* traceParameters(char (&buffer)[traceBufferSize],
-                                                         std::string_view function, std::string_view file,
-                                                         int line, std::string_view parameters,
-                                                         MessageType type) {
+                                                         const char* function, const char* file, int line,
+                                                         const char* parameters, MessageType type) {
     using View = std::string_view;
     if (type != ENTERING && type != EXITING) {
         return traceText(buffer, View());
     }
-    return traceText(buffer, type == ENTERING ? View("ENTERING: ") : View("EXITING: "), function,
-                     View("() in "), file, View(" [Line: "), TraceNumber(line), View("],Parameters List: "),
-                     parameters);
+    return traceText(buffer, type == ENTERING ? View("ENTERING: ") : View("EXITING: "), traceView(function),
+                     View("() in "), traceView(file), View(" [Line: "), TraceNumber(line),
+                     View("],Parameters List: "), traceView(parameters));
 }
 /** @} */
 
@@ -208,7 +219,7 @@ template <class Value>
 [[gnu::always_inline]] inline TK_EXPORT char* trace(const char* subject, const char* file, unsigned int line,
                                                     MessageType type) {
     alignas(64) static thread_local char messageBuffer[traceBufferSize];
-    return traceFlow(messageBuffer, traceView(subject), traceView(file), static_cast<int>(line), type);
+    return traceFlow(messageBuffer, subject, file, static_cast<int>(line), type);
 }
 
 /**
@@ -219,8 +230,7 @@ template <class Value>
 [[gnu::always_inline]] inline TK_EXPORT char* trace(const char* name, const char* file, unsigned int line,
                                                     unsigned int value) {
     alignas(64) static thread_local char messageBuffer[traceBufferSize];
-    return traceVariable(messageBuffer, traceView(name), traceView(file), static_cast<int>(line),
-                         TraceNumber(static_cast<int>(value)));
+    return traceVariable(messageBuffer, name, file, static_cast<int>(line), static_cast<int>(value));
 }
 
 /**
@@ -231,8 +241,7 @@ template <class Value>
 [[gnu::always_inline]] inline TK_EXPORT char* trace(const char* name, const char* file, unsigned int line,
                                                     const char* value) {
     alignas(64) static thread_local char messageBuffer[traceBufferSize];
-    return traceVariable(messageBuffer, traceView(name), traceView(file), static_cast<int>(line),
-                         traceView(value));
+    return traceVariable(messageBuffer, name, file, static_cast<int>(line), value);
 }
 
 /**
@@ -246,8 +255,7 @@ template <class Value>
                                                         unsigned int line, const char* parameters,
                                                         MessageType type) {
     alignas(64) static thread_local char messageBuffer[traceBufferSize];
-    return traceParameters(messageBuffer, traceView(function), traceView(file), static_cast<int>(line),
-                           traceView(parameters), type);
+    return traceParameters(messageBuffer, function, file, static_cast<int>(line), parameters, type);
 }
 /** @} */
 
