@@ -25,6 +25,8 @@
  *
  * **Encoding and ownership.** Names and texts are bytes that the moniker copies and never examines;
  * everything that it hands out is a copy that belongs to the caller.
+ *
+ * **Failures.** What copies or adds may throw `std::bad_alloc`.
  */
 #pragma once
 
@@ -37,23 +39,16 @@
 
 namespace TK {
 
-/**
- * The library's one exception: a fixed English message. Thrown by value; nothing in the library catches it.
+/** The library's one exception: a fixed English message. Thrown by value; nothing in the library catches it.
  *
- * Copying allocates, so it may throw `std::bad_alloc`. One object is used by one thread at a time.
- */
+ * Copying allocates, so it may throw `std::bad_alloc`. One object is used by one thread at a time. */
 class TK_EXPORT FrameworkException : public std::exception {
 public:
-    /**
-     * An exception with a message.
-     * @param text the message, NUL-terminated; copied. A null pointer counts as the empty text.
-     * @throws std::bad_alloc
-     */
+    /** An exception with a message.
+     * @param text the message, NUL-terminated; copied. A null pointer counts as the empty text. */
     explicit FrameworkException(const char* text);
-    /** Copies the message. @throws std::bad_alloc */
-    FrameworkException(const FrameworkException& other);
-    /** Copies the message. @throws std::bad_alloc */
-    FrameworkException& operator=(const FrameworkException& other);
+    FrameworkException(const FrameworkException& other);            ///< Copies the message.
+    FrameworkException& operator=(const FrameworkException& other); ///< Copies the message.
     ~FrameworkException() noexcept override;
 
     /** The message; it belongs to the exception and is valid while that lives. */
@@ -63,12 +58,10 @@ private:
     std::string message;
 };
 
-/**
- * An ordered list of typed keys, and the selection of one of them.
+/** An ordered list of typed keys, and the selection of one of them.
  *
  * Keys are only ever appended. Nothing makes names unique: two keys of one name are two components. The
- * getters read the selected component, change nothing, and write their output only when they succeed.
- */
+ * getters read the selected component, change nothing, and write their output only when they succeed. */
 class TK_EXPORT Moniker {
 public:
     /** The type of a component, as getType reports it. Callers may compare with the numbers; they never
@@ -90,87 +83,55 @@ public:
         std::string value;
     };
 
-    /** An empty moniker with nothing selected. */
-    Moniker();
-    /** A copy with the same components and the same selection, independent from then on. @throws
-     * std::bad_alloc */
+    Moniker(); ///< An empty moniker with nothing selected.
+    /** A copy with the same components and the same selection, independent from then on. */
     Moniker(const Moniker& other);
-    /** Copies components and selection; when memory runs out, this moniker is as it was. @throws
-     * std::bad_alloc */
+    /** Copies components and selection; when memory runs out, this moniker is as it was. */
     Moniker& operator=(const Moniker& other);
     ~Moniker();
 
-    /** The number of components. Never throws. */
-    unsigned int getKeyCount() const;
+    unsigned int getKeyCount() const; ///< The number of components. Never throws.
 
-    /**
-     * Selects a component.
+    /** Selects a component.
      * @param index its position, from 0.
-     * @return true when it exists; otherwise false, and nothing is selected any more. Never throws.
-     */
+     * @return true when it exists; otherwise false, and nothing is selected any more. Never throws. */
     bool selectKey(unsigned int index);
 
-    /**
-     * The selected component's type.
+    /** The selected component's type.
      * @param[out] type one of the ComponentType numbers.
-     * @throws FrameworkException "Key is not selected." when nothing is selected.
-     */
+     * @throws FrameworkException "Key is not selected." when nothing is selected. */
     void getType(unsigned short& type) const;
 
-    /**
-     * The selected component's name.
+    /** The selected component's name.
      * @param[out] name replaced by the name.
-     * @throws FrameworkException "Key is not selected." when nothing is selected.
-     * @throws std::bad_alloc
-     */
+     * @throws FrameworkException "Key is not selected." when nothing is selected. */
     void getName(std::string& name) const;
 
     /** @name The selected component's value
-     * The type has to be the one that the key was added with: nothing is widened. When one of these throws,
-     * `value` is as it was. A `COMPONENT_UINT8` that holds a white-space character (9 to 13 and 32 in the
-     * classic locale) reads back as nothing at all: the call returns and leaves `value` as it was, so set it
-     * before.
-     *
-     * @param[out] value replaced by the value.
+     * The type has to be the one that the key was added with: nothing is widened. A `COMPONENT_UINT8` that
+     * holds white space (9 to 13 and 32 in the classic locale) reads as nothing: the call leaves `value` as
+     * it was, so set it before. So does one that throws.
      * @throws FrameworkException "Either the Key is not selected or the value is not compatible with the
      * requested data type." when nothing is selected or the selected component has another type.
-     * @throws std::bad_alloc
-     */
-    /** @{ */
-    /** Of a `COMPONENT_STRING`. */
-    void getValue(std::string& value) const;
-    /** Of a `COMPONENT_UINT8`. */
-    void getValue(unsigned char& value) const;
-    /** Of a `COMPONENT_UINT16`. */
-    void getValue(unsigned short& value) const;
-    /** Of a `COMPONENT_UINT32`. */
-    void getValue(unsigned int& value) const;
-    /** Of a `COMPONENT_UINT64`. */
-    void getValue(unsigned long long& value) const;
-    /** @} */
+     * @{ */
+    void getValue(std::string& value) const;        ///< Of a `COMPONENT_STRING`.
+    void getValue(unsigned char& value) const;      ///< Of a `COMPONENT_UINT8`.
+    void getValue(unsigned short& value) const;     ///< Of a `COMPONENT_UINT16`.
+    void getValue(unsigned int& value) const;       ///< Of a `COMPONENT_UINT32`.
+    void getValue(unsigned long long& value) const; ///< Of a `COMPONENT_UINT64`.
+    ///@}
 
     /** @name Adding a key
-     * Appends a component and selects it. When memory runs out, the moniker is as it was.
-     *
-     * Numbers are kept as text in the form of the global C++ locale.
-     *
-     * @param name the key property's name; any text.
-     * @param value the key's value; a text is copied and not examined.
+     * Appends a component and selects it. When memory runs out, the moniker is as it was. Numbers are kept as
+     * text in the form of the global C++ locale. Names and texts are copied and not examined.
      * @return the new component's position, modulo 65,536; the selection is set to that number too.
-     * @throws std::bad_alloc
-     */
-    /** @{ */
-    /** As a `COMPONENT_STRING`. */
-    unsigned short addKey(std::string name, const std::string& value);
-    /** As a `COMPONENT_UINT8`. */
-    unsigned short addKey(std::string name, unsigned char value);
-    /** As a `COMPONENT_UINT16`. */
-    unsigned short addKey(std::string name, unsigned short value);
-    /** As a `COMPONENT_UINT32`. */
-    unsigned short addKey(std::string name, unsigned int value);
-    /** As a `COMPONENT_UINT64`. */
-    unsigned short addKey(std::string name, unsigned long long value);
-    /** @} */
+     * @{ */
+    unsigned short addKey(std::string name, const std::string& value); ///< As a `COMPONENT_STRING`.
+    unsigned short addKey(std::string name, unsigned char value);      ///< As a `COMPONENT_UINT8`.
+    unsigned short addKey(std::string name, unsigned short value);     ///< As a `COMPONENT_UINT16`.
+    unsigned short addKey(std::string name, unsigned int value);       ///< As a `COMPONENT_UINT32`.
+    unsigned short addKey(std::string name, unsigned long long value); ///< As a `COMPONENT_UINT64`.
+    ///@}
 
 private:
     TK_HIDDEN const KeyComponent& selected(const char* complaint) const;

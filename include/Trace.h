@@ -86,6 +86,7 @@ inline std::string_view traceView(const char* text) {
 /** A number in decimal digits. */
 class TK_HIDDEN TraceNumber {
 public:
+    /** Of a signed number. */
     explicit TraceNumber(int number)
         : isNegative_(number < 0),
           rest_(isNegative_ ? 0U - static_cast<unsigned int>(number) : static_cast<unsigned int>(number)) {
@@ -114,28 +115,26 @@ private:
     unsigned int rest_;
     std::size_t size_;
 };
-/** @name One piece, to a place that has room for it; returns where the next one begins. */
-/** @{ */
+/** Copies a text to a place that has room for it; returns where the next piece begins. */
 inline char* tracePiece(char* to, std::string_view text) {
     std::memcpy(to, text.data(), text.size());
     return to + text.size();
 }
+/** Writes a number likewise. */
 inline char* tracePiece(char* to, const TraceNumber& number) {
     number.write(to);
     return to + number.size();
 }
-/** @} */
-/** @name One piece, as much as fits before `end`. */
-/** @{ */
+/** Copies as much of a text as fits before `end`. */
 [[gnu::noinline]] TK_HIDDEN inline char* tracePiece(char* to, const char* end, std::string_view text) {
     return to + text.copy(to, static_cast<std::size_t>(end - to));
 }
+/** Writes as much of a number as fits before `end`. */
 inline char* tracePiece(char* to, const char* end, const TraceNumber& number) {
     char digits[TraceNumber::mostSize]; // NOLINT(*-member-init): written next
     number.write(digits);
     return tracePiece(to, end, {digits, number.size()});
 }
-/** @} */
 /** Fills a buffer with the pieces, up to its last byte but one, and the rest of it with zeros. Inlined into
  * the few functions below, where the compiler knows the sizes of most pieces; otherwise each is a call. */
 template <class... Pieces>

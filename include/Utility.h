@@ -27,7 +27,7 @@
 
 namespace TK {
 
-/** A family of static operations; the top of Utility.h tells what holds for all of them. */
+/** A family of static operations. The top of Utility.h says what holds for all of them. */
 class TK_EXPORT CUtility {
 public:
     CUtility() = delete;
@@ -36,14 +36,11 @@ public:
      * @param in the text; what follows its first NUL character is dropped.
      * @param[out] out replaced by the converted text; as it was when false is returned or anything is thrown.
      * @return false when the locale cannot represent a character, or a byte sequence is invalid in it.
-     * @throws std::bad_alloc
-     */
-    /** @{ */
+     * @{ */
     /** Wide to narrow, whole in every encoding, stateful ones included. */
     static bool WStringToAString(std::wstring in, std::string& out);
-    /** Narrow to wide. */
-    static bool AStringToWString(std::string in, std::wstring& out);
-    /** @} */
+    static bool AStringToWString(std::string in, std::wstring& out); ///< Narrow to wide.
+    ///@}
 
     /** @name Many texts
      * @param in the texts; of each, what follows its first NUL character is dropped.
@@ -51,13 +48,12 @@ public:
      * what it held before included.
      * @return false when one of them cannot be converted; those behind it are not looked at.
      * @throws std::bad_alloc the texts converted before it stay in `out`
-     */
-    /** @{ */
-    /** Each narrow to wide. */
-    static bool AStringArrToWStringArr(std::vector<std::string> in, std::vector<std::wstring>& out);
-    /** Each wide to narrow. */
-    static bool WStringArrToAStringArr(std::vector<std::wstring> in, std::vector<std::string>& out);
-    /** @} */
+     * @{ */
+    static bool AStringArrToWStringArr(std::vector<std::string> in,
+                                       std::vector<std::wstring>& out); ///< Each narrow to wide.
+    static bool WStringArrToAStringArr(std::vector<std::wstring> in,
+                                       std::vector<std::string>& out); ///< Each wide to narrow.
+    ///@}
 };
 
 } // namespace TK
