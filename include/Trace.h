@@ -164,7 +164,7 @@ template <class... Pieces>
         return traceText(buffer, View("MESSAGE [File: "), file, View(", Line: "), TraceNumber(line),
                          View("]: "), subject);
     }
-    return traceText(buffer, View());
+    return traceText(buffer, View(""));
 }
 /** The text of a variable, whose value is a piece. */
 template <class Value>
@@ -190,7 +190,7 @@ inline char* traceValueText(char (&buffer)[traceBufferSize], const char* name, c
                                                          const char* parameters, MessageType type) {
     using View = std::string_view;
     if (type != ENTERING && type != EXITING) {
-        return traceText(buffer, View());
+        return traceText(buffer, View(""));
     }
     return traceText(buffer, type == ENTERING ? View("ENTERING: ") : View("EXITING: "), traceView(function),
                      View("() in "), traceView(file), View(" [Line: "), TraceNumber(line),
