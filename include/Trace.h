@@ -402,16 +402,25 @@ private:
     char list_[traceBufferSize]; // NOLINT(*-member-init): written as far as it is read
 };
 
-/** The part of a path after its last slash; a constant for a constant path. */
-constexpr const char* traceFileName(const char* path) {
-    const char* name = path;
-    for (const char* c = path; *c != '\0'; ++c) {
-        if (*c == '/') {
-            name = c + 1;
+/** Where the part of a path after its last slash begins. */
+constexpr std::size_t traceFileNameAt(const char* path) {
+    std::size_t begin = 0;
+    for (std::size_t i = 0; path[i] != '\0'; ++i) {
+        if (path[i] == '/') {
+            begin = i + 1;
         }
     }
-    return name;
+    return begin;
 }
+
+/** The part of a path after its last slash. */
+constexpr const char* traceFileName(const char* path) {
+    return path + traceFileNameAt(path);
+}
+
+/** A number that the compiler works out, however little it optimizes. */
+template <std::size_t number>
+constexpr std::size_t traceConstant = number;
 
 /** @name The value of a VARIABLE trace: 32 bits for a number, a `bool` or an enumeration, else a text. */
 /** @{ */
@@ -525,13 +534,11 @@ private:
 
 /** A trace point: an object of a class, and a loop that repeats `step` while it returns true. Used by the
  * macros below alone. */
-#define TK_TRACE_POINT_(step, Class, ...)                                  \
-    do {                                                                   \
-        constexpr const char* tkTraceFile = ::TK::traceFileName(__FILE__); \
-        ::TK::Class tkTracePoint(__func__, tkTraceFile, __VA_ARGS__);      \
-        do {                                                               \
-        } while (tkTracePoint.step);                                       \
-    } while (false)
+#define TK_TRACE_POINT_(step, Class, ...)                                                                    \
+    for (::TK::Class tkTracePoint(__func__, &__FILE__[::TK::traceConstant<::TK::traceFileNameAt(__FILE__)>], \
+                                  __VA_ARGS__);                                                              \
+         tkTracePoint.step;)                                                                                 \
+    static_cast<void>(0)
 
 /** A trace point with parameter list. Used by the macros below alone. */
 #define TK_TRACE_PARAMETERS_(category, insertions, type) \
