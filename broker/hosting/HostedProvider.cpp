@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <dlfcn.h>
+#include <thread>
 
 namespace oxahv {
 
@@ -40,14 +41,28 @@ std::string wordsOf(const CMPIStatus& status) {
 }
 
 template <class MI>
-void cleanUp(MI* mi, const CMPIContext* context) {
-    if (mi != nullptr && mi->ft->cleanup != nullptr) {
-        try {
-            mi->ft->cleanup(mi, context, 1);
-        } catch (...) { // a provider that fails to end has ended all the same
-            passOnTheEndOfAThread();
-        }
+void cleanUp(Core& core, MI* mi, const CMPIContext* context) {
+    Owner own(core); // what the provider makes while it ends
+    const Owner::Scope scope(own);
+    try {
+        mi->ft->cleanup(mi, context, 1);
+    } catch (...) { // a provider that fails to end has ended all the same
+        passOnTheEndOfAThread();
     }
+}
+
+// A provider's cleanup may end its thread. It gets one of its own, since the broker calls it in destructors,
+// which no thread's end can leave.
+template <class Function>
+void runOnThread(const Function& function) {
+    std::thread thread;
+    try {
+        thread = std::thread(function);
+    } catch (const std::exception&) { // no memory, or too many threads
+        function();
+        return;
+    }
+    thread.join();
 }
 
 } // namespace
@@ -61,14 +76,17 @@ HostedProvider::~HostedProvider() {
 }
 
 void HostedProvider::cleanUp() {
-    Owner own(core_); // what the provider makes while it ends
-    const Owner::Scope scope(own);
     Context context(core_);
     try {
         core_.addContextEntries(context);
     } catch (const std::bad_alloc&) { // NOLINT(bugprone-empty-catch): it ends with the entries that fit
     }
-    std::apply([&](auto*... mis) { (oxahv::cleanUp(mis, &context), ...); }, mis_);
+    const auto end = [&](auto* mi) {
+        if (mi != nullptr && mi->ft->cleanup != nullptr) {
+            runOnThread([&] { oxahv::cleanUp(core_, mi, &context); });
+        }
+    };
+    std::apply([&](auto*... mis) { (end(mis), ...); }, mis_);
 }
 
 // The MI that a factory makes. What the factory throws ends here: its code may be unloaded next.
@@ -83,6 +101,7 @@ MI* HostedProvider::made(const Factory& factory) const {
     } catch (const std::exception& exception) {
         throw BrokerError("provider " + name_ + ": its factory threw: " + exception.what());
     } catch (...) {
+        passOnTheEndOfAThread();
         throw BrokerError("provider " + name_ + ": its factory threw an exception of an unknown kind");
     }
     if (status.rc != CMPI_RC_OK) {
