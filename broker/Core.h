@@ -3,6 +3,7 @@
 
 #include "classes/Classes.h"
 #include "hosting/AttachedThreads.h"
+#include "hosting/Delivery.h"
 #include "hosting/Hosting.h"
 #include "objects/Records.h"
 #include "tables/Hooks.h"
@@ -35,9 +36,6 @@ public:
     void tellUnserved(const std::string& className) const;
     void setUnservedHandler(std::function<void(const std::string&)> handler);
 
-    void setPathDelivery(PathDelivery delivery);
-    PathDelivery pathDelivery() const;
-
     void setContextEntry(const std::string& name, const std::string& text);
     // Puts the program's entries into a new context.
     void addContextEntries(Context& context);
@@ -48,8 +46,6 @@ private:
     mutable std::shared_mutex handlerMutex_;
     std::function<void(const BrokerMessage&)> handler_;
     std::function<void(const std::string&)> unservedHandler_;
-    mutable std::shared_mutex deliveryMutex_;
-    PathDelivery delivery_;
     std::shared_mutex contextMutex_;
     std::map<std::string, std::string> contextEntries_;
 
@@ -58,10 +54,10 @@ public:
     Owner owner{*this};
     Owner clones{*this}; // apart from what a memory mark frees: they are their callers'
     Classes classes;
+    Delivery delivery;
     Hooks hooks;
     AttachedThreads attachedThreads; // after the owners and before the providers, which may leave threads
     Hosting hosting{*this};
-    std::atomic<KeyMode> keyMode{KeyMode::exact};
     std::atomic<NewInstances> newInstances{NewInstances::full};
 };
 

@@ -51,16 +51,6 @@ void EmbeddedBroker::Impl::setUnservedHandler(std::function<void(const std::stri
     unservedHandler_.swap(handler);
 }
 
-void EmbeddedBroker::Impl::setPathDelivery(PathDelivery delivery) {
-    const std::unique_lock<std::shared_mutex> lock(deliveryMutex_);
-    std::swap(delivery_, delivery);
-}
-
-PathDelivery EmbeddedBroker::Impl::pathDelivery() const {
-    const std::shared_lock<std::shared_mutex> lock(deliveryMutex_);
-    return delivery_;
-}
-
 void EmbeddedBroker::Impl::setContextEntry(const std::string& name, const std::string& text) {
     const std::unique_lock<std::shared_mutex> lock(contextMutex_);
     contextEntries_[name] = text;
@@ -156,7 +146,7 @@ void EmbeddedBroker::unload(const std::string& name) {
 }
 
 void EmbeddedBroker::setKeyMode(KeyMode mode) {
-    impl_->keyMode.store(mode, std::memory_order_relaxed);
+    impl_->delivery.setKeyMode(mode);
 }
 
 void EmbeddedBroker::setNewInstances(NewInstances mode) {
@@ -164,7 +154,7 @@ void EmbeddedBroker::setNewInstances(NewInstances mode) {
 }
 
 void EmbeddedBroker::setPathDelivery(PathDelivery delivery) {
-    impl_->setPathDelivery(std::move(delivery));
+    impl_->delivery.setPathDelivery(std::move(delivery));
 }
 
 void EmbeddedBroker::injectFault(const std::string& slot, const Fault& fault) {

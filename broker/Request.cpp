@@ -3,6 +3,27 @@
 
 namespace oxahv {
 
+namespace {
+
+// The property list of a request, as CMPI wants it; null for none.
+class PropertyArray {
+public:
+    explicit PropertyArray(const std::vector<std::string>* names) {
+        if (names != nullptr) {
+            for (const std::string& name : *names) {
+                pointers_.push_back(name.c_str());
+            }
+            pointers_.push_back(nullptr);
+        }
+    }
+    const char** get() { return pointers_.empty() ? nullptr : pointers_.data(); }
+
+private:
+    std::vector<const char*> pointers_;
+};
+
+} // namespace
+
 // What belongs to one request: the owner of its objects, and its context.
 class Request::Impl {
 public:
@@ -22,6 +43,11 @@ public:
         }
         context.progress = &progress;
         return &context;
+    }
+
+    template <auto slot, class... Arguments>
+    Reply serve(const CMPIObjectPath* path, Arguments... arguments) {
+        return core.hosting.serve<slot>(contextFor(path), path, arguments...);
     }
 
     Core& core;
@@ -56,61 +82,62 @@ CMPIData Request::valueFromText(const std::string& text, CMPIType type) {
 }
 
 CMPIObjectPath* Request::deliver(const CMPIObjectPath* path) {
-    return impl_->core.hosting.deliver(path);
+    return impl_->core.delivery.deliver(path);
 }
 
 Reply Request::enumerateInstances(const CMPIObjectPath* classPath,
                                   const std::vector<std::string>* properties) {
-    return impl_->core.hosting.enumerateInstances(impl_->contextFor(classPath), classPath,
-                                                  PropertyArray(properties).get());
+    return impl_->serve<&CMPIInstanceMIFT::enumerateInstances>(classPath, PropertyArray(properties).get());
 }
 
 Reply Request::enumerateInstanceNames(const CMPIObjectPath* classPath) {
-    return impl_->core.hosting.enumerateInstanceNames(impl_->contextFor(classPath), classPath);
+    return impl_->serve<&CMPIInstanceMIFT::enumerateInstanceNames>(classPath);
 }
 
 Reply Request::getInstance(const CMPIObjectPath* path, const std::vector<std::string>* properties) {
-    return impl_->core.hosting.getInstance(impl_->contextFor(path), path, PropertyArray(properties).get());
+    return impl_->serve<&CMPIInstanceMIFT::getInstance>(path, PropertyArray(properties).get());
 }
 
 Reply Request::createInstance(const CMPIObjectPath* classPath, const CMPIInstance* instance) {
-    return impl_->core.hosting.createInstance(impl_->contextFor(classPath), classPath, instance);
+    return impl_->serve<&CMPIInstanceMIFT::createInstance>(classPath, instance);
 }
 
 Reply Request::modifyInstance(const CMPIObjectPath* path, const CMPIInstance* instance,
                               const std::vector<std::string>* properties) {
-    return impl_->core.hosting.modifyInstance(impl_->contextFor(path), path, instance,
-                                              PropertyArray(properties).get());
+    return impl_->serve<&CMPIInstanceMIFT::modifyInstance>(path, instance, PropertyArray(properties).get());
 }
 
 Reply Request::deleteInstance(const CMPIObjectPath* path) {
-    return impl_->core.hosting.deleteInstance(impl_->contextFor(path), path);
+    return impl_->serve<&CMPIInstanceMIFT::deleteInstance>(path);
 }
 
 Reply Request::execQuery(const CMPIObjectPath* classPath, const std::string& query,
                          const std::string& language) {
-    return impl_->core.hosting.execQuery(impl_->contextFor(classPath), classPath, query.c_str(),
-                                         language.c_str());
+    return impl_->serve<&CMPIInstanceMIFT::execQuery>(classPath, query.c_str(), language.c_str());
 }
 
 Reply Request::associators(const CMPIObjectPath* path, const AssociationFilter& filter,
                            const std::vector<std::string>* properties) {
-    return impl_->core.hosting.associators(impl_->contextFor(path), path, filter,
-                                           PropertyArray(properties).get());
+    return impl_->serve<&CMPIAssociationMIFT::associators>(
+        path, filter.associationClass.c_str(), filter.resultClass.c_str(), filter.role.c_str(),
+        filter.resultRole.c_str(), PropertyArray(properties).get());
 }
 
 Reply Request::associatorNames(const CMPIObjectPath* path, const AssociationFilter& filter) {
-    return impl_->core.hosting.associatorNames(impl_->contextFor(path), path, filter);
+    return impl_->serve<&CMPIAssociationMIFT::associatorNames>(
+        path, filter.associationClass.c_str(), filter.resultClass.c_str(), filter.role.c_str(),
+        filter.resultRole.c_str());
 }
 
 Reply Request::references(const CMPIObjectPath* path, const AssociationFilter& filter,
                           const std::vector<std::string>* properties) {
-    return impl_->core.hosting.references(impl_->contextFor(path), path, filter,
-                                          PropertyArray(properties).get());
+    return impl_->serve<&CMPIAssociationMIFT::references>(
+        path, filter.resultClass.c_str(), filter.role.c_str(), PropertyArray(properties).get());
 }
 
 Reply Request::referenceNames(const CMPIObjectPath* path, const AssociationFilter& filter) {
-    return impl_->core.hosting.referenceNames(impl_->contextFor(path), path, filter);
+    return impl_->serve<&CMPIAssociationMIFT::referenceNames>(path, filter.resultClass.c_str(),
+                                                              filter.role.c_str());
 }
 
 Reply Request::invokeMethod(const CMPIObjectPath* path, const std::string& method, const CMPIArgs* in) {

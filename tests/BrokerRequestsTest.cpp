@@ -742,6 +742,48 @@ TEST(Hosting, LetsAProviderSendRequestsWhileItEnds) {
     EXPECT_EQ(answers, std::vector<CMPIrc>(2, CMPI_RC_OK));
 }
 
+// A factory ends the thread that hosts the provider.
+TEST(Hosting, EndsWithTheThreadThatAFactoryEnds) {
+    EmbeddedBroker own;
+    const auto host = [](void* parameter) -> void* {
+        oxahv::ProviderFactories factories{createInstanceMI};
+        factories.method = [](const CMPIBroker* b, const CMPIContext*, CMPIStatus*) -> CMPIMethodMI* {
+            b->xft->exitThread(&serve);
+            return nullptr;
+        };
+        static_cast<EmbeddedBroker*>(parameter)->host("Ending", factories);
+        return nullptr;
+    };
+    bool hasEnded = false;
+    atEnd = [&](auto&&...) { hasEnded = true; };
+    CMPI_THREAD_RETURN returned = nullptr;
+    EXPECT_EQ(own.handle()->xft->joinThread(own.handle()->xft->newThread(host, &own, 0), &returned), 0);
+    atEnd = nullptr;
+    EXPECT_EQ(returned, &serve);
+    EXPECT_TRUE(hasEnded) << "the instance MI was there already";
+    EXPECT_EQ(own.liveObjects().total(), 0U);
+    own.host("Ending", {createInstanceMI}); // the name is free
+}
+
+// A cleanup may end no thread but the one that the broker gives it.
+TEST(Hosting, SurvivesACleanupThatEndsItsThread) {
+    int ended = 0;
+    atEnd = [&](auto&&...) {
+        ++ended;
+        CMNewString(broker, "left", nullptr);
+        broker->xft->exitThread(nullptr);
+    };
+    {
+        EmbeddedBroker own;
+        own.host("Ending", {createInstanceMI});
+        own.unload("Ending");
+        EXPECT_EQ(own.liveObjects().total(), 0U);
+        own.host("Ending", {createInstanceMI});
+    }
+    atEnd = nullptr;
+    EXPECT_EQ(ended, 2);
+}
+
 TEST(ACode, IsFoundByItsNameOrNumber) {
     for (const char* const name : {"err_not_found", "CMPI_RC_ERR_NOT_FOUND", "6"}) {
         EXPECT_EQ(oxahv::codeName(oxahv::codeFromName(name)), "CMPI_RC_ERR_NOT_FOUND") << name;

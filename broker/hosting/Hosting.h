@@ -1,31 +1,18 @@
 // The providers of a broker, and the way from a request to one of them.
 #pragma once
 
-#include "EmbeddedBroker.h"
+#include "hosting/Operations.h"
 
 #include <memory>
 #include <shared_mutex>
-#include <string_view>
+#include <string>
 #include <vector>
 
 namespace oxahv {
 
-class ObjectPath;
-class HostedProvider;
-
-// The property list of a request, as CMPI wants it; null for none.
-class PropertyArray {
-public:
-    explicit PropertyArray(const std::vector<std::string>* names);
-    const char** get() { return pointers_.empty() ? nullptr : pointers_.data(); }
-
-private:
-    std::vector<const char*> pointers_;
-};
-
 class Hosting {
 public:
-    explicit Hosting(EmbeddedBroker::Impl& core) : core_(core) {}
+    explicit Hosting(Core& core) : core_(core) {}
     ~Hosting(); // NOLINT(bugprone-exception-escape): see there
     Hosting(const Hosting&) = delete;
     Hosting& operator=(const Hosting&) = delete;
@@ -34,48 +21,30 @@ public:
     void load(const std::string& file, const std::string& name, std::vector<std::string> classes);
     void unload(const std::string& name);
 
-    // Requests. Each finds the provider of the path's class, runs its function under the context, and returns
-    // what it returned. Nothing is thrown but std::bad_alloc.
-    Reply enumerateInstances(const CMPIContext* context, const CMPIObjectPath* path, const char** properties);
-    Reply enumerateInstanceNames(const CMPIContext* context, const CMPIObjectPath* path);
-    Reply getInstance(const CMPIContext* context, const CMPIObjectPath* path, const char** properties);
-    Reply createInstance(const CMPIContext* context, const CMPIObjectPath* path,
-                         const CMPIInstance* instance);
-    Reply modifyInstance(const CMPIContext* context, const CMPIObjectPath* path, const CMPIInstance* instance,
-                         const char** properties);
-    Reply deleteInstance(const CMPIContext* context, const CMPIObjectPath* path);
-    Reply execQuery(const CMPIContext* context, const CMPIObjectPath* path, const char* query,
-                    const char* language);
-    Reply associators(const CMPIContext* context, const CMPIObjectPath* path, const AssociationFilter& filter,
-                      const char** properties);
-    Reply associatorNames(const CMPIContext* context, const CMPIObjectPath* path,
-                          const AssociationFilter& filter);
-    Reply references(const CMPIContext* context, const CMPIObjectPath* path, const AssociationFilter& filter,
-                     const char** properties);
-    Reply referenceNames(const CMPIContext* context, const CMPIObjectPath* path,
-                         const AssociationFilter& filter);
+    // Finds the provider of the path's class, calls its function in that slot of its MI's table with the
+    // arguments behind the path, and returns what it returned. Throws nothing but std::bad_alloc.
+    template <auto slot, class... Arguments>
+    Reply serve(const CMPIContext* context, const CMPIObjectPath* path, Arguments... arguments) {
+        return serve(context, path, OperationOf<slot>(arguments...));
+    }
+    // The same for a method, whose arguments are checked against its declaration.
     Reply invokeMethod(const CMPIContext* context, const CMPIObjectPath* path, const char* method,
                        const CMPIArgs* in);
 
-    // A copy of a path as the broker's KeyMode and PathDelivery say; the current owner's.
-    CMPIObjectPath* deliver(const CMPIObjectPath* handle) const;
-
 private:
+    using Providers = std::vector<std::shared_ptr<HostedProvider>>;
+
+    Reply serve(const CMPIContext* context, const CMPIObjectPath* handle, const Operation& operation);
     // Whom to ask, in order: one that names the class, or all that may serve it.
-    template <class MI>
-    std::vector<std::shared_ptr<HostedProvider>> find(const ObjectPath& path,
-                                                      std::string_view associationClass) const;
-    template <class MI, class Function>
-    Reply request(const CMPIContext* context, const CMPIObjectPath* handle, const Function& function,
-                  std::string_view associationClass = {});
+    Providers find(const ObjectPath& path, const Operation& operation) const;
     void add(std::shared_ptr<HostedProvider> provider);
     std::shared_ptr<HostedProvider> take(const std::string& name);
     void requireFreeName(const std::string& name) const;
     void requireFreeNameLocked(const std::string& name) const;
 
-    EmbeddedBroker::Impl& core_;
+    Core& core_;
     mutable std::shared_mutex mutex_;
-    std::vector<std::shared_ptr<HostedProvider>> providers_;
+    Providers providers_;
 };
 
 } // namespace oxahv

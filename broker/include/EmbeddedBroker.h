@@ -159,8 +159,9 @@ public:
      */
     void setContextEntry(const std::string& name, const std::string& text);
     /**
-     * Calls the provider's `cleanup` as at a server's end, waits for requests that are inside it, and unloads
-     * its library, whatever `cleanup` answers. Not to be called from a request that is inside it.
+     * Waits for requests that are inside the provider, calls its `cleanup` as at a server's end, on a thread
+     * that the `cleanup` may end, and unloads its library, whatever `cleanup` answers. Not to be called from
+     * a request that is inside it.
      * @throws BrokerError when no such provider is hosted.
      */
     void unload(const std::string& name);

@@ -87,81 +87,39 @@ Handle* firstOf(const Reply& reply, const std::vector<Handle*>& handles) {
     return handles.front();
 }
 
-const char* orEmpty(const char* text) {
-    return text != nullptr ? text : "";
-}
-
-CMPIEnumeration* enumerateInstanceNames(Core& core, const CMPIContext* context, const CMPIObjectPath* path) {
-    return enumerationOf(core, core.hosting.enumerateInstanceNames(context, path), path, CMPI_ref);
-}
-
-CMPIEnumeration* enumerateInstances(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
-                                    const char** properties) {
-    return enumerationOf(core, core.hosting.enumerateInstances(context, path, properties), path,
-                         CMPI_instance);
-}
-
-CMPIInstance* getInstance(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
-                          const char** properties) {
-    Reply reply = core.hosting.getInstance(context, path, properties);
-    tellUnserved(core, reply, path, CMPI_RC_ERR_NOT_FOUND);
-    return firstOf(reply, reply.instances);
-}
-
-CMPIObjectPath* createInstance(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
-                               const CMPIInstance* instance) {
-    Reply reply = core.hosting.createInstance(context, path, instance);
-    tellUnserved(core, reply, path, CMPI_RC_ERR_NOT_SUPPORTED);
-    return firstOf(reply, reply.objectPaths);
-}
-
-void modifyInstance(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
-                    const CMPIInstance* instance, const char** properties) {
-    Reply reply = core.hosting.modifyInstance(context, path, instance, properties);
-    tellUnserved(core, reply, path, CMPI_RC_ERR_NOT_SUPPORTED);
-    succeeded(reply);
-}
-
-void deleteInstance(Core& core, const CMPIContext* context, const CMPIObjectPath* path) {
-    Reply reply = core.hosting.deleteInstance(context, path);
-    tellUnserved(core, reply, path, CMPI_RC_ERR_NOT_SUPPORTED);
-    succeeded(reply);
-}
-
-CMPIEnumeration* execQuery(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
-                           const char* query, const char* language) {
-    return enumerationOf(core, core.hosting.execQuery(context, path, query, language), path, CMPI_instance);
-}
-
-CMPIEnumeration* associators(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
-                             const char* associationClass, const char* resultClass, const char* role,
-                             const char* resultRole, const char** properties) {
-    const AssociationFilter filter = {orEmpty(associationClass), orEmpty(resultClass), orEmpty(role),
-                                      orEmpty(resultRole)};
-    return enumerationOf(core, core.hosting.associators(context, path, filter, properties), path,
-                         CMPI_instance);
-}
-
-CMPIEnumeration* associatorNames(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
-                                 const char* associationClass, const char* resultClass, const char* role,
-                                 const char* resultRole) {
-    const AssociationFilter filter = {orEmpty(associationClass), orEmpty(resultClass), orEmpty(role),
-                                      orEmpty(resultRole)};
-    return enumerationOf(core, core.hosting.associatorNames(context, path, filter), path, CMPI_ref);
-}
-
-CMPIEnumeration* references(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
-                            const char* resultClass, const char* role, const char** properties) {
-    const AssociationFilter filter = {"", orEmpty(resultClass), orEmpty(role), ""};
-    return enumerationOf(core, core.hosting.references(context, path, filter, properties), path,
-                         CMPI_instance);
-}
-
-CMPIEnumeration* referenceNames(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
-                                const char* resultClass, const char* role) {
-    const AssociationFilter filter = {"", orEmpty(resultClass), orEmpty(role), ""};
-    return enumerationOf(core, core.hosting.referenceNames(context, path, filter), path, CMPI_ref);
-}
+// The upcall for an operation of an MI, by what comes back of it. It has the arguments of the MI's slot.
+template <auto slot>
+struct Upcall;
+template <class Table, class MI, class... Rest,
+          CMPIStatus (*Table::*slot)(MI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*,
+                                     Rest...)>
+struct Upcall<slot> {
+    static CMPIEnumeration* instances(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
+                                      Rest... rest) {
+        return enumerationOf(core, core.hosting.serve<slot>(context, path, rest...), path, CMPI_instance);
+    }
+    static CMPIEnumeration* paths(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
+                                  Rest... rest) {
+        return enumerationOf(core, core.hosting.serve<slot>(context, path, rest...), path, CMPI_ref);
+    }
+    static CMPIInstance* instance(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
+                                  Rest... rest) {
+        Reply reply = core.hosting.serve<slot>(context, path, rest...);
+        tellUnserved(core, reply, path, CMPI_RC_ERR_NOT_FOUND);
+        return firstOf(reply, reply.instances);
+    }
+    static CMPIObjectPath* path(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
+                                Rest... rest) {
+        Reply reply = core.hosting.serve<slot>(context, path, rest...);
+        tellUnserved(core, reply, path, CMPI_RC_ERR_NOT_SUPPORTED);
+        return firstOf(reply, reply.objectPaths);
+    }
+    static void nothing(Core& core, const CMPIContext* context, const CMPIObjectPath* path, Rest... rest) {
+        Reply reply = core.hosting.serve<slot>(context, path, rest...);
+        tellUnserved(core, reply, path, CMPI_RC_ERR_NOT_SUPPORTED);
+        succeeded(reply);
+    }
+};
 
 CMPIData invokeMethod(Core& core, const CMPIContext* context, const CMPIObjectPath* path, const char* method,
                       const CMPIArgs* in, CMPIArgs* out) {
@@ -182,7 +140,8 @@ CMPIData invokeMethod(Core& core, const CMPIContext* context, const CMPIObjectPa
 
 CMPIData getProperty(Core& core, const CMPIContext* context, const CMPIObjectPath* path, const char* name) {
     const char* properties[] = {required(name), nullptr};
-    CMPIInstance* const instance = getInstance(core, context, path, properties);
+    CMPIInstance* const instance =
+        Upcall<&CMPIInstanceMIFT::getInstance>::instance(core, context, path, properties);
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     const CMPIData data = CMGetProperty(instance, name, &status);
     if (status.rc != CMPI_RC_OK) {
@@ -202,7 +161,7 @@ void setProperty(Core& core, const CMPIContext* context, const CMPIObjectPath* p
     if (status.rc != CMPI_RC_OK) {
         throw Failure{status.rc};
     }
-    modifyInstance(core, context, path, instance, properties);
+    Upcall<&CMPIInstanceMIFT::modifyInstance>::nothing(core, context, path, instance, properties);
 }
 
 // There is no query language.
@@ -238,17 +197,17 @@ const CMPIBrokerFT requestTable = {
     SLOT(CMPIBrokerFT, attachThread, attachThread),
     SLOT(CMPIBrokerFT, detachThread, detachThread),
     SLOT(CMPIBrokerFT, deliverIndication, deliverIndication),
-    SLOT(CMPIBrokerFT, enumerateInstanceNames, enumerateInstanceNames),
-    SLOT(CMPIBrokerFT, getInstance, getInstance),
-    SLOT(CMPIBrokerFT, createInstance, createInstance),
-    SLOT(CMPIBrokerFT, modifyInstance, modifyInstance),
-    SLOT(CMPIBrokerFT, deleteInstance, deleteInstance),
-    SLOT(CMPIBrokerFT, execQuery, execQuery),
-    SLOT(CMPIBrokerFT, enumerateInstances, enumerateInstances),
-    SLOT(CMPIBrokerFT, associators, associators),
-    SLOT(CMPIBrokerFT, associatorNames, associatorNames),
-    SLOT(CMPIBrokerFT, references, references),
-    SLOT(CMPIBrokerFT, referenceNames, referenceNames),
+    SLOT(CMPIBrokerFT, enumerateInstanceNames, Upcall<&CMPIInstanceMIFT::enumerateInstanceNames>::paths),
+    SLOT(CMPIBrokerFT, getInstance, Upcall<&CMPIInstanceMIFT::getInstance>::instance),
+    SLOT(CMPIBrokerFT, createInstance, Upcall<&CMPIInstanceMIFT::createInstance>::path),
+    SLOT(CMPIBrokerFT, modifyInstance, Upcall<&CMPIInstanceMIFT::modifyInstance>::nothing),
+    SLOT(CMPIBrokerFT, deleteInstance, Upcall<&CMPIInstanceMIFT::deleteInstance>::nothing),
+    SLOT(CMPIBrokerFT, execQuery, Upcall<&CMPIInstanceMIFT::execQuery>::instances),
+    SLOT(CMPIBrokerFT, enumerateInstances, Upcall<&CMPIInstanceMIFT::enumerateInstances>::instances),
+    SLOT(CMPIBrokerFT, associators, Upcall<&CMPIAssociationMIFT::associators>::instances),
+    SLOT(CMPIBrokerFT, associatorNames, Upcall<&CMPIAssociationMIFT::associatorNames>::paths),
+    SLOT(CMPIBrokerFT, references, Upcall<&CMPIAssociationMIFT::references>::instances),
+    SLOT(CMPIBrokerFT, referenceNames, Upcall<&CMPIAssociationMIFT::referenceNames>::paths),
     SLOT(CMPIBrokerFT, invokeMethod, invokeMethod),
     SLOT(CMPIBrokerFT, setProperty, setProperty),
     SLOT(CMPIBrokerFT, getProperty, getProperty),

@@ -1,0 +1,86 @@
+#include "hosting/Delivery.h"
+
+#include "objects/Records.h"
+#include "text/Integers.h"
+
+#include <algorithm>
+
+namespace oxahv {
+
+namespace {
+
+Value changedInteger(Core& core, const Value& value, KeyMode mode) {
+    const WideInteger number = value.integer();
+    if (mode == KeyMode::text) {
+        return Value::text(core, (number.isNegative ? "-" : "") + std::to_string(number.magnitude));
+    }
+    CMPIValue wide = {};
+    wide.uint64 = number.bits();
+    const bool isSigned = mode == KeyMode::signedIntegers || integerType(value.type())->isSigned;
+    return Value::number(wide, isSigned ? CMPI_sint64 : CMPI_uint64);
+}
+
+void changeKey(Core& core, Value& value, KeyMode mode) {
+    if (mode == KeyMode::chars) {
+        if (value.type() == CMPI_string) {
+            value.retype(CMPI_chars);
+        }
+    } else if (mode != KeyMode::exact && integerType(value.type()) != nullptr) {
+        value = changedInteger(core, value, mode);
+    }
+}
+
+std::string otherCase(std::string name) {
+    for (char& c : name) {
+        const bool isLetter = (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z');
+        c = isLetter ? static_cast<char>(c ^ ('a' ^ 'A')) : c;
+    }
+    return name;
+}
+
+// Changes a path as a server or a client does, and the paths among its keys.
+void change(ObjectPath& path, KeyMode mode, const PathDelivery& delivery) {
+    if (!delivery.hostName.empty()) {
+        path.hostName = delivery.hostName;
+    }
+    if (delivery.reversesKeys) {
+        std::reverse(path.keys.begin(), path.keys.end());
+    }
+    for (NamedValue& key : path.keys) {
+        if (delivery.changesCase) {
+            key.name = otherCase(std::move(key.name));
+        }
+        if (key.value.isNull()) {
+            continue;
+        }
+        if (key.value.type() == CMPI_ref) {
+            change(*ObjectPath::of(key.value.data().value.ref), mode, delivery);
+        } else {
+            changeKey(path.core(), key.value, mode);
+        }
+    }
+}
+
+} // namespace
+
+void Delivery::setPathDelivery(PathDelivery pathDelivery) {
+    const std::unique_lock<std::shared_mutex> lock(mutex_);
+    std::swap(pathDelivery_, pathDelivery);
+}
+
+PathDelivery Delivery::pathDelivery() const {
+    const std::shared_lock<std::shared_mutex> lock(mutex_);
+    return pathDelivery_;
+}
+
+CMPIObjectPath* Delivery::deliver(const CMPIObjectPath* handle) const {
+    const ObjectPath* const path = ObjectPath::of(handle);
+    if (path == nullptr) {
+        return nullptr;
+    }
+    std::unique_ptr<ObjectPath> copy = path->copy();
+    change(*copy, keyMode_.load(std::memory_order_relaxed), pathDelivery());
+    return handOut(std::move(copy));
+}
+
+} // namespace oxahv
