@@ -1,6 +1,6 @@
 #include "check/Associations.h"
 
-#include "check/Examination.h"
+#include "check/Results.h"
 #include "show/Text.h"
 
 #include <algorithm>

@@ -1,10 +1,7 @@
 #include "check/Client.h"
 
-#include <nlohmann/json.hpp>
-
 namespace {
 
-using Json = nlohmann::json;
 using oxahv::BrokerError;
 
 bool endsWith(const std::string& text, const std::string& end) {
@@ -53,29 +50,6 @@ bool isStandard(CMPIrc code) {
 }
 
 } // namespace
-
-std::string lineOf(const Message& message) {
-    const Finding& finding = message.finding;
-    const Json json = {static_cast<int>(message.kind),
-                       message.number,
-                       message.text,
-                       static_cast<int>(finding.kind),
-                       finding.className,
-                       finding.pass,
-                       finding.request,
-                       finding.text};
-    return json.dump(-1, ' ', false, Json::error_handler_t::replace);
-}
-
-Message messageOf(const std::string& line) {
-    const Json json = Json::parse(line);
-    Message message;
-    message.kind = static_cast<Message::Kind>(json[0].get<int>());
-    message.number = json[1];
-    message.text = json[2];
-    message.finding = {static_cast<CheckKind>(json[3].get<int>()), json[4], json[5], json[6], json[7]};
-    return message;
-}
 
 // Tells the parent what is begun before it begins, so that it knows what was at work when the process ends.
 template <class Work>

@@ -4,6 +4,7 @@
 
 #include "check/Child.h"
 #include "check/Findings.h"
+#include "check/Protocol.h"
 #include "check/Query.h"
 
 #include <atomic>
@@ -30,18 +31,6 @@ struct CheckTask {
     unsigned int threads = 4;
     std::set<std::string> skipped; // the queries that have ended or blocked the provider
 };
-
-// Messages of the child, as its parent reads them.
-struct Message {
-    enum class Kind { begin, end, finding, classServed, classRefused, unserved, unusable };
-    Kind kind = Kind::begin;
-    std::size_t number = 0; // of a query; of a class that is served, its instances
-    std::string text; // of a query; of a refusal, the answer; the class of an upcall that found no provider;
-                      // of what makes the check impossible, why
-    Finding finding{};
-};
-std::string lineOf(const Message& message);
-Message messageOf(const std::string& line);
 
 class Client {
 public:

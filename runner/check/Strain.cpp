@@ -1,6 +1,6 @@
 #include "check/Strain.h"
 
-#include "check/Examination.h"
+#include "check/Results.h"
 
 #include <algorithm>
 #include <chrono>
