@@ -13,6 +13,7 @@
 #include <stdexcept>
 #include <string>
 
+namespace oxahv::runner {
 namespace {
 
 constexpr int usageFailed = 2;
@@ -67,7 +68,7 @@ struct Words {
         options.hasConduct = keyMode != "exact" || newInstances != "full" || !pathChanges.empty();
         Conduct& conduct = options.conduct;
         conduct.keyMode = keyModes.at(keyMode);
-        conduct.newInstances = newInstances == "bare" ? oxahv::NewInstances::bare : oxahv::NewInstances::full;
+        conduct.newInstances = newInstances == "bare" ? NewInstances::bare : NewInstances::full;
         for (const std::string& change : pathChanges) {
             conduct.pathDelivery.reversesKeys = conduct.pathDelivery.reversesKeys || change == "reversed";
             conduct.pathDelivery.changesCase = conduct.pathDelivery.changesCase || change == "case";
@@ -77,12 +78,9 @@ struct Words {
         }
     }
 
-    static inline const std::map<std::string, oxahv::KeyMode> keyModes = {
-        {"exact", oxahv::KeyMode::exact},
-        {"untyped", oxahv::KeyMode::untyped},
-        {"signed", oxahv::KeyMode::signedIntegers},
-        {"chars", oxahv::KeyMode::chars},
-        {"text", oxahv::KeyMode::text},
+    static inline const std::map<std::string, KeyMode> keyModes = {
+        {"exact", KeyMode::exact}, {"untyped", KeyMode::untyped}, {"signed", KeyMode::signedIntegers},
+        {"chars", KeyMode::chars}, {"text", KeyMode::text},
     };
 };
 
@@ -167,7 +165,7 @@ void addOptions(CLI::App& app, Options& options, Words& words) {
         ->allow_extra_args(false);
 }
 
-void addFilters(CLI::App& command, Takes takes, oxahv::AssociationFilter& filter) {
+void addFilters(CLI::App& command, Takes takes, AssociationFilter& filter) {
     const bool isWhole = takes == Takes::filter;
     if (isWhole) {
         command.add_option("--assoc-class", filter.associationClass, "only by associations of this class")
@@ -279,16 +277,17 @@ int parseAndRun(int argc, char** argv) {
 }
 
 } // namespace
+} // namespace oxahv::runner
 
 int main(int argc, char** argv) {
     try {
-        const int status = parseAndRun(argc, argv);
+        const int status = oxahv::runner::parseAndRun(argc, argv);
         if (!std::cout.flush()) {
             throw std::runtime_error("cannot write to the standard output");
         }
         return status;
     } catch (const std::exception& exception) {
-        std::cerr << "oxahv-provider: " << printable(exception.what()) << '\n';
-        return usageFailed;
+        std::cerr << "oxahv-provider: " << oxahv::runner::printable(exception.what()) << '\n';
+        return oxahv::runner::usageFailed;
     }
 }

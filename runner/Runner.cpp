@@ -10,13 +10,11 @@
 #include <filesystem>
 #include <iostream>
 
+namespace oxahv::runner {
+
 namespace {
 
 constexpr int providerFailed = 1;
-
-using oxahv::EmbeddedBroker;
-using oxahv::Reply;
-using oxahv::Request;
 
 // Sending requests
 
@@ -107,7 +105,7 @@ std::string nameOf(const std::string& library) {
 void addContextEntry(EmbeddedBroker& broker, const std::string& text) {
     const std::size_t equals = text.find('=');
     if (equals == std::string::npos || equals == 0) {
-        throw oxahv::BrokerError("context entry '" + text + "' is not NAME=TEXT");
+        throw BrokerError("context entry '" + text + "' is not NAME=TEXT");
     }
     broker.setContextEntry(text.substr(0, equals), text.substr(equals + 1));
 }
@@ -119,18 +117,18 @@ void inject(EmbeddedBroker& broker, const std::string& text) {
     const std::string number = first != std::string::npos ? text.substr(first + 1, second - first - 1) : "";
     if (number.empty() || number.size() > 9 || number.find_first_not_of("0123456789") != std::string::npos ||
         std::stoul(number) == 0) {
-        throw oxahv::BrokerError("fault '" + text + "' is not SLOT:N[:CODE] with N from 1 on");
+        throw BrokerError("fault '" + text + "' is not SLOT:N[:CODE] with N from 1 on");
     }
-    oxahv::Fault fault;
+    Fault fault;
     fault.firstCall = static_cast<unsigned int>(std::stoul(number));
     if (second != std::string::npos) {
-        fault.code = oxahv::codeFromName(text.substr(second + 1));
+        fault.code = codeFromName(text.substr(second + 1));
     }
     try {
         broker.injectFault(text.substr(0, first), fault);
-    } catch (const oxahv::BrokerError& error) {
-        throw oxahv::BrokerError(std::string(error.what()) +
-                                 "; name it by table and member, as CMPIObjectPathFT.addKey");
+    } catch (const BrokerError& error) {
+        throw BrokerError(std::string(error.what()) +
+                          "; name it by table and member, as CMPIObjectPathFT.addKey");
     }
 }
 
@@ -173,8 +171,8 @@ CMPIObjectPath* targetOf(Request& request, const Options& options, const Verb& v
     }
     try {
         return request.objectPathFromText(operands.target, options.nameSpace);
-    } catch (const oxahv::BrokerError& error) {
-        throw oxahv::BrokerError(std::string(error.what()) + "; write it as Class.Key=\"text\",Number=3");
+    } catch (const BrokerError& error) {
+        throw BrokerError(std::string(error.what()) + "; write it as Class.Key=\"text\",Number=3");
     }
 }
 
@@ -205,14 +203,13 @@ static void load(EmbeddedBroker& broker, const Library& library) {
     const std::string name = providerName(library);
     try {
         broker.load(std::filesystem::absolute(library.file), name, library.classes);
-    } catch (const oxahv::BrokerError& error) {
+    } catch (const BrokerError& error) {
         const std::string message = error.what();
         const bool isLoaded = message.rfind("cannot load", 0) != 0;
         const bool isFile = std::filesystem::is_regular_file(library.file);
-        throw oxahv::BrokerError(message +
-                                 (isLoaded ? "; is " + name + " its MI name? Else give it with --provider"
-                                  : isFile ? "; ldd shows what the library needs and what it lacks"
-                                           : "; give the path of the provider's library with --library"));
+        throw BrokerError(message + (isLoaded ? "; is " + name + " its MI name? Else give it with --provider"
+                                     : isFile ? "; ldd shows what the library needs and what it lacks"
+                                              : "; give the path of the provider's library with --library"));
     }
 }
 
@@ -241,10 +238,12 @@ int run(const Options& options, const Verb& verb, const Operands& operands) {
             "the provider returned " + std::to_string(reply.instances.size()) + " instances in place of one";
     }
     if (!reply.ok()) {
-        std::cerr << "oxahv-provider: " << oxahv::codeName(reply.code)
+        std::cerr << "oxahv-provider: " << codeName(reply.code)
                   << (reply.message.empty() ? "" : ": " + printable(reply.message)) << '\n';
         return providerFailed;
     }
     printReply(options, target, operands, verb.yields, reply);
     return 0;
 }
+
+} // namespace oxahv::runner

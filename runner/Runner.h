@@ -9,6 +9,8 @@
 #include <string>
 #include <vector>
 
+namespace oxahv::runner {
+
 // One provider of a library.
 struct Library {
     std::string file;
@@ -18,11 +20,11 @@ struct Library {
 
 // How the broker serves requests, where CIM servers differ.
 struct Conduct {
-    oxahv::KeyMode keyMode = oxahv::KeyMode::exact;
-    oxahv::NewInstances newInstances = oxahv::NewInstances::full;
-    oxahv::PathDelivery pathDelivery{};
+    KeyMode keyMode = KeyMode::exact;
+    NewInstances newInstances = NewInstances::full;
+    PathDelivery pathDelivery{};
 };
-void apply(oxahv::EmbeddedBroker& broker, const Conduct& conduct);
+void apply(EmbeddedBroker& broker, const Conduct& conduct);
 
 struct Options {
     std::vector<Library> libraries; // the first is the one that a check is about
@@ -39,7 +41,7 @@ struct Options {
 // What stands behind the verb. A verb leaves what it does not take as it is.
 struct Operands {
     std::string target; // a class or a path
-    oxahv::AssociationFilter filter;
+    AssociationFilter filter;
     std::optional<std::vector<std::string>> properties; // the property list
     std::string method;
     std::vector<std::string> arguments; // name=value
@@ -58,27 +60,29 @@ struct Verb {
     Yields yields;
     const char* help;
     // Sends the request.
-    oxahv::Reply (*perform)(oxahv::EmbeddedBroker& broker, oxahv::Request& request,
-                            const CMPIObjectPath* target, const Operands& operands);
+    Reply (*perform)(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* target,
+                     const Operands& operands);
 };
 
 // The verbs, in the order in which the help shows them.
 const std::vector<Verb>& verbs();
 
-// The path that the verb is about. Throws oxahv::BrokerError for a text that is none.
-CMPIObjectPath* targetOf(oxahv::Request& request, const Options& options, const Verb& verb,
+// The path that the verb is about. Throws BrokerError for a text that is none.
+CMPIObjectPath* targetOf(Request& request, const Options& options, const Verb& verb,
                          const Operands& operands);
 
 // The MI name: the option, or what the library's file stands for.
 std::string providerName(const Library& library);
 
-// Gives the broker the classes and the context entries. Throws oxahv::BrokerError.
-void prepare(oxahv::EmbeddedBroker& broker, const Options& options);
+// Gives the broker the classes and the context entries. Throws BrokerError.
+void prepare(EmbeddedBroker& broker, const Options& options);
 
-// Loads the providers. Throws oxahv::BrokerError.
-void loadProviders(oxahv::EmbeddedBroker& broker, const Options& options);
+// Loads the providers. Throws BrokerError.
+void loadProviders(EmbeddedBroker& broker, const Options& options);
 
 // Loads the provider and performs the verb. Prints results on the standard output and errors on the standard
-// error stream. Returns the exit status; throws oxahv::BrokerError for what keeps the request from being
+// error stream. Returns the exit status; throws BrokerError for what keeps the request from being
 // sent.
 int run(const Options& options, const Verb& verb, const Operands& operands);
+
+} // namespace oxahv::runner

@@ -6,9 +6,9 @@
 #include <algorithm>
 #include <set>
 
-namespace {
+namespace oxahv::runner {
 
-using oxahv::AssociationFilter;
+namespace {
 
 bool isNone(const AssociationFilter& filter) {
     return filter.associationClass.empty() && filter.resultClass.empty() && filter.role.empty() &&
@@ -262,3 +262,5 @@ bool Associations::compareWithWays(const char* verb, const std::optional<Answer>
     }
     return difference.empty();
 }
+
+} // namespace oxahv::runner

@@ -6,6 +6,8 @@
 #include <string>
 #include <vector>
 
+namespace oxahv::runner {
+
 struct CheckOptions {
     std::vector<std::string> classes; // empty: all concrete ones
     std::vector<std::string> methods; // CLASS.METHOD name=value ...
@@ -14,5 +16,7 @@ struct CheckOptions {
 };
 
 // Checks the provider and prints the report on the standard output. Returns the exit status, 1 when anything
-// is found; throws oxahv::BrokerError for what makes the check impossible.
+// is found; throws BrokerError for what makes the check impossible.
 int runCheck(const Options& options, const CheckOptions& checkOptions);
+
+} // namespace oxahv::runner

@@ -1,8 +1,8 @@
 #include "check/Client.h"
 
-namespace {
+namespace oxahv::runner {
 
-using oxahv::BrokerError;
+namespace {
 
 bool endsWith(const std::string& text, const std::string& end) {
     return text.size() >= end.size() && text.compare(text.size() - end.size(), end.size(), end) == 0;
@@ -13,19 +13,19 @@ struct Refusal {
     const char* member;
     CMPIrc code;
     CheckKind kind;
-    std::string (*text)(const oxahv::Call& call);
+    std::string (*text)(const Call& call);
 };
 
-std::string propertyText(const oxahv::Call& call) {
+std::string propertyText(const Call& call) {
     return "property " + call.name;
 }
-std::string typedText(const oxahv::Call& call) {
+std::string typedText(const Call& call) {
     return "property " + call.name + " is set as " + typeText(call.type);
 }
-std::string classText(const oxahv::Call& /*call*/) {
+std::string classText(const Call& /*call*/) {
     return "an instance is made of a class that is not declared";
 }
-std::string dateText(const oxahv::Call& call) {
+std::string dateText(const Call& call) {
     return '\'' + call.name + '\'';
 }
 
@@ -46,7 +46,7 @@ bool isException(const Answer& answer) {
 }
 
 bool isStandard(CMPIrc code) {
-    return oxahv::codeName(code) != "CMPI_RC_" + std::to_string(static_cast<int>(code));
+    return codeName(code) != "CMPI_RC_" + std::to_string(static_cast<int>(code));
 }
 
 } // namespace
@@ -155,3 +155,5 @@ bool Client::checkLeftOver(const Query& query, std::size_t before) {
     }
     return left > kept;
 }
+
+} // namespace oxahv::runner

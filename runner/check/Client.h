@@ -14,6 +14,8 @@
 #include <string>
 #include <vector>
 
+namespace oxahv::runner {
+
 // A method that the user wants to be called.
 struct MethodCall {
     std::string className;
@@ -43,11 +45,11 @@ public:
     };
 
     // Without `reports`, what is found is not told: another pass has told it.
-    Client(oxahv::EmbeddedBroker& broker, const Options& options, const CheckTask& task, ChildOutput& output,
+    Client(EmbeddedBroker& broker, const Options& options, const CheckTask& task, ChildOutput& output,
            bool reports)
         : broker_(broker), options_(options), task_(task), output_(output), reports_(reports) {}
 
-    oxahv::EmbeddedBroker& broker() { return broker_; }
+    EmbeddedBroker& broker() { return broker_; }
     const Options& options() const { return options_; }
     const CheckTask& task() const { return task_; }
     const std::vector<Asked>& asked() const { return asked_; }
@@ -72,7 +74,7 @@ private:
     void checkCalls(const std::string& request, const std::vector<ProviderCall>& calls);
     bool checkLeftOver(const Query& query, std::size_t before);
 
-    oxahv::EmbeddedBroker& broker_;
+    EmbeddedBroker& broker_;
     const Options& options_;
     const CheckTask& task_;
     ChildOutput& output_;
@@ -80,3 +82,5 @@ private:
     std::vector<Asked> asked_;
     std::atomic<std::size_t> number_{0};
 };
+
+} // namespace oxahv::runner

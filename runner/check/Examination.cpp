@@ -8,9 +8,9 @@
 #include <algorithm>
 #include <set>
 
-namespace {
+namespace oxahv::runner {
 
-using oxahv::PropertyDeclaration;
+namespace {
 
 bool isInteger(CMPIType type) {
     return (type & (CMPI_UINT | CMPI_ARRAY)) == CMPI_UINT; // signed ones have the bit too
@@ -304,3 +304,5 @@ void Examination::callMethods() {
         }
     }
 }
+
+} // namespace oxahv::runner

@@ -7,6 +7,8 @@
 #include <string>
 #include <vector>
 
+namespace oxahv::runner {
+
 class Examination {
 public:
     explicit Examination(Client& client) : client_(client) {}
@@ -34,3 +36,5 @@ private:
     Results names_; // those of the instances when it lists none
     Results instances_;
 };
+
+} // namespace oxahv::runner

@@ -2,6 +2,8 @@
 
 #include <nlohmann/json.hpp>
 
+namespace oxahv::runner {
+
 namespace {
 
 using Json = nlohmann::json;
@@ -30,3 +32,5 @@ Message messageOf(const std::string& line) {
     message.finding = {static_cast<CheckKind>(json[3].get<int>()), json[4], json[5], json[6], json[7]};
     return message;
 }
+
+} // namespace oxahv::runner

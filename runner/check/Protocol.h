@@ -6,6 +6,8 @@
 #include <cstddef>
 #include <string>
 
+namespace oxahv::runner {
+
 // Messages of the child, as its parent reads them.
 struct Message {
     enum class Kind { begin, end, finding, classServed, classRefused, unserved, unusable };
@@ -17,3 +19,5 @@ struct Message {
 };
 std::string lineOf(const Message& message);
 Message messageOf(const std::string& line);
+
+} // namespace oxahv::runner

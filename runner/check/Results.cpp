@@ -5,9 +5,9 @@
 #include <algorithm>
 #include <set>
 
-namespace {
+namespace oxahv::runner {
 
-using oxahv::PropertyDeclaration;
+namespace {
 
 // The path of a result that the others lack; empty if there is none.
 std::string onlyAmong(const std::vector<Result>& results, const std::vector<Result>& others) {
@@ -103,7 +103,7 @@ void checkMethodResult(Client& client, const Query& query, const Answer& answer)
         mind("the return value is of type " + typeText(answer.data.front().type));
     }
     for (const auto& [name, value] : answer.out) {
-        const oxahv::ParameterDeclaration* const parameter = method->find(name);
+        const ParameterDeclaration* const parameter = method->find(name);
         if (parameter == nullptr || !parameter->isOut) {
             mind(name + " is no output parameter");
         } else if (parameter->type != value.type) {
@@ -112,3 +112,5 @@ void checkMethodResult(Client& client, const Query& query, const Answer& answer)
     }
     checkTexts(client, request, "output argument", answer.out);
 }
+
+} // namespace oxahv::runner

@@ -6,6 +6,8 @@
 #include <string>
 #include <vector>
 
+namespace oxahv::runner {
+
 // Looks at one result of a query for `className`: class, keys, texts. An empty name: any class.
 void checkResult(Client& client, const std::string& request, const Result& result,
                  const std::string& className);
@@ -22,3 +24,5 @@ void checkMethodResult(Client& client, const Query& query, const Answer& answer)
 
 // Whether a provider may answer so to say that it does not do such a thing.
 bool isRefusal(CMPIrc code);
+
+} // namespace oxahv::runner

@@ -9,6 +9,8 @@
 #include <set>
 #include <thread>
 
+namespace oxahv::runner {
+
 namespace {
 
 // Threads
@@ -47,8 +49,7 @@ void compareValues(const std::string& where, const NamedData& one, const NamedDa
 Difference differenceOf(const Answer& one, const Answer& other) {
     Difference difference;
     if (one.code != other.code) {
-        difference.structure.insert(oxahv::codeName(one.code) + " in place of " +
-                                    oxahv::codeName(other.code));
+        difference.structure.insert(codeName(one.code) + " in place of " + codeName(other.code));
         return difference;
     }
     const auto ours = byIdentity(one);
@@ -251,9 +252,11 @@ void strainByFaults(Client& client) {
     std::set<std::string> shapes;
     const std::vector<Client::Asked> all = client.asked();
     for (const Client::Asked& asked : all) {
-        const std::string shape = shapeOf(asked.query) + oxahv::codeName(asked.code);
+        const std::string shape = shapeOf(asked.query) + codeName(asked.code);
         if (!asked.leavesObjects && shapes.insert(shape).second) {
             failEach(client, asked);
         }
     }
 }
+
+} // namespace oxahv::runner

@@ -4,6 +4,8 @@
 
 #include <optional>
 
+namespace oxahv::runner {
+
 std::string printable(std::string_view text, std::size_t most) {
     std::string result;
     for (std::size_t count = 0; !text.empty() && count < most; ++count) {
@@ -15,3 +17,5 @@ std::string printable(std::string_view text, std::size_t most) {
     }
     return result;
 }
+
+} // namespace oxahv::runner

@@ -7,9 +7,13 @@
 #include <string>
 #include <string_view>
 
+namespace oxahv::runner {
+
 using encoding::foldedName;
 using encoding::sameName;
 
 // The text for one line of a terminal, at most its first characters: control characters and what is not UTF-8
 // are question marks. What a provider or its MOF file holds may be anything.
 std::string printable(std::string_view text, std::size_t most = std::numeric_limits<std::size_t>::max());
+
+} // namespace oxahv::runner
