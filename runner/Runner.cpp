@@ -1,6 +1,5 @@
 #include "Runner.h"
 
-#include "Arguments.h"
 #include "check/CrashLine.h"
 #include "show/ProgressLine.h"
 #include "show/Text.h"
@@ -16,56 +15,9 @@ namespace {
 
 constexpr int providerFailed = 1;
 
-// Sending requests
-
-const std::vector<std::string>* listOf(const Operands& operands) {
-    return operands.properties ? &*operands.properties : nullptr;
-}
-
-Reply enumerateNames(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
-                     const Operands& /*operands*/) {
-    return request.enumerateInstanceNames(target);
-}
-
-Reply enumerate(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
-                const Operands& operands) {
-    return request.enumerateInstances(target, listOf(operands));
-}
-
-Reply getInstance(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
-                  const Operands& operands) {
-    return request.getInstance(target, listOf(operands));
-}
-
-Reply associatorNames(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
-                      const Operands& operands) {
-    return request.associatorNames(target, operands.filter);
-}
-
-Reply associators(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
-                  const Operands& operands) {
-    return request.associators(target, operands.filter, listOf(operands));
-}
-
-Reply referenceNames(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
-                     const Operands& operands) {
-    return request.referenceNames(target, operands.filter);
-}
-
-Reply references(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
-                 const Operands& operands) {
-    return request.references(target, operands.filter, listOf(operands));
-}
-
-Reply callMethod(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* target,
-                 const Operands& operands) {
-    return request.invokeMethod(target, operands.method,
-                                argumentsFrom(broker, request, target, operands.method, operands.arguments));
-}
-
 // Tells how far the request has come while it runs.
-Reply performed(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* target, const Verb& verb,
-                const Operands& operands) {
+Reply performed(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* target,
+                const Operation& operation, const Operands& operands) {
     ProgressLine line; // its end comes before anything is printed
     struct Shown {
         Request& request;
@@ -73,7 +25,7 @@ Reply performed(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* 
     } const shown = {request};
     request.setProgressHandler(
         [&](std::size_t results) { line.show(std::to_string(results) + " results so far"); });
-    return verb.perform(broker, request, target, operands);
+    return operation.perform(broker, request, target, operands);
 }
 
 // Printing what they yield
@@ -92,13 +44,6 @@ void printReply(const Options& options, const CMPIObjectPath* target, const Oper
         printMethodResult(std::cout, options.format, target, operands.method, reply);
         break;
     }
-}
-
-// The MI name that a library's file stands for: its stem without "lib". A version behind ".so" is none of it.
-std::string nameOf(const std::string& library) {
-    const std::string file = std::filesystem::path(library).filename();
-    const std::string stem = file.substr(0, file.find(".so"));
-    return stem.rfind("lib", 0) == 0 ? stem.substr(3) : stem;
 }
 
 // NAME=TEXT
@@ -144,29 +89,9 @@ void showTraces() {
 
 } // namespace
 
-const std::vector<Verb>& verbs() {
-    static const std::vector<Verb> all = {
-        {"ein", Target::ofClass, Takes::nothing, Yields::paths, "CLASS: the paths of its instances",
-         enumerateNames},
-        {"ei", Target::ofClass, Takes::nothing, Yields::instances, "CLASS: its instances", enumerate},
-        {"gi", Target::ofInstance, Takes::nothing, Yields::oneInstance, "PATH: the instance", getInstance},
-        {"an", Target::ofInstance, Takes::filter, Yields::paths,
-         "PATH: the paths of the instances associated with it", associatorNames},
-        {"ai", Target::ofInstance, Takes::filter, Yields::instances, "PATH: the instances associated with it",
-         associators},
-        {"rn", Target::ofInstance, Takes::referenceFilter, Yields::paths,
-         "PATH: the paths of the associations that refer to it", referenceNames},
-        {"ri", Target::ofInstance, Takes::referenceFilter, Yields::instances,
-         "PATH: the associations that refer to it", references},
-        {"cm", Target::ofInstance, Takes::method, Yields::methodResult,
-         "PATH METHOD name=value ...: call a method of the instance", callMethod},
-    };
-    return all;
-}
-
-CMPIObjectPath* targetOf(Request& request, const Options& options, const Verb& verb,
+CMPIObjectPath* targetOf(Request& request, const Options& options, const Operation& operation,
                          const Operands& operands) {
-    if (verb.target == Target::ofClass) {
+    if (operation.target == Target::ofClass) {
         return request.objectPath(options.nameSpace, operands.target);
     }
     try {
@@ -174,10 +99,6 @@ CMPIObjectPath* targetOf(Request& request, const Options& options, const Verb& v
     } catch (const BrokerError& error) {
         throw BrokerError(std::string(error.what()) + "; write it as Class.Key=\"text\",Number=3");
     }
-}
-
-std::string providerName(const Library& library) {
-    return library.provider.empty() ? nameOf(library.file) : library.provider;
 }
 
 void apply(EmbeddedBroker& broker, const Conduct& conduct) {
@@ -219,7 +140,7 @@ void loadProviders(EmbeddedBroker& broker, const Options& options) {
     }
 }
 
-int run(const Options& options, const Verb& verb, const Operands& operands) {
+int run(const Options& options, const Operation& operation, const Operands& operands) {
     EmbeddedBroker broker;
     prepare(broker, options);
     tellCrashesInOneLine(broker);
@@ -229,10 +150,10 @@ int run(const Options& options, const Verb& verb, const Operands& operands) {
         inject(broker, fault);
     }
     Request request(broker);
-    const CMPIObjectPath* const target = targetOf(request, options, verb, operands);
-    Reply reply = performed(broker, request, target, verb, operands);
+    const CMPIObjectPath* const target = targetOf(request, options, operation, operands);
+    Reply reply = performed(broker, request, target, operation, operands);
     broker.clearFaults(); // they are the request's; what is printed is asked of the broker too
-    if (reply.ok() && verb.yields == Yields::oneInstance && reply.instances.size() != 1) {
+    if (reply.ok() && operation.yields == Yields::oneInstance && reply.instances.size() != 1) {
         reply.code = CMPI_RC_ERR_FAILED;
         reply.message =
             "the provider returned " + std::to_string(reply.instances.size()) + " instances in place of one";
@@ -242,7 +163,7 @@ int run(const Options& options, const Verb& verb, const Operands& operands) {
                   << (reply.message.empty() ? "" : ": " + printable(reply.message)) << '\n';
         return providerFailed;
     }
-    printReply(options, target, operands, verb.yields, reply);
+    printReply(options, target, operands, operation.yields, reply);
     return 0;
 }
 

@@ -16,7 +16,7 @@ bool isNone(const AssociationFilter& filter) {
 }
 
 bool isOfReferences(const Query& query) {
-    return query.verb->takes == Takes::referenceFilter;
+    return query.operation->takes == Takes::referenceFilter;
 }
 
 } // namespace

@@ -82,7 +82,7 @@ std::optional<Answer> Client::ask(const Query& query) {
     checkCode(text, answer);
     checkCalls(text, calls);
     if (answer.ok() && !answer.isDone) {
-        find(CheckKind::notDone, text, query.verb->name + std::string(" does not call returnDone"));
+        find(CheckKind::notDone, text, query.operation->name + std::string(" does not call returnDone"));
     }
     asked_.push_back({query, answer.code, std::move(calls), checkLeftOver(query, before)});
     return answer;
@@ -150,7 +150,7 @@ bool Client::checkLeftOver(const Query& query, std::size_t before) {
     const std::size_t left = broker_.liveObjects().total();
     if (left > kept) {
         find(CheckKind::leftOver, textOf(query),
-             query.verb->name + (" leaves " + std::to_string(left - kept)) +
+             query.operation->name + (" leaves " + std::to_string(left - kept)) +
                  (left - kept == 1 ? " object" : " objects"));
     }
     return left > kept;

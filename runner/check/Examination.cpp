@@ -259,7 +259,7 @@ void Examination::checkList(const Query& query, const std::vector<std::string>& 
         return;
     }
     if (!answer->ok()) {
-        client_.fail(request, query.verb->name + std::string(" with a property list"), *answer);
+        client_.fail(request, query.operation->name + std::string(" with a property list"), *answer);
         return;
     }
     for (const Result& result : answer->results) {
@@ -271,7 +271,7 @@ void Examination::checkList(const Query& query, const std::vector<std::string>& 
         }
         if (yieldsMore(result, wanted)) {
             client_.find(CheckKind::listIgnored, request,
-                         query.verb->name + std::string(" yields more than the list"));
+                         query.operation->name + std::string(" yields more than the list"));
         }
     }
 }

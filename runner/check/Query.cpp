@@ -82,7 +82,7 @@ Answer sendHooked(EmbeddedBroker& broker, const Options& options, const Query& q
                   const FailingCall* failing, std::vector<ProviderCall>* calls) {
     Hooked hooked(broker, failing, calls != nullptr);
     Request request(broker);
-    const CMPIObjectPath* const target = targetOf(request, options, *query.verb, query.operands);
+    const CMPIObjectPath* const target = targetOf(request, options, *query.operation, query.operands);
     std::map<std::string, unsigned int> counts;
     if (calls != nullptr) {
         for (const Call& call : broker.stopRecording()) {
@@ -90,7 +90,7 @@ Answer sendHooked(EmbeddedBroker& broker, const Options& options, const Query& q
         }
         broker.startRecording();
     }
-    const Reply reply = query.verb->perform(broker, request, target, query.operands);
+    const Reply reply = query.operation->perform(broker, request, target, query.operands);
     for (Call& call : hooked.calls()) {
         const unsigned int number = ++counts[call.slot];
         calls->push_back({std::move(call), number});
@@ -102,8 +102,8 @@ Answer sendHooked(EmbeddedBroker& broker, const Options& options, const Query& q
 } // namespace
 
 Query queryOf(const std::string& verb, Operands operands) {
-    const auto found = std::find_if(verbs().begin(), verbs().end(),
-                                    [&](const Verb& candidate) { return verb == candidate.name; });
+    const auto found = std::find_if(operations().begin(), operations().end(),
+                                    [&](const Operation& candidate) { return verb == candidate.name; });
     return {&*found, std::move(operands)};
 }
 
@@ -115,7 +115,7 @@ Query queryOf(const std::string& verb, const std::string& target) {
 
 std::string textOf(const Query& query) {
     const Operands& operands = query.operands;
-    std::string text = query.verb->name + (' ' + quoted(operands.target));
+    std::string text = query.operation->name + (' ' + quoted(operands.target));
     if (!operands.method.empty()) {
         text += ' ' + quoted(operands.method);
     }
@@ -133,7 +133,7 @@ std::string textOf(const Query& query) {
 }
 
 std::string shapeOf(const Query& query) {
-    std::string shape = query.verb->name + (' ' + query.operands.method);
+    std::string shape = query.operation->name + (' ' + query.operands.method);
     for (const Option& option : filterOptions) {
         shape += (query.operands.filter.*option.value).empty() ? '-' : '+';
     }

@@ -10,7 +10,7 @@
 namespace oxahv::runner {
 
 struct Query {
-    const Verb* verb;
+    const Operation* operation;
     Operands operands;
 };
 

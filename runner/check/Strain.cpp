@@ -196,7 +196,7 @@ void failEach(Client& client, const Client::Asked& asked) {
             client.find(CheckKind::leftOver,
                         textOf(asked.query) + " --fault " + failing.slot + ':' +
                             std::to_string(failing.number),
-                        asked.query.verb->name + (" leaves objects when " + failing.slot + " fails"));
+                        asked.query.operation->name + (" leaves objects when " + failing.slot + " fails"));
         }
     }
 }
@@ -211,9 +211,9 @@ void strainByConduct(Client& client) {
         return client.askPlainly(query);
     };
     for (const Client::Asked& asked : all) {
-        const Verb& verb = *asked.query.verb;
+        const Operation& operation = *asked.query.operation;
         const bool isTold = asked.code != CMPI_RC_OK && !isRefusal(asked.code);
-        if (verb.target == Target::ofClass || verb.takes == Takes::method || isTold) {
+        if (operation.target == Target::ofClass || operation.takes == Takes::method || isTold) {
             continue;
         }
         const std::optional<Answer> before = askAgain(asked.query, client.task().conduct);
@@ -223,7 +223,7 @@ void strainByConduct(Client& client) {
             continue;
         }
         for (const std::string& text : differenceOf(*after, *plain).structure) {
-            client.find(CheckKind::keysUnread, textOf(asked.query), verb.name + (": " + text));
+            client.find(CheckKind::keysUnread, textOf(asked.query), operation.name + (": " + text));
         }
     }
     apply(client.broker(), client.task().conduct);

@@ -3,6 +3,7 @@
 #include <Utf8.h>
 
 #include <optional>
+#include <sstream>
 
 namespace oxahv::runner {
 
@@ -16,6 +17,15 @@ std::string printable(std::string_view text, std::size_t most) {
         encoding::appendUtf8(result, code && !encoding::isControl(*code) ? *code : U'?');
     }
     return result;
+}
+
+std::vector<std::string> namesIn(const std::string& text) {
+    std::vector<std::string> names;
+    std::istringstream stream(text);
+    for (std::string name; std::getline(stream, name, ',');) {
+        names.push_back(name);
+    }
+    return names;
 }
 
 } // namespace oxahv::runner
