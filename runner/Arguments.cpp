@@ -7,6 +7,8 @@
 #include <iterator>
 #include <optional>
 
+namespace oxahv::runner {
+
 namespace {
 
 struct Argument {
@@ -26,47 +28,46 @@ std::string namesOf(const std::vector<Declaration>& declarations) {
 }
 
 // Nothing for a class that is not declared.
-std::optional<oxahv::MethodDeclaration> declarationOf(const oxahv::EmbeddedBroker& broker,
-                                                      const std::string& className,
-                                                      const std::string& method) {
+std::optional<MethodDeclaration> declarationOf(const EmbeddedBroker& broker, const std::string& className,
+                                               const std::string& method) {
     if (!broker.isDeclared(className)) {
         return std::nullopt;
     }
-    std::optional<oxahv::MethodDeclaration> declared = findMethod(broker, className, method);
+    std::optional<MethodDeclaration> declared = findMethod(broker, className, method);
     if (declared) {
         return declared;
     }
-    throw oxahv::BrokerError("class " + className + " has no method " + method + "; it has " +
-                             namesOf(broker.methodsOf(className)));
+    throw BrokerError("class " + className + " has no method " + method + "; it has " +
+                      namesOf(broker.methodsOf(className)));
 }
 
 // The name as it is declared, and the type.
-Argument argumentOf(const std::optional<oxahv::MethodDeclaration>& method, const std::string& name) {
+Argument argumentOf(const std::optional<MethodDeclaration>& method, const std::string& name) {
     if (!method) {
         return {name, CMPI_null, {}};
     }
-    const oxahv::ParameterDeclaration* const parameter = method->find(name);
+    const ParameterDeclaration* const parameter = method->find(name);
     if (parameter == nullptr) {
-        std::vector<oxahv::ParameterDeclaration> inputs;
+        std::vector<ParameterDeclaration> inputs;
         std::copy_if(method->parameters.begin(), method->parameters.end(), std::back_inserter(inputs),
-                     [](const oxahv::ParameterDeclaration& declared) { return declared.isIn; });
-        throw oxahv::BrokerError("method " + method->name + " has no parameter " + name + "; it has " +
-                                 namesOf(inputs));
+                     [](const ParameterDeclaration& declared) { return declared.isIn; });
+        throw BrokerError("method " + method->name + " has no parameter " + name + "; it has " +
+                          namesOf(inputs));
     }
     if (!parameter->isIn) {
-        throw oxahv::BrokerError("parameter " + parameter->name + " of method " + method->name +
-                                 " is an output; leave it out");
+        throw BrokerError("parameter " + parameter->name + " of method " + method->name +
+                          " is an output; leave it out");
     }
     return {parameter->name, parameter->type, {}};
 }
 
-std::vector<Argument> parsed(const std::optional<oxahv::MethodDeclaration>& method,
+std::vector<Argument> parsed(const std::optional<MethodDeclaration>& method,
                              const std::vector<std::string>& texts) {
     std::vector<Argument> arguments;
     for (const std::string& text : texts) {
         const std::size_t equals = text.find('=');
         if (equals == std::string::npos || equals == 0) {
-            throw oxahv::BrokerError("argument '" + text + "' is not name=value");
+            throw BrokerError("argument '" + text + "' is not name=value");
         }
         Argument argument = argumentOf(method, text.substr(0, equals));
         auto known = std::find_if(arguments.begin(), arguments.end(),
@@ -74,29 +75,29 @@ std::vector<Argument> parsed(const std::optional<oxahv::MethodDeclaration>& meth
         if (known == arguments.end()) {
             known = arguments.insert(arguments.end(), std::move(argument));
         } else if ((known->type & CMPI_ARRAY) == 0) {
-            throw oxahv::BrokerError("argument " + known->name +
-                                     " stands twice; only an array takes several values");
+            throw BrokerError("argument " + known->name +
+                              " stands twice; only an array takes several values");
         }
         known->texts.push_back(text.substr(equals + 1));
     }
     return arguments;
 }
 
-CMPIData valueOf(oxahv::Request& request, const Argument& argument, const std::string& text) {
+CMPIData valueOf(Request& request, const Argument& argument, const std::string& text) {
     try {
         return request.valueFromText(text, argument.type & static_cast<CMPIType>(~CMPI_ARRAY));
-    } catch (const oxahv::BrokerError& error) {
-        throw oxahv::BrokerError("argument " + argument.name + ": " + error.what());
+    } catch (const BrokerError& error) {
+        throw BrokerError("argument " + argument.name + ": " + error.what());
     }
 }
 
 void require(const CMPIStatus& status) {
     if (status.rc != CMPI_RC_OK) {
-        throw oxahv::BrokerError("the broker took no arguments: " + oxahv::codeName(status.rc));
+        throw BrokerError("the broker took no arguments: " + codeName(status.rc));
     }
 }
 
-CMPIData arrayOf(const oxahv::EmbeddedBroker& broker, oxahv::Request& request, const Argument& argument) {
+CMPIData arrayOf(const EmbeddedBroker& broker, Request& request, const Argument& argument) {
     const auto type = static_cast<CMPIType>(argument.type & ~CMPI_ARRAY);
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     CMPIData data = {argument.type, CMPI_goodValue, {}};
@@ -112,7 +113,7 @@ CMPIData arrayOf(const oxahv::EmbeddedBroker& broker, oxahv::Request& request, c
 
 } // namespace
 
-CMPIArgs* argumentsFrom(oxahv::EmbeddedBroker& broker, oxahv::Request& request, const CMPIObjectPath* path,
+CMPIArgs* argumentsFrom(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* path,
                         const std::string& method, const std::vector<std::string>& texts) {
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     CMPIArgs* const arguments = CMNewArgs(broker.handle(), &status);
@@ -126,3 +127,5 @@ CMPIArgs* argumentsFrom(oxahv::EmbeddedBroker& broker, oxahv::Request& request, 
     }
     return arguments;
 }
+
+} // namespace oxahv::runner

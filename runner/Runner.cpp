@@ -1,6 +1,5 @@
 #include "Runner.h"
 
-#include "Arguments.h"
 #include "check/CrashLine.h"
 #include "show/ProgressLine.h"
 #include "show/Text.h"
@@ -10,64 +9,15 @@
 #include <filesystem>
 #include <iostream>
 
+namespace oxahv::runner {
+
 namespace {
 
 constexpr int providerFailed = 1;
 
-using oxahv::EmbeddedBroker;
-using oxahv::Reply;
-using oxahv::Request;
-
-// Sending requests
-
-const std::vector<std::string>* listOf(const Operands& operands) {
-    return operands.properties ? &*operands.properties : nullptr;
-}
-
-Reply enumerateNames(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
-                     const Operands& /*operands*/) {
-    return request.enumerateInstanceNames(target);
-}
-
-Reply enumerate(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
-                const Operands& operands) {
-    return request.enumerateInstances(target, listOf(operands));
-}
-
-Reply getInstance(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
-                  const Operands& operands) {
-    return request.getInstance(target, listOf(operands));
-}
-
-Reply associatorNames(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
-                      const Operands& operands) {
-    return request.associatorNames(target, operands.filter);
-}
-
-Reply associators(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
-                  const Operands& operands) {
-    return request.associators(target, operands.filter, listOf(operands));
-}
-
-Reply referenceNames(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
-                     const Operands& operands) {
-    return request.referenceNames(target, operands.filter);
-}
-
-Reply references(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
-                 const Operands& operands) {
-    return request.references(target, operands.filter, listOf(operands));
-}
-
-Reply callMethod(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* target,
-                 const Operands& operands) {
-    return request.invokeMethod(target, operands.method,
-                                argumentsFrom(broker, request, target, operands.method, operands.arguments));
-}
-
 // Tells how far the request has come while it runs.
-Reply performed(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* target, const Verb& verb,
-                const Operands& operands) {
+Reply performed(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* target,
+                const Operation& operation, const Operands& operands) {
     ProgressLine line; // its end comes before anything is printed
     struct Shown {
         Request& request;
@@ -75,7 +25,7 @@ Reply performed(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* 
     } const shown = {request};
     request.setProgressHandler(
         [&](std::size_t results) { line.show(std::to_string(results) + " results so far"); });
-    return verb.perform(broker, request, target, operands);
+    return operation.perform(broker, request, target, operands);
 }
 
 // Printing what they yield
@@ -96,18 +46,11 @@ void printReply(const Options& options, const CMPIObjectPath* target, const Oper
     }
 }
 
-// The MI name that a library's file stands for: its stem without "lib". A version behind ".so" is none of it.
-std::string nameOf(const std::string& library) {
-    const std::string file = std::filesystem::path(library).filename();
-    const std::string stem = file.substr(0, file.find(".so"));
-    return stem.rfind("lib", 0) == 0 ? stem.substr(3) : stem;
-}
-
 // NAME=TEXT
 void addContextEntry(EmbeddedBroker& broker, const std::string& text) {
     const std::size_t equals = text.find('=');
     if (equals == std::string::npos || equals == 0) {
-        throw oxahv::BrokerError("context entry '" + text + "' is not NAME=TEXT");
+        throw BrokerError("context entry '" + text + "' is not NAME=TEXT");
     }
     broker.setContextEntry(text.substr(0, equals), text.substr(equals + 1));
 }
@@ -119,18 +62,18 @@ void inject(EmbeddedBroker& broker, const std::string& text) {
     const std::string number = first != std::string::npos ? text.substr(first + 1, second - first - 1) : "";
     if (number.empty() || number.size() > 9 || number.find_first_not_of("0123456789") != std::string::npos ||
         std::stoul(number) == 0) {
-        throw oxahv::BrokerError("fault '" + text + "' is not SLOT:N[:CODE] with N from 1 on");
+        throw BrokerError("fault '" + text + "' is not SLOT:N[:CODE] with N from 1 on");
     }
-    oxahv::Fault fault;
+    Fault fault;
     fault.firstCall = static_cast<unsigned int>(std::stoul(number));
     if (second != std::string::npos) {
-        fault.code = oxahv::codeFromName(text.substr(second + 1));
+        fault.code = codeFromName(text.substr(second + 1));
     }
     try {
         broker.injectFault(text.substr(0, first), fault);
-    } catch (const oxahv::BrokerError& error) {
-        throw oxahv::BrokerError(std::string(error.what()) +
-                                 "; name it by table and member, as CMPIObjectPathFT.addKey");
+    } catch (const BrokerError& error) {
+        throw BrokerError(std::string(error.what()) +
+                          "; name it by table and member, as CMPIObjectPathFT.addKey");
     }
 }
 
@@ -146,40 +89,16 @@ void showTraces() {
 
 } // namespace
 
-const std::vector<Verb>& verbs() {
-    static const std::vector<Verb> all = {
-        {"ein", Target::ofClass, Takes::nothing, Yields::paths, "CLASS: the paths of its instances",
-         enumerateNames},
-        {"ei", Target::ofClass, Takes::nothing, Yields::instances, "CLASS: its instances", enumerate},
-        {"gi", Target::ofInstance, Takes::nothing, Yields::oneInstance, "PATH: the instance", getInstance},
-        {"an", Target::ofInstance, Takes::filter, Yields::paths,
-         "PATH: the paths of the instances associated with it", associatorNames},
-        {"ai", Target::ofInstance, Takes::filter, Yields::instances, "PATH: the instances associated with it",
-         associators},
-        {"rn", Target::ofInstance, Takes::referenceFilter, Yields::paths,
-         "PATH: the paths of the associations that refer to it", referenceNames},
-        {"ri", Target::ofInstance, Takes::referenceFilter, Yields::instances,
-         "PATH: the associations that refer to it", references},
-        {"cm", Target::ofInstance, Takes::method, Yields::methodResult,
-         "PATH METHOD name=value ...: call a method of the instance", callMethod},
-    };
-    return all;
-}
-
-CMPIObjectPath* targetOf(Request& request, const Options& options, const Verb& verb,
+CMPIObjectPath* targetOf(Request& request, const Options& options, const Operation& operation,
                          const Operands& operands) {
-    if (verb.target == Target::ofClass) {
+    if (operation.target == Target::ofClass) {
         return request.objectPath(options.nameSpace, operands.target);
     }
     try {
         return request.objectPathFromText(operands.target, options.nameSpace);
-    } catch (const oxahv::BrokerError& error) {
-        throw oxahv::BrokerError(std::string(error.what()) + "; write it as Class.Key=\"text\",Number=3");
+    } catch (const BrokerError& error) {
+        throw BrokerError(std::string(error.what()) + "; write it as Class.Key=\"text\",Number=3");
     }
-}
-
-std::string providerName(const Library& library) {
-    return library.provider.empty() ? nameOf(library.file) : library.provider;
 }
 
 void apply(EmbeddedBroker& broker, const Conduct& conduct) {
@@ -205,14 +124,13 @@ static void load(EmbeddedBroker& broker, const Library& library) {
     const std::string name = providerName(library);
     try {
         broker.load(std::filesystem::absolute(library.file), name, library.classes);
-    } catch (const oxahv::BrokerError& error) {
+    } catch (const BrokerError& error) {
         const std::string message = error.what();
         const bool isLoaded = message.rfind("cannot load", 0) != 0;
         const bool isFile = std::filesystem::is_regular_file(library.file);
-        throw oxahv::BrokerError(message +
-                                 (isLoaded ? "; is " + name + " its MI name? Else give it with --provider"
-                                  : isFile ? "; ldd shows what the library needs and what it lacks"
-                                           : "; give the path of the provider's library with --library"));
+        throw BrokerError(message + (isLoaded ? "; is " + name + " its MI name? Else give it with --provider"
+                                     : isFile ? "; ldd shows what the library needs and what it lacks"
+                                              : "; give the path of the provider's library with --library"));
     }
 }
 
@@ -222,7 +140,7 @@ void loadProviders(EmbeddedBroker& broker, const Options& options) {
     }
 }
 
-int run(const Options& options, const Verb& verb, const Operands& operands) {
+int run(const Options& options, const Operation& operation, const Operands& operands) {
     EmbeddedBroker broker;
     prepare(broker, options);
     tellCrashesInOneLine(broker);
@@ -232,19 +150,21 @@ int run(const Options& options, const Verb& verb, const Operands& operands) {
         inject(broker, fault);
     }
     Request request(broker);
-    const CMPIObjectPath* const target = targetOf(request, options, verb, operands);
-    Reply reply = performed(broker, request, target, verb, operands);
+    const CMPIObjectPath* const target = targetOf(request, options, operation, operands);
+    Reply reply = performed(broker, request, target, operation, operands);
     broker.clearFaults(); // they are the request's; what is printed is asked of the broker too
-    if (reply.ok() && verb.yields == Yields::oneInstance && reply.instances.size() != 1) {
+    if (reply.ok() && operation.yields == Yields::oneInstance && reply.instances.size() != 1) {
         reply.code = CMPI_RC_ERR_FAILED;
         reply.message =
             "the provider returned " + std::to_string(reply.instances.size()) + " instances in place of one";
     }
     if (!reply.ok()) {
-        std::cerr << "oxahv-provider: " << oxahv::codeName(reply.code)
+        std::cerr << "oxahv-provider: " << codeName(reply.code)
                   << (reply.message.empty() ? "" : ": " + printable(reply.message)) << '\n';
         return providerFailed;
     }
-    printReply(options, target, operands, verb.yields, reply);
+    printReply(options, target, operands, operation.yields, reply);
     return 0;
 }
+
+} // namespace oxahv::runner

@@ -5,6 +5,8 @@
 
 #include <Utf8.h>
 
+namespace oxahv::runner {
+
 namespace {
 
 PlainData plainOf(const CMPIData& data, const std::string& nameSpace);
@@ -20,7 +22,7 @@ NamedData plainOf(const std::vector<NamedValue>& values, const std::string& name
 Result resultOf(const CMPIObjectPath* path, const std::string& nameSpace) {
     Result result;
     result.className = textOf(CMGetClassName(path, nullptr));
-    result.path = oxahv::pathText(path);
+    result.path = pathText(path);
     result.keys = plainOf(keysOf(path), nameSpace);
     const std::string own = foldedName(textOf(CMGetNameSpace(path, nullptr)));
     result.identity = (own != foldedName(nameSpace) ? own : "") + ':' + foldedName(result.className);
@@ -55,7 +57,7 @@ PlainData plainOf(const CMPIData& data, const std::string& nameSpace) {
     plain.type = data.type;
     plain.isNull = CMIsNullValue(data);
     plain.isUtf8 = hasUtf8(data);
-    plain.text = oxahv::valueText(data);
+    plain.text = valueText(data);
     plain.identity = plain.text;
     if (!plain.isNull && data.type == CMPI_ref) {
         const Result referred = resultOf(data.value.ref, nameSpace);
@@ -77,7 +79,7 @@ bool operator==(const PlainData& a, const PlainData& b) {
     return a.type == b.type && a.isNull == b.isNull && a.identity == b.identity;
 }
 
-Answer answerOf(const oxahv::Reply& reply, const std::string& nameSpace) {
+Answer answerOf(const Reply& reply, const std::string& nameSpace) {
     Answer answer;
     answer.code = reply.code;
     answer.message = reply.message;
@@ -98,9 +100,11 @@ Answer answerOf(const oxahv::Reply& reply, const std::string& nameSpace) {
 }
 
 std::string typeText(CMPIType type) {
-    return oxahv::typeName(type) + ((type & CMPI_ARRAY) != 0 ? "[]" : "");
+    return typeName(type) + ((type & CMPI_ARRAY) != 0 ? "[]" : "");
 }
 
 std::string wordsOf(const Answer& answer) {
-    return oxahv::codeName(answer.code) + (answer.message.empty() ? "" : ": " + answer.message);
+    return codeName(answer.code) + (answer.message.empty() ? "" : ": " + answer.message);
 }
+
+} // namespace oxahv::runner

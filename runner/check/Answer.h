@@ -8,6 +8,8 @@
 #include <string>
 #include <vector>
 
+namespace oxahv::runner {
+
 struct PlainData {
     CMPIType type = CMPI_null;
     bool isNull = true;
@@ -44,7 +46,7 @@ struct Answer {
 };
 
 // Copies a reply. A namespace that is missing or `nameSpace` is no part of an identity.
-Answer answerOf(const oxahv::Reply& reply, const std::string& nameSpace);
+Answer answerOf(const Reply& reply, const std::string& nameSpace);
 
 // Whether there is a value of that name that is not NULL.
 bool hasValue(const NamedData& values, const std::string& name);
@@ -54,3 +56,5 @@ std::string typeText(CMPIType type);
 
 // "CMPI_RC_ERR_FAILED: text"
 std::string wordsOf(const Answer& answer);
+
+} // namespace oxahv::runner

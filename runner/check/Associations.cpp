@@ -1,14 +1,14 @@
 #include "check/Associations.h"
 
-#include "check/Examination.h"
+#include "check/Results.h"
 #include "show/Text.h"
 
 #include <algorithm>
 #include <set>
 
-namespace {
+namespace oxahv::runner {
 
-using oxahv::AssociationFilter;
+namespace {
 
 bool isNone(const AssociationFilter& filter) {
     return filter.associationClass.empty() && filter.resultClass.empty() && filter.role.empty() &&
@@ -16,7 +16,7 @@ bool isNone(const AssociationFilter& filter) {
 }
 
 bool isOfReferences(const Query& query) {
-    return query.verb->takes == Takes::referenceFilter;
+    return query.operation->takes == Takes::referenceFilter;
 }
 
 } // namespace
@@ -262,3 +262,5 @@ bool Associations::compareWithWays(const char* verb, const std::optional<Answer>
     }
     return difference.empty();
 }
+
+} // namespace oxahv::runner

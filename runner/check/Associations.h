@@ -7,6 +7,8 @@
 #include <string>
 #include <vector>
 
+namespace oxahv::runner {
+
 class Associations {
 public:
     Associations(Client& client, std::string path, std::string identity)
@@ -38,16 +40,16 @@ private:
     void checkOwnEnds();
     void checkOtherEnds();
     void runFilters();
-    std::vector<oxahv::AssociationFilter> filters() const;
+    std::vector<AssociationFilter> filters() const;
     std::string unrelatedClass(const std::string& wanted) const;
     std::string superclass(const std::string& className) const;
-    bool passes(const Way& way, const oxahv::AssociationFilter& filter) const;
+    bool passes(const Way& way, const AssociationFilter& filter) const;
     bool passesClass(const std::string& className, const std::string& filter) const;
-    Query query(const char* verb, const oxahv::AssociationFilter& filter) const;
-    std::optional<Answer> ask(const char* verb, const oxahv::AssociationFilter& filter);
-    Replies askBoth(const char* objects, const char* names, const oxahv::AssociationFilter& filter);
+    Query query(const char* verb, const AssociationFilter& filter) const;
+    std::optional<Answer> ask(const char* verb, const AssociationFilter& filter);
+    Replies askBoth(const char* objects, const char* names, const AssociationFilter& filter);
     bool compareWithWays(const char* verb, const std::optional<Answer>& answer,
-                         const oxahv::AssociationFilter& filter);
+                         const AssociationFilter& filter);
 
     Client& client_;
     std::string path_;
@@ -55,3 +57,5 @@ private:
     std::vector<Way> ways_;
     bool knowsWays_ = false; // whether the provider tells the references
 };
+
+} // namespace oxahv::runner

@@ -16,11 +16,9 @@
 #include <set>
 #include <unistd.h>
 
-namespace {
+namespace oxahv::runner {
 
-using oxahv::BrokerError;
-using oxahv::EmbeddedBroker;
-using oxahv::KeyMode;
+namespace {
 
 struct Pass {
     const char* name;
@@ -30,14 +28,14 @@ struct Pass {
 };
 
 const std::vector<Pass>& passes() {
-    constexpr auto full = oxahv::NewInstances::full;
+    constexpr auto full = NewInstances::full;
     static const std::vector<Pass> all = {
         {"exact keys", {}, true, nullptr},
         {"untyped keys", {KeyMode::untyped}, true, strainByConduct},
         {"signed keys", {KeyMode::signedIntegers}, true, strainByConduct},
         {"chars keys", {KeyMode::chars}, true, strainByConduct},
         {"text keys", {KeyMode::text}, true, strainByConduct},
-        {"bare instances", {KeyMode::exact, oxahv::NewInstances::bare}, true, nullptr},
+        {"bare instances", {KeyMode::exact, NewInstances::bare}, true, nullptr},
         {"reversed keys", {KeyMode::exact, full, {true, false, ""}}, true, strainByConduct},
         {"other case", {KeyMode::exact, full, {false, true, ""}}, true, strainByConduct},
         {"host", {KeyMode::exact, full, {false, false, "host.example.com"}}, true, strainByConduct},
@@ -429,3 +427,5 @@ int runCheck(const Options& options, const CheckOptions& checkOptions) {
     printReport(std::cout, options.format, report, isColoured);
     return report.findings.empty() ? 0 : 1;
 }
+
+} // namespace oxahv::runner

@@ -1,10 +1,13 @@
 // The check of a provider: which classes in which passes, each in a child process.
 #pragma once
 
-#include "Runner.h"
+#include "Options.h"
 
+#include <functional>
 #include <string>
 #include <vector>
+
+namespace oxahv::runner {
 
 struct CheckOptions {
     std::vector<std::string> classes; // empty: all concrete ones
@@ -14,5 +17,10 @@ struct CheckOptions {
 };
 
 // Checks the provider and prints the report on the standard output. Returns the exit status, 1 when anything
-// is found; throws oxahv::BrokerError for what makes the check impossible.
+// is found; throws BrokerError for what makes the check impossible.
 int runCheck(const Options& options, const CheckOptions& checkOptions);
+
+// The verb `check`: declares its options on the command line, and returns what runs it.
+std::function<int(const Options&)> declareCheck(CLI::App& command);
+
+} // namespace oxahv::runner

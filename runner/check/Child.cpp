@@ -14,6 +14,8 @@
 #include <system_error>
 #include <unistd.h>
 
+namespace oxahv::runner {
+
 namespace {
 
 using files::Descriptor;
@@ -181,3 +183,5 @@ ChildResult runInChild(const std::function<void(ChildOutput&)>& task,
     }
     return {end, ""};
 }
+
+} // namespace oxahv::runner

@@ -6,6 +6,8 @@
 #include <mutex>
 #include <string>
 
+namespace oxahv::runner {
+
 // The child's way to its parent: one line a message.
 class ChildOutput {
 public:
@@ -37,3 +39,5 @@ struct ChildResult {
 ChildResult runInChild(const std::function<void(ChildOutput&)>& task,
                        const std::function<void(const std::string&)>& receive,
                        std::chrono::milliseconds timeout);
+
+} // namespace oxahv::runner

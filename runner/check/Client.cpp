@@ -1,11 +1,8 @@
 #include "check/Client.h"
 
-#include <nlohmann/json.hpp>
+namespace oxahv::runner {
 
 namespace {
-
-using Json = nlohmann::json;
-using oxahv::BrokerError;
 
 bool endsWith(const std::string& text, const std::string& end) {
     return text.size() >= end.size() && text.compare(text.size() - end.size(), end.size(), end) == 0;
@@ -16,19 +13,19 @@ struct Refusal {
     const char* member;
     CMPIrc code;
     CheckKind kind;
-    std::string (*text)(const oxahv::Call& call);
+    std::string (*text)(const Call& call);
 };
 
-std::string propertyText(const oxahv::Call& call) {
+std::string propertyText(const Call& call) {
     return "property " + call.name;
 }
-std::string typedText(const oxahv::Call& call) {
+std::string typedText(const Call& call) {
     return "property " + call.name + " is set as " + typeText(call.type);
 }
-std::string classText(const oxahv::Call& /*call*/) {
+std::string classText(const Call& /*call*/) {
     return "an instance is made of a class that is not declared";
 }
-std::string dateText(const oxahv::Call& call) {
+std::string dateText(const Call& call) {
     return '\'' + call.name + '\'';
 }
 
@@ -49,33 +46,10 @@ bool isException(const Answer& answer) {
 }
 
 bool isStandard(CMPIrc code) {
-    return oxahv::codeName(code) != "CMPI_RC_" + std::to_string(static_cast<int>(code));
+    return codeName(code) != "CMPI_RC_" + std::to_string(static_cast<int>(code));
 }
 
 } // namespace
-
-std::string lineOf(const Message& message) {
-    const Finding& finding = message.finding;
-    const Json json = {static_cast<int>(message.kind),
-                       message.number,
-                       message.text,
-                       static_cast<int>(finding.kind),
-                       finding.className,
-                       finding.pass,
-                       finding.request,
-                       finding.text};
-    return json.dump(-1, ' ', false, Json::error_handler_t::replace);
-}
-
-Message messageOf(const std::string& line) {
-    const Json json = Json::parse(line);
-    Message message;
-    message.kind = static_cast<Message::Kind>(json[0].get<int>());
-    message.number = json[1];
-    message.text = json[2];
-    message.finding = {static_cast<CheckKind>(json[3].get<int>()), json[4], json[5], json[6], json[7]};
-    return message;
-}
 
 // Tells the parent what is begun before it begins, so that it knows what was at work when the process ends.
 template <class Work>
@@ -108,7 +82,7 @@ std::optional<Answer> Client::ask(const Query& query) {
     checkCode(text, answer);
     checkCalls(text, calls);
     if (answer.ok() && !answer.isDone) {
-        find(CheckKind::notDone, text, query.verb->name + std::string(" does not call returnDone"));
+        find(CheckKind::notDone, text, query.operation->name + std::string(" does not call returnDone"));
     }
     asked_.push_back({query, answer.code, std::move(calls), checkLeftOver(query, before)});
     return answer;
@@ -176,8 +150,10 @@ bool Client::checkLeftOver(const Query& query, std::size_t before) {
     const std::size_t left = broker_.liveObjects().total();
     if (left > kept) {
         find(CheckKind::leftOver, textOf(query),
-             query.verb->name + (" leaves " + std::to_string(left - kept)) +
+             query.operation->name + (" leaves " + std::to_string(left - kept)) +
                  (left - kept == 1 ? " object" : " objects"));
     }
     return left > kept;
 }
+
+} // namespace oxahv::runner

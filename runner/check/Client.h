@@ -4,6 +4,7 @@
 
 #include "check/Child.h"
 #include "check/Findings.h"
+#include "check/Protocol.h"
 #include "check/Query.h"
 
 #include <atomic>
@@ -12,6 +13,8 @@
 #include <set>
 #include <string>
 #include <vector>
+
+namespace oxahv::runner {
 
 // A method that the user wants to be called.
 struct MethodCall {
@@ -31,18 +34,6 @@ struct CheckTask {
     std::set<std::string> skipped; // the queries that have ended or blocked the provider
 };
 
-// Messages of the child, as its parent reads them.
-struct Message {
-    enum class Kind { begin, end, finding, classServed, classRefused, unserved, unusable };
-    Kind kind = Kind::begin;
-    std::size_t number = 0; // of a query; of a class that is served, its instances
-    std::string text; // of a query; of a refusal, the answer; the class of an upcall that found no provider;
-                      // of what makes the check impossible, why
-    Finding finding{};
-};
-std::string lineOf(const Message& message);
-Message messageOf(const std::string& line);
-
 class Client {
 public:
     // A query that was answered, with the provider's calls.
@@ -54,11 +45,11 @@ public:
     };
 
     // Without `reports`, what is found is not told: another pass has told it.
-    Client(oxahv::EmbeddedBroker& broker, const Options& options, const CheckTask& task, ChildOutput& output,
+    Client(EmbeddedBroker& broker, const Options& options, const CheckTask& task, ChildOutput& output,
            bool reports)
         : broker_(broker), options_(options), task_(task), output_(output), reports_(reports) {}
 
-    oxahv::EmbeddedBroker& broker() { return broker_; }
+    EmbeddedBroker& broker() { return broker_; }
     const Options& options() const { return options_; }
     const CheckTask& task() const { return task_; }
     const std::vector<Asked>& asked() const { return asked_; }
@@ -83,7 +74,7 @@ private:
     void checkCalls(const std::string& request, const std::vector<ProviderCall>& calls);
     bool checkLeftOver(const Query& query, std::size_t before);
 
-    oxahv::EmbeddedBroker& broker_;
+    EmbeddedBroker& broker_;
     const Options& options_;
     const CheckTask& task_;
     ChildOutput& output_;
@@ -91,3 +82,5 @@ private:
     std::vector<Asked> asked_;
     std::atomic<std::size_t> number_{0};
 };
+
+} // namespace oxahv::runner

@@ -11,6 +11,8 @@
 #include <mutex>
 #include <unistd.h>
 
+namespace oxahv::runner {
+
 namespace {
 
 // What a signal handler may read: no line is longer.
@@ -65,7 +67,7 @@ std::string unservedWords(const std::string& className) {
 }
 
 // An overflow of the stack leaves no room on it. A handler that is there already, a sanitizer's, says more.
-void tellCrashesInOneLine(oxahv::EmbeddedBroker& broker) {
+void tellCrashesInOneLine(EmbeddedBroker& broker) {
     static std::array<char, 65536> stack;
     stack_t own = {};
     own.ss_sp = stack.data();
@@ -82,3 +84,5 @@ void tellCrashesInOneLine(oxahv::EmbeddedBroker& broker) {
     }
     broker.setUnservedHandler(noteUnserved);
 }
+
+} // namespace oxahv::runner

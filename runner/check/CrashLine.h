@@ -6,10 +6,14 @@
 
 #include <string>
 
+namespace oxahv::runner {
+
 // From now on a crash of this process writes one line on the standard error stream, and ends it by the same
 // signal. Takes the broker's handler of upcalls that find no provider: what a provider does not expect of
 // those is the likeliest cause.
-void tellCrashesInOneLine(oxahv::EmbeddedBroker& broker);
+void tellCrashesInOneLine(EmbeddedBroker& broker);
 
 // What an upcall for the class has to do with a crash.
 std::string unservedWords(const std::string& className);
+
+} // namespace oxahv::runner

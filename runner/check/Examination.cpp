@@ -1,15 +1,16 @@
 #include "check/Examination.h"
 
 #include "check/Associations.h"
+#include "check/Results.h"
 #include "show/Text.h"
 #include "show/Values.h"
 
 #include <algorithm>
 #include <set>
 
-namespace {
+namespace oxahv::runner {
 
-using oxahv::PropertyDeclaration;
+namespace {
 
 bool isInteger(CMPIType type) {
     return (type & (CMPI_UINT | CMPI_ARRAY)) == CMPI_UINT; // signed ones have the bit too
@@ -95,109 +96,7 @@ const Result* findResult(const std::vector<Result>& results, const std::string& 
     return found != results.end() ? &*found : nullptr;
 }
 
-// The path of a result that the others lack; empty if there is none.
-std::string onlyAmong(const std::vector<Result>& results, const std::vector<Result>& others) {
-    std::set<std::string> identities;
-    for (const Result& other : others) {
-        identities.insert(other.identity);
-    }
-    const auto found = std::find_if(results.begin(), results.end(), [&](const Result& result) {
-        return identities.count(result.identity) == 0;
-    });
-    return found != results.end() ? found->path : "";
-}
-
-void checkTexts(Client& client, const std::string& request, const char* what, const NamedData& values) {
-    for (const auto& [name, value] : values) {
-        if (!value.isUtf8) {
-            client.find(CheckKind::encoding, request, what + (' ' + name));
-        }
-    }
-}
-
-void checkKeys(Client& client, const std::string& request, const Result& result) {
-    for (const PropertyDeclaration& property : client.broker().propertiesOf(result.className)) {
-        if (!property.isKey) {
-            continue;
-        }
-        const auto key = result.keys.find(property.name);
-        const auto value = result.properties.find(property.name);
-        if (key == result.keys.end()) {
-            client.find(CheckKind::keyMissing, request, "key " + property.name);
-        } else if (key->second.isNull) {
-            client.find(CheckKind::nullKey, request, "key " + property.name);
-        } else if (result.isInstance && (value == result.properties.end() || value->second.isNull)) {
-            client.find(CheckKind::nullKey, request,
-                        "property " + property.name + " is a key and has no value in the instance");
-        }
-    }
-}
-
 } // namespace
-
-bool isRefusal(CMPIrc code) {
-    return code == CMPI_RC_ERR_NOT_SUPPORTED || code == CMPI_RC_ERR_INVALID_CLASS ||
-           code == CMPI_RC_ERR_INVALID_NAMESPACE;
-}
-
-void checkResult(Client& client, const std::string& request, const Result& result,
-                 const std::string& className) {
-    if (!className.empty() && !client.broker().isA(result.className, className)) {
-        client.find(CheckKind::otherClass, request,
-                    "class " + result.className + " does not derive from " + className);
-    }
-    checkKeys(client, request, result);
-    checkTexts(client, request, "key", result.keys);
-    checkTexts(client, request, "property", result.properties);
-}
-
-void checkDuplicates(Client& client, const std::string& request, const std::vector<Result>& results) {
-    std::set<std::string> seen;
-    for (const Result& result : results) {
-        if (!seen.insert(result.identity).second) {
-            client.find(CheckKind::duplicate, request, result.path);
-        }
-    }
-}
-
-std::string differenceOf(const std::vector<Result>& first, const std::string& firstName,
-                         const std::vector<Result>& second, const std::string& secondName) {
-    const std::string onlyFirst = onlyAmong(first, second);
-    const std::string onlySecond = onlyAmong(second, first);
-    return !onlyFirst.empty()    ? "only among " + firstName + ": " + onlyFirst
-           : !onlySecond.empty() ? "only among " + secondName + ": " + onlySecond
-                                 : "";
-}
-
-// Only what the broker lets through is of a declared type: it takes output arguments as they come.
-void checkMethodResult(Client& client, const Query& query, const Answer& answer) {
-    const std::string request = textOf(query);
-    if (!answer.ok()) {
-        client.fail(request, "method " + query.operands.method, answer);
-        return;
-    }
-    const auto method = findMethod(client.broker(), client.task().className, query.operands.method);
-    if (!method) {
-        return;
-    }
-    const auto mind = [&](const std::string& text) {
-        client.find(CheckKind::methodResult, request, "method " + method->name + ": " + text);
-    };
-    if (answer.data.size() != 1) {
-        mind("return values: " + std::to_string(answer.data.size()));
-    } else if (answer.data.front().type != method->returnType) {
-        mind("the return value is of type " + typeText(answer.data.front().type));
-    }
-    for (const auto& [name, value] : answer.out) {
-        const oxahv::ParameterDeclaration* const parameter = method->find(name);
-        if (parameter == nullptr || !parameter->isOut) {
-            mind(name + " is no output parameter");
-        } else if (parameter->type != value.type) {
-            mind("output argument " + name + " is of type " + typeText(value.type));
-        }
-    }
-    checkTexts(client, request, "output argument", answer.out);
-}
 
 void Examination::run() {
     if (!enumerate()) {
@@ -360,7 +259,7 @@ void Examination::checkList(const Query& query, const std::vector<std::string>& 
         return;
     }
     if (!answer->ok()) {
-        client_.fail(request, query.verb->name + std::string(" with a property list"), *answer);
+        client_.fail(request, query.operation->name + std::string(" with a property list"), *answer);
         return;
     }
     for (const Result& result : answer->results) {
@@ -372,7 +271,7 @@ void Examination::checkList(const Query& query, const std::vector<std::string>& 
         }
         if (yieldsMore(result, wanted)) {
             client_.find(CheckKind::listIgnored, request,
-                         query.verb->name + std::string(" yields more than the list"));
+                         query.operation->name + std::string(" yields more than the list"));
         }
     }
 }
@@ -405,3 +304,5 @@ void Examination::callMethods() {
         }
     }
 }
+
+} // namespace oxahv::runner

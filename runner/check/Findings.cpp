@@ -6,6 +6,8 @@
 
 #include <algorithm>
 
+namespace oxahv::runner {
+
 namespace {
 
 using Json = nlohmann::ordered_json;
@@ -176,3 +178,5 @@ void printReport(std::ostream& out, Format format, const CheckReport& report, bo
         printTable(out, report, isColoured);
     }
 }
+
+} // namespace oxahv::runner

@@ -7,6 +7,8 @@
 #include <string>
 #include <vector>
 
+namespace oxahv::runner {
+
 enum class Severity { error, warning };
 
 // The checks. `checks()` has one line for each, in this order.
@@ -101,3 +103,5 @@ struct CheckReport {
 // where "answer" is there for classes that are not served, and "severity" is "error" or "warning".
 // `isColoured` sets the table's severities off by colours.
 void printReport(std::ostream& out, Format format, const CheckReport& report, bool isColoured);
+
+} // namespace oxahv::runner

@@ -5,6 +5,8 @@
 #include <map>
 #include <string_view>
 
+namespace oxahv::runner {
+
 namespace {
 
 // A word of a shell's command line.
@@ -33,20 +35,20 @@ std::string joined(const std::vector<std::string>& words) {
 
 struct Option {
     const char* name;
-    const std::string oxahv::AssociationFilter::*value;
+    const std::string AssociationFilter::*value;
 };
-constexpr Option filterOptions[] = {{"--assoc-class", &oxahv::AssociationFilter::associationClass},
-                                    {"--result-class", &oxahv::AssociationFilter::resultClass},
-                                    {"--role", &oxahv::AssociationFilter::role},
-                                    {"--result-role", &oxahv::AssociationFilter::resultRole}};
+constexpr Option filterOptions[] = {{"--assoc-class", &AssociationFilter::associationClass},
+                                    {"--result-class", &AssociationFilter::resultClass},
+                                    {"--role", &AssociationFilter::role},
+                                    {"--result-role", &AssociationFilter::resultRole}};
 
 // Takes faults and the record away, whatever happens.
 class Hooked {
 public:
-    Hooked(oxahv::EmbeddedBroker& broker, const FailingCall* failing, bool isRecorded)
+    Hooked(EmbeddedBroker& broker, const FailingCall* failing, bool isRecorded)
         : broker_(broker), isFailing_(failing != nullptr), isRecorded_(isRecorded) {
         if (failing != nullptr) {
-            oxahv::Fault fault;
+            Fault fault;
             fault.firstCall = failing->number;
             broker_.injectFault(failing->slot, fault);
         }
@@ -58,9 +60,7 @@ public:
     Hooked(const Hooked&) = delete;
     Hooked& operator=(const Hooked&) = delete;
 
-    std::vector<oxahv::Call> calls() {
-        return isRecorded_ ? broker_.stopRecording() : std::vector<oxahv::Call>();
-    }
+    std::vector<Call> calls() { return isRecorded_ ? broker_.stopRecording() : std::vector<Call>(); }
     void end() {
         if (isFailing_) {
             broker_.clearFaults();
@@ -73,25 +73,25 @@ public:
     }
 
 private:
-    oxahv::EmbeddedBroker& broker_;
+    EmbeddedBroker& broker_;
     bool isFailing_;
     bool isRecorded_;
 };
 
-Answer sendHooked(oxahv::EmbeddedBroker& broker, const Options& options, const Query& query,
+Answer sendHooked(EmbeddedBroker& broker, const Options& options, const Query& query,
                   const FailingCall* failing, std::vector<ProviderCall>* calls) {
     Hooked hooked(broker, failing, calls != nullptr);
-    oxahv::Request request(broker);
-    const CMPIObjectPath* const target = targetOf(request, options, *query.verb, query.operands);
+    Request request(broker);
+    const CMPIObjectPath* const target = targetOf(request, options, *query.operation, query.operands);
     std::map<std::string, unsigned int> counts;
     if (calls != nullptr) {
-        for (const oxahv::Call& call : broker.stopRecording()) {
+        for (const Call& call : broker.stopRecording()) {
             ++counts[call.slot];
         }
         broker.startRecording();
     }
-    const oxahv::Reply reply = query.verb->perform(broker, request, target, query.operands);
-    for (oxahv::Call& call : hooked.calls()) {
+    const Reply reply = query.operation->perform(broker, request, target, query.operands);
+    for (Call& call : hooked.calls()) {
         const unsigned int number = ++counts[call.slot];
         calls->push_back({std::move(call), number});
     }
@@ -102,8 +102,8 @@ Answer sendHooked(oxahv::EmbeddedBroker& broker, const Options& options, const Q
 } // namespace
 
 Query queryOf(const std::string& verb, Operands operands) {
-    const auto found = std::find_if(verbs().begin(), verbs().end(),
-                                    [&](const Verb& candidate) { return verb == candidate.name; });
+    const auto found = std::find_if(operations().begin(), operations().end(),
+                                    [&](const Operation& candidate) { return verb == candidate.name; });
     return {&*found, std::move(operands)};
 }
 
@@ -115,7 +115,7 @@ Query queryOf(const std::string& verb, const std::string& target) {
 
 std::string textOf(const Query& query) {
     const Operands& operands = query.operands;
-    std::string text = query.verb->name + (' ' + quoted(operands.target));
+    std::string text = query.operation->name + (' ' + quoted(operands.target));
     if (!operands.method.empty()) {
         text += ' ' + quoted(operands.method);
     }
@@ -133,19 +133,20 @@ std::string textOf(const Query& query) {
 }
 
 std::string shapeOf(const Query& query) {
-    std::string shape = query.verb->name + (' ' + query.operands.method);
+    std::string shape = query.operation->name + (' ' + query.operands.method);
     for (const Option& option : filterOptions) {
         shape += (query.operands.filter.*option.value).empty() ? '-' : '+';
     }
     return shape + (query.operands.properties ? '+' : '-');
 }
 
-Answer send(oxahv::EmbeddedBroker& broker, const Options& options, const Query& query,
-            const FailingCall* failing) {
+Answer send(EmbeddedBroker& broker, const Options& options, const Query& query, const FailingCall* failing) {
     return sendHooked(broker, options, query, failing, nullptr);
 }
 
-Answer sendRecorded(oxahv::EmbeddedBroker& broker, const Options& options, const Query& query,
+Answer sendRecorded(EmbeddedBroker& broker, const Options& options, const Query& query,
                     std::vector<ProviderCall>& calls) {
     return sendHooked(broker, options, query, nullptr, &calls);
 }
+
+} // namespace oxahv::runner

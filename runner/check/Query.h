@@ -7,8 +7,10 @@
 #include <string>
 #include <vector>
 
+namespace oxahv::runner {
+
 struct Query {
-    const Verb* verb;
+    const Operation* operation;
     Operands operands;
 };
 
@@ -31,14 +33,16 @@ struct FailingCall {
 
 // A slot's call that the provider made. The number counts all calls of the slot from the request's beginning.
 struct ProviderCall {
-    oxahv::Call call;
+    Call call;
     unsigned int number = 1;
 };
 
-// Sends the query. Throws oxahv::BrokerError when it cannot be sent. Thread-safe without a failing call.
-Answer send(oxahv::EmbeddedBroker& broker, const Options& options, const Query& query,
+// Sends the query. Throws BrokerError when it cannot be sent. Thread-safe without a failing call.
+Answer send(EmbeddedBroker& broker, const Options& options, const Query& query,
             const FailingCall* failing = nullptr);
 
 // The same, and notes the calls of slots. For one thread at a time.
-Answer sendRecorded(oxahv::EmbeddedBroker& broker, const Options& options, const Query& query,
+Answer sendRecorded(EmbeddedBroker& broker, const Options& options, const Query& query,
                     std::vector<ProviderCall>& calls);
+
+} // namespace oxahv::runner

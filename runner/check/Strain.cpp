@@ -1,6 +1,6 @@
 #include "check/Strain.h"
 
-#include "check/Examination.h"
+#include "check/Results.h"
 
 #include <algorithm>
 #include <chrono>
@@ -8,6 +8,8 @@
 #include <map>
 #include <set>
 #include <thread>
+
+namespace oxahv::runner {
 
 namespace {
 
@@ -47,8 +49,7 @@ void compareValues(const std::string& where, const NamedData& one, const NamedDa
 Difference differenceOf(const Answer& one, const Answer& other) {
     Difference difference;
     if (one.code != other.code) {
-        difference.structure.insert(oxahv::codeName(one.code) + " in place of " +
-                                    oxahv::codeName(other.code));
+        difference.structure.insert(codeName(one.code) + " in place of " + codeName(other.code));
         return difference;
     }
     const auto ours = byIdentity(one);
@@ -195,7 +196,7 @@ void failEach(Client& client, const Client::Asked& asked) {
             client.find(CheckKind::leftOver,
                         textOf(asked.query) + " --fault " + failing.slot + ':' +
                             std::to_string(failing.number),
-                        asked.query.verb->name + (" leaves objects when " + failing.slot + " fails"));
+                        asked.query.operation->name + (" leaves objects when " + failing.slot + " fails"));
         }
     }
 }
@@ -210,9 +211,9 @@ void strainByConduct(Client& client) {
         return client.askPlainly(query);
     };
     for (const Client::Asked& asked : all) {
-        const Verb& verb = *asked.query.verb;
+        const Operation& operation = *asked.query.operation;
         const bool isTold = asked.code != CMPI_RC_OK && !isRefusal(asked.code);
-        if (verb.target == Target::ofClass || verb.takes == Takes::method || isTold) {
+        if (operation.target == Target::ofClass || operation.takes == Takes::method || isTold) {
             continue;
         }
         const std::optional<Answer> before = askAgain(asked.query, client.task().conduct);
@@ -222,7 +223,7 @@ void strainByConduct(Client& client) {
             continue;
         }
         for (const std::string& text : differenceOf(*after, *plain).structure) {
-            client.find(CheckKind::keysUnread, textOf(asked.query), verb.name + (": " + text));
+            client.find(CheckKind::keysUnread, textOf(asked.query), operation.name + (": " + text));
         }
     }
     apply(client.broker(), client.task().conduct);
@@ -251,9 +252,11 @@ void strainByFaults(Client& client) {
     std::set<std::string> shapes;
     const std::vector<Client::Asked> all = client.asked();
     for (const Client::Asked& asked : all) {
-        const std::string shape = shapeOf(asked.query) + oxahv::codeName(asked.code);
+        const std::string shape = shapeOf(asked.query) + codeName(asked.code);
         if (!asked.leavesObjects && shapes.insert(shape).second) {
             failEach(client, asked);
         }
     }
 }
+
+} // namespace oxahv::runner

@@ -4,6 +4,8 @@
 
 #include "check/Client.h"
 
+namespace oxahv::runner {
+
 // Compares the answers about single instances with those that come when the broker delivers their paths as
 // they are.
 void strainByConduct(Client& client);
@@ -15,3 +17,5 @@ void strainByThreads(Client& client);
 // Lets each call fail that the provider makes of the broker in turn, of each slot the first hundred ones and
 // the last, for one query of each shape. The answer may be anything that a code stands for.
 void strainByFaults(Client& client);
+
+} // namespace oxahv::runner

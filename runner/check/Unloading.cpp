@@ -13,6 +13,8 @@
 #include <string_view>
 #include <vector>
 
+namespace oxahv::runner {
+
 namespace {
 
 // The parts of a library's file that say whether it can be unloaded.
@@ -125,3 +127,5 @@ std::string whyStillMapped(const std::string& library) {
     }
     return handle != nullptr || isMapped(file) ? causeOf(ElfFile(file)) : "";
 }
+
+} // namespace oxahv::runner

@@ -5,6 +5,8 @@
 #include <charconv>
 #include <nlohmann/json.hpp>
 
+namespace oxahv::runner {
+
 namespace {
 
 using Json = nlohmann::ordered_json;
@@ -13,7 +15,7 @@ Json jsonOf(const CMPIData& data);
 
 // The double that is written as shortly as the number is: 0.1, not 0.10000000149011612.
 double shortest(const CMPIData& real) {
-    const std::string text = oxahv::valueText(real);
+    const std::string text = valueText(real);
     double number = 0;
     std::from_chars(text.data(), text.data() + text.size(), number);
     return number;
@@ -66,9 +68,9 @@ Json jsonOf(const CMPIData& data) {
     case CMPI_dateTime:
         return textOf(CMGetStringFormat(data.value.dateTime, nullptr));
     case CMPI_ref:
-        return oxahv::pathText(data.value.ref);
+        return pathText(data.value.ref);
     default:
-        return oxahv::valueText(data);
+        return valueText(data);
     }
 }
 
@@ -83,7 +85,7 @@ Json jsonOf(const std::vector<NamedValue>& values) {
 Json jsonOf(const CMPIObjectPath* path, const std::vector<NamedValue>& values) {
     return {{"class", textOf(CMGetClassName(path, nullptr))},
             {"namespace", textOf(CMGetNameSpace(path, nullptr))},
-            {"path", oxahv::pathText(path)},
+            {"path", pathText(path)},
             {"properties", jsonOf(values)}};
 }
 
@@ -105,7 +107,7 @@ void printInstances(std::ostream& out, Format format, const std::vector<CMPIInst
         }
         out << "instance of " << textOf(CMGetClassName(path, nullptr)) << " {\n";
         for (const NamedValue& property : properties) {
-            out << "  " << property.name << " = " << oxahv::valueText(property.data) << ";\n";
+            out << "  " << property.name << " = " << valueText(property.data) << ";\n";
         }
         out << "};\n";
     }
@@ -120,7 +122,7 @@ void printPaths(std::ostream& out, Format format, const std::vector<CMPIObjectPa
         if (format == Format::json) {
             array.push_back(jsonOf(path, keysOf(path)));
         } else {
-            out << oxahv::pathText(path) << '\n';
+            out << pathText(path) << '\n';
         }
     }
     if (format == Format::json) {
@@ -129,21 +131,23 @@ void printPaths(std::ostream& out, Format format, const std::vector<CMPIObjectPa
 }
 
 void printMethodResult(std::ostream& out, Format format, const CMPIObjectPath* path,
-                       const std::string& method, const oxahv::Reply& reply) {
+                       const std::string& method, const Reply& reply) {
     CMPIData returned = {CMPI_null, CMPI_nullValue, {}};
     if (!reply.data.empty()) {
         returned = reply.data.front();
     }
     const std::vector<NamedValue> arguments = argumentsOf(reply.out);
     if (format == Format::json) {
-        print(out, Json::array({{{"path", oxahv::pathText(path)},
+        print(out, Json::array({{{"path", pathText(path)},
                                  {"method", method},
                                  {"returnValue", jsonOf(returned)},
                                  {"parameters", jsonOf(arguments)}}}));
         return;
     }
-    out << "ReturnValue = " << oxahv::valueText(returned) << ";\n";
+    out << "ReturnValue = " << valueText(returned) << ";\n";
     for (const NamedValue& argument : arguments) {
-        out << argument.name << " = " << oxahv::valueText(argument.data) << ";\n";
+        out << argument.name << " = " << valueText(argument.data) << ";\n";
     }
 }
+
+} // namespace oxahv::runner

@@ -7,6 +7,8 @@
 #include <string>
 #include <vector>
 
+namespace oxahv::runner {
+
 enum class Format { mof, json };
 
 // As MOF-like text, or as one JSON array of objects.
@@ -17,4 +19,6 @@ void printPaths(std::ostream& out, Format format, const std::vector<CMPIObjectPa
 
 // As MOF-like lines, the return value first, or as a JSON array of one object.
 void printMethodResult(std::ostream& out, Format format, const CMPIObjectPath* path,
-                       const std::string& method, const oxahv::Reply& reply);
+                       const std::string& method, const Reply& reply);
+
+} // namespace oxahv::runner

@@ -5,6 +5,8 @@
 #include <iostream>
 #include <unistd.h>
 
+namespace oxahv::runner {
+
 ProgressLine::ProgressLine() : isTerminal_(::isatty(STDERR_FILENO) == 1) {}
 
 ProgressLine::~ProgressLine() {
@@ -22,3 +24,5 @@ void ProgressLine::show(const std::string& text) {
         std::cerr << '\r' << printable(text, width) << "\033[K" << std::flush;
     }
 }
+
+} // namespace oxahv::runner

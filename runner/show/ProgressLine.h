@@ -4,6 +4,8 @@
 #include <chrono>
 #include <string>
 
+namespace oxahv::runner {
+
 // One line of the standard error stream, written over and over once this object is older than a second;
 // nothing when that stream is no terminal. The line is gone when this object is.
 class ProgressLine {
@@ -21,3 +23,5 @@ private:
     bool isShown_ = false;
     std::chrono::steady_clock::time_point due_ = std::chrono::steady_clock::now() + std::chrono::seconds(1);
 };
+
+} // namespace oxahv::runner

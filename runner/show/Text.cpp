@@ -3,6 +3,9 @@
 #include <Utf8.h>
 
 #include <optional>
+#include <sstream>
+
+namespace oxahv::runner {
 
 std::string printable(std::string_view text, std::size_t most) {
     std::string result;
@@ -15,3 +18,14 @@ std::string printable(std::string_view text, std::size_t most) {
     }
     return result;
 }
+
+std::vector<std::string> namesIn(const std::string& text) {
+    std::vector<std::string> names;
+    std::istringstream stream(text);
+    for (std::string name; std::getline(stream, name, ',');) {
+        names.push_back(name);
+    }
+    return names;
+}
+
+} // namespace oxahv::runner

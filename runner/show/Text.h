@@ -6,6 +6,9 @@
 #include <limits>
 #include <string>
 #include <string_view>
+#include <vector>
+
+namespace oxahv::runner {
 
 using encoding::foldedName;
 using encoding::sameName;
@@ -13,3 +16,8 @@ using encoding::sameName;
 // The text for one line of a terminal, at most its first characters: control characters and what is not UTF-8
 // are question marks. What a provider or its MOF file holds may be anything.
 std::string printable(std::string_view text, std::size_t most = std::numeric_limits<std::size_t>::max());
+
+// The names of a text that has commas between them; none in an empty text.
+std::vector<std::string> namesIn(const std::string& text);
+
+} // namespace oxahv::runner

@@ -2,6 +2,8 @@
 
 #include "show/Text.h"
 
+namespace oxahv::runner {
+
 namespace {
 
 // `count` and `at` are the slots that tell the values of an instance, an object path or arguments.
@@ -36,12 +38,14 @@ std::vector<NamedValue> argumentsOf(const CMPIArgs* arguments) {
     return valuesOf(arguments, CMGetArgCount, CMGetArgAt);
 }
 
-std::optional<oxahv::MethodDeclaration> findMethod(const oxahv::EmbeddedBroker& broker,
-                                                   const std::string& className, const std::string& method) {
-    for (const oxahv::MethodDeclaration& declared : broker.methodsOf(className)) {
+std::optional<MethodDeclaration> findMethod(const EmbeddedBroker& broker, const std::string& className,
+                                            const std::string& method) {
+    for (const MethodDeclaration& declared : broker.methodsOf(className)) {
         if (sameName(declared.name, method)) {
             return declared;
         }
     }
     return std::nullopt;
 }
+
+} // namespace oxahv::runner

@@ -7,6 +7,8 @@
 #include <string>
 #include <vector>
 
+namespace oxahv::runner {
+
 // Empty for a null string, and for one whose characters the broker does not hand out: a fault can strike the
 // command's own calls too.
 std::string textOf(const CMPIString* string);
@@ -22,5 +24,7 @@ std::vector<NamedValue> keysOf(const CMPIObjectPath* path);
 std::vector<NamedValue> argumentsOf(const CMPIArgs* arguments);
 
 // The declaration of a class's method, by its name in any case; nothing when there is none.
-std::optional<oxahv::MethodDeclaration> findMethod(const oxahv::EmbeddedBroker& broker,
-                                                   const std::string& className, const std::string& method);
+std::optional<MethodDeclaration> findMethod(const EmbeddedBroker& broker, const std::string& className,
+                                            const std::string& method);
+
+} // namespace oxahv::runner
