@@ -115,6 +115,21 @@ Qualifiers EmbeddedBroker::qualifiersOf(const std::string& className) const {
     return declared != nullptr ? declared->qualifiers : Qualifiers();
 }
 
+std::string EmbeddedBroker::superclassOf(const std::string& className) const {
+    const auto declared = impl_->classes.find(className);
+    return declared != nullptr && declared->superclass != nullptr ? declared->superclass->name : "";
+}
+
+std::vector<QualifierTypeDeclaration> EmbeddedBroker::qualifierTypes() const {
+    std::vector<QualifierTypeDeclaration> types;
+    for (const QualifierType& type : impl_->classes.qualifierTypes()) {
+        types.push_back({type.implied.name, type.implied.value.type, type.defaultValue,
+                         scopeNames(type.scopes), type.implied.isOverridable, type.implied.reachesSubclass,
+                         type.implied.isTranslatable});
+    }
+    return types;
+}
+
 bool EmbeddedBroker::isAssociation(const std::string& className) const {
     return qualifiersOf(className).isTrue("Association");
 }

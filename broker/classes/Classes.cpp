@@ -31,6 +31,11 @@ std::vector<std::string> Classes::names() const {
     return declarations_.classNames();
 }
 
+std::vector<QualifierType> Classes::qualifierTypes() const {
+    const std::shared_lock<std::shared_mutex> lock(mutex_);
+    return declarations_.qualifierTypes();
+}
+
 bool Classes::isA(std::string_view className, std::string_view ancestor) const {
     const std::shared_ptr<const DeclaredClass> declared = find(className);
     return declared != nullptr ? declared->isA(ancestor) : sameName(className, ancestor);

@@ -26,6 +26,7 @@ public:
     // Null for a class that is not declared.
     std::shared_ptr<const DeclaredClass> find(std::string_view name) const;
     std::vector<std::string> names() const;
+    std::vector<QualifierType> qualifierTypes() const;
     bool isA(std::string_view className, std::string_view ancestor) const;
 
 private:

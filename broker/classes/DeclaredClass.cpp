@@ -213,4 +213,12 @@ std::vector<std::string> Declarations::classNames() const {
     return names;
 }
 
+std::vector<QualifierType> Declarations::qualifierTypes() const {
+    std::vector<QualifierType> types;
+    for (const auto& [folded, type] : qualifiers_) {
+        types.push_back(type);
+    }
+    return types;
+}
+
 } // namespace oxahv

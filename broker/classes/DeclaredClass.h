@@ -30,6 +30,7 @@ struct DeclaredClass {
 struct QualifierType {
     unsigned int scopes = 0;
     QualifierDeclaration implied;
+    DeclaredValue defaultValue{}; // what elements without the qualifier have
 };
 
 // Why a declaration is refused, and which part of it is at fault.
@@ -61,6 +62,7 @@ public:
     std::shared_ptr<const DeclaredClass> find(std::string_view name) const;
     const QualifierType* findQualifier(std::string_view name) const;
     std::vector<std::string> classNames() const;
+    std::vector<QualifierType> qualifierTypes() const;
     bool anyClass() const { return !classes_.empty(); }
 
 private:

@@ -63,6 +63,17 @@ private:
     std::shared_ptr<const std::vector<QualifierDeclaration>> list_;
 };
 
+/** The declaration of a qualifier itself, which MOF begins with `Qualifier`. */
+struct QualifierTypeDeclaration {
+    std::string name;                ///< as declared
+    CMPIType type = CMPI_null;       ///< with `CMPI_ARRAY` for arrays
+    DeclaredValue defaultValue{};    ///< of type `CMPI_null` when none is declared
+    std::vector<std::string> scopes; ///< what it may qualify: "class", "association", "property" and so on
+    bool isOverridable = true;       ///< flavour EnableOverride
+    bool reachesSubclass = true;     ///< flavour ToSubclass
+    bool isTranslatable = false;     ///< flavour Translatable
+};
+
 /** One property of a class. */
 struct PropertyDeclaration {
     std::string name;             ///< as declared

@@ -124,6 +124,12 @@ public:
     std::vector<MethodDeclaration> methodsOf(const std::string& className) const;
     /** The qualifiers of a declared class, own ones first; none for one that is not declared. */
     Qualifiers qualifiersOf(const std::string& className) const;
+    /** The name of a declared class's superclass; empty for a class without one, and for one that is not
+     * declared. */
+    std::string superclassOf(const std::string& className) const;
+    /** The qualifiers that MOF has declared, in the order of their letters; with any MOF also those that CIM
+     * itself fixes, such as Key. */
+    std::vector<QualifierTypeDeclaration> qualifierTypes() const;
     /** Whether the class is declared, and is an association or derives from one. */
     bool isAssociation(const std::string& className) const;
     /** Whether the class is declared, and is abstract. */

@@ -163,8 +163,8 @@ void MofCompiler::declare(const MofSource& source, const MofInclude& include) {
 
 void MofCompiler::declare(const MofSource& source, const MofQualifierType& declared) {
     QualifierType type{declared.scopes, {declared.name.text, impliedValue(declared.type)}};
-    if (declared.value) { // checked; what a used qualifier without value has does not depend on it
-        mofValueOf(source, *declared.value, declared.type);
+    if (declared.value) { // what a used qualifier without value has does not depend on it
+        type.defaultValue = mofValueOf(source, *declared.value, declared.type);
     }
     apply(declared.flavours, type.implied);
     declarations_.declare(std::move(type));

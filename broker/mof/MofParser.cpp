@@ -53,6 +53,17 @@ CMPIType dataTypeOf(const MofToken& token) {
 
 } // namespace
 
+std::vector<std::string> scopeNames(unsigned int scopes) {
+    std::vector<std::string> names;
+    for (const Word<unsigned int>& word : scopeWords) {
+        const bool isAny = word.meaning == mofScope::any;
+        if (isAny ? scopes == mofScope::any : scopes != mofScope::any && (scopes & word.meaning) != 0) {
+            names.emplace_back(word.name);
+        }
+    }
+    return names;
+}
+
 MofParser::MofParser(const MofSource& source) : source_(source), lexer_(source), token_(lexer_.next()) {}
 
 void MofParser::failExpecting(const std::string& what) const {

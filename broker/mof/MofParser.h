@@ -66,6 +66,9 @@ constexpr unsigned int parameter = 1U << 8U;
 constexpr unsigned int any = (1U << 9U) - 1U;
 } // namespace mofScope
 
+// The names of scopes in MOF; "any" alone for all of them.
+std::vector<std::string> scopeNames(unsigned int scopes);
+
 struct MofQualifierType {
     MofName name;
     CMPIType type = CMPI_null; // with `CMPI_ARRAY`
