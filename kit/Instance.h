@@ -29,6 +29,9 @@ public:
     CMPIInstance* handle() const { return handle_; }
     /** Its path. @throws Refusal with the broker's status */
     Path path() const;
+    /** Whether the client will see what is set. It saves a provider what is dear to find out: false where the
+     * request does not want this instance, or its name alone. */
+    bool isVisible() const { return handle_ != nullptr; }
 
     /**
      * Sets a property.

@@ -13,7 +13,7 @@ class FileSystemProvider : public testing::Test {
 public:
     FileSystemProvider() {
         broker.compileMof(DEMO_MOF);
-        broker.load(DEMO_PROVIDER, "DemoFileSystem");
+        broker.load(DEMO_LIBRARY, DEMO_PROVIDER);
     }
 
     oxahv::EmbeddedBroker broker;
