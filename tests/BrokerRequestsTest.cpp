@@ -1,4 +1,4 @@
-// Requests through the broker: providers, faults, records, modes, threads.
+// Requests through the broker: hosted providers, injected faults, delivery of keys, and threads.
 #include "TestLocales.h"
 
 #include "EmbeddedBroker.h"
@@ -12,7 +12,6 @@
 #include <gtest/gtest.h>
 #include <stdexcept>
 
-using oxahv::BrokerError;
 using oxahv::ClassDeclaration;
 using oxahv::EmbeddedBroker;
 using oxahv::KeyMode;
@@ -21,7 +20,7 @@ using oxahv::Request;
 
 namespace {
 
-// A provider whose functions a test sets; the slots that none needs are empty.
+// A provider whose functions a test sets; the other slots are empty.
 std::function<CMPIStatus(const CMPIContext*, const CMPIResult*, const CMPIObjectPath*)> serve;
 std::function<void(const CMPIContext*)> atEnd;
 const CMPIBroker* broker = nullptr;
@@ -39,94 +38,57 @@ CMPIStatus end(CMPIInstanceMI*, const CMPIContext* context, CMPIBoolean) {
     CMReturn(CMPI_RC_OK);
 }
 
-CMPIInstanceMI* createInstanceMI(const CMPIBroker* theBroker, const CMPIContext*, CMPIStatus*) {
-    static CMPIInstanceMIFT table = {};
-    static CMPIInstanceMI mi = {nullptr, &table};
-    table.cleanup = end;
-    table.enumerateInstanceNames = serveAny;
-    table.getInstance = serveAny;
-    broker = theBroker;
-    return &mi;
-}
-
 // Returns the path of the request.
 CMPIStatus echo(const CMPIContext*, const CMPIResult* result, const CMPIObjectPath* path) {
     CMReturnObjectPath(result, path);
     return CMReturnDone(result);
 }
 
-// A provider that notes what it is asked for, with all arguments, and answers with an instance of the path,
-// or the path itself where that is asked for.
+// Another provider, which notes its requests with all arguments. It returns an instance of the path, or the
+// path itself where the operation's letter is a capital.
 std::string asked;
 
-void note(const char* text) {
-    asked += text != nullptr ? text + std::string(" ") : "- ";
-}
-void note(const char** list) {
-    for (; *list != nullptr; ++list) {
-        note(*list);
+struct Note {
+    static void add(const char* text) { asked += text != nullptr ? text + std::string(" ") : "- "; }
+    static void add(const char** list) {
+        for (; *list != nullptr; ++list) {
+            add(*list);
+        }
     }
-}
-void note(const CMPIInstance* instance) {
-    note(oxahv::valueText(CMGetProperty(instance, "K", nullptr)).c_str());
-}
-void note(const CMPIArgs* in) {
-    note(oxahv::valueText(CMGetArg(in, "In", nullptr)).c_str());
-}
-void note(CMPIArgs* out) {
-    CMAddArg(out, "Out", "value", CMPI_chars);
+    static void add(const CMPIInstance* instance) { add(textOf(instance, "K").c_str()); }
+    static void add(const CMPIArgs* in) { add(textOf(in, "In").c_str()); }
+    static void add(CMPIArgs* out) { CMAddArg(out, "Out", "value", CMPI_chars); }
+};
+
+template <char operation, class MI, class... Rest>
+CMPIStatus note(MI*, const CMPIContext*, const CMPIResult* result, const CMPIObjectPath* path, Rest... rest) {
+    asked += operation + std::string(" ");
+    (Note::add(rest), ...);
+    return operation < 'a' ? CMReturnObjectPath(result, path)
+                           : CMReturnInstance(result, CMNewInstance(broker, path, nullptr));
 }
 
-enum Operation { names, list, get, create, modify, remove, query, method, ends, endNames, links, linkNames };
-
-template <Operation operation, class MI, class... Rest>
-CMPIStatus noting(MI*, const CMPIContext*, const CMPIResult* result, const CMPIObjectPath* path,
-                  Rest... rest) {
-    asked += std::to_string(operation) + ' ';
-    (note(rest), ...);
-    const bool isPath =
-        operation == names || operation == create || operation == endNames || operation == linkNames;
-    return isPath ? CMReturnObjectPath(result, path)
-                  : CMReturnInstance(result, CMNewInstance(broker, path, nullptr));
-}
-
-CMPIInstanceMI* createNotingInstanceMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*) {
-    static CMPIInstanceMIFT table = {};
-    static CMPIInstanceMI mi = {nullptr, &table};
-    table.enumerateInstanceNames = noting<names>;
-    table.enumerateInstances = noting<list>;
-    table.getInstance = noting<get>;
-    table.createInstance = noting<create>;
-    table.modifyInstance = noting<modify>;
-    table.deleteInstance = noting<remove>;
-    table.execQuery = noting<query>;
+// A factory of an MI with a table of functions.
+template <auto& table, class MI>
+MI* create(const CMPIBroker* theBroker, const CMPIContext*, CMPIStatus*) {
+    static MI mi = {nullptr, &table};
+    broker = theBroker;
     return &mi;
 }
 
-CMPIAssociationMI* createNotingAssociationMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*) {
-    static CMPIAssociationMIFT table = {};
-    static CMPIAssociationMI mi = {nullptr, &table};
-    table.associators = noting<ends>;
-    table.associatorNames = noting<endNames>;
-    table.references = noting<links>;
-    table.referenceNames = noting<linkNames>;
-    return &mi;
-}
+const CMPIInstanceMIFT served = {0, 0, "", end, serveAny, {}, serveAny, {}, {}, {}, {}, {}};
+const CMPIInstanceMIFT instances = {0,         0,         "",        {},        note<'N'>, note<'i'>,
+                                    note<'g'>, note<'C'>, note<'m'>, note<'d'>, note<'q'>, {}};
+const CMPIAssociationMIFT associations = {0, 0, "", {}, note<'a'>, note<'A'>, note<'r'>, note<'R'>, {}, {}};
+const CMPIMethodMIFT methods = {0, 0, "", {}, note<'c'>};
 
-CMPIMethodMI* createNotingMethodMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*) {
-    static CMPIMethodMIFT table = {};
-    static CMPIMethodMI mi = {nullptr, &table};
-    table.invokeMethod = noting<method>;
-    return &mi;
-}
-
-class ARequest : public testing::Test {
+class RequestTest : public testing::Test {
 protected:
-    ARequest() {
+    RequestTest() {
         serve = echo;
-        broker_.host("Tested", {createInstanceMI});
+        broker_.host("Tested", {create<served>});
     }
-    ~ARequest() override { atEnd = nullptr; }
+    ~RequestTest() override { atEnd = nullptr; }
 
     CMPIObjectPath* path(const std::string& text) { return request_.objectPathFromText(text, "root"); }
 
@@ -134,26 +96,27 @@ protected:
     Request request_{broker_};
 };
 
+std::string firstPathOf(const Reply& reply) {
+    return oxahv::pathText(reply.objectPaths.at(0));
+}
+
 } // namespace
 
-TEST_F(ARequest, ReachesTheProviderAndBringsItsResultsBack) {
+TEST_F(RequestTest, ReachesTheProviderAndReturnsItsResults) {
     broker_.setContextEntry("StateFile", "earlier");
     broker_.setContextEntry("StateFile", "/a/file");
     Request request(broker_);
     CMPIObjectPath* const demo = path("Demo.Key=\"text\"");
-    EXPECT_EQ(oxahv::pathText(request.enumerateInstanceNames(demo).objectPaths.at(0)),
-              "root:Demo.Key=\"text\"");
+    EXPECT_EQ(firstPathOf(request.enumerateInstanceNames(demo)), "root:Demo.Key=\"text\"");
     serve = [](const CMPIContext* context, const CMPIResult* result, const CMPIObjectPath* p) {
-        const std::pair<const char*, const char*> entries[] = {{CMPIInitNameSpace, "\"root\""},
-                                                               {CMPIPrincipal, "\"\""},
-                                                               {CMPIInvocationFlags, "0"},
-                                                               {"StateFile", "\"/a/file\""}};
-        for (const auto& [name, value] : entries) {
-            EXPECT_EQ(oxahv::valueText(CMGetContextEntry(context, name, nullptr)), value);
+        std::string entries;
+        for (const char* const name : {CMPIInitNameSpace, CMPIPrincipal, CMPIInvocationFlags, "StateFile"}) {
+            entries += textOf(context, name) + ' ';
         }
+        EXPECT_EQ(entries, R"("root" "" 0 "/a/file" )");
         CMPIInstance* const instance = CMNewInstance(broker, p, nullptr);
         const CMPIStatus status = CMReturnInstance(result, instance);
-        CMSetProperty(instance, "Late", "x", CMPI_chars); // what was returned is a copy
+        CMSetProperty(instance, "Late", "x", CMPI_chars); // the result is a copy
         return status;
     };
     const Reply reply = request.getInstance(demo);
@@ -164,16 +127,14 @@ TEST_F(ARequest, ReachesTheProviderAndBringsItsResultsBack) {
     broker_.declare(ClassDeclaration("Demo").superclass("Base"));
     EXPECT_EQ(request.invokeMethod(demo, "START", nullptr).code, CMPI_RC_ERR_NOT_SUPPORTED)
         << "the provider has no methods";
-    const Reply other = request.invokeMethod(demo, "Other", nullptr);
-    EXPECT_EQ(other.code, CMPI_RC_ERR_METHOD_NOT_FOUND);
-    EXPECT_EQ(other.message, "class Demo has no method Other");
+    EXPECT_EQ(failureOf(request.invokeMethod(demo, "Other", nullptr)),
+              "CMPI_RC_ERR_METHOD_NOT_FOUND class Demo has no method Other");
 }
 
-TEST_F(ARequest, CanBeSentByAProvider) {
+TEST_F(RequestTest, CanComeFromAProvider) {
     const CMPIBroker* const b = broker_.handle();
     const CMPIContext* const context = request_.context();
-    broker_.host("Noting", {createNotingInstanceMI, createNotingAssociationMI, createNotingMethodMI},
-                 {"Asked"});
+    broker_.host("Noting", {create<instances>, create<associations>, create<methods>}, {"Asked"});
     CMPIObjectPath* const p = path("Asked.K=1");
     CMPIInstance* const instance = CMNewInstance(b, p, nullptr);
     CMPIArgs* const in = CMNewArgs(b, nullptr);
@@ -202,62 +163,65 @@ TEST_F(ARequest, CanBeSentByAProvider) {
     EXPECT_EQ(b->bft->modifyInstance(b, context, p, instance, properties).rc, CMPI_RC_OK);
     EXPECT_EQ(b->bft->deleteInstance(b, context, p).rc, CMPI_RC_OK);
     b->bft->invokeMethod(b, context, p, "Start", in, out, &status);
-    EXPECT_EQ(oxahv::valueText(CMGetArg(out, "Out", nullptr)), "\"value\"");
+    EXPECT_EQ(textOf(out, "Out"), "\"value\"");
     EXPECT_EQ(b->bft->getProperty(b, context, p, "K", &status).value.uint64, 1U);
     EXPECT_EQ(b->bft->setProperty(b, context, p, "K", &two, CMPI_uint64).rc, CMPI_RC_OK);
-    EXPECT_EQ(asked,
-              "0 1 P Q 2 P Q 3 1 6 select WQL 8 Asked B C D P Q 9 Asked B C D 10 Asked B P Q 11 Asked - "
-              "4 1 P Q 5 7 Start \"x\" 2 K 4 2 K ");
-    b->bft->invokeMethod(b, context, p, "Start", in, reinterpret_cast<CMPIArgs*>(p), &status);
+    EXPECT_EQ(asked, "N i P Q g P Q C 1 q select WQL a Asked B C D P Q A Asked B C D r Asked B P Q R Asked - "
+                     "m 1 P Q d c Start \"x\" g K m 2 K ");
+    auto* const foreign = reinterpret_cast<CMPIArgs*>(p);
+    b->bft->invokeMethod(b, context, p, "Start", in, foreign, &status);
     EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_HANDLE);
-    EXPECT_EQ(request_.invokeMethod(p, "Start", reinterpret_cast<CMPIArgs*>(p)).code,
-              CMPI_RC_ERR_INVALID_HANDLE);
+    EXPECT_EQ(request_.invokeMethod(p, "Start", foreign).code, CMPI_RC_ERR_INVALID_HANDLE);
 }
 
-TEST_F(ARequest, ForAMethodHasTheArgumentsThatItsClassDeclares) {
-    broker_.host("Noting", {nullptr, nullptr, createNotingMethodMI}, {"Asked"});
+TEST_F(RequestTest, PassesTheArgumentsThatTheMethodDeclares) {
+    broker_.host("Noting", {nullptr, nullptr, create<methods>}, {"Asked"});
     broker_.declare(ClassDeclaration("Asked").method(
         "Start", CMPI_uint32,
         {{"In", CMPI_string}, {"Number", CMPI_uint8A}, {"Out", CMPI_string, "", false, true}}));
-    const auto messageOf = [&](const char* name, const void* value, CMPIType type) {
-        CMPIArgs* const in = CMNewArgs(broker_.handle(), nullptr);
-        CMAddArg(in, name, value, type);
-        const Reply reply = request_.invokeMethod(path("Asked"), "start", in);
-        EXPECT_TRUE(reply.code == CMPI_RC_OK || reply.code == CMPI_RC_ERR_INVALID_PARAMETER);
-        return reply.message;
+    const std::string refused = "CMPI_RC_ERR_INVALID_PARAMETER ";
+    const struct {
+        const char* name;
+        CMPIType type;
+        std::string answer;
+    } rows[] = {
+        {"IN", CMPI_chars, "CMPI_RC_OK "},
+        {"Number", CMPI_null, "CMPI_RC_OK "},
+        {"Number", CMPI_chars, refused + "argument Number of method Start is no uint8[]"},
+        {"Out", CMPI_chars, refused + "method Start takes no argument Out"},
+        {"Else", CMPI_chars, refused + "method Start takes no argument Else"},
     };
-    EXPECT_EQ(messageOf("IN", "text", CMPI_chars), "");
-    EXPECT_EQ(messageOf("Number", nullptr, CMPI_null), "");
-    EXPECT_EQ(messageOf("Number", "text", CMPI_chars), "argument Number of method Start is no uint8[]");
-    EXPECT_EQ(messageOf("Out", "text", CMPI_chars), "method Start takes no argument Out");
-    EXPECT_EQ(messageOf("Else", "text", CMPI_chars), "method Start takes no argument Else");
+    for (const auto& row : rows) {
+        CMPIArgs* const in = CMNewArgs(broker_.handle(), nullptr);
+        CMAddArg(in, row.name, row.type == CMPI_null ? nullptr : "text", row.type);
+        EXPECT_EQ(failureOf(request_.invokeMethod(path("Asked"), "start", in)), row.answer);
+    }
 }
 
-TEST_F(ARequest, ReportsWhatTheProviderReports) {
+TEST_F(RequestTest, ReportsErrorsAndExceptionsOfTheProvider) {
     serve = [](const CMPIContext*, const CMPIResult* result, const CMPIObjectPath*) {
         const CMPIError* const error = broker->eft->newCMPIError(
             broker, "o", "i", "told", ErrorSevLow, ErrorProbCauseOther, CMPI_RC_ERR_NOT_FOUND, nullptr);
         return result->ft->returnError(result, error);
     };
-    const Reply reply = request_.getInstance(path("Demo"));
-    EXPECT_EQ(reply.code, CMPI_RC_ERR_NOT_FOUND);
-    EXPECT_EQ(reply.message, "told");
+    EXPECT_EQ(failureOf(request_.getInstance(path("Demo"))), "CMPI_RC_ERR_NOT_FOUND told");
     serve = [](auto&&...) -> CMPIStatus { throw std::runtime_error("lost"); };
     EXPECT_EQ(request_.getInstance(path("Demo")).message, "exception: lost");
 }
 
-TEST_F(ARequest, ComesThroughWantOfMemory) {
+TEST_F(RequestTest, SurvivesOutOfMemory) {
     serve = [](auto&&...) {
         CMPIString* const why = CMNewString(broker, "a text that does not fit into a string itself", nullptr);
         return CMPIStatus{CMPI_RC_ERR_ACCESS_DENIED, why};
     };
-    for (const bool once : {true, false}) {
+    for (const auto fail : {failing::allocation, failing::allocationsFrom}) {
         bool isReached = true;
         for (unsigned int n = 1; isReached; ++n) {
-            SCOPED_TRACE((once ? "allocation " : "allocations from ") + std::to_string(n));
+            SCOPED_TRACE((fail == failing::allocation ? "allocation " : "allocations from ") +
+                         std::to_string(n));
             EmbeddedBroker own;
             own.setContextEntry("an entry with a long name", "and with a text that is no shorter");
-            once ? failing::allocation(n) : failing::allocationsFrom(n);
+            fail(n);
             std::string message;
             try {
                 own.load(TEST_PROVIDER, "TestProvider");
@@ -267,21 +231,20 @@ TEST_F(ARequest, ComesThroughWantOfMemory) {
                 own.unload("TestProvider");
             } catch (const std::bad_alloc&) {
                 message = "no room";
-            } catch (const BrokerError&) {
+            } catch (const oxahv::BrokerError&) {
                 message = "no status"; // of a factory
             }
             isReached = failing::ended();
             EXPECT_NE(message.rfind("exception", 0), 0U) << "not the provider's: " << message;
         }
-        EXPECT_EQ(::dlopen(TEST_PROVIDER, RTLD_NOW | RTLD_NOLOAD), nullptr) << "no library stays behind";
+        EXPECT_EQ(::dlopen(TEST_PROVIDER, RTLD_NOW | RTLD_NOLOAD), nullptr) << "the library stays loaded";
     }
 }
 
-TEST_F(ARequest, FindsItsProviderByClass) {
+TEST_F(RequestTest, FindsTheProviderOfTheClass) {
     EmbeddedBroker own;
-    for (const char* const name : {"Base", "Other"}) {
-        own.declare(ClassDeclaration(name));
-    }
+    own.declare(ClassDeclaration("Base"));
+    own.declare(ClassDeclaration("Other"));
     own.declare(ClassDeclaration("Derived").superclass("Base"));
     own.load(TEST_PROVIDER, "TestProvider", {"Base"});
     Request request(own);
@@ -293,33 +256,33 @@ TEST_F(ARequest, FindsItsProviderByClass) {
     EXPECT_EQ(request.enumerateInstanceNames(nullptr).code, CMPI_RC_ERR_INVALID_HANDLE);
 }
 
-// Of an upcall for a class that nobody serves.
-TEST_F(ARequest, IsAnsweredAsByAServerWhereNobodyServesTheClass) {
+TEST_F(RequestTest, FromAProviderForAnUnservedClassIsAnsweredAsByAServer) {
     EmbeddedBroker own;
     own.declare(ClassDeclaration("Demo").key("K", CMPI_string).method("Start", CMPI_uint32));
     own.declare(ClassDeclaration("Served"));
     std::string unserved;
     own.setUnservedHandler([&](const std::string& className) { unserved += className + ' '; });
-    own.host("Tested", {createInstanceMI}, {"Served"});
+    own.host("Tested", {create<served>}, {"Served"});
     serve = [](const CMPIContext* context, const CMPIResult*, const CMPIObjectPath*) {
+        const CMPIBroker* const b = broker;
         CMPIStatus status = {CMPI_RC_OK, nullptr};
-        CMPIObjectPath* const demo = CMNewObjectPath(broker, "root", "Demo", nullptr);
+        CMPIObjectPath* const demo = CMNewObjectPath(b, "root", "Demo", nullptr);
         const CMPIEnumeration* const lists[] = {
-            broker->bft->enumerateInstanceNames(broker, context, demo, &status),
-            broker->bft->enumerateInstances(broker, context, demo, nullptr, &status),
-            broker->bft->associatorNames(broker, context, demo, nullptr, nullptr, nullptr, nullptr, &status),
-            broker->bft->references(broker, context, demo, nullptr, nullptr, nullptr, &status)};
+            b->bft->enumerateInstanceNames(b, context, demo, &status),
+            b->bft->enumerateInstances(b, context, demo, nullptr, &status),
+            b->bft->associatorNames(b, context, demo, nullptr, nullptr, nullptr, nullptr, &status),
+            b->bft->references(b, context, demo, nullptr, nullptr, nullptr, &status)};
         for (const CMPIEnumeration* const list : lists) {
             EXPECT_TRUE(list != nullptr && CMHasNext(list, nullptr) == 0);
         }
         EXPECT_EQ(status.rc, CMPI_RC_OK);
-        broker->bft->getInstance(broker, context, demo, nullptr, &status);
+        b->bft->getInstance(b, context, demo, nullptr, &status);
         EXPECT_EQ(status.rc, CMPI_RC_ERR_NOT_FOUND);
-        broker->bft->invokeMethod(broker, context, demo, "Start", nullptr, nullptr, &status);
+        b->bft->invokeMethod(b, context, demo, "Start", nullptr, nullptr, &status);
         EXPECT_EQ(status.rc, CMPI_RC_ERR_METHOD_NOT_AVAILABLE);
-        EXPECT_EQ(broker->bft->deleteInstance(broker, context, demo).rc, CMPI_RC_ERR_NOT_SUPPORTED);
+        EXPECT_EQ(b->bft->deleteInstance(b, context, demo).rc, CMPI_RC_ERR_NOT_SUPPORTED);
         demo->ft->setClassName(demo, "None");
-        EXPECT_EQ(broker->bft->enumerateInstances(broker, context, demo, nullptr, &status), nullptr);
+        EXPECT_EQ(b->bft->enumerateInstances(b, context, demo, nullptr, &status), nullptr);
         EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_CLASS);
         CMReturn(CMPI_RC_OK);
     };
@@ -328,8 +291,7 @@ TEST_F(ARequest, IsAnsweredAsByAServerWhereNobodyServesTheClass) {
     EXPECT_EQ(unserved, "Demo Demo Demo Demo Demo Demo Demo None ");
 }
 
-// Without a list of classes: whoever does not refuse the class, and not who calls up.
-TEST_F(ARequest, FindsItsProviderAmongThoseThatServeAll) {
+TEST_F(RequestTest, SkipsProvidersThatRefuseTheClassOrSentTheRequest) {
     unsigned int calls = 0;
     serve = [&](const CMPIContext* context, const CMPIResult* result, const CMPIObjectPath* p) -> CMPIStatus {
         const std::string name = CMGetCharsPtr(CMGetClassName(p, nullptr), nullptr);
@@ -349,67 +311,67 @@ TEST_F(ARequest, FindsItsProviderAmongThoseThatServeAll) {
         return request_.enumerateInstanceNames(request_.objectPath("root", name)).code;
     };
     EXPECT_EQ(ask("Refused"), CMPI_RC_ERR_INVALID_CLASS);
-    EXPECT_EQ(ask("Own"), CMPI_RC_ERR_INVALID_HANDLE) << "the upcall found nobody but its caller";
-    EXPECT_EQ(calls, 1U) << "and did not run for ever";
+    EXPECT_EQ(ask("Own"), CMPI_RC_ERR_INVALID_HANDLE) << "nobody else serves the class";
+    EXPECT_EQ(calls, 1U) << "the provider called itself";
     broker_.load(TEST_PROVIDER, "TestProvider");
     EXPECT_EQ(ask("Refused"), CMPI_RC_OK);
     EXPECT_EQ(ask("Another"), CMPI_RC_OK);
     EXPECT_EQ(calls, 1U);
 }
 
-TEST_F(ARequest, TellsHowFarItHasCome) {
+TEST_F(RequestTest, ReportsItsProgress) {
     std::vector<std::size_t> counts;
     request_.setProgressHandler([&](std::size_t results) { counts.push_back(results); });
     serve = [&](const CMPIContext* context, const CMPIResult* result, const CMPIObjectPath* p) {
-        if (counts.empty()) { // an upcall, whose results are not the client's
+        if (counts.empty()) { // the results of the provider's own requests do not count
             CMReturnObjectPath(result, p);
             broker->bft->enumerateInstanceNames(broker, context, p, nullptr);
             CMPIStatus status = {CMPI_RC_OK, nullptr};
             broker->bft->getInstance(broker, context, p, nullptr, &status);
-            EXPECT_EQ(status.rc, CMPI_RC_ERR_NOT_FOUND) << "it returned none";
+            EXPECT_EQ(status.rc, CMPI_RC_ERR_NOT_FOUND) << "no instance was returned";
         }
         return echo(context, result, p);
     };
     request_.enumerateInstanceNames(path("Demo"));
     request_.enumerateInstanceNames(path("Demo"));
-    EXPECT_EQ(counts, std::vector<std::size_t>({1, 2, 1})) << "each operation counts for itself";
+    EXPECT_EQ(counts, std::vector<std::size_t>({1, 2, 1})) << "each operation counts from 1";
 }
 
-TEST_F(ARequest, ReadsValuesAndPathsAndSaysWhatIsWrongWithThem) {
+TEST_F(RequestTest, ReadsValuesAndPathsFromText) {
     const ThreadLocale german("de_DE.ISO-8859-1"); // which writes 0,1
     broker_.declare(ClassDeclaration("Known").key("U", CMPI_uint8).property("X", CMPI_uint8));
     const struct {
-        const char* text;
         CMPIType type;
+        const char* text;
         const char* answer;
     } rows[] = {
-        {"-12", CMPI_null, "sint64 -12"},
-        {"-0", CMPI_uint8, "uint8 0"},
-        {"-", CMPI_null, "string \"-\""},
-        {"", CMPI_null, "string \"\""},
-        {"65", CMPI_char16, "char16 65"},
-        {"0.1", CMPI_real64, "real64 0.1"},
-        {"1e300", CMPI_real64, "real64 1.0e+300"},
-        {"-3", CMPI_real32, "real32 -3.0"},
-        {"nan", CMPI_real64, "value, column 1: expected a real64"},
-        {"1e39", CMPI_real32, "value, column 1: expected a real32"},
-        {"1.5x", CMPI_real32, "value, column 4: expected nothing behind the value"},
-        {"now", CMPI_dateTime, "value, column 1: expected a datetime"},
-        {"1", CMPI_boolean, "value, column 1: expected a boolean"},
-        {"", CMPI_ref, "object path, column 1: expected a class name"},
-        {"Demo.", CMPI_ref, "object path, column 6: expected a key name"},
-        {"Demo.K", CMPI_ref, "object path, column 7: expected '='"},
-        {"Demo.K=", CMPI_ref, "object path, column 8: expected a value"},
-        {"Demo.K=\"\\x\"", CMPI_ref, "object path, column 10: expected \", \\, n, r or t after a backslash"},
-        {"Demo.K=1,k=2", CMPI_ref, "object path, column 10: key k stands twice"},
-        {"Demo.K=1x", CMPI_ref, "object path, column 8: expected a number"},
-        {"Demo.K=maybe", CMPI_ref,
+        {CMPI_null, "-12", "sint64 -12"},
+        {CMPI_uint8, "-0", "uint8 0"},
+        {CMPI_null, "-", "string \"-\""},
+        {CMPI_null, "", "string \"\""},
+        {CMPI_char16, "65", "char16 65"},
+        {CMPI_real64, "0.1", "real64 0.1"},
+        {CMPI_real64, "1e300", "real64 1.0e+300"},
+        {CMPI_real32, "-3", "real32 -3.0"},
+        {CMPI_real64, "nan", "value, column 1: expected a real64"},
+        {CMPI_real32, "1e39", "value, column 1: expected a real32"},
+        {CMPI_real32, "1.5x", "value, column 4: expected nothing behind the value"},
+        {CMPI_dateTime, "now", "value, column 1: expected a datetime"},
+        {CMPI_boolean, "1", "value, column 1: expected a boolean"},
+        {CMPI_ref, "", "object path, column 1: expected a class name"},
+        {CMPI_ref, "Demo.", "object path, column 6: expected a key name"},
+        {CMPI_ref, "Demo.K", "object path, column 7: expected '='"},
+        {CMPI_ref, "Demo.K=", "object path, column 8: expected a value"},
+        {CMPI_ref, "Demo.K=\"\\x\"", "object path, column 10: expected \", \\, n, r or t after a backslash"},
+        {CMPI_ref, "Demo.K=1,k=2", "object path, column 10: key k stands twice"},
+        {CMPI_ref, "Demo.K=1x", "object path, column 8: expected a number"},
+        {CMPI_ref, "Demo.K=maybe",
          "object path, column 8: expected a value: a number, a text in quotes, TRUE or FALSE"},
-        {"Demo.K=18446744073709551616", CMPI_ref,
+        {CMPI_ref, "Demo.K=18446744073709551616",
          "object path, column 8: 18446744073709551616 does not fit into uint64"},
-        {"Demo K", CMPI_ref, "object path, column 5: expected '.'"},
-        {"Known.U=\"1\"", CMPI_ref, "object path, column 9: expected a uint8"},
-        {"Known.X=1", CMPI_ref, "object path, column 7: class Known has no key X"},
+        {CMPI_ref, "Demo K", "object path, column 5: expected '.'"},
+        {CMPI_ref, "Known.U=\"1\"", "object path, column 9: expected a uint8"},
+        {CMPI_ref, "Known.X=1", "object path, column 7: class Known has no key X"},
     };
     for (const auto& row : rows) {
         std::string value;
@@ -426,7 +388,7 @@ TEST_F(ARequest, ReadsValuesAndPathsAndSaysWhatIsWrongWithThem) {
     }
 }
 
-TEST_F(ARequest, DeliversKeysAsTheModeSays) {
+TEST_F(RequestTest, DeliversKeysInEachMode) {
     CMPIObjectPath* const tooWide = path("Demo.U=256,S=-32769");
     broker_.declare(ClassDeclaration("Demo")
                         .key("U", CMPI_uint8)
@@ -460,23 +422,22 @@ TEST_F(ARequest, DeliversKeysAsTheModeSays) {
         types.push_back(CMGetKeyAt(key.value.ref, 0, nullptr, nullptr).type);
         EXPECT_EQ(types, expected);
         instance = CMNewInstance(broker_.handle(), delivered, nullptr);
-        const CMPIData number = CMGetProperty(instance, "S", nullptr);
-        EXPECT_EQ(oxahv::typeName(number.type) + oxahv::valueText(number), "sint16-5") << "as it is declared";
+        EXPECT_EQ(textOf(instance, "S"), "-5");
+        EXPECT_EQ(CMGetProperty(instance, "S", nullptr).type, CMPI_sint16) << "as it is declared";
         EXPECT_EQ(CMGetProperty(instance, "T", nullptr).type, CMPI_string);
         EXPECT_EQ(oxahv::pathText(CMGetObjectPath(instance, nullptr)).rfind("root:Demo.U=200,S=-5,", 0), 0U);
     }
 }
 
-TEST_F(ARequest, KeepsTheBitsOfAKeyThatSignedIntegersDoNotHold) {
+TEST_F(RequestTest, DeliversLargeKeysAsSignedIntegersWithTheSameBits) {
     broker_.declare(ClassDeclaration("Demo").key("U", CMPI_uint64));
     broker_.setKeyMode(KeyMode::signedIntegers);
     const CMPIObjectPath* const delivered = request_.deliver(path("Demo.U=18446744073709551615"));
     EXPECT_EQ(CMGetKey(delivered, "U", nullptr).value.sint64, -1);
-    const CMPIInstance* const instance = CMNewInstance(broker_.handle(), delivered, nullptr);
-    EXPECT_EQ(oxahv::valueText(CMGetProperty(instance, "U", nullptr)), "18446744073709551615");
+    EXPECT_EQ(textOf(CMNewInstance(broker_.handle(), delivered, nullptr), "U"), "18446744073709551615");
 }
 
-TEST_F(ARequest, DeliversPathsAsServersAndClientsChangeThem) {
+TEST_F(RequestTest, DeliversPathsWithOtherOrderCaseAndHost) {
     broker_.declare(ClassDeclaration("Demo").key("Aa", CMPI_uint8).key("R", CMPI_ref));
     broker_.setPathDelivery({true, true, "a.example"});
     const CMPIObjectPath* const delivered = request_.deliver(path("root:Demo.Aa=1,R=\"x:Other.b_1=2,C=3\""));
@@ -487,16 +448,16 @@ TEST_F(ARequest, DeliversPathsAsServersAndClientsChangeThem) {
     }
 }
 
-TEST_F(ARequest, LeavesTheKeysOfABareInstanceToItsProvider) {
+TEST_F(RequestTest, LeavesKeysOfBareInstancesToTheProvider) {
     broker_.declare(ClassDeclaration("Demo").key("U", CMPI_uint8));
     broker_.setNewInstances(oxahv::NewInstances::bare);
     CMPIInstance* const instance = CMNewInstance(broker_.handle(), path("Demo.U=1"), nullptr);
     instance->ft->setObjectPath(instance, path("root:Demo.U=2"));
-    EXPECT_EQ(oxahv::valueText(CMGetProperty(instance, "U", nullptr)), "NULL");
+    EXPECT_EQ(textOf(instance, "U"), "NULL");
     EXPECT_EQ(oxahv::pathText(CMGetObjectPath(instance, nullptr)), "root:Demo.U=2");
 }
 
-TEST_F(ARequest, MeetsTheFaultsThatAreInjectedAndIsRecorded) {
+TEST_F(RequestTest, MeetsInjectedFaultsAndIsRecorded) {
     CMPIObjectPath* const demo = path("Demo.A=1,B=2");
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     broker_.injectFault("getKeyAt", {CMPI_RC_ERR_ACCESS_DENIED, false, 0, 2, 2});
@@ -544,12 +505,12 @@ TEST_F(ARequest, MeetsTheFaultsThatAreInjectedAndIsRecorded) {
               "slot setProperty is one of several: CMPIBrokerFT.setProperty, CMPIInstanceFT.setProperty");
 }
 
-TEST_F(ARequest, CanBeLeftToAThreadThatIsAttached) {
+TEST_F(RequestTest, CanBeAnsweredByAnAttachedThread) {
     serve = [this](const CMPIContext* context, const CMPIResult* result, const CMPIObjectPath* p) {
         CMPIContext* const prepared = broker->bft->prepareAttachThread(broker, context);
         std::thread([&] {
             EXPECT_EQ(broker->bft->attachThread(broker, prepared).rc, CMPI_RC_OK);
-            EXPECT_FALSE(CMIsNullValue(CMGetContextEntry(prepared, CMPIInitNameSpace, nullptr)));
+            EXPECT_EQ(textOf(prepared, CMPIInitNameSpace), "\"root\"");
             const std::size_t before = broker_.liveObjects().strings;
             CMNewString(broker, "text", nullptr);
             EXPECT_EQ(broker_.liveObjects().strings, before + 1);
@@ -564,8 +525,9 @@ TEST_F(ARequest, CanBeLeftToAThreadThatIsAttached) {
     EXPECT_EQ(oxahv::pathText(CMGetObjectPath(reply.instances.at(0), nullptr)), "root:Demo.K=1");
 }
 
-// What ends a thread's own values may call the broker still; a sanitizer sees what it must not touch.
-TEST_F(ARequest, MayBeLeftByAThreadThatStaysAttached) {
+// The destructors of a thread's own values may still call the broker; a sanitizer sees what they must not
+// touch.
+TEST_F(RequestTest, SurvivesAThreadThatEndsAttached) {
     serve = [](const CMPIContext* context, const CMPIResult* /*result*/, const CMPIObjectPath* /*path*/) {
         CMPIContext* const prepared = broker->bft->prepareAttachThread(broker, context);
         CMPI_THREAD_KEY_TYPE key = 0;
@@ -581,8 +543,8 @@ TEST_F(ARequest, MayBeLeftByAThreadThatStaysAttached) {
     EXPECT_TRUE(request_.getInstance(path("Demo.K=1")).ok());
 }
 
-// A sanitizer sees the thread's end touch the objects of the broker that is gone.
-TEST(AnAttachedThread, OutlivesItsBroker) {
+// A sanitizer sees whether the thread's end touches objects of the destroyed broker.
+TEST(AttachedThreadTest, CanOutliveTheBroker) {
     auto shortLived = std::make_unique<EmbeddedBroker>();
     const CMPIBroker* const handle = shortLived->handle();
     std::promise<void> attached;
@@ -603,14 +565,13 @@ TEST(AnAttachedThread, OutlivesItsBroker) {
     thread.join();
 }
 
-TEST_F(ARequest, EndsWithTheThreadThatItsProviderEnds) {
+TEST_F(RequestTest, EndsWhenTheProviderExitsItsThread) {
     serve = [](auto&&...) -> CMPIStatus {
         broker->xft->exitThread(&serve);
         return {CMPI_RC_OK, nullptr};
     };
     const auto send = [](void* parameter) -> void* {
-        auto* const own = static_cast<EmbeddedBroker*>(parameter);
-        Request request(*own);
+        Request request(*static_cast<EmbeddedBroker*>(parameter));
         request.getInstance(request.objectPath("root", "Demo"));
         return nullptr;
     };
@@ -621,11 +582,11 @@ TEST_F(ARequest, EndsWithTheThreadThatItsProviderEnds) {
     EXPECT_EQ(broker_.liveObjects().total(), before);
 }
 
-TEST_F(ARequest, KeepsItsProviderWhileItIsInside) {
+TEST_F(RequestTest, DelaysTheUnloadOfItsProvider) {
     std::promise<void> entered;
     std::promise<void> mayLeave;
     std::atomic<bool> hasEnded{false};
-    atEnd = [&](auto&&...) { hasEnded = true; };
+    atEnd = [&](auto*) { hasEnded = true; };
     serve = [&](auto&&...) {
         entered.set_value();
         mayLeave.get_future().wait();
@@ -647,7 +608,7 @@ TEST_F(ARequest, KeepsItsProviderWhileItIsInside) {
     mayLeave.set_value();
 }
 
-TEST_F(ARequest, RunsWhileTheBrokerIsSetUp) {
+TEST_F(RequestTest, MayRunWhileTheBrokerIsSetUp) {
     serve = [](const CMPIContext* context, const CMPIResult* result, const CMPIObjectPath* p) {
         CMAddContextEntry(context, "Entry", "text", CMPI_chars);
         return CMReturnInstance(result, CMNewInstance(broker, p, nullptr));
@@ -680,7 +641,7 @@ TEST_F(ARequest, RunsWhileTheBrokerIsSetUp) {
     isOver = true;
 }
 
-TEST(Hosting, LoadsAndUnloadsLibraries) {
+TEST(HostingTest, LoadsAndUnloadsLibraries) {
     EmbeddedBroker own;
     const std::pair<const char*, const char*> rows[] = {
         {"TestProvider", "no error"},
@@ -697,7 +658,7 @@ TEST(Hosting, LoadsAndUnloadsLibraries) {
     EXPECT_EQ(errorOf([&] { own.host("Empty", {}); }), "provider Empty has no factory");
 }
 
-TEST(Hosting, ServesAProviderThatIsWrittenInC) {
+TEST(HostingTest, ServesAProviderWrittenInC) {
     EmbeddedBroker own;
     own.load(C_PROVIDER, "CProvider");
     Request request(own);
@@ -706,35 +667,32 @@ TEST(Hosting, ServesAProviderThatIsWrittenInC) {
     const Reply all = request.enumerateInstances(path, &properties);
     ASSERT_EQ(all.instances.size(), 1U) << oxahv::codeName(all.code);
     EXPECT_EQ(oxahv::pathText(CMGetObjectPath(all.instances[0], nullptr)), oxahv::pathText(path));
-    const auto property = [&](const char* name) {
-        return oxahv::valueText(CMGetProperty(all.instances[0], name, nullptr));
-    };
-    EXPECT_EQ(property("Array") + property("Date"), "{7}\"20240229120000.000000+000\"");
-    EXPECT_EQ(property("Text"), "NULL") << "not asked for";
+    const CMPIInstance* const instance = all.instances[0];
+    EXPECT_EQ(textOf(instance, "Array") + textOf(instance, "Date"), "{7}\"20240229120000.000000+000\"");
+    EXPECT_EQ(textOf(instance, "Text"), "NULL") << "the request does not ask for it";
     CMPIArgs* const in = CMNewArgs(own.handle(), nullptr);
     CMAddArg(in, "In", "value", CMPI_chars);
     const Reply method = request.invokeMethod(path, "Name", in);
-    EXPECT_EQ(oxahv::valueText(method.data.at(0)), "\"root\"");
-    EXPECT_EQ(oxahv::valueText(CMGetArg(method.out, "In", nullptr)), "\"value\"");
-    EXPECT_EQ(oxahv::valueText(CMGetArg(method.out, "Method", nullptr)), "\"Name\"");
+    EXPECT_EQ(oxahv::valueText(method.data.at(0)) + textOf(method.out, "In") + textOf(method.out, "Method"),
+              R"("root""value""Name")");
 }
 
-TEST(Hosting, LetsAProviderSendRequestsWhileItEnds) {
+TEST(HostingTest, LetsAProviderSendRequestsWhileItEnds) {
     std::vector<CMPIrc> answers;
     atEnd = [&](const CMPIContext* context) {
         CMPIStatus status = {CMPI_RC_OK, nullptr};
         const CMPIObjectPath* const path = CMNewObjectPath(broker, "root", "Other", nullptr);
         broker->bft->enumerateInstanceNames(broker, context, path, &status);
         answers.push_back(status.rc);
-        EXPECT_FALSE(CMIsNullValue(CMGetContextEntry(context, "StateFile", nullptr)));
+        EXPECT_EQ(textOf(context, "StateFile"), "\"/a/file\"");
     };
     {
         EmbeddedBroker own;
         own.setContextEntry("StateFile", "/a/file");
-        own.host("Ending", {createInstanceMI}, {"Ending"});
+        own.host("Ending", {create<served>}, {"Ending"});
         own.load(TEST_PROVIDER, "TestProvider", {"Other"});
         own.unload("Ending");
-        own.host("Ending", {createInstanceMI}, {"Ending"});
+        own.host("Ending", {create<served>}, {"Ending"});
         own.unload("TestProvider");
         own.load(TEST_PROVIDER, "TestProvider", {"Other"});
     }
@@ -742,11 +700,10 @@ TEST(Hosting, LetsAProviderSendRequestsWhileItEnds) {
     EXPECT_EQ(answers, std::vector<CMPIrc>(2, CMPI_RC_OK));
 }
 
-// A factory ends the thread that hosts the provider.
-TEST(Hosting, EndsWithTheThreadThatAFactoryEnds) {
+TEST(HostingTest, EndsWhenAFactoryExitsItsThread) {
     EmbeddedBroker own;
     const auto host = [](void* parameter) -> void* {
-        oxahv::ProviderFactories factories{createInstanceMI};
+        oxahv::ProviderFactories factories{create<served>};
         factories.method = [](const CMPIBroker* b, const CMPIContext*, CMPIStatus*) -> CMPIMethodMI* {
             b->xft->exitThread(&serve);
             return nullptr;
@@ -762,11 +719,11 @@ TEST(Hosting, EndsWithTheThreadThatAFactoryEnds) {
     EXPECT_EQ(returned, &serve);
     EXPECT_TRUE(hasEnded) << "the instance MI was there already";
     EXPECT_EQ(own.liveObjects().total(), 0U);
-    own.host("Ending", {createInstanceMI}); // the name is free
+    own.host("Ending", {create<served>}); // the name is free
 }
 
-// A cleanup may end no thread but the one that the broker gives it.
-TEST(Hosting, SurvivesACleanupThatEndsItsThread) {
+// The broker runs a cleanup on a thread of its own, which the cleanup may end.
+TEST(HostingTest, SurvivesACleanupThatExitsItsThread) {
     int ended = 0;
     atEnd = [&](auto&&...) {
         ++ended;
@@ -775,16 +732,16 @@ TEST(Hosting, SurvivesACleanupThatEndsItsThread) {
     };
     {
         EmbeddedBroker own;
-        own.host("Ending", {createInstanceMI});
+        own.host("Ending", {create<served>});
         own.unload("Ending");
         EXPECT_EQ(own.liveObjects().total(), 0U);
-        own.host("Ending", {createInstanceMI});
+        own.host("Ending", {create<served>});
     }
     atEnd = nullptr;
     EXPECT_EQ(ended, 2);
 }
 
-TEST(ACode, IsFoundByItsNameOrNumber) {
+TEST(CodeTest, IsFoundByNameOrNumber) {
     for (const char* const name : {"err_not_found", "CMPI_RC_ERR_NOT_FOUND", "6"}) {
         EXPECT_EQ(oxahv::codeName(oxahv::codeFromName(name)), "CMPI_RC_ERR_NOT_FOUND") << name;
     }
