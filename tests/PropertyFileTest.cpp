@@ -296,7 +296,7 @@ TEST_F(PropertyFileTest, SaveSurvivesPowerFailures) {
 
 TEST_F(PropertyFileTest, SaveRemovesFilesOfKilledSaves) {
     write("");
-    write("", ".file.backup"); // somebody's own
+    write(".file.backup", ""); // somebody's own
     const pid_t child = ::fork();
     if (child == 0) {
         beforeSync = [] { ::raise(SIGKILL); };

@@ -15,12 +15,13 @@ public:
     ScratchFolder(const ScratchFolder&) = delete;
     ScratchFolder& operator=(const ScratchFolder&) = delete;
 
-    std::string path(const std::string& name = "file") const { return folder_ / name; }
+    std::string path(const std::string& name = "file") const { return folder_.string() + '/' + name; }
 
-    void write(const std::string& content, const std::string& name = "file") const {
+    void write(const std::string& name, const std::string& content) const {
         std::filesystem::create_directories(std::filesystem::path(path(name)).parent_path());
         std::ofstream(path(name), std::ios::binary) << content;
     }
+    void write(const std::string& content) const { write("file", content); }
 
     std::string content(const std::string& name = "file") const {
         std::ifstream stream(path(name), std::ios::binary);
