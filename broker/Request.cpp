@@ -140,6 +140,18 @@ Reply Request::referenceNames(const CMPIObjectPath* path, const AssociationFilte
                                                               filter.role.c_str());
 }
 
+Reply Request::getProperty(const CMPIObjectPath* path, const std::string& name) {
+    return impl_->core.hosting.getProperty(impl_->contextFor(path), path, name.c_str());
+}
+
+Reply Request::setProperty(const CMPIObjectPath* path, const std::string& name, const CMPIData& value) {
+    // A slot takes the text of CMPI_chars itself in place of a value.
+    const CMPIValue* const given =
+        value.type == CMPI_chars ? reinterpret_cast<const CMPIValue*>(value.value.chars) : &value.value;
+    return impl_->core.hosting.setProperty(impl_->contextFor(path), path, name.c_str(),
+                                           CMIsNullValue(value) ? nullptr : given, value.type);
+}
+
 Reply Request::invokeMethod(const CMPIObjectPath* path, const std::string& method, const CMPIArgs* in) {
     return impl_->core.hosting.invokeMethod(impl_->contextFor(path), path, method.c_str(), in);
 }

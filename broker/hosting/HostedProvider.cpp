@@ -33,6 +33,16 @@ struct FactoryOf<CMPIMethodMI> {
     static constexpr auto member = &ProviderFactories::method;
     static constexpr const char* symbol = "_Create_MethodMI";
 };
+template <>
+struct FactoryOf<CMPIPropertyMI> {
+    static constexpr auto member = &ProviderFactories::property;
+    static constexpr const char* symbol = "_Create_PropertyMI";
+};
+template <>
+struct FactoryOf<CMPIIndicationMI> {
+    static constexpr auto member = &ProviderFactories::indication;
+    static constexpr const char* symbol = "_Create_IndicationMI";
+};
 
 // A status as words for a person.
 std::string wordsOf(const CMPIStatus& status) {

@@ -52,7 +52,7 @@ private:
     std::string name_;
     std::vector<std::string> classes_;
     void* library_ = nullptr;
-    std::tuple<CMPIInstanceMI*, CMPIAssociationMI*, CMPIMethodMI*> mis_{};
+    std::tuple<CMPIInstanceMI*, CMPIAssociationMI*, CMPIMethodMI*, CMPIPropertyMI*, CMPIIndicationMI*> mis_{};
     std::promise<void> gone_;
 };
 

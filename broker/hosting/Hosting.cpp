@@ -8,6 +8,13 @@
 
 namespace oxahv {
 
+Reply Hosting::refused(CMPIrc code, std::string message) {
+    Reply reply;
+    reply.code = code;
+    reply.message = std::move(message);
+    return reply;
+}
+
 namespace {
 
 // Runs a provider's function. What it throws becomes a status: a provider must not take its server along.
@@ -42,15 +49,8 @@ void ask(const HostedProvider& provider, const Operation& operation, const CMPIC
     }
 }
 
-Reply refused(CMPIrc code, std::string message = {}) {
-    Reply reply;
-    reply.code = code;
-    reply.message = std::move(message);
-    return reply;
-}
-
 Reply unserved(CMPIrc code, std::string message) {
-    Reply reply = refused(code, std::move(message));
+    Reply reply = Hosting::refused(code, std::move(message));
     reply.isServed = false;
     return reply;
 }
@@ -102,21 +102,6 @@ private:
     const Ongoing* outer_;
 };
 thread_local const Ongoing* Ongoing::innermost = nullptr;
-
-// Why a declared method does not take its arguments; empty when it does.
-std::string complaintAbout(const MethodDeclaration& method, const Arguments& in) {
-    for (const NamedValue& argument : in.values) {
-        const ParameterDeclaration* const parameter = method.find(argument.name);
-        if (parameter == nullptr || !parameter->isIn) {
-            return "method " + method.name + " takes no argument " + argument.name;
-        }
-        if (!argument.value.isNull() && argument.value.type() != storedType(parameter->type)) {
-            return "argument " + argument.name + " of method " + method.name + " is no " +
-                   declaredTypeName(parameter->type);
-        }
-    }
-    return {};
-}
 
 } // namespace
 
@@ -235,29 +220,6 @@ Reply Hosting::serve(const CMPIContext* context, const CMPIObjectPath* handle, c
         }
         isAsked = true;
     }
-    return reply;
-}
-
-Reply Hosting::invokeMethod(const CMPIContext* context, const CMPIObjectPath* path, const char* method,
-                            const CMPIArgs* in) {
-    if (in != nullptr && Arguments::of(in) == nullptr) {
-        return refused(CMPI_RC_ERR_INVALID_HANDLE);
-    }
-    const CMPIArgs* const given = in != nullptr ? in : handOut(std::make_unique<Arguments>(core_));
-    CMPIArgs* const out = handOut(std::make_unique<Arguments>(core_));
-    const ObjectPath* const target = ObjectPath::of(path);
-    const auto declared = target != nullptr ? core_.classes.find(target->className) : nullptr;
-    const MethodDeclaration* const wanted = declared != nullptr ? declared->findMethod(method) : nullptr;
-    const std::string complaint = wanted != nullptr ? complaintAbout(*wanted, *Arguments::of(given)) : "";
-    Reply reply;
-    if (declared != nullptr && wanted == nullptr) {
-        reply = refused(CMPI_RC_ERR_METHOD_NOT_FOUND, "class " + declared->name + " has no method " + method);
-    } else if (!complaint.empty()) {
-        reply = refused(CMPI_RC_ERR_INVALID_PARAMETER, complaint);
-    } else {
-        reply = serve<&CMPIMethodMIFT::invokeMethod>(context, path, method, given, out);
-    }
-    reply.out = out;
     return reply;
 }
 

@@ -30,11 +30,21 @@ public:
     // The same for a method, whose arguments are checked against its declaration.
     Reply invokeMethod(const CMPIContext* context, const CMPIObjectPath* path, const char* method,
                        const CMPIArgs* in);
+    // A single property, checked likewise: by a property MI where there is one that does it, else by the
+    // instance that has it.
+    Reply getProperty(const CMPIContext* context, const CMPIObjectPath* path, const char* name);
+    Reply setProperty(const CMPIContext* context, const CMPIObjectPath* path, const char* name,
+                      const CMPIValue* value, CMPIType type);
+
+    // The answer to a request that no provider gets.
+    static Reply refused(CMPIrc code, std::string message = {});
 
 private:
     using Providers = std::vector<std::shared_ptr<HostedProvider>>;
 
     Reply serve(const CMPIContext* context, const CMPIObjectPath* handle, const Operation& operation);
+    Reply modifyProperty(const CMPIContext* context, const CMPIObjectPath* path, const char* name,
+                         const CMPIData& data);
     // Whom to ask, in order: one that names the class, or all that may serve it.
     Providers find(const ObjectPath& path, const Operation& operation) const;
     void add(std::shared_ptr<HostedProvider> provider);

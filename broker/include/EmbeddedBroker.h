@@ -65,6 +65,10 @@ struct ProviderFactories {
     CMPIAssociationMI* (*association)(const CMPIBroker*, const CMPIContext*, CMPIStatus*) = nullptr;
     /** `NAME_Create_MethodMI`. */
     CMPIMethodMI* (*method)(const CMPIBroker*, const CMPIContext*, CMPIStatus*) = nullptr;
+    /** `NAME_Create_PropertyMI`. */
+    CMPIPropertyMI* (*property)(const CMPIBroker*, const CMPIContext*, CMPIStatus*) = nullptr;
+    /** `NAME_Create_IndicationMI`. */
+    CMPIIndicationMI* (*indication)(const CMPIBroker*, const CMPIContext*, CMPIStatus*) = nullptr;
 };
 
 /** The broker. The top of EmbeddedBroker.h tells how to use it. */
@@ -151,8 +155,8 @@ public:
               std::vector<std::string> classes = {});
     /**
      * Loads a provider library and hosts the provider `name` in it, by the factory functions
-     * `NAME_Create_InstanceMI`, `NAME_Create_AssociationMI` and `NAME_Create_MethodMI`, or the
-     * `_Generic_Create_…` ones.
+     * `NAME_Create_InstanceMI`, `NAME_Create_AssociationMI`, `NAME_Create_MethodMI`,
+     * `NAME_Create_PropertyMI` and `NAME_Create_IndicationMI`, or the `_Generic_Create_…` ones.
      * @param file path of the library, as `dlopen` takes it.
      * @throws BrokerError when the library cannot be loaded, has none of the factories, or a factory fails.
      */

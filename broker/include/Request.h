@@ -144,6 +144,23 @@ public:
     Reply referenceNames(const CMPIObjectPath* path, const AssociationFilter& filter = {});
     /** @} */
 
+    /** @name Operations of single properties
+     * A property MI serves them. Where no provider of the class has one, or it answers
+     * `CMPI_RC_ERR_NOT_SUPPORTED`, the property is read by getInstance or written by modifyInstance, with the
+     * property alone in the property list. A property that the class does not declare answers
+     * `CMPI_RC_ERR_NO_SUCH_PROPERTY`.
+     * @param path names the instance.
+     * @param name the property's name.
+     */
+    /** @{ */
+    /** Reads a property; its value is in Reply::data. */
+    Reply getProperty(const CMPIObjectPath* path, const std::string& name);
+    /** Sets a property.
+     * @param value its new value, such as valueFromText makes; of another type than is declared it answers
+     * `CMPI_RC_ERR_TYPE_MISMATCH`. */
+    Reply setProperty(const CMPIObjectPath* path, const std::string& name, const CMPIData& value);
+    /** @} */
+
     /**
      * Calls a method.
      * @param path names the instance, or the class of a static method.

@@ -136,32 +136,18 @@ CMPIData invokeMethod(Core& core, const CMPIContext* context, const CMPIObjectPa
     return reply.data.empty() ? Value().data() : reply.data.front();
 }
 
-// A property of an instance that a provider serves.
-
 CMPIData getProperty(Core& core, const CMPIContext* context, const CMPIObjectPath* path, const char* name) {
-    const char* properties[] = {required(name), nullptr};
-    CMPIInstance* const instance =
-        Upcall<&CMPIInstanceMIFT::getInstance>::instance(core, context, path, properties);
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    const CMPIData data = CMGetProperty(instance, name, &status);
-    if (status.rc != CMPI_RC_OK) {
-        throw Failure{status.rc};
-    }
-    return data;
+    Reply reply = core.hosting.getProperty(context, path, required(name));
+    tellUnserved(core, reply, path, CMPI_RC_ERR_NOT_FOUND);
+    succeeded(reply);
+    return reply.data.empty() ? Value().data() : reply.data.front();
 }
 
 void setProperty(Core& core, const CMPIContext* context, const CMPIObjectPath* path, const char* name,
                  const CMPIValue* value, CMPIType type) {
-    const char* properties[] = {required(name), nullptr};
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    CMPIInstance* const instance = CMNewInstance(&core.record, path, &status);
-    if (status.rc == CMPI_RC_OK) {
-        status = CMSetProperty(instance, name, value, type);
-    }
-    if (status.rc != CMPI_RC_OK) {
-        throw Failure{status.rc};
-    }
-    Upcall<&CMPIInstanceMIFT::modifyInstance>::nothing(core, context, path, instance, properties);
+    Reply reply = core.hosting.setProperty(context, path, required(name), value, type);
+    tellUnserved(core, reply, path, CMPI_RC_ERR_NOT_SUPPORTED);
+    succeeded(reply);
 }
 
 // There is no query language.
