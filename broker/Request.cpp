@@ -29,10 +29,14 @@ class Request::Impl {
 public:
     explicit Impl(EmbeddedBroker& broker) : core(broker.impl()) {
         core.addContextEntries(context);
-        CMPIValue flags = {};
-        flags.uint32 = 0;
-        context.values.set(CMPIInvocationFlags, Value::number(flags, CMPI_uint32));
+        setFlags(0);
         context.values.set(CMPIPrincipal, Value::text(core, ""));
+    }
+
+    void setFlags(CMPIFlags flags) {
+        CMPIValue value = {};
+        value.uint32 = flags;
+        context.values.set(CMPIInvocationFlags, Value::number(value, CMPI_uint32));
     }
 
     // The context of a request for a path.
@@ -63,6 +67,14 @@ Request::~Request() = default;
 
 const CMPIContext* Request::context() const {
     return &impl_->context;
+}
+
+void Request::setContextEntry(const std::string& name, const std::string& text) {
+    impl_->context.values.set(name, Value::text(impl_->core, text));
+}
+
+void Request::setInvocationFlags(CMPIFlags flags) {
+    impl_->setFlags(flags);
 }
 
 void Request::setProgressHandler(std::function<void(std::size_t results)> handler) {

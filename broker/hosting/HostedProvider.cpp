@@ -1,10 +1,10 @@
 #include "hosting/HostedProvider.h"
 
 #include "Core.h"
+#include "hosting/ProviderCall.h"
 
 #include <algorithm>
 #include <dlfcn.h>
-#include <thread>
 
 namespace oxahv {
 
@@ -50,29 +50,19 @@ std::string wordsOf(const CMPIStatus& status) {
     return codeName(status.rc) + (text == nullptr || text->text.empty() ? "" : ": " + text->text);
 }
 
+// A provider that fails to end has ended all the same, but the program is told.
 template <class MI>
-void cleanUp(Core& core, MI* mi, const CMPIContext* context) {
+void cleanUp(Core& core, const std::string& name, MI* mi, const CMPIContext* context) {
     Owner own(core); // what the provider makes while it ends
     const Owner::Scope scope(own);
     try {
-        mi->ft->cleanup(mi, context, 1);
-    } catch (...) { // a provider that fails to end has ended all the same
-        passOnTheEndOfAThread();
+        const Outcome outcome = callProvider([&] { return mi->ft->cleanup(mi, context, 1); });
+        if (outcome.isThrown) {
+            const std::string text = "provider " + name + ": its cleanup threw an " + outcome.message;
+            core.tell({false, CMPI_SEV_ERROR, name, text, true});
+        }
+    } catch (const std::exception&) { // NOLINT(bugprone-empty-catch): no memory, or the program's handler
     }
-}
-
-// A provider's cleanup may end its thread. It gets one of its own, since the broker calls it in destructors,
-// which no thread's end can leave.
-template <class Function>
-void runOnThread(const Function& function) {
-    std::thread thread;
-    try {
-        thread = std::thread(function);
-    } catch (const std::exception&) { // no memory, or too many threads
-        function();
-        return;
-    }
-    thread.join();
 }
 
 } // namespace
@@ -93,7 +83,7 @@ void HostedProvider::cleanUp() {
     }
     const auto end = [&](auto* mi) {
         if (mi != nullptr && mi->ft->cleanup != nullptr) {
-            runOnThread([&] { oxahv::cleanUp(core_, mi, &context); });
+            runOnThread([&] { oxahv::cleanUp(core_, name_, mi, &context); });
         }
     };
     std::apply([&](auto*... mis) { (end(mis), ...); }, mis_);
@@ -178,6 +168,31 @@ void HostedProvider::load(const std::string& file) {
 bool HostedProvider::serves(const Classes& declared, std::string_view className) const {
     return std::any_of(classes_.begin(), classes_.end(),
                        [&](const std::string& served) { return declared.isA(className, served); });
+}
+
+bool HostedProvider::servesPartOf(const Classes& declared, std::string_view className) const {
+    return std::any_of(classes_.begin(), classes_.end(),
+                       [&](const std::string& served) { return declared.isA(served, className); });
+}
+
+bool HostedProvider::mayAssociate(const Classes& declared, std::string_view className) const {
+    bool isKnown = false; // whether a class of the provider's is an association
+    for (const std::string& served : classes_) {
+        const auto association = declared.find(served);
+        if (association == nullptr || !association->qualifiers.isTrue("Association")) {
+            continue;
+        }
+        isKnown = true;
+        for (const PropertyDeclaration& end : association->properties) {
+            if (end.type == CMPI_ref &&
+                (end.referenceClass.empty() || declared.find(end.referenceClass) == nullptr ||
+                 declared.isA(className, end.referenceClass) ||
+                 declared.isA(end.referenceClass, className))) {
+                return true;
+            }
+        }
+    }
+    return !isKnown;
 }
 
 } // namespace oxahv

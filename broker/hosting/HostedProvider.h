@@ -32,6 +32,10 @@ public:
 
     bool serves(const Classes& declared, std::string_view className) const;
     bool servesAll() const { return classes_.empty(); }
+    // Whether it serves a class that derives from this one.
+    bool servesPartOf(const Classes& declared, std::string_view className) const;
+    // Whether instances of the class may be ends of associations that it serves, as far as they are declared.
+    bool mayAssociate(const Classes& declared, std::string_view className) const;
 
     // Null where the provider has no such MI.
     template <class MI>

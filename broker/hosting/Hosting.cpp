@@ -1,6 +1,7 @@
 #include "hosting/Hosting.h"
 
 #include "Core.h"
+#include "hosting/ProviderCall.h"
 
 #include <algorithm>
 #include <iterator>
@@ -17,62 +18,85 @@ Reply Hosting::refused(CMPIrc code, std::string message) {
 
 namespace {
 
-// Runs a provider's function. What it throws becomes a status: a provider must not take its server along.
-template <class Function>
-CMPIStatus guarded(const Function& function, std::string& message) {
-    constexpr CMPIStatus thrown = {CMPI_RC_ERR_FAILED, nullptr};
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    try {
-        status = function();
-    } catch (const std::exception& exception) {
-        message = std::string("exception: ") + exception.what();
-        return thrown;
-    } catch (...) {
-        passOnTheEndOfAThread();
-        message = "exception of an unknown kind";
-        return thrown;
-    }
-    const String* const text = String::of(status.msg);
-    message = text != nullptr ? text->text : std::string(); // what this throws is not the provider's
-    return status;
-}
-
-// Has a provider serve a request; its results and its status come to be the reply of `result`.
-void ask(const HostedProvider& provider, const Operation& operation, const CMPIContext* context,
-         const CMPIObjectPath* path, Result& result) {
-    std::string message;
-    const CMPIStatus status =
-        guarded([&] { return operation.call(provider, context, &result, path); }, message);
-    if (status.rc != CMPI_RC_OK) { // else an error that the provider returned as a result is kept
-        result.reply.code = status.rc;
-        result.reply.message = message;
-    }
-}
-
 Reply unserved(CMPIrc code, std::string message) {
     Reply reply = Hosting::refused(code, std::move(message));
     reply.isServed = false;
     return reply;
 }
 
-// Whether a provider has said that the class is not its own.
-bool isRefusal(const Reply& reply) {
-    return (reply.code == CMPI_RC_ERR_NOT_SUPPORTED || reply.code == CMPI_RC_ERR_INVALID_CLASS) &&
-           reply.instances.empty() && reply.objectPaths.empty();
+// How much an answer says: of several, the first of those that say most counts.
+enum class Weight { none, refusal, notFound, success, failure };
+
+Weight weightOf(const Reply& reply) {
+    const bool isEmpty = reply.instances.empty() && reply.objectPaths.empty();
+    if (reply.ok() || !isEmpty) {
+        return reply.ok() ? Weight::success : Weight::failure;
+    }
+    switch (reply.code) {
+    case CMPI_RC_ERR_NOT_SUPPORTED: // a provider says that the class is not its own
+    case CMPI_RC_ERR_INVALID_CLASS:
+        return Weight::refusal;
+    case CMPI_RC_ERR_NOT_FOUND: // that the instance is not, which another's may be
+        return Weight::notFound;
+    default:
+        return Weight::failure;
+    }
 }
+
+template <class Element>
+void append(std::vector<Element>& list, const std::vector<Element>& more) {
+    list.insert(list.end(), more.begin(), more.end());
+}
+
+// The answers of the providers that are asked for one request.
+class Answers {
+public:
+    explicit Answers(Reply unserved) : reply_(std::move(unserved)) {}
+
+    Weight weight() const { return weight_; }
+    std::size_t results() const { return reply_.instances.size() + reply_.objectPaths.size(); }
+    Reply take() { return std::move(reply_); }
+
+    void add(const HostedProvider& provider, const Reply& answer) {
+        const Weight weight = weightOf(answer);
+        reply_.answers.push_back({provider.name(), answer.code, answer.message,
+                                  answer.instances.size() + answer.objectPaths.size()});
+        append(reply_.instances, answer.instances);
+        append(reply_.objectPaths, answer.objectPaths);
+        append(reply_.data, answer.data);
+        append(reply_.errors, answer.errors);
+        reply_.isServed = reply_.isServed || !provider.servesAll() || weight != Weight::refusal;
+        if (weight > weight_) {
+            weight_ = weight;
+            reply_.code = answer.code;
+            reply_.message = answer.message;
+            reply_.done = answer.done;
+        } else if (weight == weight_) {
+            reply_.done = reply_.done && answer.done;
+        }
+    }
+
+private:
+    Reply reply_;
+    Weight weight_ = Weight::none;
+};
 
 // What the thread is inside of. A provider that calls up for a class of another may be the only one that is
 // asked, and would call up for ever.
 class Ongoing {
 public:
+    static constexpr std::size_t deepest = 1000;
+
     Ongoing(const HostedProvider* provider, const std::type_info& operation, const std::string& className)
-        : provider_(provider), operation_(operation), className_(className), outer_(innermost) {
+        : provider_(provider), operation_(operation), className_(className), outer_(innermost),
+          depth_(depth() + 1) {
         innermost = this;
     }
     ~Ongoing() { innermost = outer_; }
     Ongoing(const Ongoing&) = delete;
     Ongoing& operator=(const Ongoing&) = delete;
 
+    static std::size_t depth() { return innermost != nullptr ? innermost->depth_ : 0; }
     static bool includes(const HostedProvider* provider) {
         return any([&](const Ongoing& one) { return one.provider_ == provider; });
     }
@@ -100,6 +124,7 @@ private:
     const std::type_info& operation_;
     const std::string& className_;
     const Ongoing* outer_;
+    std::size_t depth_;
 };
 thread_local const Ongoing* Ongoing::innermost = nullptr;
 
@@ -166,28 +191,54 @@ void Hosting::unload(const std::string& name) {
     gone.wait();
 }
 
-Hosting::Providers Hosting::find(const ObjectPath& path, const Operation& operation) const {
+template <class Predicate>
+Hosting::Providers Hosting::providersThat(const Predicate& match) const {
     const std::shared_lock<std::shared_mutex> lock(mutex_);
-    const auto have = [&](const auto& matches) {
-        Providers found;
-        std::copy_if(
-            providers_.begin(), providers_.end(), std::back_inserter(found),
-            [&](const auto& provider) { return operation.isOfferedBy(*provider) && matches(*provider); });
-        return found;
-    };
+    Providers found;
+    std::copy_if(providers_.begin(), providers_.end(), std::back_inserter(found),
+                 [&](const auto& provider) { return match(*provider); });
+    return found;
+}
+
+Hosting::Providers Hosting::find(const ObjectPath& path, const Operation& operation) const {
     const std::string_view association = operation.associationClass();
+    const bool isOfAnyAssociation = operation.isAlongAssociations() && association.empty();
     const std::string_view wanted = association.empty() ? path.className : association;
-    Providers found = have([&](const HostedProvider& p) { return p.serves(core_.classes, wanted); });
-    if (!found.empty()) {
-        found.resize(1);
-        return found;
+    Providers found;
+    if (!isOfAnyAssociation) {
+        found = providersThat([&](const HostedProvider& p) {
+            return operation.isOfferedBy(p) &&
+                   (p.serves(core_.classes, wanted) ||
+                    (!association.empty() && p.servesPartOf(core_.classes, wanted)));
+        });
     }
-    // An association's provider lists its own class, not those of its ends.
-    const bool isOfAny = operation.isAlongAssociations() && association.empty();
-    found = have([&](const HostedProvider& p) { return isOfAny || p.servesAll(); });
+    if (found.empty()) {
+        found = providersThat([&](const HostedProvider& p) {
+            return operation.isOfferedBy(p) &&
+                   (p.servesAll() || (isOfAnyAssociation && p.mayAssociate(core_.classes, path.className)));
+        });
+    }
+    // One that calls up for a class of another is to get that call last.
     std::stable_partition(found.begin(), found.end(),
                           [](const auto& provider) { return !Ongoing::includes(provider.get()); });
     return found;
+}
+
+// Has a provider serve a request.
+Reply Hosting::ask(const HostedProvider& provider, const CMPIContext* context, const CMPIObjectPath* path,
+                   const Operation& operation, const Progress& progress) const {
+    Result result(core_, Owner::current(core_));
+    result.progress = progress.handler;
+    result.earlier = progress.results;
+    const CMPIObjectPath* const delivered = core_.delivery.deliver(path);
+    const Outcome outcome =
+        callProvider([&] { return operation.call(provider, context, &result, delivered); });
+    Reply& reply = result.reply;
+    if (outcome.code != CMPI_RC_OK) { // else an error that the provider returned as a result is kept
+        reply.code = outcome.code;
+        reply.message = outcome.message.empty() ? reply.message : outcome.message;
+    }
+    return std::move(reply);
 }
 
 Reply Hosting::serve(const CMPIContext* context, const CMPIObjectPath* handle, const Operation& operation) {
@@ -199,28 +250,25 @@ Reply Hosting::serve(const CMPIContext* context, const CMPIObjectPath* handle, c
     if (core_.classes.any() && core_.classes.find(path->className) == nullptr) {
         return unserved(CMPI_RC_ERR_INVALID_CLASS, "class " + path->className + " is not declared");
     }
+    if (Ongoing::depth() >= Ongoing::deepest) {
+        return refused(CMPI_RC_ERR_FAILED, "requests are nested " + std::to_string(Ongoing::deepest) +
+                                               " deep; the last is for class " + path->className);
+    }
     const std::function<void(std::size_t)>* const progress = std::exchange(own->progress, nullptr);
-    Reply reply = unserved(CMPI_RC_ERR_NOT_SUPPORTED, "no provider serves this for class " + path->className);
-    bool isAsked = false;
+    Answers answers(
+        unserved(CMPI_RC_ERR_NOT_SUPPORTED, "no provider serves this for class " + path->className));
     for (const std::shared_ptr<HostedProvider>& provider : find(*path, operation)) {
         if (provider->servesAll() && Ongoing::includes(provider.get(), typeid(operation), path->className)) {
             continue;
         }
         const Ongoing ongoing(provider.get(), typeid(operation), path->className);
-        Result result(core_, Owner::current(core_));
-        result.progress = progress;
-        ask(*provider, operation, context, core_.delivery.deliver(handle), result);
-        const bool isRefused = provider->servesAll() && isRefusal(result.reply);
-        if (!isRefused || !isAsked) { // the first refusal is the one to tell
-            reply = std::move(result.reply);
-            reply.isServed = !isRefused;
-        }
-        if (!isRefused) {
+        answers.add(*provider, ask(*provider, context, handle, operation, {progress, answers.results()}));
+        // Associations may be of several providers; an instance is of one.
+        if (!operation.isAlongAssociations() && answers.weight() > Weight::refusal) {
             break;
         }
-        isAsked = true;
     }
-    return reply;
+    return answers.take();
 }
 
 } // namespace oxahv

@@ -3,6 +3,7 @@
 
 #include "hosting/Operations.h"
 
+#include <functional>
 #include <memory>
 #include <shared_mutex>
 #include <string>
@@ -42,10 +43,20 @@ public:
 private:
     using Providers = std::vector<std::shared_ptr<HostedProvider>>;
 
+    // Who wants to know of a request's results, and how many have come before.
+    struct Progress {
+        const std::function<void(std::size_t)>* handler;
+        std::size_t results;
+    };
+
     Reply serve(const CMPIContext* context, const CMPIObjectPath* handle, const Operation& operation);
+    Reply ask(const HostedProvider& provider, const CMPIContext* context, const CMPIObjectPath* path,
+              const Operation& operation, const Progress& progress) const;
+    template <class Predicate>
+    Providers providersThat(const Predicate& match) const;
     Reply modifyProperty(const CMPIContext* context, const CMPIObjectPath* path, const char* name,
                          const CMPIData& data);
-    // Whom to ask, in order: one that names the class, or all that may serve it.
+    // Whom to ask, in order: those that name the class, or all that may serve it.
     Providers find(const ObjectPath& path, const Operation& operation) const;
     void add(std::shared_ptr<HostedProvider> provider);
     std::shared_ptr<HostedProvider> take(const std::string& name);

@@ -210,7 +210,8 @@ public:
      * called no more when this returns. A handler must not set another.
      */
     void setUnservedHandler(std::function<void(const std::string& className)> handler);
-    /** Receives what providers write through the `logMessage` and `trace` slots; null: dropped. Called on
+    /** Receives what providers write through the `logMessage` and `trace` slots, and the line about an
+     * exception that leaves a provider's `cleanup`; null: dropped. Called on
      * their threads, by several at once; the earlier handler is called no more when this returns. A handler
      * must not set another. */
     void setMessageHandler(std::function<void(const BrokerMessage&)> handler);

@@ -24,6 +24,14 @@ namespace oxahv {
 
 class EmbeddedBroker;
 
+/** What one provider answered to a request. */
+struct ProviderAnswer {
+    std::string provider;     ///< its name in the broker
+    CMPIrc code = CMPI_RC_OK; ///< the status's code
+    std::string message;      ///< the status's text, empty if none
+    std::size_t results = 0;  ///< how many instances or object paths of the reply are its own
+};
+
 /** What a request yielded: its status, and what the provider returned, in order. All of it dies with the
  * request. */
 struct Reply {
@@ -34,6 +42,11 @@ struct Reply {
     std::vector<CMPIData> data;               ///< returned by returnData; a method's return value
     CMPIArgs* out = nullptr;                  ///< a method's output arguments
     bool done = false;                        ///< whether the provider called returnDone
+    /** What the provider returned by returnError, all fields of it, in order. A status without a text that
+     * follows an error leaves the error's text in `message`. */
+    std::vector<CMPIError*> errors{};
+    /** Of each provider that was asked, in order; the reply holds their results in the same order. */
+    std::vector<ProviderAnswer> answers{};
     bool isServed = true; ///< whether there was a provider to ask, and not all of them refused the class
     /** Whether the code is `CMPI_RC_OK`. */
     bool ok() const { return code == CMPI_RC_OK; }
@@ -53,13 +66,18 @@ struct AssociationFilter {
  * gets the code without the message.
  *
  * The operations find the provider by the class of the path, call its MI function, and collect what it
- * returns. Each asks the first provider that serves the class; of several with associations, a request names
- * the association class of the one that it means. Of providers that serve all classes, the next is asked
- * where one refuses the class (`CMPI_RC_ERR_NOT_SUPPORTED`, `CMPI_RC_ERR_INVALID_CLASS`) without a result;
- * one that calls up comes last, and never gets the call that it is in once more. The path is delivered as the
- * broker's KeyMode and PathDelivery say. With declarations, an unknown class answers
- * `CMPI_RC_ERR_INVALID_CLASS`, a method that its class does not have `CMPI_RC_ERR_METHOD_NOT_FOUND`; a class
- * that no provider serves answers `CMPI_RC_ERR_NOT_SUPPORTED`. None of them throws, but for `std::bad_alloc`.
+ * returns. Of several providers that serve the class, the next is asked where one refuses it
+ * (`CMPI_RC_ERR_NOT_SUPPORTED`, `CMPI_RC_ERR_INVALID_CLASS`) without a result; providers that serve all
+ * classes are asked where none names it. A request along associations goes to every provider whose
+ * associations can reach the path's class, or to those of the association class that it names, and brings all
+ * their results; an error of one is its error, but for a refusal or `CMPI_RC_ERR_NOT_FOUND` where another
+ * succeeds. A provider that calls up comes last, and one that serves all classes never gets the call that it
+ * is in once more. Requests nest at most 1,000 deep; a deeper one answers `CMPI_RC_ERR_FAILED`.
+ *
+ * The path is delivered as the broker's KeyMode and PathDelivery say. With declarations, an unknown class
+ * answers `CMPI_RC_ERR_INVALID_CLASS`, a method that its class does not have `CMPI_RC_ERR_METHOD_NOT_FOUND`;
+ * a class that no provider serves answers `CMPI_RC_ERR_NOT_SUPPORTED`. None of them throws, but for
+ * `std::bad_alloc`.
  */
 class TK_EXPORT Request {
 public:
@@ -72,6 +90,17 @@ public:
 
     /** The request's context, as provider functions receive it. */
     const CMPIContext* context() const;
+
+    /**
+     * Sets an entry of the context from here on, such as the standard's `CMPIPrincipal` (who asks; empty at
+     * first), `CMPIRole`, `CMPIAcceptLanguage` and `CMPIContentLanguage`. `CMPIInitNameSpace` is always the
+     * namespace of an operation's path.
+     * @param name the entry's name.
+     * @param text its value, a `CMPI_string`.
+     */
+    void setContextEntry(const std::string& name, const std::string& text);
+    /** Sets the context's `CMPIInvocationFlags` from here on. @param flags `CMPI_FLAG_…` bits; 0 at first. */
+    void setInvocationFlags(CMPIFlags flags);
 
     /**
      * Tells how far the operations of this request have come, while they run.

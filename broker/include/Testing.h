@@ -92,12 +92,14 @@ struct LiveObjects {
     }
 };
 
-/** A broker message or trace that a provider wrote through the broker's `logMessage` and `trace` slots. */
+/** A message or trace that a provider wrote through the broker's `logMessage` and `trace` slots, or a message
+ * of the broker's about a provider: an exception has left its `cleanup`. */
 struct BrokerMessage {
     bool isTrace = false;    ///< written by `trace`; else by `logMessage`
     int severityOrLevel = 0; ///< a `CMPILevel` of a trace, else a `CMPISeverity`
     std::string component;   ///< the id or component argument
     std::string text;        ///< the text
+    bool isBrokers = false;  ///< written by the broker; `component` is then the provider's name
 };
 
 } // namespace oxahv

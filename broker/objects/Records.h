@@ -141,7 +141,7 @@ public:
     // Says that one more has come.
     void tellProgress() const {
         if (progress != nullptr && *progress) {
-            (*progress)(reply.instances.size() + reply.objectPaths.size());
+            (*progress)(earlier + reply.instances.size() + reply.objectPaths.size());
         }
     }
 
@@ -149,6 +149,7 @@ public:
     Owner& keeper;
     Reply reply;
     const std::function<void(std::size_t)>* progress = nullptr;
+    std::size_t earlier = 0; // results of providers that were asked before
 };
 
 class PropertyList : public RecordedObject<CMPIPropertyList, Kind::other, PropertyList> {

@@ -159,6 +159,9 @@ void returnError(Result& result, const CMPIError* handle) {
     if (error == nullptr) {
         throw Failure{CMPI_RC_ERR_INVALID_HANDLE};
     }
+    std::unique_ptr<Object> copy = error->clone();
+    result.reply.errors.push_back(static_cast<Error*>(copy.get()));
+    result.keeper.adopt(std::move(copy));
     result.reply.code = error->statusCode;
     result.reply.message = error->message;
 }
