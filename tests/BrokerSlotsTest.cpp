@@ -61,6 +61,15 @@ struct Fresh {
     static const void* of(const CMPIArray*) { return array(); }
     static const void* of(const CMPIError*) { return error(); }
     static const void* of(const CMPIPropertyList*) { return properties(); }
+    static const void* of(const CMPISelectExp*) { return query(); }
+    static const void* of(const CMPISelectCond*) { return CMGetDoc(query(), nullptr); }
+    static const void* of(const CMPISubCond*) {
+        return CMGetSubCondAt(CMGetDoc(query(), nullptr), 0, nullptr);
+    }
+    static const void* of(const CMPIPredicate*) {
+        return CMGetPredicateAt(CMGetSubCondAt(CMGetDoc(query(), nullptr), 0, nullptr), 0, nullptr);
+    }
+    static const void* of(CMPIAccessor*) { return reinterpret_cast<const void*>(&textValue); }
     static const void* of(const CMPIDateTime*) { return CMNewDateTime(broker, nullptr); }
     static const void* of(const CMPIGcStat*) { return broker->mft->mark(broker, nullptr); }
     static const void* of(const CMPIEnumeration*) {
@@ -105,6 +114,15 @@ struct Fresh {
         error->ft->setMessageArguments(error, array());
         return error;
     }
+    static CMPISelectExp* query() {
+        return CMNewSelectExp(broker, "SELECT * FROM Demo WHERE text = 'value'", "WQL", nullptr, nullptr);
+    }
+    static CMPIData textValue(const char*, void*) {
+        CMPIData data = {CMPI_chars, CMPI_goodValue, {}};
+        static char value[] = "value";
+        data.value.chars = value;
+        return data;
+    }
     static CMPIPropertyList* properties() { return broker->eft->newPropertyList(broker, nullptr, nullptr); }
 
     static inline const char* names[] = {"text", nullptr};
@@ -112,7 +130,10 @@ struct Fresh {
 
 template <class Type>
 const void* argument() {
-    if constexpr (!std::is_pointer_v<Type> || std::is_same_v<Type, void*> || std::is_same_v<Type, char*>) {
+    if constexpr (std::is_same_v<Type, CMPIAccessor*>) {
+        return Fresh::of(static_cast<Type>(nullptr));
+    } else if constexpr (!std::is_pointer_v<Type> || std::is_same_v<Type, void*> ||
+                         std::is_same_v<Type, char*>) {
         return nullptr;
     } else {
         return Fresh::of(static_cast<const std::remove_pointer_t<Type>*>(nullptr));
@@ -121,7 +142,9 @@ const void* argument() {
 
 template <class Type>
 Type typed(const void* argument) {
-    if constexpr (std::is_pointer_v<Type>) {
+    if constexpr (std::is_same_v<Type, CMPIAccessor*>) {
+        return reinterpret_cast<Type>(const_cast<void*>(argument));
+    } else if constexpr (std::is_pointer_v<Type>) {
         return static_cast<Type>(const_cast<void*>(argument));
     } else if constexpr (std::is_same_v<Type, CMPIType>) {
         return CMPI_string;
@@ -190,11 +213,10 @@ Slot untyped(Return (*slot)(Parameters..., ...)) {
 
 // What a broker without a repository cannot do.
 const std::set<std::string> unsupported = {
-    "CMPIBrokerFT.deliverIndication",   "CMPIBrokerFT.enumerateInstancesFiltered",
-    "CMPIBrokerFT.associatorsFiltered", "CMPIBrokerFT.referencesFiltered",
-    "CMPIBrokerEncFT.newSelectExp",     "CMPIBrokerEncFT.openMessageFile",
-    "CMPIBrokerEncFT.closeMessageFile", "CMPIBrokerEncFT.newEnumerationFilter",
-    "CMPIStringFT.newCharsCP",
+    "CMPIBrokerFT.deliverIndication",       "CMPIBrokerFT.enumerateInstancesFiltered",
+    "CMPIBrokerFT.associatorsFiltered",     "CMPIBrokerFT.referencesFiltered",
+    "CMPIBrokerEncFT.openMessageFile",      "CMPIBrokerEncFT.closeMessageFile",
+    "CMPIBrokerEncFT.newEnumerationFilter", "CMPIStringFT.newCharsCP",
 };
 
 class EverySlot : public testing::Test {
@@ -281,6 +303,12 @@ TEST_F(EverySlot, SurvivesNullArgumentsAndWantOfMemory) {
     sweep(CMNewDateTime(broker, nullptr)->ft);
     sweep(Fresh::error()->ft);
     sweep(Fresh::properties()->ft);
+    sweep(Fresh::query()->ft);
+    const CMPISelectCond* const condition = CMGetDoc(Fresh::query(), nullptr);
+    sweep(condition->ft);
+    const CMPISubCond* const group = CMGetSubCondAt(condition, 0, nullptr);
+    sweep(group->ft);
+    sweep(CMGetPredicateAt(group, 0, nullptr)->ft);
     forEachSlot(*broker->xft, [](const char* name, auto slot) { EXPECT_NE(slot, nullptr) << name; });
     const auto* const noMark = reinterpret_cast<const CMPIGcStat*>(CMNewString(broker, "", nullptr));
     EXPECT_EQ(broker->mft->release(broker, noMark).rc, CMPI_RC_ERR_INVALID_HANDLE);

@@ -33,6 +33,18 @@
  * **Conduct.** All slots of all function tables are filled. A slot that gets a null handle or one that is not
  * of its kind answers `CMPI_RC_ERR_INVALID_HANDLE`; what a broker without a repository cannot do answers
  * `CMPI_RC_ERR_NOT_SUPPORTED`. No slot throws.
+ *
+ * **Queries.** `newSelectExp` takes WQL and the basic level of the CIM query language ("DMTF:CQL",
+ * "CIM:CQL"): a select list, `FROM` one class, and `WHERE` with `= <> < <= > >=`, `AND`, `OR`, `NOT`, `IS
+ * NULL`, `LIKE` and `ISA`, on properties and on those of embedded instances (`SourceInstance.Name`). What
+ * depends on a NULL is unknown, and an instance of which a query is unknown is not accepted. Integers of all
+ * types compare by their numbers, exactly, with reals too; texts byte by byte; date/times by their instants.
+ * A fault is `CMPI_RC_ERR_INVALID_QUERY`, with the column in the status's text; what goes beyond the basic
+ * level, 1,000 comparisons (in a normal form too) or 100 nested parentheses is refused with DSP0200's code 29
+ * (`CMPI_RC_ERR_QUERY_FEATURE_NOT_SUPPORTED`); values that do not compare are `CMPI_RC_ERR_TYPE_MISMATCH`.
+ * With declarations the names and types of a query are checked when it is made. A query without `WHERE` is an
+ * empty conjunction: its disjunction of conjunctions has one part without predicates, its conjunction of
+ * disjunctions has no part.
  */
 #pragma once
 

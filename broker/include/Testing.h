@@ -83,7 +83,7 @@ struct LiveObjects {
     std::size_t enumerations = 0; ///< `CMPIEnumeration`
     std::size_t contexts = 0;     ///< `CMPIContext`
     std::size_t results = 0;      ///< `CMPIResult`
-    std::size_t others = 0;       ///< errors, property lists, memory marks
+    std::size_t others = 0; ///< errors, property lists, memory marks, select expressions and their parts
 
     /** All of them. */
     std::size_t total() const {

@@ -20,7 +20,12 @@ using Core = EmbeddedBroker::Impl;
 // What an operation of a slot throws; the slot reports it as a status.
 struct Failure {
     CMPIrc code;
+    std::shared_ptr<const std::string>
+        text{}; // for a person; null: none. Shared, since copies must not throw
 };
+[[noreturn]] inline void failWith(CMPIrc code, std::string text) {
+    throw Failure{code, std::make_shared<const std::string>(std::move(text))};
+}
 
 // In a handler of everything: a thread that ends unwinds its stack by what is no C++ exception and must go
 // on.

@@ -1,6 +1,7 @@
 #include "objects/Records.h"
 
 #include "Core.h"
+#include "query/SelectExpression.h"
 
 #include <algorithm>
 #include <cstring>
@@ -9,10 +10,11 @@
 namespace oxahv {
 
 Object* objectOf(const void* handle) {
-    static const void* const tables[] = {&String::table,       &Array::table,    &DateTime::table,
-                                         &Arguments::table,    &Context::table,  &Enumeration::table,
-                                         &ObjectPath::table,   &Instance::table, &Result::table,
-                                         &PropertyList::table, &Error::table};
+    static const void* const tables[] = {
+        &String::table,          &Array::table,        &DateTime::table,   &Arguments::table,
+        &Context::table,         &Enumeration::table,  &ObjectPath::table, &Instance::table,
+        &Result::table,          &PropertyList::table, &Error::table,      &SelectExpression::table,
+        &SelectCondition::table, &SubCondition::table, &Predicate::table};
     if (handle == nullptr) {
         return nullptr;
     }
@@ -86,6 +88,24 @@ void Instance::setPath(std::unique_ptr<ObjectPath> newPath) {
             properties.set(key.name, key.value);
         }
     }
+}
+
+bool Instance::isKey(const DeclaredClass* declared, std::string_view name) const {
+    const PropertyDeclaration* const property = declared != nullptr ? declared->find(name) : nullptr;
+    return property != nullptr ? property->isKey : path->keys.find(name) != nullptr;
+}
+
+bool Instance::passesFilter(const DeclaredClass* declared, std::string_view name) const {
+    return !isFiltered || isKey(declared, name) ||
+           std::any_of(filter.begin(), filter.end(),
+                       [&](const std::string& wanted) { return sameName(wanted, name); });
+}
+
+void Instance::setFilter(std::vector<std::string> names) {
+    filter = std::move(names);
+    isFiltered = true;
+    const auto declared = core().classes.find(path->className);
+    properties.keepOnly([&](const std::string& name) { return passesFilter(declared.get(), name); });
 }
 
 PropertyList::PropertyList(Core& core, std::vector<std::string> list)

@@ -13,6 +13,8 @@
 
 namespace oxahv {
 
+struct DeclaredClass;
+
 // An object with its CMPI record. The address of the table tells the kind of a handle.
 template <class Record, Kind objectKind, class Derived>
 class RecordedObject : public Object, public Record {
@@ -123,6 +125,10 @@ public:
     std::unique_ptr<Object> clone() const override;
     // Names it anew. The keys become properties, unless new instances are bare.
     void setPath(std::unique_ptr<ObjectPath> newPath);
+    // From now on it has its keys and the properties of these names alone.
+    void setFilter(std::vector<std::string> names);
+    bool isKey(const DeclaredClass* declared, std::string_view name) const;
+    bool passesFilter(const DeclaredClass* declared, std::string_view name) const;
 
     std::unique_ptr<ObjectPath> path;
     NamedValues properties;

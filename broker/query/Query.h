@@ -102,8 +102,8 @@ private:
 bool fulfils(const Classes& classes, const QueryCondition& condition, const QuerySource& source);
 bool fulfils(const Classes& classes, const QueryPredicate& predicate, const QuerySource& source);
 
-// The value of a literal as texts, and its type: `CMPI_sint64` for integers, `CMPI_uint64` where that is too
-// narrow.
+// A literal as text, without quotes, and its type: `CMPI_sint64` for integers, `CMPI_uint64` where that is
+// too narrow.
 std::string textOf(const QueryLiteral& literal);
 CMPIType typeOf(const QueryLiteral& literal);
 

@@ -80,9 +80,26 @@ CMPIDateTime* newDateTimeFromChars(Core& core, const char* text) {
     return newDateTimeOf(core, required(text));
 }
 
-CMPISelectExp* newSelectExp(Core& /*core*/, const char* /*query*/, const char* /*language*/,
-                            CMPIArray** /*projection*/) {
-    throw Failure{CMPI_RC_ERR_NOT_SUPPORTED};
+// The select list as an array of texts; none for `*`.
+CMPIArray* projectionOf(Core& core, const Query& query) {
+    if (query.selectsAll()) {
+        return nullptr;
+    }
+    auto array = std::make_unique<Array>(core, CMPI_string, 0);
+    for (const QueryProperty& property : query.selected()) {
+        array->elements.push_back(Value::text(core, property.text));
+    }
+    return handOut(std::move(array));
+}
+
+CMPISelectExp* newSelectExp(Core& core, const char* text, const char* language, CMPIArray** projection) {
+    const std::shared_ptr<const Query> query = Query::parse(required(text), required(language));
+    query->check(core.classes);
+    auto expression = std::make_unique<SelectExpression>(core, query);
+    if (projection != nullptr) {
+        *projection = projectionOf(core, *query);
+    }
+    return handOut(std::move(expression));
 }
 
 CMPIBoolean classPathIsA(Core& core, const CMPIObjectPath* handle, const char* className) {
@@ -97,6 +114,20 @@ CMPIBoolean classPathIsA(Core& core, const CMPIObjectPath* handle, const char* c
 }
 
 // Asking about an object of any kind
+
+template <class Class>
+bool isA(const Object& object) {
+    return dynamic_cast<const Class*>(&object) != nullptr;
+}
+
+const char* typeOfOther(const Object& object) {
+    return isA<Error>(object)              ? "CMPIError"
+           : isA<PropertyList>(object)     ? "CMPIPropertyList"
+           : isA<SelectExpression>(object) ? "CMPISelectExp"
+           : isA<SelectCondition>(object)  ? "CMPISelectCond"
+           : isA<SubCondition>(object)     ? "CMPISubCond"
+                                           : "CMPIPredicate";
+}
 
 const char* typeOf(const void* handle) {
     const Object* const object = objectOf(handle);
@@ -125,7 +156,7 @@ const char* typeOf(const void* handle) {
     case Kind::other:
         break;
     }
-    return dynamic_cast<const Error*>(object) != nullptr ? "CMPIError" : "CMPIPropertyList";
+    return typeOfOther(*object);
 }
 
 CMPIString* getType(Core& core, const void* handle) {

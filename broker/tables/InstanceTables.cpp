@@ -2,8 +2,6 @@
 
 #include "tables/Slots.h"
 
-#include <algorithm>
-
 namespace oxahv {
 
 namespace {
@@ -176,21 +174,10 @@ CMPICount getPropertyCount(const Instance& instance) {
     return static_cast<CMPICount>(instance.properties.size());
 }
 
-bool isKey(const Instance& instance, const DeclaredClass* declared, std::string_view name) {
-    const PropertyDeclaration* const property = declared != nullptr ? declared->find(name) : nullptr;
-    return property != nullptr ? property->isKey : instance.path->keys.find(name) != nullptr;
-}
-
-bool passesFilter(const Instance& instance, const DeclaredClass* declared, std::string_view name) {
-    return !instance.isFiltered || isKey(instance, declared, name) ||
-           std::any_of(instance.filter.begin(), instance.filter.end(),
-                       [&](const std::string& wanted) { return sameName(wanted, name); });
-}
-
 void setProperty(Instance& instance, const char* name, const CMPIValue* value, CMPIType type) {
     const auto declared = instance.core().classes.find(instance.path->className);
     Value checked = declaredValue(instance.core(), declared.get(), required(name), value, type);
-    if (passesFilter(instance, declared.get(), name)) {
+    if (instance.passesFilter(declared.get(), name)) {
         instance.properties.set(name, std::move(checked));
     }
 }
@@ -205,7 +192,7 @@ CMPIObjectPath* getObjectPath(const Instance& instance) {
     const auto declared = instance.core().classes.find(instance.path->className);
     std::unique_ptr<ObjectPath> path = instance.path->copy();
     for (const NamedValue& property : instance.properties) {
-        if (!property.value.isNull() && isKey(instance, declared.get(), property.name)) {
+        if (!property.value.isNull() && instance.isKey(declared.get(), property.name)) {
             path->keys.set(property.name, property.value);
         }
     }
@@ -229,11 +216,11 @@ void setPropertyFilter(Instance& instance, const char** properties, const char**
     std::vector<std::string> filter;
     appendNames(filter, properties);
     appendNames(filter, keys);
-    instance.filter = std::move(filter);
-    instance.isFiltered = properties != nullptr;
-    const auto declared = instance.core().classes.find(instance.path->className);
-    instance.properties.keepOnly(
-        [&](const std::string& name) { return passesFilter(instance, declared.get(), name); });
+    if (properties != nullptr) {
+        instance.setFilter(std::move(filter));
+    } else {
+        instance.isFiltered = false;
+    }
 }
 
 } // namespace

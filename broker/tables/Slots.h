@@ -7,6 +7,7 @@
 #pragma once
 
 #include "Core.h"
+#include "query/SelectExpression.h"
 
 #include <cstring>
 #include <new>
@@ -54,6 +55,14 @@ template <>
 struct SelfOf<CMPIPropertyList> : ObjectSelf<PropertyList> {};
 template <>
 struct SelfOf<CMPIError> : ObjectSelf<Error> {};
+template <>
+struct SelfOf<CMPISelectExp> : ObjectSelf<SelectExpression> {};
+template <>
+struct SelfOf<CMPISelectCond> : ObjectSelf<SelectCondition> {};
+template <>
+struct SelfOf<CMPISubCond> : ObjectSelf<SubCondition> {};
+template <>
+struct SelfOf<CMPIPredicate> : ObjectSelf<Predicate> {};
 
 // The status among a slot's arguments; null when there is none.
 inline CMPIStatus* statusIn() {
@@ -83,6 +92,25 @@ Result failed(CMPIStatus& status, CMPIrc code) {
     } else if constexpr (!std::is_void_v<Result>) {
         return Result{};
     }
+}
+
+// The same with the failure's text as the status's message, which the current owner has.
+template <class Result>
+Result failed(Core& core, CMPIStatus& status, const Failure& failure) {
+    CMPIString* message = nullptr;
+    if (failure.text != nullptr) {
+        try {
+            message = handOut(std::make_unique<String>(core, *failure.text));
+        } catch (const std::bad_alloc&) {
+            return failed<Result>(status, CMPI_RC_ERROR_SYSTEM);
+        }
+    }
+    Result result = failed<Result>(status, failure.code);
+    status.msg = message;
+    if constexpr (std::is_same_v<Result, CMPIStatus>) {
+        result.msg = message;
+    }
+    return result;
 }
 
 // Puts a slot's arguments into the record of its call. The value's type comes after the value.
@@ -142,7 +170,11 @@ private:
                 sizeof...(Rest) - ((std::is_same_v<Rest, CMPIStatus*> ? 1 : 0) + ... + 0);
             return apply(self, std::tuple<Rest...>(rest...), std::make_index_sequence<count>());
         } catch (const Failure& failure) {
-            return failed<Return>(status, failure.code);
+            if constexpr (std::is_void_v<Return>) {
+                return failed<Return>(status, failure.code);
+            } else {
+                return failed<Return>(Self::core(self), status, failure);
+            }
         } catch (const std::bad_alloc&) {
             return failed<Return>(status, CMPI_RC_ERROR_SYSTEM);
         } catch (...) { // such as a message handler's

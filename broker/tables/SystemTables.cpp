@@ -214,8 +214,6 @@ void freeObject(Core& /*core*/, Record* handle) {
     }
 }
 
-void freeSelectExp(Core& /*core*/, CMPISelectExp* /*expression*/) {} // there are none
-
 } // namespace
 
 const CMPIBrokerExtFT systemTable = {
@@ -261,7 +259,7 @@ const CMPIBrokerMemFT memoryTable = {
     SLOT(CMPIBrokerMemFT, freeString, (freeObject<String, CMPIString>)),
     SLOT(CMPIBrokerMemFT, freeArray, (freeObject<Array, CMPIArray>)),
     SLOT(CMPIBrokerMemFT, freeDateTime, (freeObject<DateTime, CMPIDateTime>)),
-    SLOT(CMPIBrokerMemFT, freeSelectExp, freeSelectExp),
+    SLOT(CMPIBrokerMemFT, freeSelectExp, (freeObject<SelectExpression, CMPISelectExp>)),
     SLOT(CMPIBrokerMemFT, freeChars, freeChars),
 };
 

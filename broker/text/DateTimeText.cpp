@@ -147,21 +147,23 @@ bool isDateTimeText(std::string_view text) {
            isDayOfItsMonth(text);
 }
 
-std::uint64_t binaryOf(std::string_view text) {
+std::int64_t microsecondsOf(std::string_view text) {
     const auto& f = timestampFields;
     if (isIntervalText(text)) {
         const auto& i = intervalFields;
-        return static_cast<std::uint64_t>(
-            valueOf(text, i[0]) * day +
-            timeOfDay(valueOf(text, i[1]), valueOf(text, i[2]), valueOf(text, i[3])) + fractionOf(text));
+        return valueOf(text, i[0]) * day +
+               timeOfDay(valueOf(text, i[1]), valueOf(text, i[2]), valueOf(text, i[3])) + fractionOf(text);
     }
     const std::int64_t local =
         daysSinceEpoch(valueOf(text, f[0]), valueOf(text, f[1]), valueOf(text, f[2])) * day +
         timeOfDay(valueOf(text, f[3]), valueOf(text, f[4]), valueOf(text, f[5])) + fractionOf(text);
     const std::string_view minutes = text.substr(signPosition + 1);
     const std::int64_t offset = (isAsterisks(minutes) ? 0 : numberOf(minutes)) * (60 * second);
-    const std::int64_t utc = text[signPosition] == '-' ? local + offset : local - offset;
-    return utc > 0 ? static_cast<std::uint64_t>(utc) : 0;
+    return text[signPosition] == '-' ? local + offset : local - offset;
+}
+
+std::uint64_t binaryOf(std::string_view text) {
+    return static_cast<std::uint64_t>(std::max<std::int64_t>(microsecondsOf(text), 0));
 }
 
 std::string dateTimeText(std::uint64_t microseconds, bool isInterval) {
