@@ -144,7 +144,8 @@ TEST(TheRunner, WritesInstancesAndSendsQueries) {
         {"--new-instance bare ci " + path, 0, "root/cimv2:Demo.Text=\"a\"\n"},
         {"ci Demo Text=b Small=5", 0, "root/cimv2:Demo.Text=\"b\"\n"},
         {"--output json mi " + path, 0, "[]\n"},
-        {"mi " + path + " small=5 Many=1 Many=2", 1, "oxahv-provider: CMPI_RC_ERR_FAILED: small=5;Many=-1;\n"},
+        {"mi " + path + " small=5 Many=1 Many=2", 1,
+         "oxahv-provider: CMPI_RC_ERR_FAILED: small=5;Many=-1;\n"},
         {"di " + path, 0, ""},
         {"di Demo", 1, "oxahv-provider: CMPI_RC_ERR_NOT_FOUND\n"},
         {"ci Demo Other=1", 2,
@@ -161,6 +162,17 @@ TEST(TheRunner, WritesInstancesAndSendsQueries) {
     EXPECT_EQ(run(test + "xq Demo 'SELECT * FROM Demo'").output,
               "instance of Demo {\n  Query = \"SELECT * FROM Demo\";\n  Language = \"WQL\";\n};\n");
     EXPECT_NE(run(test + "xq --language CIM:CQL Demo x").output.find("\"CIM:CQL\""), std::string::npos);
+}
+
+// A terminal obeys them: a provider's text could give it another title, or more.
+TEST(TheRunner, PrintsControlCharactersAsEscapes) {
+    const std::string call = test + "cm Demo Any $'A=\\e]0;\\u009b\\x7f\\n\xff'";
+    EXPECT_EQ(shell("bash -c \"" RUNNER " " + call + "\"").output,
+              "ReturnValue = 1;\nA = \"\\x001B]0;\\x009B\\x007F\\n\\x00FF\";\n");
+    const std::string json = shell("bash -c \"" RUNNER " --output json " + call + "\"").output;
+    EXPECT_NE(json.find(R"(\u001b]0;\u009B\u007F\n)"), std::string::npos) << json;
+    const std::string path = R"('root/cimv2:Demo.Text="\x001B]0;"')";
+    EXPECT_EQ(run(test + "ci " + path).output, unquoted(path) + '\n') << "what is printed can be read";
 }
 
 TEST(TheRunner, GivesProvidersTheirContext) {
