@@ -11,7 +11,12 @@ namespace oxahv::runner {
 
 namespace {
 
+// What is given values by name, for messages.
+constexpr const char* argumentWord = "argument";
+constexpr const char* propertyWord = "property";
+
 struct Argument {
+    const char* word;
     std::string name;
     CMPIType type; // with CMPI_ARRAY for arrays; CMPI_null: what the text looks like
     std::vector<std::string> texts;
@@ -44,7 +49,7 @@ std::optional<MethodDeclaration> declarationOf(const EmbeddedBroker& broker, con
 // The name as it is declared, and the type.
 Argument argumentOf(const std::optional<MethodDeclaration>& method, const std::string& name) {
     if (!method) {
-        return {name, CMPI_null, {}};
+        return {argumentWord, name, CMPI_null, {}};
     }
     const ParameterDeclaration* const parameter = method->find(name);
     if (parameter == nullptr) {
@@ -58,24 +63,48 @@ Argument argumentOf(const std::optional<MethodDeclaration>& method, const std::s
         throw BrokerError("parameter " + parameter->name + " of method " + method->name +
                           " is an output; leave it out");
     }
-    return {parameter->name, parameter->type, {}};
+    return {argumentWord, parameter->name, parameter->type, {}};
 }
 
-std::vector<Argument> parsed(const std::optional<MethodDeclaration>& method,
-                             const std::vector<std::string>& texts) {
+// The same of a property.
+Argument propertyOf(const EmbeddedBroker& broker, const std::string& className, const std::string& name) {
+    if (!broker.isDeclared(className)) {
+        return {propertyWord, name, CMPI_null, {}};
+    }
+    const std::vector<PropertyDeclaration> declared = broker.propertiesOf(className);
+    const auto found =
+        std::find_if(declared.begin(), declared.end(),
+                     [&](const PropertyDeclaration& property) { return sameName(property.name, name); });
+    if (found == declared.end()) {
+        throw BrokerError("class " + className + " has no property " + name + "; it has " +
+                          namesOf(declared));
+    }
+    return {propertyWord, found->name, found->type, {}};
+}
+
+// Where the name of name=value ends.
+std::size_t equalsIn(const char* word, const std::string& text) {
+    const std::size_t equals = text.find('=');
+    if (equals == std::string::npos || equals == 0) {
+        throw BrokerError(std::string(word) + " '" + text + "' is not name=value");
+    }
+    return equals;
+}
+
+// `declared` finds the argument of a name.
+template <class Declared>
+std::vector<Argument> parsed(const char* word, const std::vector<std::string>& texts,
+                             const Declared& declared) {
     std::vector<Argument> arguments;
     for (const std::string& text : texts) {
-        const std::size_t equals = text.find('=');
-        if (equals == std::string::npos || equals == 0) {
-            throw BrokerError("argument '" + text + "' is not name=value");
-        }
-        Argument argument = argumentOf(method, text.substr(0, equals));
+        const std::size_t equals = equalsIn(word, text);
+        Argument argument = declared(text.substr(0, equals));
         auto known = std::find_if(arguments.begin(), arguments.end(),
                                   [&](const Argument& other) { return sameName(other.name, argument.name); });
         if (known == arguments.end()) {
             known = arguments.insert(arguments.end(), std::move(argument));
         } else if ((known->type & CMPI_ARRAY) == 0) {
-            throw BrokerError("argument " + known->name +
+            throw BrokerError(known->word + (' ' + known->name) +
                               " stands twice; only an array takes several values");
         }
         known->texts.push_back(text.substr(equals + 1));
@@ -87,13 +116,13 @@ CMPIData valueOf(Request& request, const Argument& argument, const std::string& 
     try {
         return request.valueFromText(text, argument.type & static_cast<CMPIType>(~CMPI_ARRAY));
     } catch (const BrokerError& error) {
-        throw BrokerError("argument " + argument.name + ": " + error.what());
+        throw BrokerError(argument.word + (' ' + argument.name) + ": " + error.what());
     }
 }
 
 void require(const CMPIStatus& status) {
     if (status.rc != CMPI_RC_OK) {
-        throw BrokerError("the broker took no arguments: " + codeName(status.rc));
+        throw BrokerError("the broker took no values: " + codeName(status.rc));
     }
 }
 
@@ -111,6 +140,11 @@ CMPIData arrayOf(const EmbeddedBroker& broker, Request& request, const Argument&
     return data;
 }
 
+CMPIData dataOf(const EmbeddedBroker& broker, Request& request, const Argument& argument) {
+    return (argument.type & CMPI_ARRAY) != 0 ? arrayOf(broker, request, argument)
+                                             : valueOf(request, argument, argument.texts.front());
+}
+
 } // namespace
 
 CMPIArgs* argumentsFrom(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* path,
@@ -118,14 +152,43 @@ CMPIArgs* argumentsFrom(EmbeddedBroker& broker, Request& request, const CMPIObje
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     CMPIArgs* const arguments = CMNewArgs(broker.handle(), &status);
     require(status);
-    for (const Argument& argument :
-         parsed(declarationOf(broker, textOf(CMGetClassName(path, nullptr)), method), texts)) {
-        const CMPIData data = (argument.type & CMPI_ARRAY) != 0
-                                  ? arrayOf(broker, request, argument)
-                                  : valueOf(request, argument, argument.texts.front());
+    const auto declaration = declarationOf(broker, textOf(CMGetClassName(path, nullptr)), method);
+    const auto declared = [&](const std::string& name) { return argumentOf(declaration, name); };
+    for (const Argument& argument : parsed(argumentWord, texts, declared)) {
+        const CMPIData data = dataOf(broker, request, argument);
         require(CMAddArg(arguments, argument.name.c_str(), &data.value, data.type));
     }
     return arguments;
+}
+
+CMPIInstance* instanceFrom(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* path,
+                           const std::vector<std::string>& texts) {
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    CMPIInstance* const instance = CMNewInstance(broker.handle(), path, &status);
+    require(status);
+    for (const NamedValue& key : keysOf(path)) {
+        require(CMSetProperty(instance, key.name.c_str(), &key.data.value, key.data.type));
+    }
+    const std::string className = textOf(CMGetClassName(path, nullptr));
+    const auto declared = [&](const std::string& name) { return propertyOf(broker, className, name); };
+    for (const Argument& property : parsed(propertyWord, texts, declared)) {
+        const CMPIData data = dataOf(broker, request, property);
+        require(CMSetProperty(instance, property.name.c_str(), &data.value, data.type));
+    }
+    return instance;
+}
+
+std::vector<std::string> namesOfValues(const std::vector<std::string>& texts) {
+    std::vector<std::string> names;
+    for (const std::string& text : texts) {
+        std::string name = text.substr(0, equalsIn(propertyWord, text));
+        const bool isNew = std::none_of(names.begin(), names.end(),
+                                        [&](const std::string& other) { return sameName(other, name); });
+        if (isNew) {
+            names.push_back(std::move(name));
+        }
+    }
+    return names;
 }
 
 } // namespace oxahv::runner

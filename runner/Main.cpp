@@ -24,9 +24,7 @@ answered with an error, or check found something; 2 for wrong usage, and for fil
 that cannot be used.
 
   oxahv-provider --library ./libDemoPort.so --output json ei Demo_Port
-  oxahv-provider --library ./libDemoPort.so gi 'Demo_Port.Name="eth0"'
   oxahv-provider --library ./libDemoPort.so --mof Demo.mof cm Demo_Port.Number=3 SetSpeed Speed=1000
-  oxahv-provider --library ./libDemoPort.so --fault CMPIObjectPathFT.addKey:2 ein Demo_Port
   oxahv-provider --library ./libDemoPort.so --mof Demo.mof check)";
 
 bool hasLibrary(const Options& options) {

@@ -48,7 +48,29 @@ Reply references(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectP
 Reply callMethod(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* target,
                  const Operands& operands) {
     return request.invokeMethod(target, operands.method,
-                                argumentsFrom(broker, request, target, operands.method, operands.arguments));
+                                argumentsFrom(broker, request, target, operands.method, operands.values));
+}
+
+Reply createInstance(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* target,
+                     const Operands& operands) {
+    return request.createInstance(target, instanceFrom(broker, request, target, operands.values));
+}
+
+// Without a property list a provider sets what the instance lacks to NULL.
+Reply modifyInstance(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* target,
+                     const Operands& operands) {
+    const std::vector<std::string> named = namesOfValues(operands.values);
+    return request.modifyInstance(target, instanceFrom(broker, request, target, operands.values), &named);
+}
+
+Reply deleteInstance(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
+                     const Operands& /*operands*/) {
+    return request.deleteInstance(target);
+}
+
+Reply execQuery(EmbeddedBroker& /*broker*/, Request& request, const CMPIObjectPath* target,
+                const Operands& operands) {
+    return request.execQuery(target, operands.query, operands.language);
 }
 
 } // namespace
@@ -69,6 +91,14 @@ const std::vector<Operation>& operations() {
          "PATH: the associations that refer to it", references},
         {"cm", Target::ofInstance, Takes::method, Yields::methodResult,
          "PATH METHOD name=value ...: call a method of the instance", callMethod},
+        {"ci", Target::ofInstance, Takes::values, Yields::onePath,
+         "PATH name=value ...: create an instance; prints its path", createInstance},
+        {"mi", Target::ofInstance, Takes::values, Yields::nothing,
+         "PATH name=value ...: change these properties of the instance", modifyInstance},
+        {"di", Target::ofInstance, Takes::nothing, Yields::nothing, "PATH: delete the instance",
+         deleteInstance},
+        {"xq", Target::ofClass, Takes::query, Yields::instances, "CLASS QUERY: what the query selects",
+         execQuery},
     };
     return all;
 }

@@ -15,14 +15,16 @@ struct Operands {
     AssociationFilter filter;
     std::optional<std::vector<std::string>> properties; // the property list
     std::string method;
-    std::vector<std::string> arguments; // name=value
+    std::vector<std::string> values; // name=value: a method's arguments, an instance's properties
+    std::string query;
+    std::string language = "WQL"; // of the query
 };
 
 // What a verb is about: a class's name or an object path.
 enum class Target { ofClass, ofInstance };
 // What it takes beside that.
-enum class Takes { nothing, filter, referenceFilter, method };
-enum class Yields { paths, instances, oneInstance, methodResult };
+enum class Takes { nothing, filter, referenceFilter, method, values, query };
+enum class Yields { nothing, paths, onePath, instances, oneInstance, methodResult };
 
 struct Operation {
     const char* name;

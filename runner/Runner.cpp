@@ -33,7 +33,11 @@ Reply performed(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* 
 void printReply(const Options& options, const CMPIObjectPath* target, const Operands& operands, Yields yields,
                 const Reply& reply) {
     switch (yields) {
+    case Yields::nothing:
+        printInstances(std::cout, options.format, {});
+        break;
     case Yields::paths:
+    case Yields::onePath:
         printPaths(std::cout, options.format, reply.objectPaths);
         break;
     case Yields::instances:
@@ -85,6 +89,17 @@ void showTraces() {
         }
     });
     HVLog::HVLogger::setThreshold(0);
+}
+
+// An answer of OK with another number of results than the operation has is the provider's mistake.
+void requireOneResult(Yields yields, Reply& reply) {
+    const bool isPath = yields == Yields::onePath;
+    const std::size_t count = isPath ? reply.objectPaths.size() : reply.instances.size();
+    if (reply.ok() && (isPath || yields == Yields::oneInstance) && count != 1) {
+        reply.code = CMPI_RC_ERR_FAILED;
+        reply.message = "the provider returned " + std::to_string(count) +
+                        (isPath ? " paths" : " instances") + " in place of one";
+    }
 }
 
 } // namespace
@@ -153,11 +168,7 @@ int run(const Options& options, const Operation& operation, const Operands& oper
     const CMPIObjectPath* const target = targetOf(request, options, operation, operands);
     Reply reply = performed(broker, request, target, operation, operands);
     broker.clearFaults(); // they are the request's; what is printed is asked of the broker too
-    if (reply.ok() && operation.yields == Yields::oneInstance && reply.instances.size() != 1) {
-        reply.code = CMPI_RC_ERR_FAILED;
-        reply.message =
-            "the provider returned " + std::to_string(reply.instances.size()) + " instances in place of one";
-    }
+    requireOneResult(operation.yields, reply);
     if (!reply.ok()) {
         std::cerr << "oxahv-provider: " << codeName(reply.code)
                   << (reply.message.empty() ? "" : ": " + printable(reply.message)) << '\n';

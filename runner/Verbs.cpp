@@ -24,6 +24,11 @@ it looks like one, and a text otherwise. A text may stand in double quotes, and 
 looks like a number. With --output json the result is an array of one object {"path", "method",
 "returnValue", "parameters"}.)";
 
+constexpr const char* valuesFooter =
+    R"(With --mof, the class's declaration tells the properties' types. Of an array, each name=value
+adds an element. Without declaration a value is a number, TRUE or FALSE where it looks like one, and
+a text otherwise. A text may stand in double quotes, and has to where it looks like a number.)";
+
 void addFilters(CLI::App& command, Takes takes, AssociationFilter& filter) {
     const bool isWhole = takes == Takes::filter;
     if (isWhole) {
@@ -50,6 +55,40 @@ void addPropertyList(CLI::App& command, Operands& operands) {
         ->type_name("NAME,...");
 }
 
+// Filters, and the words that follow the target.
+void addTaken(CLI::App& command, Takes takes, Operands& operands) {
+    switch (takes) {
+    case Takes::nothing:
+        break;
+    case Takes::filter:
+    case Takes::referenceFilter:
+        addFilters(command, takes, operands.filter);
+        break;
+    case Takes::method:
+        command.add_option("METHOD", operands.method, "the method's name")->required()->type_name("");
+        command.add_option("name=value", operands.values, "an input argument")->type_name("");
+        break;
+    case Takes::values:
+        command.add_option("name=value", operands.values, "a property")->type_name("");
+        break;
+    case Takes::query:
+        command.add_option("QUERY", operands.query, "such as 'SELECT * FROM Class'")
+            ->required()
+            ->type_name("");
+        command.add_option("--language", operands.language, "the query's language")
+            ->type_name("NAME")
+            ->capture_default_str();
+        break;
+    }
+}
+
+const char* footerOf(const Operation& operation) {
+    return operation.takes == Takes::method      ? methodFooter
+           : operation.takes == Takes::values    ? valuesFooter
+           : operation.yields != Yields::nothing ? resultFooter
+                                                 : "";
+}
+
 void addOperands(CLI::App& command, const Operation& operation, Operands& operands) {
     const bool isOfClass = operation.target == Target::ofClass;
     command
@@ -57,19 +96,13 @@ void addOperands(CLI::App& command, const Operation& operation, Operands& operan
                     isOfClass ? "a class's name" : "an instance's path, such as Class.Key=\"text\",Number=3")
         ->required()
         ->type_name("");
-    if (operation.takes == Takes::filter || operation.takes == Takes::referenceFilter) {
-        addFilters(command, operation.takes, operands.filter);
-    } else if (operation.takes == Takes::method) {
-        command.add_option("METHOD", operands.method, "the method's name")->required()->type_name("");
-        command.add_option("name=value", operands.arguments, "an input argument")->type_name("");
-        command.footer(methodFooter);
-    }
-    if (operation.yields == Yields::instances || operation.yields == Yields::oneInstance) {
+    addTaken(command, operation.takes, operands);
+    const bool yieldsInstances =
+        operation.yields == Yields::instances || operation.yields == Yields::oneInstance;
+    if (yieldsInstances && operation.takes != Takes::query) { // a query names its properties itself
         addPropertyList(command, operands);
     }
-    if (operation.takes != Takes::method) {
-        command.footer(resultFooter);
-    }
+    command.footer(footerOf(operation));
 }
 
 Verb verbOf(const Operation& operation) {

@@ -272,7 +272,7 @@ Texts offered(const std::string& words) {
 } // namespace
 
 TEST(Completion, OffersWhatTheHelpShows) {
-    for (const std::string verb : {"", "ein", "ei", "gi", "an", "ai", "rn", "ri", "cm", "check"}) {
+    for (const std::string verb : {"", "ein", "ei", "gi", "an", "ai", "rn", "ri", "cm", "ci", "mi", "di", "xq", "check"}) {
         const Texts all = offered(verb + " --");
         const std::string help = run(verb + " --help").output;
         std::istringstream lines(help.substr(0, help.find("Exit status"))); // examples follow

@@ -141,6 +141,50 @@ TEST(RunnerTest, CallsMethodsWithDeclaredParameters) {
     }
 }
 
+TEST(RunnerTest, WritesInstancesAndSendsQueries) {
+    const File file("class Demo { [Key] string Text; uint8 Small; uint8 Many[]; };\n");
+    const std::string declared = test + "--mof " + file.path() + ' ';
+    const std::string path = "'Demo.Text=\"a\"'";
+    const struct {
+        std::string arguments;
+        int status;
+        const char* output;
+    } cases[] = {
+        {"ci " + path, 0, "root/cimv2:Demo.Text=\"a\"\n"},
+        {"--new-instance bare ci " + path, 0, "root/cimv2:Demo.Text=\"a\"\n"},
+        {"ci Demo Text=b Small=5", 0, "root/cimv2:Demo.Text=\"b\"\n"},
+        {"--output json mi " + path, 0, "[]\n"},
+        {"mi " + path + " small=5 Many=1 Many=2", 1,
+         "oxahv-provider: CMPI_RC_ERR_FAILED: small=5;Many=-1;\n"},
+        {"di " + path, 0, ""},
+        {"di Demo", 1, "oxahv-provider: CMPI_RC_ERR_NOT_FOUND\n"},
+        {"ci Demo Other=1", 2,
+         "oxahv-provider: class Demo has no property Other; it has Text, Small, Many\n"},
+        {"mi Demo Small=256", 2,
+         "oxahv-provider: property Small: value, column 1: 256 does not fit into uint8\n"},
+        {"mi Demo =1", 2, "oxahv-provider: property '=1' is not name=value\n"},
+    };
+    for (const auto& c : cases) {
+        const Outcome outcome = run(declared + c.arguments);
+        EXPECT_EQ(outcome.output, c.output) << c.arguments;
+        EXPECT_EQ(outcome.status, c.status) << c.arguments;
+    }
+    EXPECT_EQ(run(test + "xq Demo 'SELECT * FROM Demo'").output,
+              "instance of Demo {\n  Query = \"SELECT * FROM Demo\";\n  Language = \"WQL\";\n};\n");
+    EXPECT_NE(run(test + "xq --language CIM:CQL Demo x").output.find("\"CIM:CQL\""), std::string::npos);
+}
+
+// A terminal obeys them: a provider's text could give it another title, or more.
+TEST(RunnerTest, PrintsControlCharactersAsEscapes) {
+    const std::string call = test + "cm Demo Any $'A=\\e]0;\\u009b\\x7f\\n\xff'";
+    EXPECT_EQ(shell("bash -c \"" RUNNER " " + call + "\"").output,
+              "ReturnValue = 1;\nA = \"\\x001B]0;\\x009B\\x007F\\n\\x00FF\";\n");
+    const std::string json = shell("bash -c \"" RUNNER " --output json " + call + "\"").output;
+    EXPECT_NE(json.find(R"(\u001b]0;\u009B\u007F\n)"), std::string::npos) << json;
+    const std::string path = R"('root/cimv2:Demo.Text="\x001B]0;"')";
+    EXPECT_EQ(run(test + "ci " + path).output, unquoted(path) + '\n') << "what is printed can be read";
+}
+
 TEST(RunnerTest, PassesContextToTheProvider) {
     const File file;
     const std::string call = host + hostClasses + "--context OXAHostStateFile=" + file.path() + ' ';
@@ -160,11 +204,12 @@ TEST(RunnerTest, ShowsProgressOnATerminal) {
 }
 
 TEST(RunnerTest, HelpFitsOnAScreen) {
-    for (const std::string verb : {"", "ein", "ei", "gi", "an", "ai", "rn", "ri", "cm", "check"}) {
+    for (const std::string verb :
+         {"", "ein", "ei", "gi", "an", "ai", "rn", "ri", "cm", "ci", "mi", "di", "xq", "check"}) {
         const Outcome help = run(verb + " --help");
         EXPECT_EQ(help.status, 0);
         EXPECT_NE(help.output.find("Usage: oxahv-provider " + verb), std::string::npos);
-        EXPECT_LE(std::count(help.output.begin(), help.output.end(), '\n'), verb.empty() ? 40 : 24) << verb;
+        EXPECT_LE(std::count(help.output.begin(), help.output.end(), '\n'), verb.empty() ? 48 : 24) << verb;
         std::istringstream lines(help.output);
         for (std::string line; std::getline(lines, line);) {
             EXPECT_LE(line.size(), 100U) << line;

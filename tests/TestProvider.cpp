@@ -1,9 +1,10 @@
 // A provider library with factories of one name, and generic ones that refuse every other name but "Generic",
-// "Throws" by an exception. It returns the paths and arguments that it is given; a path of class Slow four
-// times, half a second apart.
+// "Throws" by an exception. It returns the paths, arguments and queries that it is given; a path of class
+// Slow four times, half a second apart. What a client would write is named by what it answers.
 #include <cmpimacs.h>
 
 #include <chrono>
+#include <cstdio>
 #include <cstring>
 #include <exception>
 #include <thread>
@@ -23,6 +24,51 @@ CMPIStatus enumerateInstanceNames(CMPIInstanceMI*, const CMPIContext*, const CMP
 CMPIStatus getInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*,
                        const char**) {
     CMReturn(CMPI_RC_OK);
+}
+
+const CMPIBroker* theBroker;
+
+// The new instance's path has the property Text as its key.
+CMPIStatus createInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+                          const CMPIObjectPath* path, const CMPIInstance* instance) {
+    CMPIObjectPath* const made = CMNewObjectPath(
+        theBroker, "root/cimv2", CMGetCharsPtr(CMGetClassName(path, nullptr), nullptr), nullptr);
+    const CMPIData text = CMGetProperty(instance, "Text", nullptr);
+    if (text.type != CMPI_string) {
+        CMReturn(CMPI_RC_ERR_INVALID_PARAMETER);
+    }
+    CMAddKey(made, "Text", &text.value, CMPI_string);
+    return CMReturnObjectPath(result, made);
+}
+
+// The message is what the request would change. No std::string, whose symbols would keep the library mapped.
+CMPIStatus modifyInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*,
+                          const CMPIInstance* instance, const char** properties) {
+    char text[256] = "";
+    for (; properties != nullptr && *properties != nullptr; ++properties) {
+        const CMPIData data = CMGetProperty(instance, *properties, nullptr);
+        const std::size_t size = std::strlen(text);
+        std::snprintf(text + size, sizeof text - size, "%s=%d;", *properties,
+                      data.type == CMPI_uint8 ? data.value.uint8 : -1);
+    }
+    if (text[0] == '\0') {
+        CMReturn(CMPI_RC_OK);
+    }
+    CMReturnWithChars(theBroker, CMPI_RC_ERR_FAILED, text);
+}
+
+CMPIStatus deleteInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
+                          const CMPIObjectPath* path) {
+    CMReturn(CMGetKeyCount(path, nullptr) == 1 ? CMPI_RC_OK : CMPI_RC_ERR_NOT_FOUND);
+}
+
+// One instance, whose properties are the query and its language.
+CMPIStatus execQuery(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+                     const CMPIObjectPath* path, const char* query, const char* language) {
+    CMPIInstance* const instance = CMNewInstance(theBroker, path, nullptr);
+    CMSetProperty(instance, "Query", query, CMPI_chars);
+    CMSetProperty(instance, "Language", language, CMPI_chars);
+    return CMReturnInstance(result, instance);
 }
 
 CMPIStatus invokeMethod(CMPIMethodMI*, const CMPIContext*, const CMPIResult* result, const CMPIObjectPath*,
@@ -48,12 +94,17 @@ public:
 
 } // namespace
 
-extern "C" CMPI_EXPORT CMPIInstanceMI* TestProvider_Create_InstanceMI(const CMPIBroker*, const CMPIContext*,
-                                                                      CMPIStatus*) {
+extern "C" CMPI_EXPORT CMPIInstanceMI* TestProvider_Create_InstanceMI(const CMPIBroker* broker,
+                                                                      const CMPIContext*, CMPIStatus*) {
+    theBroker = broker;
     static CMPIInstanceMIFT table = {};
     static CMPIInstanceMI mi = {nullptr, &table};
     table.enumerateInstanceNames = enumerateInstanceNames;
     table.getInstance = getInstance;
+    table.createInstance = createInstance;
+    table.modifyInstance = modifyInstance;
+    table.deleteInstance = deleteInstance;
+    table.execQuery = execQuery;
     return &mi;
 }
 

@@ -6,6 +6,8 @@
 #include "text/DateTimeText.h"
 #include "text/Integers.h"
 
+#include <Utf8.h>
+#include <cctype>
 #include <cerrno>
 #include <charconv>
 #include <cmath>
@@ -170,7 +172,7 @@ private:
         while (next() != '"') {
             if (next() == '\\') {
                 ++position_;
-                value += unescaped();
+                encoding::appendUtf8(value, unescaped());
             } else if (position_ < text_.size()) {
                 value += next();
             } else {
@@ -182,20 +184,41 @@ private:
         return value;
     }
 
-    char unescaped() const {
+    // The character after a backslash, of which the last one is still to be passed.
+    char32_t unescaped() {
         switch (next()) {
         case '"':
+            return U'"';
         case '\\':
-            return next();
+            return U'\\';
         case 'n':
-            return '\n';
+            return U'\n';
         case 'r':
-            return '\r';
+            return U'\r';
         case 't':
-            return '\t';
+            return U'\t';
+        case 'x':
+            return hexadecimal();
         default:
-            fail(position_, "expected \", \\, n, r or t after a backslash");
+            fail(position_, "expected \", \\, n, r, t or x after a backslash");
         }
+    }
+
+    // As in MOF, up to four digits are read.
+    char32_t hexadecimal() {
+        constexpr std::size_t most = 4;
+        const std::size_t start = position_ + 1;
+        std::size_t length = 0;
+        while (length < most && start + length < text_.size() &&
+               std::isxdigit(static_cast<unsigned char>(text_[start + length])) != 0) {
+            ++length;
+        }
+        const auto code = length > 0 ? std::stoul(std::string(text_.substr(start, length)), nullptr, 16) : 0;
+        if (code == 0 || !encoding::isUnicodeScalar(static_cast<char32_t>(code))) {
+            fail(start, "expected the digits of a character");
+        }
+        position_ = start + length - 1;
+        return static_cast<char32_t>(code);
     }
 
     Value textValue(std::size_t start, const std::string& text, CMPIType wanted) {

@@ -348,9 +348,11 @@ bool CheckRun::runOnce(CheckTask& task, CheckedClass& checked,
     atWork_.clear();
     unserved_.clear();
     std::cout.flush();
-    const ChildResult result = runInChild(
-        work, [&](const std::string& line) { receive(messageOf(line), checked); },
-        std::chrono::seconds(checkOptions_.timeoutSeconds));
+    const ChildResult result =
+        runInChild(work,
+                   {[&](const std::string& line) { receive(messageOf(line), checked); },
+                    [](const std::string& line) { std::cerr << line << '\n'; }},
+                   std::chrono::seconds(checkOptions_.timeoutSeconds));
     if (result.end == ChildEnd::finished) {
         return true;
     }

@@ -1,15 +1,19 @@
 #include "check/Child.h"
 
+#include "check/Processes.h"
+
 #include <Descriptor.h>
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <csignal>
 #include <cstring>
 #include <fcntl.h>
+#include <optional>
 #include <poll.h>
 #include <sys/prctl.h>
-#include <sys/syscall.h>
+#include <sys/resource.h>
 #include <sys/wait.h>
 #include <system_error>
 #include <unistd.h>
@@ -26,44 +30,139 @@ constexpr char finishedMark = '.'; // no message begins with it
     throw std::system_error(errno, std::generic_category(), what);
 }
 
-// An exception must not unwind into what the parent was doing.
-[[noreturn]] void live(const std::function<void(ChildOutput&)>& task, int output, pid_t parent) noexcept {
-    ::setpgid(0, 0);
-    // The child must not outlive a parent that is killed, however early; nor one that a terminal interrupts,
-    // which does not reach this group.
-    ::prctl(PR_SET_PDEATHSIG, SIGKILL);
-    if (::getppid() != parent) {
-        ::_exit(1);
+struct Pipe {
+    Pipe() : Pipe(makePipe()) {}
+    Descriptor input;
+    Descriptor output;
+
+private:
+    explicit Pipe(const std::array<int, 2>& ends) : input(ends[0]), output(ends[1]) {}
+    static std::array<int, 2> makePipe() {
+        std::array<int, 2> ends{};
+        if (::pipe2(ends.data(), O_CLOEXEC) != 0) {
+            fail("pipe");
+        }
+        return ends;
     }
-    ::dup2(STDERR_FILENO, STDOUT_FILENO);
-    ChildOutput out(output);
-    task(out);
-    out.send(std::string(1, finishedMark));
-    ::_exit(0); // what the parent's objects do at its end is the parent's
+};
+
+// What child and keeper write to the parent.
+struct Pipes {
+    Pipe messages;
+    Pipe errors;
+    Pipe status; // the keeper's alone: how the child has ended
+};
+
+// Dies with the parent, however early that dies. False when it is dead already.
+bool endsWithParent(pid_t parent, int signal) {
+    ::prctl(PR_SET_PDEATHSIG, signal);
+    return ::getppid() == parent;
 }
 
-// Kills and reaps the child, whatever happens to its parent. What the provider has started goes with it.
-class Process {
+// In the child
+
+// An exception must not unwind into what the parent was doing. Nothing that the parent began is ended here:
+// no destructors, no handlers of exit.
+[[noreturn]] void runTask(const std::function<void(ChildOutput&)>& task, Pipes& pipes,
+                          pid_t keeper) noexcept {
+    if (!endsWithParent(keeper, SIGKILL)) {
+        ::_exit(1);
+    }
+    const rlimit noCore = {1, 1}; // 1 keeps a handler of core dumps from being started too, unlike 0
+    ::setrlimit(RLIMIT_CORE, &noCore);
+    ::dup2(pipes.errors.output.get(), STDERR_FILENO);
+    ::dup2(STDERR_FILENO, STDOUT_FILENO);
+    pipes.errors.output.close();
+    pipes.status.output.close();
+    ChildOutput out(pipes.messages.output.get());
+    task(out);
+    out.send(std::string(1, finishedMark));
+    ::_exit(0);
+}
+
+// In the keeper
+
+// The signals that the keeper waits for in place of being struck by them.
+sigset_t keeperSignals() {
+    sigset_t signals;
+    ::sigemptyset(&signals);
+    for (const int number : {SIGCHLD, SIGTERM, SIGINT, SIGHUP, SIGQUIT}) {
+        ::sigaddset(&signals, number);
+    }
+    return signals;
+}
+
+// The status of a child that has ended, also of an orphan.
+std::optional<int> statusWhenEnded(pid_t child) {
+    std::optional<int> result;
+    int status = 0;
+    for (pid_t ended = 0; (ended = ::waitpid(-1, &status, WNOHANG)) > 0;) {
+        result = ended == child ? std::optional<int>(status) : result;
+    }
+    return result;
+}
+
+// Waits for the child's end. Killed by then are those below it, also when another signal ends the waiting:
+// the parent's death, or its order to stop.
+[[noreturn]] void keep(pid_t child, const sigset_t& signals, Pipes& pipes) {
+    std::optional<int> status;
+    int number = SIGCHLD;
+    while (!(status = statusWhenEnded(child)) && number == SIGCHLD) {
+        if (::sigwait(&signals, &number) != 0) {
+            break;
+        }
+    }
+    killDescendants();
+    const int known = status.value_or(0);
+    [[maybe_unused]] const ssize_t size = ::write(pipes.status.output.get(), &known, sizeof known);
+    ::_exit(0);
+}
+
+// The group of its own keeps a terminal's Ctrl-C from the keeper and the child: what the user interrupts is
+// the parent, and its end is theirs.
+[[noreturn]] void runKeeper(const std::function<void(ChildOutput&)>& task, Pipes& pipes,
+                            pid_t parent) noexcept {
+    ::setpgid(0, 0);
+    ::prctl(PR_SET_CHILD_SUBREAPER, 1);
+    const sigset_t signals = keeperSignals();
+    sigset_t before;
+    ::sigprocmask(SIG_BLOCK, &signals, &before);
+    const pid_t keeper = ::getpid();
+    if (!endsWithParent(parent, SIGTERM)) {
+        ::_exit(1);
+    }
+    const pid_t child = ::fork();
+    if (child == 0) {
+        ::sigprocmask(SIG_SETMASK, &before, nullptr);
+        runTask(task, pipes, keeper);
+    }
+    if (child < 0) {
+        ::_exit(1);
+    }
+    pipes.messages.output.close();
+    pipes.errors.output.close();
+    keep(child, signals, pipes);
+}
+
+// In the parent
+
+// Ends and reaps the keeper, and with it all below, whatever happens here.
+class Keeper {
 public:
-    // Both processes make the group, so that it is there for whichever needs it first.
-    explicit Process(pid_t id) : id_(id) { ::setpgid(id, id); }
-    ~Process() {
+    explicit Keeper(pid_t id) : id_(id) {}
+    ~Keeper() {
         if (id_ > 0) {
             end();
         }
     }
-    Process(const Process&) = delete;
-    Process& operator=(const Process&) = delete;
+    Keeper(const Keeper&) = delete;
+    Keeper& operator=(const Keeper&) = delete;
 
-    // Returns the status of a process that has ended by itself, or of the end that it meets here. The group
-    // keeps its number until the process is reaped.
-    int end() {
-        ::kill(-id_, SIGKILL);
-        int status = 0;
-        while (::waitpid(id_, &status, 0) < 0 && errno == EINTR) {
+    void end() {
+        ::kill(id_, SIGTERM);
+        while (::waitpid(id_, nullptr, 0) < 0 && errno == EINTR) {
         }
         id_ = -1;
-        return status;
     }
 
 private:
@@ -78,37 +177,12 @@ std::string wordsOf(int status) {
     return "exit status " + std::to_string(WEXITSTATUS(status));
 }
 
-// Reads lines until the mark, the end of the child, or silence. Of the end, the process itself tells: a pipe
-// stays open in what the child has started, and a child can close it and go on.
-class Reader {
+// Hands over the lines that come through a pipe.
+class LineReader {
 public:
-    Reader(int descriptor, int process, const std::function<void(const std::string&)>& receive)
-        : descriptor_(descriptor), process_(process), receive_(receive) {}
+    LineReader(int descriptor, std::function<void(const std::string&)> take)
+        : descriptor_(descriptor), take_(std::move(take)) {}
 
-    ChildEnd read(std::chrono::milliseconds timeout) {
-        std::array<pollfd, 2> waiting = {{{descriptor_, POLLIN, 0}, {process_, POLLIN, 0}}};
-        while (!isFinished_) {
-            const int ready = ::poll(waiting.data(), waiting.size(), static_cast<int>(timeout.count()));
-            if (ready < 0 && errno != EINTR) {
-                fail("poll");
-            }
-            if (ready == 0) {
-                return ChildEnd::hung;
-            }
-            if (ready < 0) {
-                continue;
-            }
-            if (waiting[0].revents == 0) { // then all is read
-                return ChildEnd::crashed;
-            }
-            if (!readBlock()) {
-                waiting[0].fd = -1; // is polled no more
-            }
-        }
-        return ChildEnd::finished;
-    }
-
-private:
     // False at the end of the file.
     bool readBlock() {
         std::array<char, 65536> block{};
@@ -119,25 +193,94 @@ private:
         pending_.append(block.data(), size > 0 ? static_cast<std::size_t>(size) : 0);
         std::size_t begin = 0;
         for (std::size_t end = 0; (end = pending_.find('\n', begin)) != std::string::npos; begin = end + 1) {
-            take(pending_.substr(begin, end - begin));
+            take_(pending_.substr(begin, end - begin));
         }
         pending_.erase(0, begin);
         return size != 0;
     }
 
-    void take(const std::string& line) {
-        if (!line.empty() && line.front() == finishedMark) {
-            isFinished_ = true;
-        } else {
-            receive_(line);
+    void finish() {
+        if (!pending_.empty()) {
+            take_(pending_);
+            pending_.clear();
         }
     }
 
+private:
     int descriptor_;
-    int process_;
-    const std::function<void(const std::string&)>& receive_;
+    std::function<void(const std::string&)> take_;
     std::string pending_;
+};
+
+// Reads until the mark, the end of the child, or silence. The keeper's status marks the end of the child:
+// what the child has started may hold its pipes open, and the child may close them and go on.
+class Reader {
+public:
+    Reader(Pipes& pipes, const ChildReceiver& receiver)
+        : waiting_({{{pipes.messages.input.get(), POLLIN, 0},
+                     {pipes.errors.input.get(), POLLIN, 0},
+                     {pipes.status.input.get(), POLLIN, 0}}}),
+          messages_(pipes.messages.input.get(),
+                    [this, &receiver](const std::string& line) {
+                        isFinished_ = isFinished_ || (!line.empty() && line.front() == finishedMark);
+                        if (!isFinished_) {
+                            receiver.message(line);
+                        }
+                    }),
+          errors_(pipes.errors.input.get(), receiver.error) {}
+
+    // The status is of a child that has crashed. Only messages put the end of the time off: a child may write
+    // errors for ever.
+    ChildEnd read(std::chrono::milliseconds timeout, int& status) {
+        using Clock = std::chrono::steady_clock;
+        Clock::time_point end = Clock::now() + timeout;
+        while (!isFinished_) {
+            const auto left = std::chrono::duration_cast<std::chrono::milliseconds>(end - Clock::now());
+            const int ready =
+                ::poll(waiting_.data(), waiting_.size(), static_cast<int>(std::max<long>(left.count(), 0)));
+            if (ready < 0 && errno != EINTR) {
+                fail("poll");
+            }
+            if (left.count() <= 0 && (ready == 0 || waiting_[0].revents == 0)) {
+                return ChildEnd::hung;
+            }
+            if (ready <= 0) {
+                continue;
+            }
+            const bool hasMessages = take(0, messages_);
+            end = hasMessages ? Clock::now() + timeout : end;
+            const bool hasErrors = take(1, errors_);
+            // The status comes last of all that is written, so the pipes are emptied first.
+            if (!hasMessages && !hasErrors && waiting_[2].revents != 0) {
+                [[maybe_unused]] const ssize_t size = ::read(waiting_[2].fd, &status, sizeof status);
+                return ChildEnd::crashed;
+            }
+        }
+        return ChildEnd::finished;
+    }
+
+    // What is still to be read on the standard error stream, once nobody writes any more.
+    void readErrors() {
+        while (waiting_[1].fd >= 0 && ::poll(&waiting_[1], 1, 0) > 0 && take(1, errors_)) {
+        }
+        errors_.finish();
+    }
+
+private:
+    bool take(std::size_t index, LineReader& lines) {
+        if (waiting_.at(index).revents == 0) {
+            return false;
+        }
+        if (!lines.readBlock()) {
+            waiting_.at(index).fd = -1; // is polled no more
+        }
+        return true;
+    }
+
+    std::array<pollfd, 3> waiting_;
     bool isFinished_ = false;
+    LineReader messages_;
+    LineReader errors_;
 };
 
 } // namespace
@@ -154,34 +297,27 @@ void ChildOutput::send(const std::string& line) {
     }
 }
 
-ChildResult runInChild(const std::function<void(ChildOutput&)>& task,
-                       const std::function<void(const std::string&)>& receive,
+ChildResult runInChild(const std::function<void(ChildOutput&)>& task, const ChildReceiver& receiver,
                        std::chrono::milliseconds timeout) {
-    std::array<int, 2> ends{};
-    if (::pipe2(ends.data(), O_CLOEXEC) != 0) {
-        fail("pipe");
-    }
-    const Descriptor input(ends[0]);
-    Descriptor output(ends[1]);
+    Pipes pipes;
     const pid_t parent = ::getpid();
     const pid_t id = ::fork();
     if (id < 0) {
         fail("fork");
     }
     if (id == 0) {
-        live(task, output.get(), parent);
+        runKeeper(task, pipes, parent);
     }
-    Process child(id);
-    output.close();
-    const Descriptor process(static_cast<int>(::syscall(SYS_pidfd_open, id, 0)));
-    if (process.get() < 0) {
-        fail("pidfd_open");
-    }
-    const ChildEnd end = Reader(input.get(), process.get(), receive).read(timeout);
-    if (end == ChildEnd::crashed) {
-        return {end, wordsOf(child.end())};
-    }
-    return {end, ""};
+    Keeper keeper(id);
+    pipes.messages.output.close();
+    pipes.errors.output.close();
+    pipes.status.output.close();
+    Reader reader(pipes, receiver);
+    int status = 0;
+    const ChildEnd end = reader.read(timeout, status);
+    keeper.end();
+    reader.readErrors();
+    return {end, end == ChildEnd::crashed ? wordsOf(status) : ""};
 }
 
 } // namespace oxahv::runner

@@ -31,13 +31,21 @@ struct ChildResult {
     std::string text; // of a crash: "killed by signal 11 (Segmentation fault)" or "exit status 3"
 };
 
+// What the parent does with the child's lines; both may throw, which ends the child.
+struct ChildReceiver {
+    std::function<void(const std::string& line)> message; // that the task has sent
+    std::function<void(const std::string& line)> error;   // of its standard error stream
+};
+
 // Forks, and runs the task in the child, whose standard output becomes its standard error stream: what a
-// provider prints belongs to no report. The parent's `receive` gets each line that the task sends. A child
-// that sends none for `timeout` is killed. In the end, the processes that the child has started are killed as
-// well. Only for a process of one thread. Throws std::system_error when no
-// child can be made, and whatever `receive` throws.
-ChildResult runInChild(const std::function<void(ChildOutput&)>& task,
-                       const std::function<void(const std::string&)>& receive,
+// provider prints belongs to no report. The parent gets each line that the task sends and each that it writes
+// to its standard error stream. A child that sends none for `timeout` is killed.
+//
+// Between the two is a keeper, a process that inherits all orphans below it. When the child ends, or this
+// process does, however it is killed, the keeper kills what the provider has started, also in sessions of
+// their own. Only for a process of one thread. Throws std::system_error when no child can be made, and
+// whatever the receiver throws.
+ChildResult runInChild(const std::function<void(ChildOutput&)>& task, const ChildReceiver& receiver,
                        std::chrono::milliseconds timeout);
 
 } // namespace oxahv::runner

@@ -296,7 +296,7 @@ void Examination::callMethods() {
         Operands operands;
         operands.target = names_.empty() ? client_.task().className : names_.front().path;
         operands.method = call.method;
-        operands.arguments = call.arguments;
+        operands.values = call.arguments;
         const Query query = queryOf("cm", std::move(operands));
         const std::optional<Answer> answer = client_.ask(query);
         if (answer) {

@@ -119,8 +119,11 @@ std::string textOf(const Query& query) {
     if (!operands.method.empty()) {
         text += ' ' + quoted(operands.method);
     }
-    for (const std::string& argument : operands.arguments) {
-        text += ' ' + quoted(argument);
+    for (const std::string& value : operands.values) {
+        text += ' ' + quoted(value);
+    }
+    if (!operands.query.empty()) {
+        text += ' ' + quoted(operands.query) + " --language " + quoted(operands.language);
     }
     for (const Option& option : filterOptions) {
         const std::string& value = operands.filter.*option.value;

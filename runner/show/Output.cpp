@@ -1,5 +1,6 @@
 #include "show/Output.h"
 
+#include "show/Text.h"
 #include "show/Values.h"
 
 #include <charconv>
@@ -89,9 +90,15 @@ Json jsonOf(const CMPIObjectPath* path, const std::vector<NamedValue>& values) {
             {"properties", jsonOf(values)}};
 }
 
-// A provider's texts need not be UTF-8; what is not is replaced.
+// A provider's texts need not be UTF-8; what is not is replaced. The library leaves DEL and the second set of
+// control characters as they are, which a terminal obeys.
 void print(std::ostream& out, const Json& json) {
-    out << json.dump(2, ' ', false, Json::error_handler_t::replace) << '\n';
+    out << escaped(json.dump(2, ' ', false, Json::error_handler_t::replace), 'u') << '\n';
+}
+
+// As MOF writes it, in a form that a terminal shows and does not obey.
+std::string mofText(const CMPIData& data) {
+    return escaped(valueText(data), 'x');
 }
 
 } // namespace
@@ -105,9 +112,9 @@ void printInstances(std::ostream& out, Format format, const std::vector<CMPIInst
             array.push_back(jsonOf(path, properties));
             continue;
         }
-        out << "instance of " << textOf(CMGetClassName(path, nullptr)) << " {\n";
+        out << "instance of " << escaped(textOf(CMGetClassName(path, nullptr)), 'x') << " {\n";
         for (const NamedValue& property : properties) {
-            out << "  " << property.name << " = " << valueText(property.data) << ";\n";
+            out << "  " << escaped(property.name, 'x') << " = " << mofText(property.data) << ";\n";
         }
         out << "};\n";
     }
@@ -122,7 +129,7 @@ void printPaths(std::ostream& out, Format format, const std::vector<CMPIObjectPa
         if (format == Format::json) {
             array.push_back(jsonOf(path, keysOf(path)));
         } else {
-            out << pathText(path) << '\n';
+            out << escaped(pathText(path), 'x') << '\n';
         }
     }
     if (format == Format::json) {
@@ -144,9 +151,9 @@ void printMethodResult(std::ostream& out, Format format, const CMPIObjectPath* p
                                  {"parameters", jsonOf(arguments)}}}));
         return;
     }
-    out << "ReturnValue = " << valueText(returned) << ";\n";
+    out << "ReturnValue = " << mofText(returned) << ";\n";
     for (const NamedValue& argument : arguments) {
-        out << argument.name << " = " << valueText(argument.data) << ";\n";
+        out << escaped(argument.name, 'x') << " = " << mofText(argument.data) << ";\n";
     }
 }
 
