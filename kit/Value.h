@@ -293,6 +293,9 @@ inline Value::Value(const CMPIData& value) : type_(value.type) {
     } else if (detail::readInteger(value, integer)) {
         form_ = Form::integer;
         integer_ = integer.bits;
+    } else if (value.type == CMPI_boolean || value.type == CMPI_char16) {
+        form_ = Form::integer;
+        integer_ = value.type == CMPI_boolean ? (value.value.boolean != 0 ? 1U : 0U) : value.value.char16;
     } else if (value.type == CMPI_real32 || value.type == CMPI_real64) {
         form_ = Form::real;
         real_ = value.type == CMPI_real32 ? value.value.real32 : value.value.real64;

@@ -1,0 +1,23 @@
+// `oxahv-provider new`: the first draft of a provider, as a project that can be built and tested.
+#pragma once
+
+#include "drafts/Files.h"
+#include "drafts/Model.h"
+
+#include <string>
+#include <vector>
+
+namespace oxahv::runner {
+
+struct DraftOptions {
+    std::vector<std::string> classes;
+    std::string provider; // the MI name; empty: after the first class
+    std::string folder;
+};
+
+// Writes the project, and the names of its files on the standard output. Returns the exit status; throws
+// std::runtime_error, one line, when it has written nothing.
+int runNew(const std::vector<std::string>& mofFiles, const std::string& nameSpace,
+           const DraftOptions& options);
+
+} // namespace oxahv::runner
