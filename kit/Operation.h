@@ -199,13 +199,14 @@ inline bool Operation::hasKeys(const char* className, Keys keys) const {
     detail::Status status;
     const CMPICount count = CMGetKeyCount(path_.handle(), &status);
     detail::require(status, "count the keys");
-    if (count != keys.size() || !isFor(className)) {
+    if (!isFor(className)) {
         return false;
     }
-    return std::all_of(keys.begin(), keys.end(), [this](const Key& key) {
+    const bool areSame = std::all_of(keys.begin(), keys.end(), [this](const Key& key) {
         const detail::Found sent = detail::keyOf(broker(), path_.handle(), key.name);
         return sent.isThere && detail::ValueAccess::isSame(key.value, sent);
     });
+    return areSame && count == keys.size();
 }
 
 inline Instance Operation::instance(const char* className, Keys keys) const {

@@ -60,8 +60,8 @@ public:
     /**
      * Whether another path names the same object: the same class and keys, in any order, names in any case,
      * numbers in any type. Namespaces are not compared: a client may leave them out of a reference.
-     * @throws Refusal `CMPI_RC_ERR_INVALID_PARAMETER` when a key cannot be compared: NULL, or a text where
-     * the other path has a number or reference; else the broker's status.
+     * @throws Refusal `CMPI_RC_ERR_INVALID_PARAMETER` when a key cannot be compared: NULL, or of a type that
+     * no server makes of the other path's, such as a text for a reference; else the broker's status.
      */
     bool names(const Path& other) const;
 

@@ -305,6 +305,15 @@ TEST_F(HostProviderTest, ReportsWhyATagCannotBeSaved) {
     EXPECT_EQ(content(stateFile_), saved);
     EXPECT_EQ(setTag("third"), "0");
     EXPECT_EQ(tag(), "2 \"third\"");
+
+    oxahv::EmbeddedBroker withoutFile;
+    withoutFile.setContextEntry("OXAHostStateFile", "");
+    host(withoutFile);
+    Request request(withoutFile);
+    const Reply nowhere = setTag(request, "fourth");
+    EXPECT_EQ(nowhere.code, CMPI_RC_ERR_FAILED);
+    EXPECT_NE(nowhere.message.find("OXAHostStateFile names no file"), std::string::npos) << nowhere.message;
+    EXPECT_TRUE(request.getInstance(request.objectPathFromText(detailsPath, "")).ok());
 }
 
 TEST_F(HostProviderTest, WritesDatesAsTheSameInstant) {
@@ -353,7 +362,11 @@ TEST_F(HostProviderTest, RefusesRequestsWithTheRightCode) {
     CMPIData number = {CMPI_uint64, CMPI_goodValue, {}};
     number.value.uint64 = 5;
     EXPECT_EQ(request_.invokeMethod(path(systemPath), "SetAssetTag", argument(number)).message,
-              "The asset tag is missing.");
+              "argument Tag is no text");
+    const CMPIArgs* const none = CMNewArgs(broker_.handle(), nullptr);
+    const Reply missing = request_.invokeMethod(path(systemPath), "SetAssetTag", none);
+    EXPECT_EQ(missing.code, CMPI_RC_ERR_INVALID_PARAMETER);
+    EXPECT_EQ(missing.message, "The asset tag is missing.");
 
     oxahv::EmbeddedBroker faulty;
     faulty.setContextEntry("OXAHostStateFile", "x");

@@ -153,7 +153,12 @@ TEST_F(KitRequests, MayNameAnInstanceWithKeysOfAnyType) {
     }
     EXPECT_EQ(get("1", CMPI_chars).instances.size(), 1U);
     EXPECT_EQ(get("1", CMPI_chars, "two").code, CMPI_RC_ERR_NOT_FOUND);
-    EXPECT_EQ(failureOf(get("x", CMPI_chars)), "CMPI_RC_ERR_INVALID_PARAMETER key Number is no integer");
+    for (const char* const text : {"x", "", "1x", " 1", "18446744073709551617"}) {
+        EXPECT_EQ(get(text, CMPI_chars).code, CMPI_RC_ERR_NOT_FOUND) << text;
+    }
+    value.boolean = 1;
+    EXPECT_EQ(failureOf(get(reinterpret_cast<const char*>(&value), CMPI_boolean)),
+              "CMPI_RC_ERR_INVALID_PARAMETER key Number is no integer");
     value.sint64 = -1;
     EXPECT_EQ(get(reinterpret_cast<const char*>(&value), CMPI_sint64).code, CMPI_RC_ERR_NOT_FOUND);
     value.uint64 = ~0ULL;

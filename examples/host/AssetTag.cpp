@@ -10,6 +10,7 @@
 #include <cwctype>
 #include <filesystem>
 #include <mutex>
+#include <system_error>
 
 using TK::Utils;
 
@@ -43,6 +44,11 @@ AssetTag AssetTagFile::read() const {
 }
 
 void AssetTagFile::write(const std::string& text) const {
+    if (path_.empty()) {
+        // A property file without a name would store nothing, and say nothing.
+        throw std::system_error(std::make_error_code(std::errc::invalid_argument),
+                                "OXAHostStateFile names no file");
+    }
     const std::lock_guard<TK::Mutex> lock(TK::_fileMutex);
     const std::filesystem::path folder = std::filesystem::path(path_).parent_path();
     if (!folder.empty()) {

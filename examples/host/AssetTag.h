@@ -24,7 +24,7 @@ public:
     // Throws std::system_error when the file is there but cannot be read.
     AssetTag read() const;
     // Stores the tag with this moment as its date. Makes the file, and its folder. Throws std::system_error
-    // when that fails; the file then holds what it held before.
+    // when that fails or the path is empty; the file then holds what it held before.
     void write(const std::string& text) const;
 
 private:

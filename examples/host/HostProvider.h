@@ -5,7 +5,7 @@
 
 #include <string>
 
-// Makes the provider read a machine below `root` from now on.
+// Makes the providers that are created from now on read a machine below `root`.
 void setHostRoot(const std::string& root);
 
 extern "C" CMPIInstanceMI* OXAHostProvider_Create_InstanceMI(const CMPIBroker* broker,

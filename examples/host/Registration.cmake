@@ -55,6 +55,4 @@ endforeach()
 set(oxahost_registration ${CMAKE_CURRENT_BINARY_DIR}/registration)
 foreach(file OXAHost.reg OXAHostRegistration.mof)
     configure_file(${CMAKE_CURRENT_SOURCE_DIR}/${file}.in ${oxahost_registration}/${file} @ONLY)
-    oxahv_install(FILES ${oxahost_registration}/${file}
-        DESTINATION ${CMAKE_INSTALL_DATADIR}/oxahv/registration COMPONENT example)
 endforeach()

@@ -207,25 +207,24 @@ inline bool readInteger(const CMPIData& data, Integer& integer) {
     }
 }
 
-// A number that is too large for any type of CIM is out of range, not of another type.
-inline Integer decimalOf(const Found& found, const char* chars) {
+enum class Decimal { number, notANumber, tooLarge }; // tooLarge: for any type of CIM
+
+inline Decimal readDecimal(const char* chars, Integer& integer) {
     const bool isNegative = *chars == '-';
     std::uint64_t number = 0;
     bool isTooLarge = false;
     const char* digit = isNegative ? chars + 1 : chars;
     do {
         if (*digit < '0' || *digit > '9') {
-            refuse(found, "is no integer");
+            return Decimal::notANumber;
         }
         const auto value = static_cast<std::uint64_t>(*digit - '0');
         isTooLarge = isTooLarge || number > (UINT64_MAX - value) / 10;
         number = number * 10 + value;
     } while (*++digit != '\0');
     constexpr std::uint64_t lowest = std::uint64_t{1} << 63U;
-    if (isTooLarge || (isNegative && number > lowest)) {
-        refuse(found, "is out of range");
-    }
-    return {isNegative && number != 0, isNegative ? 0 - number : number};
+    integer = {isNegative && number != 0, isNegative ? 0 - number : number};
+    return isTooLarge || (isNegative && number > lowest) ? Decimal::tooLarge : Decimal::number;
 }
 
 inline Integer integerIn(const Found& found) {
@@ -236,7 +235,10 @@ inline Integer integerIn(const Found& found) {
         if (chars == nullptr) {
             refuse(found, "is no integer");
         }
-        integer = decimalOf(found, chars);
+        const Decimal decimal = readDecimal(chars, integer);
+        if (decimal != Decimal::number) {
+            refuse(found, decimal == Decimal::tooLarge ? "is out of range" : "is no integer");
+        }
     }
     return integer;
 }

@@ -363,7 +363,14 @@ inline bool ValueAccess::isSame(const Value& value, const Found& sent) {
             return characterIn(sent) == value.integer_;
         }
         const Integer ours = integerOf(value);
-        const Integer theirs = integerIn(sent);
+        Integer theirs = {};
+        // A server may hand a number over as text: one that is no number names nothing.
+        const char* const chars = charsIn(sent);
+        if (chars == nullptr) {
+            theirs = integerIn(sent);
+        } else if (readDecimal(chars, theirs) != Decimal::number) {
+            return false;
+        }
         return ours.isNegative == theirs.isNegative && ours.bits == theirs.bits;
     }
     case Form::real:
