@@ -1,0 +1,26 @@
+// What every step of an operation works with.
+#pragma once
+
+#include "Schema.h"
+
+#include <EmbeddedBroker.h>
+
+#include <string>
+
+namespace cimxml {
+
+struct Environment {
+    oxahv::EmbeddedBroker& broker;
+    oxahv::Request& request; // owns all CMPI objects that are made on the way
+    Schema schema;
+    std::string nameSpace; // of the operation
+    std::string hostName;  // of this server, as paths name it
+};
+
+// Throws CimError with the status's code and message, if it is none of success.
+void require(const CMPIStatus& status, const std::string& what);
+
+// Empty for a null string.
+std::string textOf(const CMPIString* string);
+
+} // namespace cimxml
