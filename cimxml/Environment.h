@@ -1,6 +1,7 @@
 // What every step of an operation works with.
 #pragma once
 
+#include "Checked.h"
 #include "Schema.h"
 
 #include <EmbeddedBroker.h>
@@ -16,11 +17,5 @@ struct Environment {
     std::string nameSpace; // of the operation
     std::string hostName;  // of this server, as paths name it
 };
-
-// Throws CimError with the status's code and message, if it is none of success.
-void require(const CMPIStatus& status, const std::string& what);
-
-// Empty for a null string.
-std::string textOf(const CMPIString* string);
 
 } // namespace cimxml

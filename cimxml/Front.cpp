@@ -89,18 +89,6 @@ private:
 
 } // namespace
 
-void require(const CMPIStatus& status, const std::string& what) {
-    if (status.rc != CMPI_RC_OK) {
-        const std::string text = textOf(status.msg);
-        throw CimError(status.rc, what + (text.empty() ? "" : ": " + text));
-    }
-}
-
-std::string textOf(const CMPIString* string) {
-    const char* const chars = string != nullptr ? CMGetCharsPtr(string, nullptr) : nullptr;
-    return chars != nullptr ? chars : "";
-}
-
 Front::Front(oxahv::EmbeddedBroker& broker, std::string nameSpace)
     : broker_(broker), nameSpace_(std::move(nameSpace)) {}
 

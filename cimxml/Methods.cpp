@@ -19,8 +19,7 @@ CMPIType argumentType(const oxahv::MethodDeclaration* method, const std::string&
 
 CMPIArgs* readArguments(Environment& environment, const Call& call, const oxahv::MethodDeclaration* method) {
     CMPIStatus status = {CMPI_RC_OK, nullptr};
-    CMPIArgs* const arguments = CMNewArgs(environment.broker.handle(), &status);
-    require(status, "arguments");
+    CMPIArgs* const arguments = checked("arguments", CMNewArgs, environment.broker.handle());
     for (const Element* const argument : call.parameters) {
         const std::string name = argument->attribute("NAME");
         const std::string what = "argument " + name;
@@ -45,13 +44,12 @@ std::vector<Attribute> attributesOf(const CMPIData& data) {
 }
 
 void writeArguments(XmlWriter& writer, Environment& environment, const CMPIArgs* arguments) {
-    const CMPICount count = arguments != nullptr ? CMGetArgCount(arguments, nullptr) : 0;
+    const CMPICount count = arguments != nullptr ? checked("arguments", CMGetArgCount, arguments) : 0;
     for (CMPICount i = 0; i < count; ++i) {
-        CMPIString* name = nullptr;
-        const CMPIData data = CMGetArgAt(arguments, i, &name, nullptr);
-        std::vector<Attribute> attributes = attributesOf(data);
-        attributes.insert(attributes.begin(), {"NAME", textOf(name)});
-        writer.element("PARAMVALUE", attributes, [&] { writeValue(writer, environment, data); });
+        const NamedData argument = argumentAt(arguments, i);
+        std::vector<Attribute> attributes = attributesOf(argument.data);
+        attributes.insert(attributes.begin(), {"NAME", argument.name});
+        writer.element("PARAMVALUE", attributes, [&] { writeValue(writer, environment, argument.data); });
     }
 }
 
@@ -59,7 +57,7 @@ void writeArguments(XmlWriter& writer, Environment& environment, const CMPIArgs*
 
 void performMethod(Environment& environment, const Call& call, XmlWriter& writer) {
     const CMPIObjectPath* const path = readObjectPath(environment, *call.target);
-    const auto declared = environment.schema.find(textOf(CMGetClassName(path, nullptr)));
+    const auto declared = environment.schema.find(classNameOf(path));
     const oxahv::MethodDeclaration* const method =
         declared != nullptr ? declared->findMethod(call.name) : nullptr;
     if (declared != nullptr && method == nullptr) {

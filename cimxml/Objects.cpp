@@ -34,11 +34,8 @@ CMPIObjectPath* newPath(Environment& environment, const std::string& nameSpace,
     if (className.empty()) {
         refuse("a path without a class");
     }
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    CMPIObjectPath* const path =
-        CMNewObjectPath(environment.broker.handle(), nameSpace.c_str(), className.c_str(), &status);
-    require(status, className);
-    return path;
+    return checked(className, CMNewObjectPath, environment.broker.handle(), nameSpace.c_str(),
+                   className.c_str());
 }
 
 // The type of a key of which no class says it.
@@ -89,10 +86,6 @@ std::string onlyKeyOf(const DeclaredClass* declared) {
     return name;
 }
 
-std::string classNameOf(const CMPIObjectPath* path) {
-    return textOf(CMGetClassName(path, nullptr));
-}
-
 // One property of an instance that a client sent.
 void readProperty(Environment& environment, CMPIInstance* instance, const DeclaredClass* declared,
                   const Element& property, CMPIrc noSuchProperty) {
@@ -115,7 +108,7 @@ void readProperty(Environment& environment, CMPIInstance* instance, const Declar
 }
 
 // The path of a new instance: its class with the keys among its properties.
-CMPIObjectPath* pathOf(Environment& environment, const Element& instance, const DeclaredClass* declared) {
+CMPIObjectPath* newPathOf(Environment& environment, const Element& instance, const DeclaredClass* declared) {
     const std::string className = instance.attribute("CLASSNAME");
     CMPIObjectPath* const path = newPath(environment, environment.nameSpace, className);
     for (const Element& property : declared != nullptr ? instance.children : std::vector<Element>()) {
@@ -132,6 +125,14 @@ CMPIObjectPath* pathOf(Environment& environment, const Element& instance, const 
 }
 
 // Writing
+
+std::string hostOf(const CMPIObjectPath* path) {
+    return textOf(checked("host", CMGetHostname, path));
+}
+
+std::string nameSpaceOf(const CMPIObjectPath* path) {
+    return textOf(checked("namespace", CMGetNameSpace, path));
+}
 
 void writeNameSpace(XmlWriter& writer, const std::string& nameSpace) {
     writer.element("LOCALNAMESPACEPATH", {}, [&] {
@@ -189,10 +190,11 @@ bool isShown(const Shown& shown, Environment& environment, const DeclaredClass* 
 }
 
 void writeProperty(XmlWriter& writer, Environment& environment, const DeclaredClass* declared,
-                   const std::string& name, const CMPIData& data, const Shown& shown) {
+                   const NamedData& named, const Shown& shown) {
+    const auto& [name, data] = named;
     const oxahv::PropertyDeclaration* const property = declared != nullptr ? declared->find(name) : nullptr;
     PropertyTag tag;
-    tag.name = name;
+    tag.name = named.name;
     tag.type = data.type;
     if (property != nullptr) {
         tag.referenceClass = property->referenceClass;
@@ -211,7 +213,7 @@ void writeProperty(XmlWriter& writer, Environment& environment, const DeclaredCl
         if (property != nullptr && shown.includesQualifiers) {
             writeQualifiers(writer, property->qualifiers);
         }
-        writeValue(writer, environment, data);
+        writeValue(writer, environment, named.data);
     });
 }
 
@@ -273,13 +275,12 @@ CMPIInstance* readInstance(Environment& environment, const Element& instance, co
     const std::string className = instance.attribute("CLASSNAME");
     const auto declared = environment.schema.find(className);
     if (path == nullptr) {
-        path = pathOf(environment, instance, declared.get());
+        path = newPathOf(environment, instance, declared.get());
     } else if (!sameName(classNameOf(path), className)) {
         refuse("an instance of class " + className + " has the path of another class");
     }
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    CMPIInstance* const result = CMNewInstance(environment.broker.handle(), path, &status);
-    require(status, "class " + className);
+    CMPIInstance* const result =
+        checked("class " + className, CMNewInstance, environment.broker.handle(), path);
     for (const Element& child : instance.children) {
         if (child.name.compare(0, 8, "PROPERTY") == 0) {
             readProperty(environment, result, declared.get(), child, noSuchProperty);
@@ -290,18 +291,17 @@ CMPIInstance* readInstance(Environment& environment, const Element& instance, co
 
 void writeInstanceName(XmlWriter& writer, Environment& environment, const CMPIObjectPath* path) {
     writer.element("INSTANCENAME", {{"CLASSNAME", classNameOf(path)}}, [&] {
-        const CMPICount count = CMGetKeyCount(path, nullptr);
+        const CMPICount count = checked("keys", CMGetKeyCount, path);
         for (CMPICount i = 0; i < count; ++i) {
-            CMPIString* name = nullptr;
-            const CMPIData key = CMGetKeyAt(path, i, &name, nullptr);
-            writeKey(writer, environment, textOf(name), key);
+            const NamedData key = keyAt(path, i);
+            writeKey(writer, environment, key.name, key.data);
         }
     });
 }
 
 void writeInstancePath(XmlWriter& writer, Environment& environment, const CMPIObjectPath* path) {
-    const std::string host = textOf(CMGetHostname(path, nullptr));
-    const std::string nameSpace = textOf(CMGetNameSpace(path, nullptr));
+    const std::string host = hostOf(path);
+    const std::string nameSpace = nameSpaceOf(path);
     writer.element("INSTANCEPATH", {}, [&] {
         writer.element("NAMESPACEPATH", {}, [&] {
             writer.element("HOST", {}, [&] { writer.text(host.empty() ? environment.hostName : host); });
@@ -312,8 +312,8 @@ void writeInstancePath(XmlWriter& writer, Environment& environment, const CMPIOb
 }
 
 void writeReference(XmlWriter& writer, Environment& environment, const CMPIObjectPath* path) {
-    const std::string nameSpace = textOf(CMGetNameSpace(path, nullptr));
-    const bool isClass = CMGetKeyCount(path, nullptr) == 0;
+    const std::string nameSpace = nameSpaceOf(path);
+    const bool isClass = checked("keys", CMGetKeyCount, path) == 0;
     const auto writeName = [&] {
         if (isClass) {
             writer.element("CLASSNAME", {{"NAME", classNameOf(path)}});
@@ -321,7 +321,7 @@ void writeReference(XmlWriter& writer, Environment& environment, const CMPIObjec
             writeInstanceName(writer, environment, path);
         }
     };
-    if (!isClass && !textOf(CMGetHostname(path, nullptr)).empty()) {
+    if (!isClass && !hostOf(path).empty()) {
         writeInstancePath(writer, environment, path);
     } else if (nameSpace.empty()) {
         writeName();
@@ -335,19 +335,17 @@ void writeReference(XmlWriter& writer, Environment& environment, const CMPIObjec
 
 void writeInstance(XmlWriter& writer, Environment& environment, const CMPIInstance* instance,
                    const Shown& shown) {
-    const std::string className = classNameOf(CMGetObjectPath(instance, nullptr));
+    const std::string className = classNameOf(pathOf(instance));
     const auto declared = environment.schema.find(className);
     writer.element("INSTANCE", {{"CLASSNAME", className}}, [&] {
         if (declared != nullptr && shown.includesQualifiers) {
             writeQualifiers(writer, declared->qualifiers);
         }
-        const CMPICount count = CMGetPropertyCount(instance, nullptr);
+        const CMPICount count = checked("properties", CMGetPropertyCount, instance);
         for (CMPICount i = 0; i < count; ++i) {
-            CMPIString* string = nullptr;
-            const CMPIData data = CMGetPropertyAt(instance, i, &string, nullptr);
-            const std::string name = textOf(string);
-            if (isShown(shown, environment, declared.get(), name)) {
-                writeProperty(writer, environment, declared.get(), name, data, shown);
+            const NamedData property = propertyAt(instance, i);
+            if (isShown(shown, environment, declared.get(), property.name)) {
+                writeProperty(writer, environment, declared.get(), property, shown);
             }
         }
     });

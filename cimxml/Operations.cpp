@@ -60,7 +60,7 @@ class Union {
 public:
     void add(const Reply& reply) {
         for (CMPIInstance* const instance : reply.instances) {
-            if (isNew(CMGetObjectPath(instance, nullptr))) {
+            if (isNew(pathOf(instance))) {
                 instances.push_back(instance);
             }
         }
@@ -119,7 +119,7 @@ void enumerateInstances(const Parameters& parameters, XmlWriter& writer) {
     });
     for (const CMPIInstance* const instance : results.instances) {
         writer.element("VALUE.NAMEDINSTANCE", {}, [&] {
-            writeInstanceName(writer, environment, CMGetObjectPath(instance, nullptr));
+            writeInstanceName(writer, environment, pathOf(instance));
             writeInstance(writer, environment, instance, selection.shown);
         });
     }
@@ -158,7 +158,7 @@ void createInstance(const Parameters& parameters, XmlWriter& writer) {
     Environment& environment = parameters.environment();
     const CMPIInstance* const instance = readInstance(
         environment, instanceIn(parameters.required("NewInstance")), nullptr, CMPI_RC_ERR_INVALID_PARAMETER);
-    const CMPIObjectPath* const path = CMGetObjectPath(instance, nullptr);
+    const CMPIObjectPath* const path = pathOf(instance);
     const Reply reply = environment.request.createInstance(path, instance);
     require(reply);
     // Of a provider that returns no path, the new instance has the one that the client gave it.
@@ -188,7 +188,7 @@ void deleteInstance(const Parameters& parameters, XmlWriter& /*writer*/) {
 // The declared property; nothing for a class that is not declared. Throws CimError where its class lacks it.
 std::optional<oxahv::PropertyDeclaration> declarationOf(Environment& environment, const CMPIObjectPath* path,
                                                         const std::string& name) {
-    const auto declared = environment.schema.find(textOf(CMGetClassName(path, nullptr)));
+    const auto declared = environment.schema.find(classNameOf(path));
     if (declared == nullptr) {
         return std::nullopt;
     }
@@ -208,10 +208,9 @@ void getProperty(const Parameters& parameters, XmlWriter& writer) {
     const Reply reply = environment.request.getInstance(path, &names);
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     const CMPIData data = CMGetProperty(onlyInstance(reply), name.c_str(), &status);
-    if (!isDeclared) {
+    // A declared property that the provider left out is a NULL.
+    if (!isDeclared || status.rc != CMPI_RC_ERR_NO_SUCH_PROPERTY) {
         require(status, "property " + name);
-    }
-    if (status.rc == CMPI_RC_OK) {
         writeValue(writer, environment, data);
     }
 }
@@ -228,9 +227,8 @@ void setProperty(const Parameters& parameters, XmlWriter& /*writer*/) {
                                           : static_cast<CMPIType>(CMPI_null);
         data = readValue(environment, *value, type, "property " + name);
     }
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    CMPIInstance* const instance = CMNewInstance(environment.broker.handle(), path, &status);
-    require(status, "property " + name);
+    CMPIInstance* const instance =
+        checked("property " + name, CMNewInstance, environment.broker.handle(), path);
     require(CMSetProperty(instance, name.c_str(), CMIsNullValue(data) ? nullptr : &data.value, data.type),
             "property " + name);
     const std::vector<std::string> names = {name};
@@ -243,7 +241,7 @@ void writeObjects(const Parameters& parameters, XmlWriter& writer, const Reply& 
     Environment& environment = parameters.environment();
     for (const CMPIInstance* const instance : require(reply).instances) {
         writer.element("VALUE.OBJECTWITHPATH", {}, [&] {
-            writeInstancePath(writer, environment, CMGetObjectPath(instance, nullptr));
+            writeInstancePath(writer, environment, pathOf(instance));
             writeInstance(writer, environment, instance, shown);
         });
     }

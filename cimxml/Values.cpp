@@ -143,11 +143,9 @@ CMPIInstance* embeddedInstance(Environment& environment, const std::string& text
 }
 
 CMPIData readArray(Environment& environment, const Element& array, CMPIType type, const std::string& what) {
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
     CMPIData data = {arrayOf(type), CMPI_goodValue, {}};
-    data.value.array =
-        CMNewArray(environment.broker.handle(), static_cast<CMPICount>(array.children.size()), type, &status);
-    require(status, what);
+    data.value.array = checked(what, CMNewArray, environment.broker.handle(),
+                               static_cast<CMPICount>(array.children.size()), type);
     CMPICount index = 0;
     for (const Element& child : array.children) {
         if (child.name != "VALUE.NULL") { // elements are NULL at first
@@ -259,13 +257,12 @@ CMPIData valueFromText(Environment& environment, const std::string& text, CMPITy
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     switch (type) {
     case CMPI_string:
-        data.value.string = CMNewString(environment.broker.handle(), text.c_str(), &status);
-        require(status, what);
+        data.value.string = checked(what, CMNewString, environment.broker.handle(), text.c_str());
         return data;
     case CMPI_dateTime:
         data.value.dateTime =
             CMNewDateTimeFromChars(environment.broker.handle(), std::string(trimmed(text)).c_str(), &status);
-        if (status.rc != CMPI_RC_OK) {
+        if (status.rc != CMPI_RC_OK || data.value.dateTime == nullptr) {
             refuse(what, text, type);
         }
         return data;
@@ -324,9 +321,9 @@ void writeValue(XmlWriter& writer, Environment& environment, const CMPIData& dat
     }
     const bool isReference = elementType(data.type) == CMPI_ref;
     writer.element(isReference ? "VALUE.REFARRAY" : "VALUE.ARRAY", {}, [&] {
-        const CMPICount count = CMGetArrayCount(data.value.array, nullptr);
+        const CMPICount count = checked("array", CMGetArrayCount, data.value.array);
         for (CMPICount i = 0; i < count; ++i) {
-            const CMPIData element = CMGetArrayElementAt(data.value.array, i, nullptr);
+            const CMPIData element = checked("array element", CMGetArrayElementAt, data.value.array, i);
             if (CMIsNullValue(element)) {
                 writer.element("VALUE.NULL", {});
             } else {
@@ -370,7 +367,7 @@ std::string plainText(const CMPIData& data) {
     case CMPI_chars:
         return data.value.chars != nullptr ? data.value.chars : "";
     case CMPI_dateTime:
-        return textOf(CMGetStringFormat(data.value.dateTime, nullptr));
+        return textOf(checked("date", CMGetStringFormat, data.value.dateTime));
     default:
         return oxahv::valueText(data); // MOF writes booleans and integers the same way
     }
