@@ -20,7 +20,7 @@ std::string_view trimmed(std::string_view text) {
                                            : std::string_view();
 }
 
-// The parts of a header's value, without blanks around them.
+// The parts of a header's value, without blanks around them. They live as long as the text.
 std::vector<std::string_view> split(std::string_view text, char separator) {
     std::vector<std::string_view> parts;
     for (std::size_t begin = 0; begin <= text.size();) {
@@ -64,10 +64,15 @@ std::string percentDecoded(std::string_view text) {
     return result;
 }
 
+std::string valueOf(const HttpRequest& request, std::string_view header, const char* otherwise) {
+    const std::string* const value = request.find(header);
+    return value != nullptr ? *value : otherwise;
+}
+
 // What stands before the names of extension headers: RFC 2774 lets the client choose two digits.
 std::string extensionPrefix(const HttpRequest& request) {
-    const std::string* const man = request.find("Man");
-    const std::vector<std::string_view> parts = split(man != nullptr ? *man : "", ';');
+    const std::string man = valueOf(request, "Man", "");
+    const std::vector<std::string_view> parts = split(man, ';');
     if (unquoted(parts.front()) != extension) {
         throw HttpError(510, "", "an M-POST request without the extension " + std::string(extension));
     }
@@ -79,8 +84,8 @@ std::string extensionPrefix(const HttpRequest& request) {
 }
 
 void requireXml(const HttpRequest& request) {
-    const std::string* const type = request.find("Content-Type");
-    const std::vector<std::string_view> parts = split(type != nullptr ? *type : "application/xml", ';');
+    const std::string type = valueOf(request, "Content-Type", "application/xml");
+    const std::vector<std::string_view> parts = split(type, ';');
     const std::string_view charset = parameterOf(parts, "charset");
     const bool isXml = sameName(parts.front(), "application/xml") || sameName(parts.front(), "text/xml");
     const std::string* const encoding = request.find("Content-Encoding");
