@@ -3,6 +3,7 @@
 #include "Operations.h"
 #include "Runner.h"
 #include "check/Check.h"
+#include "serve/Serve.h"
 #include "show/Text.h"
 
 #include <CLI/CLI.hpp>
@@ -124,6 +125,9 @@ const std::vector<Verb>& verbs() {
             rows.push_back(verbOf(operation));
         }
         rows.push_back({"check", "find out what the provider does wrong", true, declareCheck});
+#ifdef OXAHV_HAS_SERVE
+        rows.push_back({"serve", "answer CIM clients over HTTP until Ctrl-C", true, declareServe});
+#endif
         return rows;
     }();
     return all;

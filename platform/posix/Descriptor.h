@@ -17,6 +17,13 @@ public:
     bool isOpen() const { return number_ >= 0; }
     int get() const { return number_; }
 
+    // Leaves it open, for the caller to close.
+    int release() {
+        const int number = number_;
+        number_ = -1;
+        return number;
+    }
+
     // Closes it early. Returns false when that fails: some file systems report a failed write only now.
     bool close() {
         const int number = number_;

@@ -1,0 +1,462 @@
+#include "Operations.h"
+
+#include "ClassElements.h"
+#include "Failure.h"
+#include "Objects.h"
+#include "Parameters.h"
+#include "Values.h"
+
+#include <Names.h>
+
+#include <algorithm>
+#include <iterator>
+#include <set>
+
+namespace cimxml {
+
+namespace {
+
+using encoding::sameName;
+using oxahv::Reply;
+
+// What a request for instances says of what is to be shown of them. Without LocalOnly the inherited
+// properties are shown too: the default of the standard, TRUE, would hide the keys of most classes, and the
+// parameter is deprecated for instances.
+struct Selection {
+    explicit Selection(const Parameters& parameters) : names(parameters.names("PropertyList")) {
+        shown.localOnly = parameters.boolean("LocalOnly", false);
+        shown.includesQualifiers = parameters.boolean("IncludeQualifiers", false);
+        shown.includesClassOrigin = parameters.boolean("IncludeClassOrigin", false);
+        shown.properties = list();
+    }
+    Selection(const Selection&) = delete;
+    Selection& operator=(const Selection&) = delete;
+
+    const std::vector<std::string>* list() const { return names ? &*names : nullptr; }
+
+    std::optional<std::vector<std::string>> names;
+    Shown shown;
+};
+
+CMPIObjectPath* classPath(const Parameters& parameters, const std::string& className) {
+    const Environment& environment = parameters.environment();
+    return environment.request.objectPath(environment.nameSpace, className);
+}
+
+const CMPIInstance* onlyInstance(const Reply& reply) {
+    require(reply);
+    if (reply.instances.size() != 1) {
+        throw CimError(CMPI_RC_ERR_FAILED, "the provider returned " + std::to_string(reply.instances.size()) +
+                                               " instances in place of one");
+    }
+    return reply.instances.front();
+}
+
+// Enumerations
+
+// The results of an enumeration of a class and of the classes that derive from it, each of which may have a
+// provider of its own. A provider of the superclass may have returned some of them already.
+class Union {
+public:
+    void add(const Reply& reply) {
+        for (CMPIInstance* const instance : reply.instances) {
+            if (isNew(pathOf(instance))) {
+                instances.push_back(instance);
+            }
+        }
+        for (CMPIObjectPath* const path : reply.objectPaths) {
+            if (isNew(path)) {
+                paths.push_back(path);
+            }
+        }
+    }
+
+    std::vector<CMPIInstance*> instances;
+    std::vector<CMPIObjectPath*> paths;
+
+private:
+    bool isNew(const CMPIObjectPath* path) { return seen_.insert(oxahv::pathText(path)).second; }
+
+    std::set<std::string> seen_;
+};
+
+bool isRefusal(const Reply& reply) {
+    return !reply.isServed || reply.code == CMPI_RC_ERR_NOT_SUPPORTED ||
+           reply.code == CMPI_RC_ERR_INVALID_CLASS;
+}
+
+// `ask` sends the request for one class.
+template <class Ask>
+Union enumerate(const Parameters& parameters, const std::string& className, const Ask& ask) {
+    Union results;
+    const Reply first = ask(classPath(parameters, className));
+    bool isServed = !isRefusal(first);
+    if (isServed) {
+        results.add(require(first));
+    }
+    for (const std::string& subclass : parameters.environment().schema.subclassesOf(className, true)) {
+        const Reply reply = ask(classPath(parameters, subclass));
+        if (!isRefusal(reply)) {
+            results.add(require(reply));
+            isServed = true;
+        }
+    }
+    if (!isServed) {
+        require(first);
+    }
+    return results;
+}
+
+void enumerateInstances(const Parameters& parameters, XmlWriter& writer) {
+    const std::string className = parameters.requiredClassName("ClassName");
+    Environment& environment = parameters.environment();
+    Selection selection(parameters);
+    if (!parameters.boolean("DeepInheritance", true)) {
+        selection.shown.declaredBy = className;
+    }
+    const Union results = enumerate(parameters, className, [&](const CMPIObjectPath* path) {
+        return environment.request.enumerateInstances(path, selection.list());
+    });
+    for (const CMPIInstance* const instance : results.instances) {
+        writer.element("VALUE.NAMEDINSTANCE", {}, [&] {
+            writeInstanceName(writer, environment, pathOf(instance));
+            writeInstance(writer, environment, instance, selection.shown);
+        });
+    }
+}
+
+void enumerateInstanceNames(const Parameters& parameters, XmlWriter& writer) {
+    const std::string className = parameters.requiredClassName("ClassName");
+    Environment& environment = parameters.environment();
+    const Union results = enumerate(parameters, className, [&](const CMPIObjectPath* path) {
+        return environment.request.enumerateInstanceNames(path);
+    });
+    for (const CMPIObjectPath* const path : results.paths) {
+        writeInstanceName(writer, environment, path);
+    }
+}
+
+// Single instances
+
+void getInstance(const Parameters& parameters, XmlWriter& writer) {
+    const CMPIObjectPath* const path = parameters.instanceName("InstanceName");
+    const Selection selection(parameters);
+    Environment& environment = parameters.environment();
+    const Reply reply = environment.request.getInstance(path, selection.list());
+    writeInstance(writer, environment, onlyInstance(reply), selection.shown);
+}
+
+const Element& instanceIn(const Element& parent) {
+    const Element* const instance = parent.child("INSTANCE");
+    if (instance == nullptr) {
+        throw CimError(CMPI_RC_ERR_INVALID_PARAMETER, parent.name + " without INSTANCE");
+    }
+    return *instance;
+}
+
+void createInstance(const Parameters& parameters, XmlWriter& writer) {
+    Environment& environment = parameters.environment();
+    const CMPIInstance* const instance = readInstance(
+        environment, instanceIn(parameters.required("NewInstance")), nullptr, CMPI_RC_ERR_INVALID_PARAMETER);
+    const CMPIObjectPath* const path = pathOf(instance);
+    const Reply reply = environment.request.createInstance(path, instance);
+    require(reply);
+    // Of a provider that returns no path, the new instance has the one that the client gave it.
+    writeInstanceName(writer, environment, reply.objectPaths.empty() ? path : reply.objectPaths.front());
+}
+
+void modifyInstance(const Parameters& parameters, XmlWriter& /*writer*/) {
+    Environment& environment = parameters.environment();
+    const Element* const named = parameters.required("ModifiedInstance").child("VALUE.NAMEDINSTANCE");
+    const Element* const name = named != nullptr ? named->child("INSTANCENAME") : nullptr;
+    if (name == nullptr) {
+        throw CimError(CMPI_RC_ERR_INVALID_PARAMETER, "parameter ModifiedInstance is no VALUE.NAMEDINSTANCE");
+    }
+    const CMPIObjectPath* const path = readInstanceName(environment, *name, environment.nameSpace);
+    const CMPIInstance* const instance =
+        readInstance(environment, instanceIn(*named), path, CMPI_RC_ERR_NO_SUCH_PROPERTY);
+    const auto names = parameters.names("PropertyList");
+    require(environment.request.modifyInstance(path, instance, names ? &*names : nullptr));
+}
+
+void deleteInstance(const Parameters& parameters, XmlWriter& /*writer*/) {
+    require(parameters.environment().request.deleteInstance(parameters.instanceName("InstanceName")));
+}
+
+// Single properties, of which the instance's provider is asked
+
+// The declared property; nothing for a class that is not declared. Throws CimError where its class lacks it.
+std::optional<oxahv::PropertyDeclaration> declarationOf(Environment& environment, const CMPIObjectPath* path,
+                                                        const std::string& name) {
+    const auto declared = environment.schema.find(classNameOf(path));
+    if (declared == nullptr) {
+        return std::nullopt;
+    }
+    const oxahv::PropertyDeclaration* const property = declared->find(name);
+    if (property == nullptr) {
+        throw CimError(CMPI_RC_ERR_NO_SUCH_PROPERTY, "class " + declared->name + " has no property " + name);
+    }
+    return *property;
+}
+
+void getProperty(const Parameters& parameters, XmlWriter& writer) {
+    Environment& environment = parameters.environment();
+    const CMPIObjectPath* const path = parameters.instanceName("InstanceName");
+    const std::string name = parameters.requiredText("PropertyName");
+    const bool isDeclared = declarationOf(environment, path, name).has_value();
+    const std::vector<std::string> names = {name};
+    const Reply reply = environment.request.getInstance(path, &names);
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    const CMPIData data = CMGetProperty(onlyInstance(reply), name.c_str(), &status);
+    // A declared property that the provider left out is a NULL.
+    if (!isDeclared || status.rc != CMPI_RC_ERR_NO_SUCH_PROPERTY) {
+        require(status, "property " + name);
+        writeValue(writer, environment, data);
+    }
+}
+
+void setProperty(const Parameters& parameters, XmlWriter& /*writer*/) {
+    Environment& environment = parameters.environment();
+    const CMPIObjectPath* const path = parameters.instanceName("InstanceName");
+    const std::string name = parameters.requiredText("PropertyName");
+    const auto declaration = declarationOf(environment, path, name);
+    const Element* const value = parameters.find("NewValue");
+    CMPIData data = {CMPI_string, CMPI_nullValue, {}};
+    if (value != nullptr) {
+        const CMPIType type = declaration ? valueTypeOf(declaration->type, declaration->qualifiers)
+                                          : static_cast<CMPIType>(CMPI_null);
+        data = readValue(environment, *value, type, "property " + name);
+    }
+    CMPIInstance* const instance =
+        checked("property " + name, CMNewInstance, environment.broker.handle(), path);
+    require(CMSetProperty(instance, name.c_str(), CMIsNullValue(data) ? nullptr : &data.value, data.type),
+            "property " + name);
+    const std::vector<std::string> names = {name};
+    require(environment.request.modifyInstance(path, instance, &names));
+}
+
+// Several instances
+
+void writeObjects(const Parameters& parameters, XmlWriter& writer, const Reply& reply, const Shown& shown) {
+    Environment& environment = parameters.environment();
+    for (const CMPIInstance* const instance : require(reply).instances) {
+        writer.element("VALUE.OBJECTWITHPATH", {}, [&] {
+            writeInstancePath(writer, environment, pathOf(instance));
+            writeInstance(writer, environment, instance, shown);
+        });
+    }
+}
+
+void writePaths(const Parameters& parameters, XmlWriter& writer, const Reply& reply) {
+    Environment& environment = parameters.environment();
+    for (const CMPIObjectPath* const path : require(reply).objectPaths) {
+        writer.element("OBJECTPATH", {}, [&] { writeInstancePath(writer, environment, path); });
+    }
+}
+
+// The instance at one end of associations.
+CMPIObjectPath* objectName(const Parameters& parameters) {
+    if (parameters.required("ObjectName").child("CLASSNAME") != nullptr) {
+        throw CimError(CMPI_RC_ERR_NOT_SUPPORTED, "associations between classes are not supported");
+    }
+    return parameters.instanceName("ObjectName");
+}
+
+oxahv::AssociationFilter filterOf(const Parameters& parameters) {
+    return {parameters.className("AssocClass"), parameters.className("ResultClass"), parameters.text("Role"),
+            parameters.text("ResultRole")};
+}
+
+void associators(const Parameters& parameters, XmlWriter& writer) {
+    const Selection selection(parameters);
+    const Reply reply = parameters.environment().request.associators(objectName(parameters),
+                                                                     filterOf(parameters), selection.list());
+    writeObjects(parameters, writer, reply, selection.shown);
+}
+
+void associatorNames(const Parameters& parameters, XmlWriter& writer) {
+    writePaths(
+        parameters, writer,
+        parameters.environment().request.associatorNames(objectName(parameters), filterOf(parameters)));
+}
+
+void references(const Parameters& parameters, XmlWriter& writer) {
+    const Selection selection(parameters);
+    const Reply reply = parameters.environment().request.references(objectName(parameters),
+                                                                    filterOf(parameters), selection.list());
+    writeObjects(parameters, writer, reply, selection.shown);
+}
+
+void referenceNames(const Parameters& parameters, XmlWriter& writer) {
+    writePaths(parameters, writer,
+               parameters.environment().request.referenceNames(objectName(parameters), filterOf(parameters)));
+}
+
+// The class that a query is about, which decides who is asked: the word after FROM.
+std::string classInQuery(const std::string& query) {
+    constexpr const char* space = " \t\r\n";
+    std::string before;
+    for (std::size_t begin = query.find_first_not_of(space); begin != std::string::npos;) {
+        const std::size_t end = std::min(query.find_first_of(space, begin), query.size());
+        const std::string word = query.substr(begin, end - begin);
+        if (sameName(before, "from")) {
+            return word;
+        }
+        before = word;
+        begin = query.find_first_not_of(space, end);
+    }
+    throw CimError(CMPI_RC_ERR_INVALID_QUERY, "the query names no class: there is no FROM in it");
+}
+
+void execQuery(const Parameters& parameters, XmlWriter& writer) {
+    const std::string language = parameters.requiredText("QueryLanguage");
+    const std::string query = parameters.requiredText("Query");
+    const Reply reply = parameters.environment().request.execQuery(classPath(parameters, classInQuery(query)),
+                                                                   query, language);
+    writeObjects(parameters, writer, reply, {});
+}
+
+// Classes and qualifiers
+
+std::shared_ptr<const DeclaredClass> declaredClass(const Parameters& parameters, const std::string& name,
+                                                   CMPIrc otherwise) {
+    auto declared = parameters.environment().schema.find(name);
+    if (declared == nullptr) {
+        throw CimError(otherwise, "class " + name + " is not declared");
+    }
+    return declared;
+}
+
+Shown classSelection(const Parameters& parameters, const std::vector<std::string>* properties) {
+    Shown shown;
+    shown.localOnly = parameters.boolean("LocalOnly", true);
+    shown.includesQualifiers = parameters.boolean("IncludeQualifiers", true);
+    shown.includesClassOrigin = parameters.boolean("IncludeClassOrigin", false);
+    shown.properties = properties;
+    return shown;
+}
+
+void getClass(const Parameters& parameters, XmlWriter& writer) {
+    const std::string name = parameters.requiredClassName("ClassName");
+    const auto names = parameters.names("PropertyList");
+    writeClass(writer, *declaredClass(parameters, name, CMPI_RC_ERR_NOT_FOUND),
+               classSelection(parameters, names ? &*names : nullptr));
+}
+
+std::vector<std::string> enumeratedClasses(const Parameters& parameters) {
+    const std::string name = parameters.className("ClassName");
+    if (!name.empty()) {
+        declaredClass(parameters, name, CMPI_RC_ERR_INVALID_CLASS);
+    }
+    return parameters.environment().schema.subclassesOf(name, parameters.boolean("DeepInheritance", false));
+}
+
+void enumerateClasses(const Parameters& parameters, XmlWriter& writer) {
+    const Shown shown = classSelection(parameters, nullptr);
+    for (const std::string& name : enumeratedClasses(parameters)) {
+        writeClass(writer, *declaredClass(parameters, name, CMPI_RC_ERR_FAILED), shown);
+    }
+}
+
+void enumerateClassNames(const Parameters& parameters, XmlWriter& writer) {
+    for (const std::string& name : enumeratedClasses(parameters)) {
+        writer.element("CLASSNAME", {{"NAME", name}});
+    }
+}
+
+void getQualifier(const Parameters& parameters, XmlWriter& writer) {
+    const std::string name = parameters.requiredText("QualifierName");
+    for (const auto& type : parameters.environment().broker.qualifierTypes()) {
+        if (sameName(type.name, name)) {
+            writeQualifierType(writer, type);
+            return;
+        }
+    }
+    throw CimError(CMPI_RC_ERR_NOT_FOUND, "qualifier " + name + " is not declared");
+}
+
+void enumerateQualifiers(const Parameters& parameters, XmlWriter& writer) {
+    for (const auto& type : parameters.environment().broker.qualifierTypes()) {
+        writeQualifierType(writer, type);
+    }
+}
+
+struct Operation {
+    const char* name;
+    void (*perform)(const Parameters& parameters, XmlWriter& writer);
+    bool hasResult; // an IRETURNVALUE, which may be empty
+    std::vector<const char*> parameters;
+};
+
+const std::vector<Operation>& operations() {
+    static const std::vector<Operation> all = {
+        {"GetInstance",
+         getInstance,
+         true,
+         {"InstanceName", "LocalOnly", "IncludeQualifiers", "IncludeClassOrigin", "PropertyList"}},
+        {"EnumerateInstances",
+         enumerateInstances,
+         true,
+         {"ClassName", "LocalOnly", "DeepInheritance", "IncludeQualifiers", "IncludeClassOrigin",
+          "PropertyList"}},
+        {"EnumerateInstanceNames", enumerateInstanceNames, true, {"ClassName"}},
+        {"CreateInstance", createInstance, true, {"NewInstance"}},
+        {"ModifyInstance", modifyInstance, false, {"ModifiedInstance", "IncludeQualifiers", "PropertyList"}},
+        {"DeleteInstance", deleteInstance, false, {"InstanceName"}},
+        {"GetProperty", getProperty, true, {"InstanceName", "PropertyName"}},
+        {"SetProperty", setProperty, false, {"InstanceName", "PropertyName", "NewValue"}},
+        {"Associators",
+         associators,
+         true,
+         {"ObjectName", "AssocClass", "ResultClass", "Role", "ResultRole", "IncludeQualifiers",
+          "IncludeClassOrigin", "PropertyList"}},
+        {"AssociatorNames",
+         associatorNames,
+         true,
+         {"ObjectName", "AssocClass", "ResultClass", "Role", "ResultRole"}},
+        {"References",
+         references,
+         true,
+         {"ObjectName", "ResultClass", "Role", "IncludeQualifiers", "IncludeClassOrigin", "PropertyList"}},
+        {"ReferenceNames", referenceNames, true, {"ObjectName", "ResultClass", "Role"}},
+        {"ExecQuery", execQuery, true, {"QueryLanguage", "Query"}},
+        {"GetClass",
+         getClass,
+         true,
+         {"ClassName", "LocalOnly", "IncludeQualifiers", "IncludeClassOrigin", "PropertyList"}},
+        {"EnumerateClasses",
+         enumerateClasses,
+         true,
+         {"ClassName", "DeepInheritance", "LocalOnly", "IncludeQualifiers", "IncludeClassOrigin"}},
+        {"EnumerateClassNames", enumerateClassNames, true, {"ClassName", "DeepInheritance"}},
+        {"GetQualifier", getQualifier, true, {"QualifierName"}},
+        {"EnumerateQualifiers", enumerateQualifiers, true, {}},
+    };
+    return all;
+}
+
+} // namespace
+
+const Reply& require(const Reply& reply) {
+    if (!reply.ok()) {
+        throw CimError(reply.code, reply.message);
+    }
+    return reply;
+}
+
+void performOperation(Environment& environment, const Call& call, XmlWriter& writer) {
+    const auto operation =
+        std::find_if(operations().begin(), operations().end(),
+                     [&](const Operation& candidate) { return sameName(candidate.name, call.name); });
+    if (operation == operations().end()) {
+        throw CimError(CMPI_RC_ERR_NOT_SUPPORTED, "operation " + call.name + " is not supported");
+    }
+    const Parameters parameters(environment, call, operation->parameters);
+    if (operation->hasResult) {
+        writer.element("IRETURNVALUE", {}, [&] { operation->perform(parameters, writer); });
+    } else {
+        operation->perform(parameters, writer);
+    }
+}
+
+} // namespace cimxml
