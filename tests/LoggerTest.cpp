@@ -27,9 +27,9 @@ void log(int level, const std::string& text = "text") {
     HVLogger::logLevelMessage("function", "File.cpp", 3, "Test", level, nullptr, 0, 0, text);
 }
 
-class TheLogger : public testing::Test {
+class LoggerTest : public testing::Test {
 protected:
-    ~TheLogger() override {
+    ~LoggerTest() override {
         HVLogger::reset();
         std::remove(path_.c_str());
     }
@@ -44,7 +44,7 @@ protected:
 
 } // namespace
 
-TEST_F(TheLogger, WritesByThresholdAndByLevelCodeOnceItHasASink) {
+TEST_F(LoggerTest, WritesByThresholdAndLevelOnceItHasASink) {
     keepLevels();
     log(6000); // there is no threshold
     HVLogger::setSink(nullptr);
@@ -65,7 +65,7 @@ TEST_F(TheLogger, WritesByThresholdAndByLevelCodeOnceItHasASink) {
     EXPECT_EQ(levels_, std::vector<int>({1000, 4000, 4001, 4002}));
 }
 
-TEST_F(TheLogger, HandsTheWholeMessageToTheSink) {
+TEST_F(LoggerTest, PassesTheWholeMessageToTheSink) {
     std::vector<std::string> seen;
     HVLogger::setSink([&](const HVLog::Message& m) {
         seen.push_back(std::string(m.function) + '|' + m.file + '|' + std::to_string(m.line) + '|' + m.text);
@@ -78,7 +78,7 @@ TEST_F(TheLogger, HandsTheWholeMessageToTheSink) {
                                               "function|File.cpp|3|text", "trace 3000 Test text"}));
 }
 
-TEST_F(TheLogger, DropsWhatItsSinkLogsAndSurvivesWhatItThrows) {
+TEST_F(LoggerTest, DropsMessagesOfItsSinkAndPassesOnExceptions) {
     int calls = 0;
     HVLogger::setSink([&](const HVLog::Message&) {
         ++calls;
@@ -91,7 +91,7 @@ TEST_F(TheLogger, DropsWhatItsSinkLogsAndSurvivesWhatItThrows) {
     EXPECT_EQ(calls, 2);
 }
 
-TEST_F(TheLogger, LeavesNoFileOpenWhenMemoryRunsOut) {
+TEST_F(LoggerTest, LeavesNoFileOpenWhenMemoryRunsOut) {
     const auto nextDescriptor = [] {
         const int next = ::dup(STDIN_FILENO);
         ::close(next);
@@ -110,7 +110,7 @@ TEST_F(TheLogger, LeavesNoFileOpenWhenMemoryRunsOut) {
     }
 }
 
-TEST_F(TheLogger, OutlivesItsReader) {
+TEST_F(LoggerTest, SurvivesAClosedPipe) {
     ASSERT_EQ(::mkfifo(path_.c_str(), 0600), 0);
     const int reader = ::open(path_.c_str(), O_RDONLY | O_NONBLOCK);
     HVLogger::setFileSink(path_);
@@ -119,7 +119,7 @@ TEST_F(TheLogger, OutlivesItsReader) {
     log(4000); // SIGPIPE would end this program, now or when it is let through again
 }
 
-TEST_F(TheLogger, BeginsANewLineAfterAFullDisk) {
+TEST_F(LoggerTest, BeginsANewLineAfterAFullDisk) {
     HVLogger::setFileSink(path_);
     HVLogger::setThreshold(0);
     rlimit earlier{};
@@ -141,7 +141,7 @@ TEST_F(TheLogger, BeginsANewLineAfterAFullDisk) {
               "log 4000 Test cut he\nlog 4000 Test whole\nlog 4000 Test cut a\nlog 4000 Test last\n");
 }
 
-TEST_F(TheLogger, LogsInChildrenForkedWhileAnotherThreadLogs) {
+TEST_F(LoggerTest, WorksAfterAForkBesideAThread) {
     std::atomic<bool> isInSink{false};
     std::atomic<bool> mayLeave{false};
     HVLogger::setSink([&](const HVLog::Message& message) {
@@ -182,7 +182,7 @@ TEST_F(TheLogger, LogsInChildrenForkedWhileAnotherThreadLogs) {
     EXPECT_EQ(status, 0);
 }
 
-TEST_F(TheLogger, WritesWholeLinesToAFileFromManyThreads) {
+TEST_F(LoggerTest, WritesWholeLinesFromManyThreads) {
     HVLogger::setFileSink(path_);
     HVLogger::setThreshold(0);
     std::vector<std::thread> threads;
@@ -210,7 +210,7 @@ TEST_F(TheLogger, WritesWholeLinesToAFileFromManyThreads) {
     EXPECT_EQ(count, 401);
 }
 
-TEST(AMessageBuffer, IsEmptyAndSoundAgainAfterEachText) {
+TEST(MessageBufferTest, StartsAnewAfterEachText) {
     HVMessageBuffer buffer;
     const char* const none = nullptr;
     for (int round = 0; round < 2; ++round) { // with and without a stream from before
@@ -228,7 +228,7 @@ TEST(AMessageBuffer, IsEmptyAndSoundAgainAfterEachText) {
     EXPECT_EQ(buffer.str(buffer), "");
 }
 
-TEST(AMessageBuffer, ThrowsInsteadOfHandingOutAShortText) {
+TEST(MessageBufferTest, ThrowsWhenMemoryRunsOut) {
     const std::string text(300, 'x');
     HVMessageBuffer buffer;
     std::ostream& stream = buffer << "a" << 1;
