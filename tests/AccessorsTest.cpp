@@ -63,9 +63,9 @@ struct Objects {
     const CMPIObjectPath* path;
 };
 
-class Accessors : public BrokerTest {
+class AccessorsTest : public BrokerTest {
 protected:
-    Accessors() {
+    AccessorsTest() {
         CMPIValue value = {};
         store("Null", nullptr, CMPI_string);
         store("Text", "text", CMPI_chars);
@@ -158,7 +158,7 @@ protected:
 
 } // namespace
 
-TEST_F(Accessors, ReadAValueOrLeaveTheOutputAlone) {
+TEST_F(AccessorsTest, GettersReadTheValueOrKeepTheOutput) {
     for (const Getter& getter : allGetters(objects_)) {
         expectValue(getter);
         expectNothing(getter, "Missing");
@@ -170,7 +170,7 @@ TEST_F(Accessors, ReadAValueOrLeaveTheOutputAlone) {
     }
 }
 
-TEST_F(Accessors, ReadWideTextsThatTheLocaleHas) {
+TEST_F(AccessorsTest, GettersConvertWideTexts) {
     store("Text", "", CMPI_chars);
     for (const Getter& getter : textGetters<std::wstring>(objects_, "L\"\"", chars)) {
         expectValue(getter);
@@ -189,7 +189,7 @@ TEST_F(Accessors, ReadWideTextsThatTheLocaleHas) {
     }
 }
 
-TEST_F(Accessors, ReadTheMemberAskedForWhateverTheType) {
+TEST_F(AccessorsTest, GettersIgnoreTheTypeOfTheValue) {
     const auto retype = [](CMPIData& data, CMPIStatus& /*status*/) { data.type = CMPI_sint8; };
     Otherwise<&CMPIInstanceFT::getProperty> instance(instance_, retype);
     Otherwise<&CMPIArgsFT::getArg> args(args_, retype);
@@ -202,7 +202,7 @@ TEST_F(Accessors, ReadTheMemberAskedForWhateverTheType) {
     EXPECT_EQ(wide & 0xFFFFU, 60000U);
 }
 
-TEST_F(Accessors, DoNotTakeAValueThatComesWithAnError) {
+TEST_F(AccessorsTest, GettersRejectAValueWithAnError) {
     Otherwise<&CMPIInstanceFT::getProperty> instance(instance_);
     Otherwise<&CMPIArgsFT::getArg> args(args_);
     Otherwise<&CMPIObjectPathFT::getKey> path(path_);
@@ -220,7 +220,7 @@ TEST_F(Accessors, DoNotTakeAValueThatComesWithAnError) {
 }
 
 // Of a text's characters the status counts, but not with an argument; of a date's text it never does.
-TEST_F(Accessors, TakeATextThatComesWithAnErrorInTwoPlaces) {
+TEST_F(AccessorsTest, TwoGettersAcceptATextWithAnError) {
     Otherwise<&CMPIStringFT::getCharPtr> string(newString("text"));
     const auto alter = [&](CMPIData& data, CMPIStatus& /*status*/) { data.value.string = string.handle(); };
     Otherwise<&CMPIInstanceFT::getProperty> instance(instance_, alter);
@@ -241,7 +241,7 @@ TEST_F(Accessors, TakeATextThatComesWithAnErrorInTwoPlaces) {
     expectValue(dateGetter(dated.handle()));
 }
 
-TEST_F(Accessors, TellTheTextsOfHandlesAndMakeInstances) {
+TEST_F(AccessorsTest, ConvertsStringsAndCreatesInstances) {
     CMPIString* const string = newString("text");
     EXPECT_EQ(logOf([&] { EXPECT_EQ(PU::convertToString(string), "text"); }), chars);
     EXPECT_EQ(logOf([&] { PU::convertToString(nullptr); }), noConversion);
@@ -258,7 +258,7 @@ TEST_F(Accessors, TellTheTextsOfHandlesAndMakeInstances) {
     }
 }
 
-TEST_F(Accessors, HandEveryTypeOverWithItsCode) {
+TEST_F(AccessorsTest, SettersPassEveryTypeWithItsCode) {
     const auto checkProperty = [&](auto value, const std::string& type, const std::string& text) {
         expectSet([&] { PU::setProperty(instance_, "Name", value); }, "setProperty", type, text);
     };
@@ -288,7 +288,7 @@ TEST_F(Accessors, HandEveryTypeOverWithItsCode) {
     checkProperty(-0.25, "real64", "-0.25");
 }
 
-TEST_F(Accessors, SetTextsAsTheyAreOrAsDates) {
+TEST_F(AccessorsTest, SettersPassTextsOrDates) {
     const auto set = [&](std::string value, bool isDate, const oxahv::Fault& fault = {CMPI_RC_OK}) {
         return logOf([&] { PU::setProperty(broker_.handle(), instance_, "Name", value, isDate); }, "*",
                      fault);
@@ -310,7 +310,7 @@ TEST_F(Accessors, SetTextsAsTheyAreOrAsDates) {
     EXPECT_EQ(logOf([&] { PU::setProperty(erring.handle(), instance_, "Name", text, true); }), made);
 }
 
-TEST_F(Accessors, SetWideTextsThatTheLocaleHas) {
+TEST_F(AccessorsTest, SettersConvertWideTexts) {
     const std::string converted = passing(utility, "WStringToAString");
     const auto check = [&](std::wstring value, const std::string& traces, const std::string& text) {
         expectSet([&] { PU::setKeyProperty(path_, "Name", value); }, "addKey", "chars", text, traces);

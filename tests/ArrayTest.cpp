@@ -8,7 +8,7 @@ namespace {
 
 using Strings = std::vector<std::string>;
 
-class Arrays : public BrokerTest {
+class ArrayTest : public BrokerTest {
 protected:
     const ThreadLocale plain_{"C"};
     CMPIInstance* const instance_ =
@@ -96,7 +96,7 @@ protected:
 
 } // namespace
 
-TEST_F(Arrays, AreFilledUntilTheBrokerRefusesAnElement) {
+TEST_F(ArrayTest, SetterStopsAtTheFirstRefusedElement) {
     checkSetter<unsigned char>({0, 7, 255}, "uint8", {"0", "7", "255"});
     checkSetter<unsigned short>({0, 256, 65535}, "uint16", {"0", "256", "65535"});
     checkSetter<std::string>({std::string("cut\0off", 7), "", "t\xC3\xA4"}, "string",
@@ -107,7 +107,7 @@ TEST_F(Arrays, AreFilledUntilTheBrokerRefusesAnElement) {
     checkSetter<std::wstring>({L"t\u00E4", L"", L"c"}, "string", {"t\xC3\xA4", "", "c"});
 }
 
-TEST_F(Arrays, OfPasswordsDoNotTellWhereTheyLie) {
+TEST_F(ArrayTest, SetterHidesTheAddressOfPasswords) {
     Strings texts = {"secret"};
     const auto shows = [&](auto& value, const char* name, const void* shown) {
         const std::string list = parameters(shown, broker_.handle(), name);
@@ -128,7 +128,7 @@ TEST_F(Arrays, OfPasswordsDoNotTellWhereTheyLie) {
     logOfSetting(texts, nullptr, broker_.handle()); // does not end the process
 }
 
-TEST_F(Arrays, AreReadWithoutTheElementsThatCannotBe) {
+TEST_F(ArrayTest, GetterSkipsUnreadableElements) {
     std::vector<unsigned short> numbers = {1, 65535};
     Strings texts = {"a", "c"};
     PU::setProperty(broker_.handle(), instance_, "Numbers", numbers);
@@ -184,7 +184,7 @@ TEST_F(Arrays, AreReadWithoutTheElementsThatCannotBe) {
     EXPECT_EQ(got<std::string>("Texts", instance.handle()), "{ \"\" } true");
 }
 
-TEST_F(Arrays, ThatAreNoneAreNotRead) {
+TEST_F(ArrayTest, GetterRejectsNonArrays) {
     CMSetProperty(instance_, "Null", nullptr, CMPI_uint16A);
     CMSetProperty(instance_, "Scalar", "text", CMPI_chars);
     for (const char* const name : {"Null", "Scalar", "Missing"}) {

@@ -12,7 +12,7 @@ using oxahv::Request;
 
 namespace {
 
-class ABroker : public testing::Test {
+class ObjectsTest : public testing::Test {
 protected:
     CMPIString* string(const char* text) { return CMNewString(handle_, text, nullptr); }
 
@@ -26,7 +26,7 @@ protected:
 
 } // namespace
 
-TEST_F(ABroker, RefusesForeignHandlesAndMissingTexts) {
+TEST_F(ObjectsTest, RejectForeignHandlesAndNullTexts) {
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     EXPECT_EQ(CMNewInstance(handle_, reinterpret_cast<CMPIObjectPath*>(string("")), &status), nullptr);
     EXPECT_EQ(status.rc, CMPI_RC_ERR_INVALID_HANDLE);
@@ -35,7 +35,7 @@ TEST_F(ABroker, RefusesForeignHandlesAndMissingTexts) {
     EXPECT_EQ(CMAddKey(path_, nullptr, "v", CMPI_chars).rc, CMPI_RC_ERR_INVALID_PARAMETER);
 }
 
-TEST_F(ABroker, KeepsValuesByNameIgnoringCaseInTheirOrder) {
+TEST_F(ObjectsTest, KeepKeysInOrderIgnoringCase) {
     char text[] = "first";
     CMPIValue value = {};
     value.uint16 = 7;
@@ -62,7 +62,7 @@ TEST_F(ABroker, KeepsValuesByNameIgnoringCaseInTheirOrder) {
     EXPECT_EQ(oxahv::pathText(other), "root:Other");
 }
 
-TEST_F(ABroker, KeepsNullAsNull) {
+TEST_F(ObjectsTest, KeepNullValues) {
     CMAddKey(path_, "Key", nullptr, CMPI_uint16);
     const CMPIData key = CMGetKeyAt(path_, 0, nullptr, nullptr);
     EXPECT_TRUE(key.type == CMPI_uint16 && key.state == (CMPI_keyValue | CMPI_nullValue));
@@ -80,7 +80,7 @@ TEST_F(ABroker, KeepsNullAsNull) {
     EXPECT_EQ(oxahv::valueText({CMPI_chars, CMPI_goodValue, {}}), "?");
 }
 
-TEST_F(ABroker, ChecksInstancesAgainstTheirClass) {
+TEST_F(ObjectsTest, ChecksInstancesAgainstTheirClass) {
     broker_.declare(ClassDeclaration("Demo_Base").key("Id", CMPI_uint16).property("Text", CMPI_string));
     broker_.declare(ClassDeclaration("Demo").superclass("demo_base").property("Numbers", CMPI_uint8A));
     CMPIStatus status = {CMPI_RC_OK, nullptr};
@@ -107,7 +107,7 @@ TEST_F(ABroker, ChecksInstancesAgainstTheirClass) {
     EXPECT_EQ(CMClassPathIsA(handle_, request_.objectPath("root", "Demo_Base"), "Demo", nullptr), 0);
 }
 
-TEST_F(ABroker, LetsOnlyKeysAndWantedPropertiesThroughAFilter) {
+TEST_F(ObjectsTest, FilterDropsOtherProperties) {
     CMAddKey(path_, "Id", "x", CMPI_chars);
     CMPIInstance* instance = CMNewInstance(handle_, path_, nullptr);
     const auto set = [&](std::initializer_list<const char*> names) {
@@ -129,7 +129,7 @@ TEST_F(ABroker, LetsOnlyKeysAndWantedPropertiesThroughAFilter) {
     EXPECT_EQ(oxahv::pathText(CMGetObjectPath(instance, nullptr)), "root:Demo.Id=\"x\"");
 }
 
-TEST_F(ABroker, HoldsArraysWithNullElements) {
+TEST_F(ObjectsTest, ArraysHoldNullElements) {
     CMPIValue value = {};
     value.real32 = 1.5F;
     CMPIValue whole = {};
@@ -155,7 +155,7 @@ TEST_F(ABroker, HoldsArraysWithNullElements) {
     EXPECT_EQ(CMNewArray(handle_, 1, CMPI_uint8A, nullptr), nullptr);
 }
 
-TEST_F(ABroker, ReadsAndWritesDatesAndIntervals) {
+TEST_F(ObjectsTest, ConvertsDatesAndIntervals) {
     struct {
         const char* text;
         bool isInterval;
@@ -213,7 +213,7 @@ TEST_F(ABroker, ReadsAndWritesDatesAndIntervals) {
     }
 }
 
-TEST_F(ABroker, FreesWithARequestWhatWasNotClonedOrReleased) {
+TEST_F(ObjectsTest, RequestFreesItsObjects) {
     const LiveObjects before = broker_.liveObjects();
     CMPIInstance* clone = nullptr;
     {
@@ -245,7 +245,7 @@ TEST_F(ABroker, FreesWithARequestWhatWasNotClonedOrReleased) {
     EXPECT_NE(CMGetContextEntryCount(request_.context(), nullptr), 0U) << "a request's context stays its own";
 }
 
-TEST_F(ABroker, TellsAboutObjectsAndMakesMessages) {
+TEST_F(ObjectsTest, DescribesObjectsAndFormatsMessages) {
     EXPECT_EQ(textOf(handle_->eft->getType(handle_, path_, nullptr)), "CMPIObjectPath");
     EXPECT_NE(handle_->eft->isOfType(handle_, string("x"), "CMPIString", nullptr), 0);
     EXPECT_EQ(textOf(handle_->eft->toString(handle_, path_, nullptr)), "root:Demo");
@@ -273,7 +273,7 @@ TEST_F(ABroker, TellsAboutObjectsAndMakesMessages) {
     EXPECT_EQ(handle_->eft->trace(handle_, CMPI_LEV_INFO, nullptr, "trace", nullptr).rc, CMPI_RC_ERR_FAILED);
 }
 
-TEST_F(ABroker, LendsTheOperatingSystemsThreadsAndMemory) {
+TEST_F(ObjectsTest, OffersThreadsAndMemory) {
     const CMPIBrokerExtFT* const x = handle_->xft;
     struct Shared {
         const CMPIBrokerExtFT* x;

@@ -282,7 +282,7 @@ private:
 
 } // namespace
 
-TEST_F(EverySlot, SurvivesNullArgumentsAndWantOfMemory) {
+TEST_F(EverySlot, SurvivesNullArgumentsAndOutOfMemory) {
     const Request request(broker_);
     const CMPIObjectPath* const path = CMNewObjectPath(broker, "root", "Demo", nullptr);
     const auto enumerate = [&] {

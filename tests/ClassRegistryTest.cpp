@@ -28,11 +28,11 @@ void expectAsTheChain(const std::string& text) {
     ASSERT_EQ(ProviderUtilities::extend_getClassId(name), chain(name, 119)) << name;
 }
 
-class ClassRegistry : public BrokerTest {};
+class ClassRegistryTest : public BrokerTest {};
 
-class Ancestry : public BrokerTest {
+class AncestryTest : public BrokerTest {
 protected:
-    Ancestry() {
+    AncestryTest() {
         broker_.declare(oxahv::ClassDeclaration("CIM_Port"));
         broker_.declare(oxahv::ClassDeclaration("Demo_Port").superclass("CIM_Port"));
         broker_.declare(oxahv::ClassDeclaration("Demo_Disk"));
@@ -68,7 +68,7 @@ protected:
 
 } // namespace
 
-TEST_F(ClassRegistry, KnowsTheClassesOfBothTables) {
+TEST_F(ClassRegistryTest, KnowsTheClassesOfBothTables) {
     ASSERT_EQ(TK::classCount, 133U);
     EXPECT_EQ(chain("OXATK_NICTeam", 0), 150); // as OXATK_Partition
     EXPECT_EQ(chain("OXATK_CMMEthernetSystemDevice", 119), 180);
@@ -82,7 +82,7 @@ TEST_F(ClassRegistry, KnowsTheClassesOfBothTables) {
 }
 
 // Callers keep class ids, so none may ever change: a sum over all rows (64 bit FNV-1a of ids and names).
-TEST_F(ClassRegistry, KeepsItsIds) {
+TEST_F(ClassRegistryTest, NeverChangesAnId) {
     unsigned long long sum = 0xCBF29CE484222325U;
     for (const TK::ClassEntry& entry : TK::classTable) {
         for (const char c : std::to_string(entry.id) + entry.name) {
@@ -92,7 +92,7 @@ TEST_F(ClassRegistry, KeepsItsIds) {
     EXPECT_EQ(sum, 0xEAB88D90EA28EDCCU);
 }
 
-TEST_F(ClassRegistry, AnswersAsAChainOfComparisonsForEveryEdit) {
+TEST_F(ClassRegistryTest, AnswersLikeAChainOfComparisons) {
     const std::string letters = "_aZ5-\x80\xC4\xB1";
     for (const TK::ClassEntry& entry : TK::classTable) {
         const std::string name = entry.name;
@@ -113,7 +113,7 @@ TEST_F(ClassRegistry, AnswersAsAChainOfComparisonsForEveryEdit) {
 
 // In Turkish, I is the capital of a dotless i, which is the byte 0xFD, and i the small letter of a dotted I,
 // which is 0xDD.
-TEST_F(ClassRegistry, AnswersAsAChainOfComparisonsInTurkish) {
+TEST_F(ClassRegistryTest, AnswersLikeAChainOfComparisonsInTurkish) {
     const ThreadLocale turkish("tr_TR.ISO-8859-9");
     if (strcasecmp("i", "\xDD") != 0) {
         GTEST_SKIP() << "a sanitizer's strcasecmp, which knows ASCII alone";
@@ -134,7 +134,7 @@ TEST_F(ClassRegistry, AnswersAsAChainOfComparisonsInTurkish) {
     EXPECT_GT(known, 100);
 }
 
-TEST_F(ClassRegistry, ComparesTextsIgnoringCase) {
+TEST_F(ClassRegistryTest, ComparesTextsIgnoringCase) {
     EXPECT_TRUE(ProviderUtilities::textEqual("aBc", "AbC"));
     EXPECT_FALSE(ProviderUtilities::textEqual("abc", "abc "));
     EXPECT_FALSE(ProviderUtilities::textEqual(nullptr, nullptr));
@@ -142,7 +142,7 @@ TEST_F(ClassRegistry, ComparesTextsIgnoringCase) {
     EXPECT_FALSE(ProviderUtilities::textEqual("", nullptr));
 }
 
-TEST_F(ClassRegistry, TellsTheClassOfAnObjectPath) {
+TEST_F(ClassRegistryTest, FindsTheClassOfAnObjectPath) {
     const CMPIObjectPath* const real = request_.objectPath("root/cimv2", "oxatk_Fan");
     const auto check = [&](const CMPIObjectPath* path, int id, const std::string& log) {
         EXPECT_EQ(logOf([&] { EXPECT_EQ(ProviderUtilities::getClassId(path), id); }), log);
@@ -166,7 +166,7 @@ TEST_F(ClassRegistry, TellsTheClassOfAnObjectPath) {
     check(unnamed.handle(), 0, "getClassName\n");
 }
 
-TEST_F(Ancestry, IsWhatTheBrokerSays) {
+TEST_F(AncestryTest, AsksTheBroker) {
     EXPECT_FALSE(related({}));
     EXPECT_EQ(log_, "");
     EXPECT_FALSE(related({"Demo_Disk", "Demo_Missing"}));
@@ -176,7 +176,7 @@ TEST_F(Ancestry, IsWhatTheBrokerSays) {
     EXPECT_FALSE(ProviderUtilities::areClassesRelated(broker_.handle(), "root", "Demo_Port", "CIM_Port"));
 }
 
-TEST_F(Ancestry, IsNoneWhenTheBrokerFails) {
+TEST_F(AncestryTest, FindsNoneWhenTheBrokerFails) {
     broker_.injectFault("classPathIsA", anError);
     EXPECT_FALSE(related({"Demo_Port"}));
     // A candidate without a path does not end the list.

@@ -46,7 +46,7 @@ static_assert(!std::is_copy_constructible_v<TK::Mutex>);
 
 } // namespace
 
-TEST(ADate, ReadsBackFromItsTextForEveryValueOfEveryField) {
+TEST(DateTimeTest, ReadsBackEveryValueOfEveryField) {
     std::mt19937 random(5);
     const auto any = [&] { return static_cast<unsigned char>(random()); };
     for (int value = 0; value <= USHRT_MAX; ++value) {
@@ -68,7 +68,7 @@ TEST(ADate, ReadsBackFromItsTextForEveryValueOfEveryField) {
     }
 }
 
-TEST(ADate, IsReadFromNoOtherText) {
+TEST(DateTimeTest, RejectsOtherTexts) {
     for (const char* const text :
          {"", "1970-01-01", "1970-01-01 00:00:0", "970-01-01 00:00:00", "1970/01/01 00:00:00",
           " 1970-01-01 00:00:00", "1970-01-01 00:00:00 ", "-1970-01-01 00:00:00", "65536-01-01 00:00:00",
@@ -83,7 +83,7 @@ TEST(ADate, IsReadFromNoOtherText) {
     }
 }
 
-TEST(AMutex, IsHeldByOneThreadAtATime) {
+TEST(MutexTest, IsHeldByOneThreadAtATime) {
     TK::Mutex mutex;
     const auto isFree = [&mutex] {
         bool taken = false;

@@ -43,7 +43,7 @@ extern "C" __attribute__((visibility("default"))) FILE* fopen64(const char* path
     return nullptr;
 }
 
-TEST(TheHost, OffersVirtualMachinesWithADeviceAndWithoutTheServer) {
+TEST(HostProbeTest, NeedsTheDeviceAndNoServer) {
     struct : std::stringbuf {
         int flushes = 0;
         int sync() override { return ++flushes, 0; }
@@ -64,7 +64,7 @@ TEST(TheHost, OffersVirtualMachinesWithADeviceAndWithoutTheServer) {
     EXPECT_EQ(output.flushes, 0);
 }
 
-TEST(LocalisedTexts, AreInTheLanguageAndTheEncodingOfTheThread) {
+TEST(LocalisedTextTest, HasLanguageAndEncodingOfTheThread) {
     const std::wstring key = L"The asset tag holds characters that are not allowed.";
     const std::pair<const char*, const char*> rows[] = {
         {"C", "The asset tag holds characters that are not allowed."},
@@ -77,7 +77,7 @@ TEST(LocalisedTexts, AreInTheLanguageAndTheEncodingOfTheThread) {
     EXPECT_TRUE(loggerCalls().empty());
 }
 
-TEST(LocalisedTexts, StayUntilTheirThreadHasAskedForEightMore) {
+TEST(LocalisedTextTest, StaysValidForSevenMoreCalls) {
     // All made before: a text made later could come to lie, and be right, where a freed result was.
     std::vector<std::wstring> keys;
     std::vector<std::string> expected;

@@ -10,6 +10,7 @@
 #include <clocale>
 #include <csignal>
 #include <ctime>
+#include <future>
 #include <sys/resource.h>
 
 using oxahv::KeyMode;
@@ -425,4 +426,20 @@ TEST_F(HostProviderTest, SurvivesEveryFailureOfBrokerMemoryAndLogger) {
         EXPECT_GT(failures, 15U) << "what a reply cannot do without";
     }
     EXPECT_EQ(broker_.liveObjects().total(), before) << "nothing outlives its request";
+}
+
+TEST_F(HostProviderTest, ServesSeveralRequestsAtOnce) {
+    std::vector<std::future<void>> clients;
+    for (int client = 0; client < 4; ++client) {
+        clients.push_back(std::async(std::launch::async, [this] {
+            for (int round = 0; round < 10; ++round) {
+                Request request(broker_);
+                EXPECT_TRUE(setTag(request, "Büro").ok());
+                EXPECT_TRUE(request.getInstance(request.objectPathFromText(detailsPath, "")).ok());
+                EXPECT_TRUE(request.associatorNames(request.objectPathFromText(osPath, "")).ok());
+            }
+        }));
+    }
+    clients.clear();
+    EXPECT_EQ(tag(), "40 \"Büro\"");
 }

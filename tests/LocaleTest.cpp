@@ -23,7 +23,7 @@ const std::wstring german = L"Das Inventarkennzeichen enth\u00E4lt unzul\u00E4ss
 
 } // namespace
 
-TEST(ALocalisedText, IsInTheLanguageOfTheThreadsMessages) {
+TEST(LocaleTest, TextIsInTheLanguageOfTheThread) {
     const struct {
         const char* locale;
         int mask;
@@ -52,7 +52,7 @@ TEST(ALocalisedText, IsInTheLanguageOfTheThreadsMessages) {
     }
 }
 
-TEST(ALocalisedText, IsTheKeyWhenThereIsNone) {
+TEST(LocaleTest, UnknownTextIsItsKey) {
     const ThreadLocale locale("de_DE.UTF-8");
     // Under the empty key a catalogue holds its header, and a NUL would cut a key down to one that exists.
     for (const std::wstring& key :

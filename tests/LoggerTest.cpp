@@ -1,14 +1,13 @@
+// The logger: which messages it writes, where to, and what it survives.
 #include "FailingMemory.h"
+#include "ScratchFolder.h"
 
 #include "HVLogger.h"
 #include "HVMessageBuffer.h"
 
 #include <atomic>
-#include <cstdio>
 #include <fcntl.h>
-#include <fstream>
-#include <gtest/gtest.h>
-#include <sstream>
+#include <future>
 #include <stdexcept>
 #include <sys/resource.h>
 #include <sys/stat.h>
@@ -27,24 +26,24 @@ void log(int level, const std::string& text = "text") {
     HVLogger::logLevelMessage("function", "File.cpp", 3, "Test", level, nullptr, 0, 0, text);
 }
 
-class TheLogger : public testing::Test {
+class LoggerTest : public testing::Test, protected ScratchFolder {
 protected:
-    ~TheLogger() override {
-        HVLogger::reset();
-        std::remove(path_.c_str());
-    }
+    ~LoggerTest() override { HVLogger::reset(); }
 
     void keepLevels() {
         HVLogger::setSink([this](const HVLog::Message& message) { levels_.push_back(message.level); });
     }
+    void writeToFile() {
+        HVLogger::setFileSink(path());
+        HVLogger::setThreshold(0);
+    }
 
     std::vector<int> levels_;
-    const std::string path_ = testing::TempDir() + "oxahv-logger-test-" + std::to_string(::getpid());
 };
 
 } // namespace
 
-TEST_F(TheLogger, WritesByThresholdAndByLevelCodeOnceItHasASink) {
+TEST_F(LoggerTest, WritesByThresholdAndLevelOnceItHasASink) {
     keepLevels();
     log(6000); // there is no threshold
     HVLogger::setSink(nullptr);
@@ -65,7 +64,7 @@ TEST_F(TheLogger, WritesByThresholdAndByLevelCodeOnceItHasASink) {
     EXPECT_EQ(levels_, std::vector<int>({1000, 4000, 4001, 4002}));
 }
 
-TEST_F(TheLogger, HandsTheWholeMessageToTheSink) {
+TEST_F(LoggerTest, PassesTheWholeMessageToTheSink) {
     std::vector<std::string> seen;
     HVLogger::setSink([&](const HVLog::Message& m) {
         seen.push_back(std::string(m.function) + '|' + m.file + '|' + std::to_string(m.line) + '|' + m.text);
@@ -78,7 +77,7 @@ TEST_F(TheLogger, HandsTheWholeMessageToTheSink) {
                                               "function|File.cpp|3|text", "trace 3000 Test text"}));
 }
 
-TEST_F(TheLogger, DropsWhatItsSinkLogsAndSurvivesWhatItThrows) {
+TEST_F(LoggerTest, DropsMessagesOfItsSinkAndPassesOnExceptions) {
     int calls = 0;
     HVLogger::setSink([&](const HVLog::Message&) {
         ++calls;
@@ -91,7 +90,7 @@ TEST_F(TheLogger, DropsWhatItsSinkLogsAndSurvivesWhatItThrows) {
     EXPECT_EQ(calls, 2);
 }
 
-TEST_F(TheLogger, LeavesNoFileOpenWhenMemoryRunsOut) {
+TEST_F(LoggerTest, LeavesNoFileOpenWhenMemoryRunsOut) {
     const auto nextDescriptor = [] {
         const int next = ::dup(STDIN_FILENO);
         ::close(next);
@@ -102,7 +101,7 @@ TEST_F(TheLogger, LeavesNoFileOpenWhenMemoryRunsOut) {
     for (unsigned int n = 1; hasFailed; ++n) {
         failing::allocation(n);
         try {
-            HVLogger::setFileSink(path_);
+            HVLogger::setFileSink(path());
         } catch (const std::bad_alloc&) {
         }
         hasFailed = failing::ended();
@@ -110,18 +109,16 @@ TEST_F(TheLogger, LeavesNoFileOpenWhenMemoryRunsOut) {
     }
 }
 
-TEST_F(TheLogger, OutlivesItsReader) {
-    ASSERT_EQ(::mkfifo(path_.c_str(), 0600), 0);
-    const int reader = ::open(path_.c_str(), O_RDONLY | O_NONBLOCK);
-    HVLogger::setFileSink(path_);
-    HVLogger::setThreshold(0);
+TEST_F(LoggerTest, SurvivesAClosedPipe) {
+    ASSERT_EQ(::mkfifo(path().c_str(), 0600), 0);
+    const int reader = ::open(path().c_str(), O_RDONLY | O_NONBLOCK);
+    writeToFile();
     ::close(reader);
     log(4000); // SIGPIPE would end this program, now or when it is let through again
 }
 
-TEST_F(TheLogger, BeginsANewLineAfterAFullDisk) {
-    HVLogger::setFileSink(path_);
-    HVLogger::setThreshold(0);
+TEST_F(LoggerTest, BeginsANewLineAfterAFullDisk) {
+    writeToFile();
     rlimit earlier{};
     ASSERT_EQ(::getrlimit(RLIMIT_FSIZE, &earlier), 0);
     rlimit full{20, earlier.rlim_max};
@@ -133,15 +130,13 @@ TEST_F(TheLogger, BeginsANewLineAfterAFullDisk) {
     log(4000, "whole");
     log(4000, "cut again");
     ASSERT_EQ(::setrlimit(RLIMIT_FSIZE, &earlier), 0);
-    HVLogger::setFileSink(path_); // knows the cut line by the file
+    HVLogger::setFileSink(path()); // knows the cut line by the file
     log(4000, "last");
-    std::ostringstream content;
-    content << std::ifstream(path_).rdbuf();
-    EXPECT_EQ(content.str(),
+    EXPECT_EQ(content(),
               "log 4000 Test cut he\nlog 4000 Test whole\nlog 4000 Test cut a\nlog 4000 Test last\n");
 }
 
-TEST_F(TheLogger, LogsInChildrenForkedWhileAnotherThreadLogs) {
+TEST_F(LoggerTest, WorksAfterAForkBesideAThread) {
     std::atomic<bool> isInSink{false};
     std::atomic<bool> mayLeave{false};
     HVLogger::setSink([&](const HVLog::Message& message) {
@@ -164,12 +159,11 @@ TEST_F(TheLogger, LogsInChildrenForkedWhileAnotherThreadLogs) {
         HVLogger::setLevel(1, true);
         ::_exit(0);
     };
-    const pid_t child = ::fork();
-    if (child == 0) {
+    if (::fork() == 0) {
         logInChild();
     }
     int status = 0;
-    ASSERT_EQ(::waitpid(child, &status, 0), child);
+    ASSERT_GT(::wait(&status), 0);
     EXPECT_EQ(status, 0);
     mayLeave = true;
     other.join();
@@ -182,27 +176,24 @@ TEST_F(TheLogger, LogsInChildrenForkedWhileAnotherThreadLogs) {
     EXPECT_EQ(status, 0);
 }
 
-TEST_F(TheLogger, WritesWholeLinesToAFileFromManyThreads) {
-    HVLogger::setFileSink(path_);
-    HVLogger::setThreshold(0);
-    std::vector<std::thread> threads;
+TEST_F(LoggerTest, WritesWholeLinesFromManyThreads) {
+    writeToFile();
+    std::vector<std::future<void>> threads;
     for (const char letter : {'a', 'b', 'c', 'd'}) {
-        threads.emplace_back([letter] {
+        threads.push_back(std::async(std::launch::async, [letter] {
             for (int i = 0; i < 100; ++i) {
                 log(4000, std::string(200, letter));
             }
-        });
+        }));
     }
-    for (std::thread& thread : threads) {
-        thread.join();
-    }
-    HVLogger::setFileSink(path_); // goes on behind what is there
+    threads.clear();
+    HVLogger::setFileSink(path()); // goes on behind what is there
     log(4000, std::string(200, 'e'));
     testing::internal::CaptureStderr();
     HVLogger::setStderrSink();
     log(4000, "shown");
     EXPECT_EQ(testing::internal::GetCapturedStderr(), "log 4000 Test shown\n");
-    std::ifstream lines(path_);
+    std::ifstream lines(path());
     int count = 0;
     for (std::string line; std::getline(lines, line); ++count) {
         ASSERT_EQ(line, "log 4000 Test " + std::string(200, line.back()));
@@ -210,7 +201,7 @@ TEST_F(TheLogger, WritesWholeLinesToAFileFromManyThreads) {
     EXPECT_EQ(count, 401);
 }
 
-TEST(AMessageBuffer, IsEmptyAndSoundAgainAfterEachText) {
+TEST(MessageBufferTest, StartsAnewAfterEachText) {
     HVMessageBuffer buffer;
     const char* const none = nullptr;
     for (int round = 0; round < 2; ++round) { // with and without a stream from before
@@ -228,7 +219,7 @@ TEST(AMessageBuffer, IsEmptyAndSoundAgainAfterEachText) {
     EXPECT_EQ(buffer.str(buffer), "");
 }
 
-TEST(AMessageBuffer, ThrowsInsteadOfHandingOutAShortText) {
+TEST(MessageBufferTest, ThrowsWhenMemoryRunsOut) {
     const std::string text(300, 'x');
     HVMessageBuffer buffer;
     std::ostream& stream = buffer << "a" << 1;

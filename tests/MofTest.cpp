@@ -104,7 +104,7 @@ std::string answerOf(Slot slot, const CMPIObjectPath* path, Names... names) {
 
 } // namespace
 
-TEST(Mof, DeclaresEveryConstruct) {
+TEST(MofTest, DeclaresEveryConstruct) {
     EmbeddedBroker broker;
     broker.compileMof(folder + "/Constructs.mof");
     std::string text;
@@ -118,7 +118,7 @@ TEST(Mof, DeclaresEveryConstruct) {
     EXPECT_TRUE(broker.methodsOf("Demo_Nowhere").empty());
 }
 
-TEST(Mof, HasErrorsWithTheirPlaces) {
+TEST(MofTest, ReportsErrorsWithTheirPlaces) {
     const struct {
         const char* text;
         const char* error;
@@ -211,7 +211,7 @@ TEST(Mof, HasErrorsWithTheirPlaces) {
     EXPECT_EQ(errorOfText(broker, "[Q] class A {};"), "no error") << "not even a qualifier";
 }
 
-TEST(Mof, HasErrorsOfFilesWhereTheyAreIncluded) {
+TEST(MofTest, ReportsErrorsInIncludedFiles) {
     const ThreadLocale english("C"); // the system's words for its errors
     EmbeddedBroker broker;
     const std::pair<const char*, std::string> rows[] = {
@@ -229,7 +229,7 @@ TEST(Mof, HasErrorsOfFilesWhereTheyAreIncluded) {
 }
 
 // Classes hold their superclasses: a chain without end would be let go of by as many calls, one in the other.
-TEST(Mof, RefusesASuperclassToMany) {
+TEST(MofTest, LimitsTheDepthOfClasses) {
     std::string text = "class C0 {};\n";
     for (int i = 1; i <= 1000; ++i) {
         text += "class C" + std::to_string(i) + " : C" + std::to_string(i - 1) + " {};\n";
@@ -247,7 +247,7 @@ constexpr std::size_t step = 1;
 #endif
 
 // Cut off or damaged at any place, a text is taken or refused, and nothing worse.
-TEST(Mof, OutlivesDamagedTexts) {
+TEST(MofTest, SurvivesDamagedTexts) {
     const std::string whole =
         contentOf(folder + "/Constructs.mof") + contentOf(folder + "/Qualifiers.mof").substr(3);
     const auto tryText = [&](const std::string& text) {
@@ -277,7 +277,7 @@ TEST(Mof, OutlivesDamagedTexts) {
     tryText("instance of A " + std::string(1000000, '{'));
 }
 
-TEST(Mof, IsAskedForByTheQualifierSlots) {
+TEST(MofTest, AnswersTheQualifierSlots) {
     EmbeddedBroker broker;
     oxahv::Request request(broker);
     const CMPIObjectPath* path = request.objectPath("root", "demo_derived");
@@ -312,7 +312,7 @@ TEST(Mof, IsAskedForByTheQualifierSlots) {
               "{1, NULL}1.5FALSE97NULL");
 }
 
-TEST(Mof, HasBuildersForWhatItBrings) {
+TEST(MofTest, DeclarationsCanBeBuiltInCode) {
     EmbeddedBroker broker;
     broker.declare(ClassDeclaration("Base").method("Stop", CMPI_uint8, {{"Hard", CMPI_boolean}}));
     ClassDeclaration demo("Demo");

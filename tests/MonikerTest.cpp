@@ -44,7 +44,7 @@ Moniker oneOfEach() {
 
 } // namespace
 
-TEST(AMoniker, StartsEmptyWithNothingSelected) {
+TEST(MonikerTest, StartsEmptyWithNothingSelected) {
     Moniker moniker;
     EXPECT_EQ(moniker.getKeyCount(), 0U);
     EXPECT_FALSE(moniker.selectKey(0));
@@ -63,7 +63,7 @@ TEST(AMoniker, StartsEmptyWithNothingSelected) {
     }
 }
 
-TEST(AMoniker, ReadsEveryTypeOnlyAsItself) {
+TEST(MonikerTest, ReadsEveryTypeOnlyAsItself) {
     Moniker moniker = oneOfEach();
     EXPECT_EQ(textOf(moniker), std::string("a:0=65 b:1=65535 c:2=4294967295 d:3=18446744073709551615 ") +
                                    std::string("a:4=t\0t  > a:4=t\0t", 18));
@@ -77,7 +77,7 @@ TEST(AMoniker, ReadsEveryTypeOnlyAsItself) {
     EXPECT_EQ(selectedKey(moniker), notSelected);
 }
 
-TEST(AMoniker, ReadsBackEveryByteThatIsNoWhiteSpace) {
+TEST(MonikerTest, ReadsBackEveryByteButWhiteSpace) {
     for (unsigned int byte = 0; byte < 256; ++byte) {
         Moniker moniker;
         moniker.addKey("k", static_cast<unsigned char>(byte));
@@ -88,7 +88,7 @@ TEST(AMoniker, ReadsBackEveryByteThatIsNoWhiteSpace) {
     }
 }
 
-TEST(AMoniker, CountsPositionsModulo65536) {
+TEST(MonikerTest, CountsPositionsModulo65536) {
     Moniker moniker;
     for (unsigned int i = 0; i < 65536; ++i) {
         ASSERT_EQ(moniker.addKey("k", i), i);
@@ -100,7 +100,7 @@ TEST(AMoniker, CountsPositionsModulo65536) {
     EXPECT_EQ(selectedKey(moniker), "over:2=7");
 }
 
-TEST(AMoniker, IsIndependentOfItsCopies) {
+TEST(MonikerTest, CopiesAreIndependent) {
     Moniker moniker = oneOfEach();
     ASSERT_TRUE(moniker.selectKey(1));
     Moniker copy(moniker);
@@ -113,7 +113,7 @@ TEST(AMoniker, IsIndependentOfItsCopies) {
     EXPECT_EQ(textOf(assigned), before);
 }
 
-TEST(AMoniker, WritesAndReadsNumbersAsStreamsOfTheGlobalLocaleDo) {
+TEST(MonikerTest, FormatsNumbersByTheGlobalLocale) {
     struct Grouped : std::numpunct<char> {
         std::string do_grouping() const override { return "\3"; }
         char do_thousands_sep() const override { return '.'; }
@@ -129,7 +129,7 @@ TEST(AMoniker, WritesAndReadsNumbersAsStreamsOfTheGlobalLocaleDo) {
     EXPECT_EQ(selectedKey(moniker), "k:2=1") << "of 1.234.567";
 }
 
-TEST(AFrameworkException, KeepsItsOwnCopyOfTheMessage) {
+TEST(FrameworkExceptionTest, CopiesTheMessage) {
     std::string text = "a message that is longer than any short string buffer holds";
     const std::string before = text;
     FrameworkException copy(nullptr);

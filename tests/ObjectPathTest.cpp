@@ -37,7 +37,7 @@ public:
           }) {}
 };
 
-class ObjectPaths : public BrokerTest {
+class ObjectPathTest : public BrokerTest {
 protected:
     CMPIObjectPath* newPath() { return request_.objectPath("root/cimv2", "Demo_Class"); }
 
@@ -69,7 +69,7 @@ const std::string oneOfEach = "a:0=7 b:1=8 c:2=9 d:3=18446744073709551615 e:4=te
 
 } // namespace
 
-TEST_F(ObjectPaths, BecomeMonikersAndComeBack) {
+TEST_F(ObjectPathTest, ConvertsToMonikersAndBack) {
     const CMPIObjectPath* const path = pathWithOneOfEach();
     const std::string log = counted("5", keysAt(std::vector<std::string>(5)), "5") +
                             keysAt({chars, chars, chars, chars, chars + chars});
@@ -90,7 +90,7 @@ TEST_F(ObjectPaths, BecomeMonikersAndComeBack) {
     EXPECT_EQ(logOfTransforming(again), log + oneOfEach);
 }
 
-TEST_F(ObjectPaths, KeepTheirKeysInTheWidestTypeWhereTheServerDeliversThemSo) {
+TEST_F(ObjectPathTest, KeepsTheWidestTypeOfDeliveredKeys) {
     broker_.setKeyMode(oxahv::KeyMode::untyped);
     Moniker moniker;
     PU::transformObjectPathToMoniker(request_.deliver(pathWithOneOfEach()), moniker);
@@ -101,7 +101,7 @@ TEST_F(ObjectPaths, KeepTheirKeysInTheWidestTypeWhereTheServerDeliversThemSo) {
         << log;
 }
 
-TEST_F(ObjectPaths, WithoutKeysLeaveMonikersAsTheyAre) {
+TEST_F(ObjectPathTest, WithoutKeysChangesNoMoniker) {
     Moniker moniker;
     moniker.addKey("x", 1U);
     moniker.addKey("y", 2U);
@@ -112,7 +112,7 @@ TEST_F(ObjectPaths, WithoutKeysLeaveMonikersAsTheyAre) {
     PU::transformMonikerToObjectPath(empty, &none); // touches neither
 }
 
-TEST_F(ObjectPaths, HaveOneKeyOfAName) {
+TEST_F(ObjectPathTest, HasOneKeyPerName) {
     Moniker moniker;
     moniker.addKey("name", 1U);
     moniker.addKey("NAME", 2U);
@@ -124,7 +124,7 @@ TEST_F(ObjectPaths, HaveOneKeyOfAName) {
     EXPECT_EQ(textOf(again), "name:2=2  > name:2=2");
 }
 
-TEST_F(ObjectPaths, CountAndConvertTheKeysThatHaveAValue) {
+TEST_F(ObjectPathTest, CountsKeysThatHaveAValue) {
     CMPIObjectPath* const path = newPath();
     CMAddKey(path, "null", nullptr, CMPI_string);
     PU::setKeyProperty(path, "a", 1U);
@@ -145,14 +145,14 @@ TEST_F(ObjectPaths, CountAndConvertTheKeysThatHaveAValue) {
               counted("4", keys, "0", "") + " > Key is not selected.");
 }
 
-TEST_F(ObjectPaths, CountTheirKeysModulo65536) {
+TEST_F(ObjectPathTest, CountsKeysModulo65536) {
     Otherwise<&CMPIObjectPathFT::getKeyAt> path(pathWithOneOfEach(), [](auto&, auto&) {});
     Counted many(path.handle(), 65536 + 2);
     EXPECT_EQ(logOf([&] { EXPECT_EQ(PU::getKeyCount(many.handle()), 2); }),
               counted("2", keysAt({"", ""}), "2", ""));
 }
 
-TEST_F(ObjectPaths, WithAKeyOfAnyOtherTypeThrowAndKeepWhatCameBefore) {
+TEST_F(ObjectPathTest, ConversionThrowsAtAKeyOfAnotherType) {
     CMPIObjectPath* const real = newPath();
     PU::setKeyProperty(real, "before", 1U);
     PU::setKeyProperty(real, "key", 2U);
@@ -181,7 +181,7 @@ TEST_F(ObjectPaths, WithAKeyOfAnyOtherTypeThrowAndKeepWhatCameBefore) {
     }
 }
 
-TEST_F(ObjectPaths, ThatCannotCountTheirKeysThrowAfterTheTrace) {
+TEST_F(ObjectPathTest, KeyCountThrowsAfterTheTrace) {
     const CMPIObjectPath* const path = pathWithOneOfEach();
     const std::string log =
         "getKeyCount\n" + variable(providerUtilities, "getKeyCount", "keyCount", "0") + noCount;
@@ -198,7 +198,7 @@ TEST_F(ObjectPaths, ThatCannotCountTheirKeysThrowAfterTheTrace) {
               variable(providerUtilities, "getKeyCount", "keyCount", "2") + keysAt({"", ""}) + noCount);
 }
 
-TEST_F(ObjectPaths, WhoseTextsCannotBeReadThrow) {
+TEST_F(ObjectPathTest, ConversionThrowsAtAnUnreadableText) {
     const CMPIObjectPath* const path = pathWithOneOfEach();
     for (oxahv::Fault fault : {anError, nothing}) {
         for (fault.firstCall = 1; fault.firstCall <= 6; ++fault.firstCall) { // five names and a text
@@ -213,7 +213,7 @@ TEST_F(ObjectPaths, WhoseTextsCannotBeReadThrow) {
     }
 }
 
-TEST_F(ObjectPaths, TakeAWhiteSpaceByteAsZero) {
+TEST_F(ObjectPathTest, ReadsAWhiteSpaceByteAsZero) {
     Moniker moniker;
     moniker.addKey("k", static_cast<unsigned char>(' '));
     CMPIObjectPath* path = newPath();
@@ -221,7 +221,7 @@ TEST_F(ObjectPaths, TakeAWhiteSpaceByteAsZero) {
     EXPECT_EQ(oxahv::pathText(path), "root/cimv2:Demo_Class.k=0");
 }
 
-TEST_F(ObjectPaths, AreCreatedUnlessTheBrokerRefuses) {
+TEST_F(ObjectPathTest, CreatesPathsUnlessTheBrokerRefuses) {
     const auto expect = [this](const CMPIBroker* broker, bool isMade) {
         const auto trace = [](const std::string& name, const std::string& value) {
             return variable(providerUtilities, "createObjectPath", name, value);

@@ -26,7 +26,7 @@ std::string linesOf(const std::string& file, const std::string& beginning = "") 
 
 } // namespace
 
-TEST(TheRegistration, AgreesWithTheMofAndTheLibrary) {
+TEST(RegistrationTest, AgreesWithMofAndLibrary) {
     ASSERT_EQ("lib" + provider + ".so", LIBRARY_NAME);
     oxahv::EmbeddedBroker broker;
     broker.compileMof(MOF_FOLDER "/CIMSuperclasses.mof");

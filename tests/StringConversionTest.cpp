@@ -15,7 +15,7 @@ const char* const stateful = "en_US.ISO-2022-KR";
 
 } // namespace
 
-TEST(NarrowText, IsInTheEncodingOfTheThreadsLocale) {
+TEST(NarrowTextTest, HasTheEncodingOfTheThread) {
     const struct {
         const char* locale;
         std::wstring wide;
@@ -51,7 +51,7 @@ TEST(NarrowText, IsInTheEncodingOfTheThreadsLocale) {
     EXPECT_EQ(make_wstring("\x0E\x30\x21\xFF\x30\x21\x0Fz\xFFz"), L"\uAC00\xDCFF\uAC00z\xDCFFz");
 }
 
-TEST(NarrowText, HasAQuestionMarkForWhatTheEncodingLacks) {
+TEST(NarrowTextTest, ReplacesUnknownCharactersByQuestionMarks) {
     const std::pair<const char*, std::string> rows[] = {{"C", "a????\0b"s},
                                                         {"C.UTF-8", "a\xC4\xB0\xEA\xB0\x80??\0b"s},
                                                         {"tr_TR.ISO-8859-9", "a\xDD???\0b"s},
@@ -63,7 +63,7 @@ TEST(NarrowText, HasAQuestionMarkForWhatTheEncodingLacks) {
     }
 }
 
-TEST(AnyText, SurvivesConversion) {
+TEST(StringConversionTest, RandomTextsReadBack) {
     std::mt19937 random(3);
     // Parts of valid, incomplete and overlong sequences among plain characters and NULs.
     const std::string alphabet("ab\0\xC3\xBC\xE2\x82\xAC\xF0\x9F\x98\x80\xFF\xED\xA0\x1B\x0E", 17);
@@ -87,7 +87,7 @@ TEST(AnyText, SurvivesConversion) {
     }
 }
 
-TEST(ACText, IsCopiedAndNullIsEmpty) {
+TEST(StringConversionTest, TakesCTextsAndNull) {
     EXPECT_EQ(make_string(static_cast<const char*>(nullptr)), "");
     EXPECT_EQ(make_string("\xFFtext"), "\xFFtext");
     std::ostringstream stream;

@@ -24,14 +24,14 @@ extern "C" __attribute__((visibility("default"))) int tolower(int c) noexcept {
 
 namespace {
 
-class Texts : public BrokerTest {
+class TextTest : public BrokerTest {
 protected:
     const ThreadLocale plain_{"C"};
 };
 
 } // namespace
 
-TEST_F(Texts, AreConvertedUnlessEmpty) {
+TEST_F(TextTest, ConvertsTextsThatAreNotEmpty) {
     std::string narrow = "earlier";
     std::wstring wide = L"earlier";
     const auto convert = [&](const std::wstring& wideIn, const std::string& narrowIn, bool result) {
@@ -87,7 +87,7 @@ void checkScreen(const std::basic_string<Char>& alphabet) {
 } // namespace
 
 // The obvious version's answers that users build on, then all that it answers.
-TEST_F(Texts, OfUsersAreScreened) {
+TEST_F(TextTest, ScreensTextsOfUsers) {
     EXPECT_TRUE(isAcceptable<char>("a\\b<", "<"));
     EXPECT_FALSE(isAcceptable<char>("WWW.x", ":"));
     EXPECT_TRUE(isAcceptable<char>("a:b", ":"));
@@ -108,7 +108,7 @@ TEST_F(Texts, OfUsersAreScreened) {
 
 // Long texts are looked through block by block: an entry is found wherever it stands, across the blocks'
 // edges too.
-TEST_F(Texts, OfUsersAreScreenedAtAnyLength) {
+TEST_F(TextTest, ScreensLongTexts) {
     constexpr std::size_t length = 3 * 4096 + 100;
     const auto accepted = [](const std::string& text) {
         const bool narrow = ProviderUtilities::ValidateInput(text, "");

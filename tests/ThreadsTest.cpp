@@ -111,7 +111,7 @@ void HVLog::HVLogger::traceLevelMessage(const char* function, const char* file, 
     log(function, file, line, text);
 }
 
-TEST(ManyThreads, ServeRequestsWhileEverythingElseGoesOn) {
+TEST(ThreadsTest, ServesRequestsBesideEverythingElse) {
     oxahv::EmbeddedBroker broker;
     hostRoad(broker);
     TK::PropertyFile file;

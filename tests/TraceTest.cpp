@@ -15,9 +15,9 @@ const std::string category("Test.Trace");
 
 constexpr TracingModule module = {"Test.Trace", "TraceTest.cpp"};
 
-class ATracePoint : public testing::Test {
+class TraceTest : public testing::Test {
 protected:
-    ATracePoint() { takeTraces(); }
+    TraceTest() { takeTraces(); }
 };
 
 // What a test body traces as its parameters.
@@ -54,7 +54,7 @@ HVLog::HVMessageBuffer::~HVMessageBuffer() {
     destroyed.push_back(this);
 }
 
-TEST_F(ATracePoint, HandsItsTextToBothFunctionsOfTheLogger) {
+TEST_F(TraceTest, CallsBothFunctionsOfTheLogger) {
     const void* const pointer = &category;
     const int line = __LINE__ + 1;
     TK_TRACE_ENTERING(category);
@@ -70,7 +70,7 @@ TEST_F(ATracePoint, HandsItsTextToBothFunctionsOfTheLogger) {
                                 message(module, "TestBody", "something happened"));
 }
 
-TEST_F(ATracePoint, ShowsAVariableAsANumberOrATextByItsType) {
+TEST_F(TraceTest, ShowsNumbersAndTexts) {
     const std::string text("text");
     const char* const none = nullptr;
     char array[] = "array";
@@ -93,7 +93,7 @@ TEST_F(ATracePoint, ShowsAVariableAsANumberOrATextByItsType) {
     EXPECT_EQ(takeTraces(), expected);
 }
 
-TEST_F(ATracePoint, TakesAnyInsertionsUpToANullText) {
+TEST_F(TraceTest, ListEndsAtANullText) {
     const int object = 0;
     int* const nowhere = nullptr;
     const char* const none = nullptr;
@@ -108,7 +108,7 @@ TEST_F(ATracePoint, TakesAnyInsertionsUpToANullText) {
                                 parameters(" object=" + address(&object) + " text=") + parameters(" text="));
 }
 
-TEST_F(ATracePoint, WritesAddressesAsTheGlobalLocaleDoes) {
+TEST_F(TraceTest, WritesAddressesByTheGlobalLocale) {
     const std::locale earlier = std::locale::global(std::locale(std::locale::classic(), new GroupedDigits));
     const int object = 0;
     const char* const none = nullptr;
@@ -121,7 +121,7 @@ TEST_F(ATracePoint, WritesAddressesAsTheGlobalLocaleDoes) {
               parameters(" a=" + shown + " b=x c=" + shown) + parameters(" a=" + shown + " b="));
 }
 
-TEST_F(ATracePoint, DestroysTheBufferOfItsParametersLast) {
+TEST_F(TraceTest, DestroysTheBufferOfItsParametersLast) {
     made.clear();
     destroyed.clear();
     TK_TRACE_EXITING_PARAMETERS(category, " n=" << 1);
@@ -129,7 +129,7 @@ TEST_F(ATracePoint, DestroysTheBufferOfItsParametersLast) {
     EXPECT_EQ(destroyed, std::vector<const void*>({made[1], made[0]}));
 }
 
-TEST_F(ATracePoint, EvaluatesItsArgumentsForEachOfTheTwoCalls) {
+TEST_F(TraceTest, EvaluatesArgumentsForEachCall) {
     int evaluations = 0;
     const auto counted = [&evaluations](const auto& value) -> const auto& {
         ++evaluations;
@@ -145,7 +145,7 @@ TEST_F(ATracePoint, EvaluatesItsArgumentsForEachOfTheTwoCalls) {
     EXPECT_EQ(evaluations, 10);
 }
 
-TEST_F(ATracePoint, IsOneStatement) {
+TEST_F(TraceTest, IsOneStatement) {
     const bool never = loggerCalls().size() > 100;
     if (never)
         TK_TRACE_ENTERING(category);
@@ -156,20 +156,20 @@ TEST_F(ATracePoint, IsOneStatement) {
     EXPECT_EQ(loggerCalls().size(), 6U);
 }
 
-TEST_F(ATracePoint, PassesOnWhatInsertionsThrow) {
+TEST_F(TraceTest, PassesOnExceptionsOfInsertions) {
     const auto fail = []() -> int { throw std::logic_error("insertion"); };
     EXPECT_THROW(TK_TRACE_ENTERING_PARAMETERS(category, " n=" << fail()), std::logic_error);
     TK_TRACE_ENTERING(category);
     EXPECT_EQ(takeTraces(), entering(module, "TestBody"));
 }
 
-TEST(TheFormattingFunctions, TakeNullTextsAndTypesOutsideTheirOwn) {
+TEST(TraceTextTest, AcceptsNullTextsAndUnknownTypes) {
     EXPECT_STREQ(TK::trace(nullptr, nullptr, 3, TK::MESSAGE), "MESSAGE [File: (null), Line: 3]: (null)");
     EXPECT_STREQ(TK::trace("f", "F.cpp", 3, static_cast<TK::MessageType>(3)), "");
     EXPECT_STREQ(TK::tracepara("f", "F.cpp", 3, " a=1", TK::MESSAGE), "");
 }
 
-TEST(TheFormattingFunctions, EachKeepItsLastText) {
+TEST(TraceTextTest, EachFunctionHasItsOwnBuffer) {
     const char* const flow = TK::trace("f", "F.cpp", 1, TK::ENTERING);
     const char* const number = TK::trace("n", "F.cpp", 2, 7U);
     const char* const text = TK::trace("t", "F.cpp", 3, "x");

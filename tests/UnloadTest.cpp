@@ -58,7 +58,7 @@ void askEverything(oxahv::EmbeddedBroker& broker, const char* className) {
 
 } // namespace
 
-TEST(AProviderLibrary, IsUnloadedWhileItsThreadsEnd) {
+TEST(UnloadTest, CanHappenWhileThreadsEnd) {
     oxahv::EmbeddedBroker broker;
     for (int round = 0; round < 1000 && !HasFailure(); ++round) {
         broker.load(ROAD_PROVIDER, "Road");
@@ -78,7 +78,7 @@ TEST(AProviderLibrary, IsUnloadedWhileItsThreadsEnd) {
 }
 
 #ifdef HOST_PROVIDER
-TEST(AProviderLibrary, LeavesTheProcessAfterRequests) {
+TEST(UnloadTest, UnmapsTheLibraryAfterRequests) {
     const Provider providers[] = {{HOST_PROVIDER,
                                    "OXAHostProvider",
                                    "OXATK_OperatingSystem",

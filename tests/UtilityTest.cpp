@@ -45,24 +45,24 @@ testing::AssertionResult convertsAsTheCLibrary(const From& text) {
            << testing::PrintToString(text) << " became " << testing::PrintToString(out);
 }
 
-class Conversion : public testing::TestWithParam<const char*> {
+class ConversionTest : public testing::TestWithParam<const char*> {
     const ThreadLocale locale_{GetParam(), LC_CTYPE_MASK};
 };
 
-class ATextConversion : public testing::Test {
+class ConversionStateTest : public testing::Test {
 protected:
-    ATextConversion() { takeTraces(); }
+    ConversionStateTest() { takeTraces(); }
 
     const ThreadLocale plain_{"C"};
 };
 
 } // namespace
 
-INSTANTIATE_TEST_SUITE_P(InLocales, Conversion,
+INSTANTIATE_TEST_SUITE_P(InLocales, ConversionTest,
                          testing::Values("C", "C.UTF-8", "de_DE.ISO-8859-1", "zh_HK.BIG5-HKSCS",
                                          "en_US.ISO-2022-KR"));
 
-TEST_P(Conversion, TakesEveryCodePointThatTheCLibraryTakes) {
+TEST_P(ConversionTest, ConvertsEveryCodePointOfTheCLibrary) {
     std::vector<std::wstring> texts;
     std::vector<std::string> wanted;
     for (wchar_t c = 1; c <= lastCodePoint; ++c) {
@@ -86,7 +86,7 @@ TEST_P(Conversion, TakesEveryCodePointThatTheCLibraryTakes) {
     EXPECT_EQ(wide.size(), wanted.size());
 }
 
-TEST_P(Conversion, TakesEveryByteSequenceThatTheCLibraryTakes) {
+TEST_P(ConversionTest, ConvertsEveryByteSequenceOfTheCLibrary) {
     for (unsigned int first = 1; first < 256; ++first) {
         for (unsigned int second = 0; second < 256; ++second) {
             const char bytes[] = {static_cast<char>(first), static_cast<char>(second), '\0'};
@@ -116,7 +116,7 @@ TEST_P(Conversion, TakesEveryByteSequenceThatTheCLibraryTakes) {
 
 // Texts are converted block by block on the way to narrow text, so a character of several bytes, or a change
 // of the shift state, can come to stand on the edge of a block of any power of two.
-TEST_P(Conversion, TakesLongTextsWhole) {
+TEST_P(ConversionTest, ConvertsLongTexts) {
     for (const wchar_t character : {L'\u00E4', L'\u4E00', L'\uAC00', L'\U0001F600'}) {
         for (const std::size_t around : {256U, 4096U, 8192U}) {
             for (std::size_t lead = around - 20; lead < around + 4; ++lead) {
@@ -133,7 +133,7 @@ TEST_P(Conversion, TakesLongTextsWhole) {
 }
 
 // A failure in the middle of a shifted run must not shift the next text.
-TEST_F(ATextConversion, StartsInTheInitialShiftState) {
+TEST_F(ConversionStateTest, StartsInTheInitialShiftState) {
     const ThreadLocale korean("en_US.ISO-2022-KR", LC_CTYPE_MASK);
     for (int i = 0; i < 3; ++i) {
         std::string out;
@@ -164,7 +164,7 @@ void checkVectors(const char* function, const From& a, const From& bad, const To
 
 } // namespace
 
-TEST_F(ATextConversion, OfAVectorAppendsTextsUpToTheirNulOrEmpties) {
+TEST_F(ConversionStateTest, VectorsEndUpWholeOrEmpty) {
     checkVectors<std::wstring, std::string>("AStringArrToWStringArr", {"aa\0\xFF", 4}, "\xFF", L"aa");
     checkVectors<std::string, std::wstring>("WStringArrToAStringArr", {L"aa\0\x110000", 4}, L"\u00E4", "aa");
 }

@@ -21,16 +21,16 @@ using obvious::date;
 using obvious::formatted;
 using obvious::parsed;
 
-class CimDates : public testing::Test {
+class CimDateTest : public testing::Test {
 protected:
-    ~CimDates() override { takeTraces(); }
+    ~CimDateTest() override { takeTraces(); }
 };
 
 constexpr const char* zeros = "00000000000000.000000+000";
 
 } // namespace
 
-TEST_F(CimDates, AreWritten) {
+TEST_F(CimDateTest, WritesDates) {
     // The obvious version is right.
     EXPECT_EQ(formatted(date(2009, 3, 7, 5, 4, 9, 123, -5)), "20090307050409.000123-300");
     EXPECT_EQ(formatted(date(0, 0, 0, 0, 0, 0, 0, 0)), "19700101000000.000000+000");
@@ -40,7 +40,7 @@ TEST_F(CimDates, AreWritten) {
     EXPECT_EQ(Utils::convertCIMDateTime(widest), formatted(widest));
 }
 
-TEST_F(CimDates, AreWrittenForEveryValueOfEveryField) {
+TEST_F(CimDateTest, WritesEveryValueOfEveryField) {
     for (unsigned int number = 0; number <= 65535; ++number) {
         const auto byte = [number](unsigned int shift) {
             return static_cast<unsigned char>(number >> shift);
@@ -57,7 +57,7 @@ TEST_F(CimDates, AreWrittenForEveryValueOfEveryField) {
     }
 }
 
-TEST_F(CimDates, AreRead) {
+TEST_F(CimDateTest, ReadsDates) {
     const std::pair<const char*, DateTime> rows[] = {
         {"20090307050409.000123-300", date(2009, 3, 7, 5, 4, 9, 123, -300)},
         {"-001-1-2-3-4-5.-99999x300", date(65535, 255, 254, 253, 252, 251, 4294867297U, 0)},
@@ -72,7 +72,7 @@ TEST_F(CimDates, AreRead) {
     }
 }
 
-TEST_F(CimDates, AreReadWithAnythingInEveryField) {
+TEST_F(CimDateTest, ReadsAnythingInEveryField) {
     for (const std::size_t position : {0U, 4U, 6U, 8U, 10U, 12U, 14U, 15U, 19U, 21U, 23U}) {
         for (unsigned int pair = 0; pair <= 0xFFFF; pair += position == 4 ? 1 : 7) {
             std::string text = zeros;
@@ -84,14 +84,14 @@ TEST_F(CimDates, AreReadWithAnythingInEveryField) {
     }
 }
 
-TEST_F(CimDates, ThatEndTooEarlyThrowWithoutAnExitTrace) {
+TEST_F(CimDateTest, ThrowsAtTextsThatEndTooEarly) {
     for (std::size_t length = 0; length < 21; ++length) {
         EXPECT_THROW(Utils::convertStringToDateTime(std::string(zeros, length)), std::out_of_range) << length;
         EXPECT_EQ(takeTraces(), entering(utils, "convertStringToDateTime"));
     }
 }
 
-TEST_F(CimDates, AreMadeOfStrippedAndPaddedTexts) {
+TEST_F(CimDateTest, StripsAndPadsTexts) {
     const std::string text(70000, ' ');
     // Positions have 16 bits: without a NUL the last of them ends the text.
     EXPECT_EQ(Utils::stripSpaces(text).size(), 65535U);
@@ -130,9 +130,9 @@ private:
     Calls calls_;
 };
 
-class PropertyFileFields : public testing::Test {
+class FileFieldsTest : public testing::Test {
 protected:
-    ~PropertyFileFields() override { EXPECT_EQ(takeTraces(), "") << "none of them traces"; }
+    ~FileFieldsTest() override { EXPECT_EQ(takeTraces(), "") << "none of them traces"; }
 
     RecordingFile file_;
     const std::lock_guard<TK::Mutex> lock_{TK::_fileMutex}; // which none of them locks
@@ -141,7 +141,7 @@ protected:
 
 } // namespace
 
-TEST_F(PropertyFileFields, AreConvertedOnTheWay) {
+TEST_F(FileFieldsTest, ConvertsKeysAndTexts) {
     const std::string key = "k\xC3\xA4\xE4";
     const std::wstring wideKey = L"k\u00E4\xDCE4";
     file_.store(std::wstring(L"v\u4E00\0w", 4));
@@ -157,7 +157,7 @@ TEST_F(PropertyFileFields, AreConvertedOnTheWay) {
     EXPECT_EQ(file_.takeCalls(), (RecordingFile::Calls(3, {L"get", wideKey})));
 }
 
-TEST_F(PropertyFileFields, ReadNumbersOfThirtyTwoBits) {
+TEST_F(FileFieldsTest, ReadsNumbersOf32Bits) {
     const std::pair<const wchar_t*, unsigned int> rows[] = {{L"", 0},
                                                             {L"-", 0},
                                                             {L"+", 0},
@@ -183,7 +183,7 @@ TEST_F(PropertyFileFields, ReadNumbersOfThirtyTwoBits) {
     EXPECT_EQ(Utils::ReadUint32FromFile(file_, "key"), 4U);
 }
 
-TEST_F(PropertyFileFields, WriteNumbersInTextsOfFixedLength) {
+TEST_F(FileFieldsTest, WritesNumbersInTextsOfFixedLength) {
     const auto check = [&](const std::wstring& digits, std::size_t length) {
         std::wstring padded = digits;
         padded.resize(length);
@@ -199,7 +199,7 @@ TEST_F(PropertyFileFields, WriteNumbersInTextsOfFixedLength) {
     }
 }
 
-TEST_F(PropertyFileFields, ReadDatesOrTheFirstSecondOf1970AndWriteThem) {
+TEST_F(FileFieldsTest, ReadsAndWritesDates) {
     for (const wchar_t* const text : {L"", L"0000-00-00 00:00:00", L"x0000-00-00y"}) {
         file_.store(text);
         EXPECT_TRUE(Utils::ReadDateFromFile(file_, "k") == DateTime());

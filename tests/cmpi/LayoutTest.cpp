@@ -213,7 +213,7 @@ void expectCall(const char* name, void (*function)(), Return (*use)(Record*, Res
     expectCall(name, function, use, std::index_sequence_for<Rest...>());
 }
 
-class ConvenienceNames : public testing::TestWithParam<const Uses*> {
+class ConvenienceNamesTest : public testing::TestWithParam<const Uses*> {
 protected:
     const Uses& uses_ = *GetParam();
     const CMPIBroker* const broker_ = &fakeObject<CMPIBroker>();
@@ -286,7 +286,7 @@ CMIndicationMIFactory(Provider, TestProvider)
 CMProviderBase(OtherProvider)
 CMMethodMIFactory(Provider, OtherProvider)
 
-TEST(AProviderFactory, SharesOneObjectAmongTheKindsOfOneName) {
+TEST(FactoryTest, SharesOneObjectPerProviderName) {
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     constructorFails = true;
     EXPECT_EQ(TestProvider_Create_MethodMI(nullptr, nullptr, &status), nullptr);
@@ -308,7 +308,7 @@ TEST(AProviderFactory, SharesOneObjectAmongTheKindsOfOneName) {
     EXPECT_EQ(aliveProviders, 0);
 }
 
-TEST(AProviderFactory, FillsEachSlotWithItsFunctionWhichLetsNoExceptionOut) {
+TEST(FactoryTest, FillsEverySlotAndCatchesExceptions) {
     callSlots(TestProvider_Create_InstanceMI(nullptr, nullptr, nullptr));
     callSlots(TestProvider_Create_AssociationMI(nullptr, nullptr, nullptr));
     callSlots(TestProvider_Create_MethodMI(nullptr, nullptr, nullptr));
@@ -317,7 +317,7 @@ TEST(AProviderFactory, FillsEachSlotWithItsFunctionWhichLetsNoExceptionOut) {
     EXPECT_EQ(aliveProviders, 0);
 }
 
-TEST_P(ConvenienceNames, FillEachSlotOfAProviderWithItsFunction) {
+TEST_P(ConvenienceNamesTest, StubsFillEverySlot) {
     CMPIStatus status = {CMPI_RC_ERROR, nullptr};
     callSlots(uses_.createInstance(broker_, nullptr, nullptr));
     callSlots(uses_.createAssociation(broker_, nullptr, nullptr));
@@ -332,13 +332,13 @@ TEST_P(ConvenienceNames, FillEachSlotOfAProviderWithItsFunction) {
     EXPECT_EQ(std::string(indications->ft->miName).substr(0, 20), "indicationProviderIn");
 }
 
-TEST_P(ConvenienceNames, CallTheirSlotsWithTheirArguments) {
+TEST_P(ConvenienceNamesTest, CallTheirSlots) {
 #define CALL(result, name, table, slot, parameters, body) \
     expectCall(#name, reinterpret_cast<void (*)()>(Fake<&table::slot>::call), uses_.call##name);
 #include "CmpiStandard.inc"
 }
 
-TEST_P(ConvenienceNames, OfNoSlotDoWhatTheyAreFor) {
+TEST_P(ConvenienceNamesTest, WithoutASlotDoTheirWork) {
     CMPIBrokerFT& services = fake(broker_->bft);
     services.brokerCapabilities = CMPI_MB_Indications;
     services.brokerVersion = CMPICurrentVersion;
@@ -347,7 +347,7 @@ TEST_P(ConvenienceNames, OfNoSlotDoWhatTheyAreFor) {
     EXPECT_STREQ(uses_.failedExpectation(broker_, string_, value<CMPIString*>(resultNumber)), nullptr);
 }
 
-TEST_P(ConvenienceNames, PassInsertionsAsBrokersReadThem) {
+TEST_P(ConvenienceNamesTest, PassInsertionsOfMessages) {
     noted.clear();
     EXPECT_EQ(uses_.message(broker_, value<CMPIString*>(1)), value<CMPIString*>(resultNumber));
     const std::string insertions =
@@ -355,4 +355,4 @@ TEST_P(ConvenienceNames, PassInsertionsAsBrokersReadThem) {
     EXPECT_EQ(noted, (CMPI_VERSION >= 200 ? "file" + insertions : "") + "text" + insertions);
 }
 
-INSTANTIATE_TEST_SUITE_P(OfEachLanguage, ConvenienceNames, testing::Values(&usesInC, &usesInCpp));
+INSTANTIATE_TEST_SUITE_P(OfEachLanguage, ConvenienceNamesTest, testing::Values(&usesInC, &usesInCpp));
