@@ -180,8 +180,8 @@ TEST(RunnerTest, PrintsControlCharactersAsEscapes) {
               "ReturnValue = 1;\nA = \"\\x001B]0;\\x009B\\x007F\\n\\x00FF\";\n");
     const std::string json = shell("bash -c \"" RUNNER " --output json " + call + "\"").output;
     EXPECT_NE(json.find(R"(\u001b]0;\u009B\u007F\n)"), std::string::npos) << json;
-    const std::string path = R"('root/cimv2:Demo.Text="\x001B]0;"')";
-    EXPECT_EQ(run(test + "ci " + path).output, unquoted(path) + '\n') << "what is printed can be read";
+    const std::string path = R"(root/cimv2:Demo.Text="\x001B]0;")";
+    EXPECT_EQ(run(test + "ci " + quoted(path)).output, path + '\n') << "what is printed can be read";
 }
 
 TEST(RunnerTest, PassesContextToTheProvider) {
