@@ -2,6 +2,7 @@
 // the "C" locale, as one that never calls setlocale.
 #include "HostProvider.h"
 #include "AssetTag.h"
+#include "ErrorOf.h"
 #include "FailureWays.h"
 #include "HostTime.h"
 #include "ScratchFolder.h"
@@ -126,11 +127,7 @@ public:
         return in;
     }
 
-    CMPIArgs* argument(const std::string& tag) {
-        CMPIData data = {CMPI_string, CMPI_goodValue, {}};
-        data.value.string = CMNewString(broker_.handle(), tag.c_str(), nullptr);
-        return argument(data);
-    }
+    CMPIArgs* argument(const std::string& tag) { return argument(request_.valueFromText(tag, CMPI_string)); }
 
     Reply setTag(Request& request, const std::string& tag, const char* method = "SetAssetTag") {
         return request.invokeMethod(request.objectPathFromText(systemPath, ""), method, argument(tag));
@@ -145,8 +142,7 @@ public:
     // How often the tag was changed, and the tag.
     std::string tag() {
         const CMPIInstance* const details = request_.getInstance(path(detailsPath)).instances.at(0);
-        return oxahv::valueText(CMGetProperty(details, "AssetTagChanges", nullptr)) + ' ' +
-               oxahv::valueText(CMGetProperty(details, "AssetTag", nullptr));
+        return ::textOf(details, "AssetTagChanges") + ' ' + ::textOf(details, "AssetTag");
     }
 
     const std::string stateFile_ = "var/lib/asset.properties";
@@ -212,40 +208,29 @@ TEST_F(HostProviderTest, ShowsTheMachine) {
 }
 
 TEST_F(HostProviderTest, ReadsNumberKeysOfEveryType) {
-    const auto reading = [&](const CMPIValue& value, CMPIType type) {
+    const auto reading = [&](CMPIType type, const std::string& number) {
         CMPIObjectPath* const sensor = path(sensorPath);
-        CMAddKey(sensor, "SensorNumber", &value, type);
+        const CMPIData key = request_.valueFromText(number, type);
+        CMAddKey(sensor, "SensorNumber", &key.value, type);
         const Reply reply = request_.getInstance(sensor);
-        return reply.ok() ? oxahv::valueText(CMGetProperty(reply.instances.at(0), "Reading", nullptr))
-                          : oxahv::codeName(reply.code);
+        return reply.ok() ? ::textOf(reply.instances.at(0), "Reading") : oxahv::codeName(reply.code);
     };
-    const auto readingOf = [&](long long number, CMPIType type) {
-        CMPIValue value = {};
-        value.sint64 = number;
-        return reading(value, type);
-    };
+    const std::string notFound = "CMPI_RC_ERR_NOT_FOUND";
     for (const CMPIType type :
-         {CMPIType{CMPI_uint8}, CMPIType{CMPI_uint16}, CMPIType{CMPI_uint32}, CMPIType{CMPI_uint64},
-          CMPIType{CMPI_sint8}, CMPIType{CMPI_sint16}, CMPIType{CMPI_sint32}, CMPIType{CMPI_sint64}}) {
-        EXPECT_EQ(readingOf(15, type), "2.0") << type;
-        EXPECT_EQ(readingOf(2, type), "CMPI_RC_ERR_NOT_FOUND") << type;
-        EXPECT_EQ(readingOf(-5, type), "CMPI_RC_ERR_NOT_FOUND") << type;
+         std::vector<CMPIType>{CMPI_uint8, CMPI_uint16, CMPI_uint32, CMPI_uint64, CMPI_sint8, CMPI_sint16,
+                               CMPI_sint32, CMPI_sint64, CMPI_string}) {
+        EXPECT_EQ(reading(type, "15"), "2.0") << type;
+        EXPECT_EQ(reading(type, "2"), notFound) << type;
+        if (type == CMPI_string || (type & CMPI_SINT) == CMPI_SINT) {
+            EXPECT_EQ(reading(type, "-5"), notFound) << type;
+        }
     }
-    EXPECT_EQ(readingOf(65536 + 5, CMPI_uint32), "CMPI_RC_ERR_NOT_FOUND") << "not cut to 16 bits";
-    EXPECT_EQ(readingOf(65536 + 5, CMPI_sint64), "CMPI_RC_ERR_NOT_FOUND");
-    const std::pair<const char*, const char*> texts[] = {
-        {"5", "1.5"},
-        {"-5", "CMPI_RC_ERR_NOT_FOUND"},
-        {"", "CMPI_RC_ERR_NOT_FOUND"},
-        {"5x", "CMPI_RC_ERR_NOT_FOUND"},
-        {" 5", "CMPI_RC_ERR_NOT_FOUND"},
-        {"65541", "CMPI_RC_ERR_NOT_FOUND"},
-        {"18446744073709551621", "CMPI_RC_ERR_NOT_FOUND"},
-    };
-    for (const auto& [text, expected] : texts) {
-        CMPIValue value = {};
-        value.string = CMNewString(broker_.handle(), text, nullptr);
-        EXPECT_EQ(reading(value, CMPI_string), expected) << text;
+    EXPECT_EQ(reading(CMPI_uint8, "251"), notFound) << "not read as -5";
+    for (const CMPIType type : std::vector<CMPIType>{CMPI_uint32, CMPI_sint64, CMPI_string}) {
+        EXPECT_EQ(reading(type, "65541"), notFound) << "not cut to 16 bits";
+    }
+    for (const char* const text : {"", "5x", " 5", "18446744073709551621"}) {
+        EXPECT_EQ(reading(CMPI_string, text), notFound) << text;
     }
 }
 
@@ -333,11 +318,12 @@ TEST_F(HostProviderTest, WritesDatesAsTheSameInstant) {
 }
 
 TEST_F(HostProviderTest, RefusesRequestsWithTheRightCode) {
-    EXPECT_EQ(codeOf("OXATK_EthernetPort.DeviceID=\"eth0\""), CMPI_RC_ERR_NOT_FOUND);
-    EXPECT_EQ(codeOf(portPath + ",Other=1"), CMPI_RC_ERR_NOT_FOUND);
     std::string other = systemPath;
     other.replace(other.rfind("machine"), 7, "others");
-    EXPECT_EQ(codeOf(other), CMPI_RC_ERR_NOT_FOUND);
+    for (const std::string& unknown :
+         {std::string("OXATK_EthernetPort.DeviceID=\"eth0\""), portPath + ",Other=1", other}) {
+        EXPECT_EQ(codeOf(unknown), CMPI_RC_ERR_NOT_FOUND) << unknown;
+    }
     EXPECT_EQ(request_.associators(path(other)).code, CMPI_RC_ERR_NOT_FOUND);
     EXPECT_EQ(request_.invokeMethod(path(other), "SetAssetTag", argument("x")).code, CMPI_RC_ERR_NOT_FOUND);
     CMPIObjectPath* const swapped = path("OXATK_RunningOS");
@@ -352,22 +338,21 @@ TEST_F(HostProviderTest, RefusesRequestsWithTheRightCode) {
 
     const CMPIObjectPath* const port = path(portPath);
     const CMPIInstance* const instance = CMNewInstance(broker_.handle(), port, nullptr);
-    EXPECT_EQ(request_.createInstance(port, instance).code, CMPI_RC_ERR_NOT_SUPPORTED);
-    EXPECT_EQ(request_.modifyInstance(port, instance).code, CMPI_RC_ERR_NOT_SUPPORTED);
-    EXPECT_EQ(request_.deleteInstance(port).code, CMPI_RC_ERR_NOT_SUPPORTED);
-    EXPECT_EQ(request_.execQuery(port, "select", "WQL").code, CMPI_RC_ERR_NOT_SUPPORTED);
+    for (const Reply& reply :
+         {request_.createInstance(port, instance), request_.modifyInstance(port, instance),
+          request_.deleteInstance(port), request_.execQuery(port, "select", "WQL")}) {
+        EXPECT_EQ(reply.code, CMPI_RC_ERR_NOT_SUPPORTED);
+    }
 
     EXPECT_EQ(setTag(request_, "x", "Reboot").code, CMPI_RC_ERR_METHOD_NOT_FOUND);
     EXPECT_EQ(request_.invokeMethod(port, "SetAssetTag", argument("x")).code, CMPI_RC_ERR_METHOD_NOT_FOUND);
     EXPECT_TRUE(setTag(request_, "x", "setassettag").ok());
-    CMPIData number = {CMPI_uint64, CMPI_goodValue, {}};
-    number.value.uint64 = 5;
-    EXPECT_EQ(request_.invokeMethod(path(systemPath), "SetAssetTag", argument(number)).message,
+    const CMPIArgs* const number = argument(request_.valueFromText("5", CMPI_uint64));
+    EXPECT_EQ(request_.invokeMethod(path(systemPath), "SetAssetTag", number).message,
               "argument Tag is no text");
     const CMPIArgs* const none = CMNewArgs(broker_.handle(), nullptr);
-    const Reply missing = request_.invokeMethod(path(systemPath), "SetAssetTag", none);
-    EXPECT_EQ(missing.code, CMPI_RC_ERR_INVALID_PARAMETER);
-    EXPECT_EQ(missing.message, "The asset tag is missing.");
+    EXPECT_EQ(failureOf(request_.invokeMethod(path(systemPath), "SetAssetTag", none)),
+              "CMPI_RC_ERR_INVALID_PARAMETER The asset tag is missing.");
 
     oxahv::EmbeddedBroker faulty;
     faulty.setContextEntry("OXAHostStateFile", "x");
