@@ -117,6 +117,21 @@ protected:
         return logOf(operation);
     }
 
+    // What createObjectPath does, whether the broker makes the path or not.
+    static std::string creating(const CMPIBroker* broker, const std::string& className,
+                                const std::string& nameSpace, bool isMade) {
+        const auto trace = [](const std::string& name, const std::string& value) {
+            return variable(providerUtilities, "createObjectPath", name, value);
+        };
+        const std::string list =
+            " broker=" + address(broker) + " classname=" + className + " nameSpace=" + nameSpace;
+        const std::string own = "ProviderUtilities::createObjectPath";
+        return entering(providerUtilities, "createObjectPath", list) + trace("classname", className) +
+               "newObjectPath " + nameSpace + ' ' + className + '\n' +
+               (isMade ? "setNameSpace " + nameSpace + '\n' + trace('"' + own + '"', own) : "") +
+               exiting(providerUtilities, "createObjectPath", list);
+    }
+
     CMPIString* newString(const char* text) { return CMNewString(broker_.handle(), text, nullptr); }
 
     oxahv::EmbeddedBroker broker_;

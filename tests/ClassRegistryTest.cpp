@@ -48,18 +48,9 @@ protected:
         return result;
     }
 
-    // What createObjectPath does for a candidate, and with the path that is made.
+    // What is done for a candidate.
     std::string asked(const std::string& candidate, bool isMade = true) const {
-        const std::string list =
-            " broker=" + address(broker_.handle()) + " classname=" + candidate + " nameSpace=root/cimv2";
-        const std::string own = "ProviderUtilities::createObjectPath";
-        return entering(providerUtilities, "createObjectPath", list) +
-               variable(providerUtilities, "createObjectPath", "classname", candidate) +
-               "newObjectPath root/cimv2 " + candidate + '\n' +
-               (isMade ? "setNameSpace root/cimv2\n" +
-                             variable(providerUtilities, "createObjectPath", '"' + own + '"', own)
-                       : "") +
-               exiting(providerUtilities, "createObjectPath", list) +
+        return creating(broker_.handle(), candidate, "root/cimv2", isMade) +
                (isMade ? "classPathIsA CIM_Port\n" : "");
     }
 

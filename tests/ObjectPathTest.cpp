@@ -223,17 +223,10 @@ TEST_F(ObjectPathTest, ReadsAWhiteSpaceByteAsZero) {
 
 TEST_F(ObjectPathTest, CreatesPathsUnlessTheBrokerRefuses) {
     const auto expect = [this](const CMPIBroker* broker, bool isMade) {
-        const auto trace = [](const std::string& name, const std::string& value) {
-            return variable(providerUtilities, "createObjectPath", name, value);
+        const auto create = [&] {
+            EXPECT_EQ(PU::createObjectPath(broker, "Demo_Class", "root") != nullptr, isMade);
         };
-        const std::string list = " broker=" + address(broker) + " classname=Demo_Class nameSpace=root";
-        const std::string own = "ProviderUtilities::createObjectPath";
-        EXPECT_EQ(
-            logOf([&] { EXPECT_EQ(PU::createObjectPath(broker, "Demo_Class", "root") != nullptr, isMade); }),
-            entering(providerUtilities, "createObjectPath", list) + trace("classname", "Demo_Class") +
-                "newObjectPath root Demo_Class\n" +
-                (isMade ? "setNameSpace root\n" + trace('"' + own + '"', own) : "") +
-                exiting(providerUtilities, "createObjectPath", list));
+        EXPECT_EQ(logOf(create), creating(broker, "Demo_Class", "root", isMade));
     };
     const CMPIBroker* const broker = broker_.handle();
     expect(broker, true);
