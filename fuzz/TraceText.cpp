@@ -74,14 +74,14 @@ extern "C" int LLVMFuzzerInitialize(int*, char***) {
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     fuzz::Input input(data, size);
-    // Now and then a mebibyte; it takes its time.
+    // Now and then 64 KiB; it takes its time.
     const auto number = input.number<std::uint16_t>();
     const unsigned int repeated = number == 0xFFFF ? 0x10000U : number % 64U;
     const auto line = input.number<unsigned int>();
     const std::string file = input.line();
     const std::string piece = input.rest();
     std::string text = piece;
-    for (unsigned int i = repeated; i > 0 && text.size() < 1'048'576 && !piece.empty(); --i) {
+    for (unsigned int i = repeated; i > 0 && text.size() < 65'536 && !piece.empty(); --i) {
         text += piece;
     }
     checkFunctions(text.c_str(), file.c_str(), line);

@@ -7,7 +7,6 @@
 #include <csignal>
 #include <fcntl.h>
 #include <functional>
-#include <map>
 #include <sys/resource.h>
 #include <sys/stat.h>
 #include <sys/syscall.h>
@@ -113,30 +112,26 @@ static_assert(!std::is_copy_constructible_v<PropertyFile> && !std::is_copy_assig
 
 } // namespace
 
-TEST_F(PropertyFileTest, ReadsBackEveryKeyAndValue) {
-    const std::wstring nasty =
-        L" \t\n\r\b\x7F\x1B\\u{4}=#"
-        L"k\u0085\u00A0\u2028\uFEFF\u20AC\U0001F600\U0010FFFF\xD800\xDFFF\x110000\xFFFFFFFF";
-    std::map<std::wstring, std::wstring> expected = {{L"", L""}, {std::wstring(L"nul\0key", 7), L"value"}};
-    for (const wchar_t first : nasty) {
-        for (const wchar_t second : nasty) {
-            expected[{first, second}] = {second, L'v', first};
-        }
-    }
+// A fuzz target tries them in combination.
+TEST_F(PropertyFileTest, ReadsBackEveryCharacter) {
+    std::wstring characters = L"\u20AC\uFEFF\U0001F600\U0010FFFF\xD800\xDFFF\x110000\xFFFFFFFF";
     for (wchar_t code = 1; code < 0x3000; ++code) {
-        expected[std::wstring(1, code)] = std::wstring(2, code);
+        characters += code;
     }
     PropertyFile file(path());
-    for (const auto& [key, value] : expected) {
-        file.setEntry(key, L"something longer at first");
-        file.setEntry(key, value);
+    file.setEntry(std::wstring(L"nul\0key", 7), L"value");
+    for (const wchar_t character : characters) {
+        file.setEntry({character}, L"something longer at first");
+        file.setEntry({character}, {character, L'v', character});
     }
     file.save();
     PropertyFile again(path());
     EXPECT_EQ(damageOf(again), "");
-    for (const auto& [key, value] : expected) {
-        ASSERT_EQ(file.getEntry(key), value) << testing::PrintToString(key);
-        ASSERT_EQ(again.getEntry(key), value) << testing::PrintToString(key);
+    EXPECT_EQ(again.getEntry(std::wstring(L"nul\0key", 7)), L"value");
+    for (const wchar_t character : characters) {
+        const std::wstring value = {character, L'v', character};
+        ASSERT_EQ(file.getEntry({character}), value) << static_cast<unsigned long>(character);
+        ASSERT_EQ(again.getEntry({character}), value) << static_cast<unsigned long>(character);
     }
 }
 
