@@ -164,11 +164,9 @@ TEST(RunnerTest, WritesInstancesAndSendsQueries) {
         {"mi Demo =1", 2, "oxahv-provider: property '=1' is not name=value\n"},
     };
     for (const auto& c : cases) {
-        const Outcome outcome = run(declared + c.arguments);
-        EXPECT_EQ(outcome.output, c.output) << c.arguments;
-        EXPECT_EQ(outcome.status, c.status) << c.arguments;
+        expectRun(declared + c.arguments, c.status, c.output);
     }
-    EXPECT_EQ(run(test + "xq Demo 'SELECT * FROM Demo'").output,
+    expectRun(test + "xq Demo 'SELECT * FROM Demo'", 0,
               "instance of Demo {\n  Query = \"SELECT * FROM Demo\";\n  Language = \"WQL\";\n};\n");
     EXPECT_NE(run(test + "xq --language CIM:CQL Demo x").output.find("\"CIM:CQL\""), std::string::npos);
 }
@@ -180,8 +178,8 @@ TEST(RunnerTest, PrintsControlCharactersAsEscapes) {
               "ReturnValue = 1;\nA = \"\\x001B]0;\\x009B\\x007F\\n\\x00FF\";\n");
     const std::string json = shell("bash -c \"" RUNNER " --output json " + call + "\"").output;
     EXPECT_NE(json.find(R"(\u001b]0;\u009B\u007F\n)"), std::string::npos) << json;
-    const std::string path = R"(root/cimv2:Demo.Text="\x001B]0;")";
-    EXPECT_EQ(run(test + "ci " + quoted(path)).output, path + '\n') << "what is printed can be read";
+    const std::string path = R"(root/cimv2:Demo.Text="\x001B]0;")"; // what is printed can be read
+    expectRun(test + "ci " + quoted(path), 0, path + '\n');
 }
 
 TEST(RunnerTest, PassesContextToTheProvider) {
