@@ -1,8 +1,8 @@
 // Requests through the broker: hosted providers, injected faults, delivery of keys, and threads.
 #include "TestLocales.h"
 
-#include "EmbeddedBroker.h"
 #include "ErrorOf.h"
+#include "Factory.h"
 #include "FailingMemory.h"
 
 #include <atomic>
@@ -23,7 +23,6 @@ namespace {
 // A provider whose functions a test sets; the other slots are empty.
 std::function<CMPIStatus(const CMPIContext*, const CMPIResult*, const CMPIObjectPath*)> serve;
 std::function<void(const CMPIContext*)> atEnd;
-const CMPIBroker* broker = nullptr;
 
 template <class... Rest>
 CMPIStatus serveAny(CMPIInstanceMI*, const CMPIContext* context, const CMPIResult* result,
@@ -64,14 +63,6 @@ CMPIStatus note(MI*, const CMPIContext*, const CMPIResult* result, const CMPIObj
     (Note::add(rest), ...);
     return operation < 'a' ? CMReturnObjectPath(result, path)
                            : CMReturnInstance(result, CMNewInstance(broker, path, nullptr));
-}
-
-// A factory of an MI with a table of functions.
-template <auto& table, class MI>
-MI* create(const CMPIBroker* theBroker, const CMPIContext*, CMPIStatus*) {
-    static MI mi = {nullptr, &table};
-    broker = theBroker;
-    return &mi;
 }
 
 const CMPIInstanceMIFT served = {0, 0, "", end, serveAny, {}, serveAny, {}, {}, {}, {}, {}};

@@ -1,6 +1,6 @@
 // Every slot of every table that takes a handle: with each argument null in turn, and while memory runs out
 // at each allocation in turn. No call may crash, throw, leak, or report success that it did not have.
-#include "EmbeddedBroker.h"
+#include "Factory.h"
 #include "FailingMemory.h"
 #include "cmpi/Slots.h"
 
@@ -16,7 +16,6 @@ using oxahv::Request;
 
 namespace {
 
-const CMPIBroker* broker = nullptr;
 const CMPIResult* result = nullptr; // while the provider is inside
 std::function<void()> insideProvider;
 const CMPIContext* context = nullptr; // of the call
@@ -39,15 +38,7 @@ CMPIStatus serveInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* 
     return made.rc == CMPI_RC_OK ? CMReturnInstance(given, instance) : made;
 }
 
-CMPIInstanceMI* createProvider(const CMPIBroker* theBroker, const CMPIContext*, CMPIStatus*) {
-    static CMPIInstanceMIFT table = {};
-    static CMPIInstanceMI mi = {nullptr, &table};
-    table.enumerateInstanceNames = serveNames;
-    table.enumerateInstances = serveInstance;
-    table.getInstance = serveInstance;
-    broker = theBroker;
-    return &mi;
-}
+const CMPIInstanceMIFT served = {0, 0, "", {}, serveNames, serveInstance, serveInstance, {}, {}, {}, {}, {}};
 
 // What a fresh argument points at, with which most slots succeed; null where they can do without.
 struct Fresh {
@@ -221,7 +212,7 @@ const std::set<std::string> unsupported = {
 
 class EverySlot : public testing::Test {
 protected:
-    EverySlot() { broker_.host("Provider", {createProvider}); }
+    EverySlot() { broker_.host("Provider", {create<served>}); }
 
     template <class Table>
     void sweep(const Table* table) {

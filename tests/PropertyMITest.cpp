@@ -1,5 +1,5 @@
 // Requests for single properties, to a provider with a property MI that reads and does not write.
-#include "EmbeddedBroker.h"
+#include "Factory.h"
 
 #include <gtest/gtest.h>
 
@@ -19,26 +19,10 @@ CMPIStatus readProperty(CMPIPropertyMI*, const CMPIContext*, const CMPIResult* r
     return CMReturnData(result, &seven, CMPI_uint8);
 }
 
-CMPIPropertyMI* createPropertyMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*) {
-    static CMPIPropertyMIFT table = {};
-    static CMPIPropertyMI mi = {nullptr, &table};
-    table.getProperty = readProperty;
-    return &mi;
-}
-
 CMPIStatus writeProperty(CMPIPropertyMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*,
                          const char* name, const CMPIData data) {
     asked += std::string("set ") + name + '=' + oxahv::valueText(data) + ' ';
     CMReturn(data.type == CMPI_uint8 ? CMPI_RC_OK : CMPI_RC_ERR_TYPE_MISMATCH);
-}
-
-CMPIPropertyMI* createWritingMI(const CMPIBroker* broker, const CMPIContext* context, CMPIStatus* status) {
-    CMPIPropertyMI* const mi = createPropertyMI(broker, context, status);
-    static CMPIPropertyMIFT table = {};
-    static CMPIPropertyMI writing = {nullptr, &table};
-    table = *mi->ft;
-    table.setProperty = writeProperty;
-    return &writing;
 }
 
 CMPIStatus modify(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*,
@@ -48,12 +32,9 @@ CMPIStatus modify(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const 
     CMReturn(CMPI_RC_OK);
 }
 
-CMPIInstanceMI* createInstanceMI(const CMPIBroker*, const CMPIContext*, CMPIStatus*) {
-    static CMPIInstanceMIFT table = {};
-    static CMPIInstanceMI mi = {nullptr, &table};
-    table.modifyInstance = modify;
-    return &mi;
-}
+const CMPIPropertyMIFT reading = {0, 0, "", {}, {}, readProperty, {}};
+const CMPIPropertyMIFT writing = {0, 0, "", {}, writeProperty, readProperty, {}};
+const CMPIInstanceMIFT modifying = {0, 0, "", {}, {}, {}, {}, {}, modify, {}, {}, {}};
 
 class AProperty : public testing::Test {
 protected:
@@ -64,7 +45,7 @@ protected:
 
     void host(decltype(oxahv::ProviderFactories::property) factory) {
         oxahv::ProviderFactories factories;
-        factories.instance = createInstanceMI;
+        factories.instance = create<modifying>;
         factories.property = factory;
         broker_.host("Tested", factories, {"Demo"});
     }
@@ -80,7 +61,7 @@ protected:
 } // namespace
 
 TEST_F(AProperty, IsServedByItsMI) {
-    host(createWritingMI);
+    host(create<writing>);
     EXPECT_EQ(request_.getProperty(path(), "Speed").data.at(0).value.uint8, 7);
     EXPECT_EQ(set("9", CMPI_uint8), CMPI_RC_OK);
     EXPECT_EQ(set("9", CMPI_string), CMPI_RC_ERR_TYPE_MISMATCH);
@@ -97,7 +78,7 @@ TEST_F(AProperty, IsServedByItsMI) {
 }
 
 TEST_F(AProperty, IsWrittenByItsInstanceWhereTheMIOnlyReads) {
-    host(createPropertyMI);
+    host(create<reading>);
     EXPECT_EQ(set("9", CMPI_uint8), CMPI_RC_OK);
     CMPIData none = {};
     none.type = CMPI_uint8;
