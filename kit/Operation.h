@@ -12,6 +12,8 @@
 
 namespace oxahv {
 
+class Operation;
+
 namespace detail {
 // Whether classes are related to the one that a client filters by, which most candidates share: the last
 // answer is kept.
@@ -21,12 +23,15 @@ struct ClassFilter {
     bool lastPasses = false;
 };
 
-// The filters of an association request; null or empty is none.
+// The filters of an association request; null or empty is none. The code that applies them is called through
+// this record, so that a provider without associations does not compile it.
 struct EndFilter {
     ClassFilter associationClass;
     ClassFilter resultClass;
     const char* role;
     const char* resultRole;
+    // Whether the client may want an association of this class, whose ends are known as far as they are keys.
+    bool (*mayWant)(const Operation& operation, const char* className, const Instance& association);
 };
 
 inline bool isGiven(const char* filter) {
@@ -139,6 +144,7 @@ private:
     bool isNearEnd(const Instance::End& end) const;
     bool isFarEnd(const std::vector<Instance::End>& ends, std::size_t index) const;
     bool isAsked(const std::vector<Instance::End>& ends) const;
+    static bool mayWant(const Operation& operation, const char* className, const Instance& association);
     Instance unwanted() const;
     Instance complete(const char* className, CMPIObjectPath* path, const Keys* keys) const;
     void fill(Instance& instance, const char* className, const Keys* keys) const;
@@ -236,8 +242,7 @@ inline Instance Operation::complete(const char* className, CMPIObjectPath* path,
     if (isOfAssociations()) {
         instance.isAssociation_ = true;
         detail::eachKey(keys, path, [&](const char* name, const Value& value) { instance.set(name, value); });
-        if (!passes(filter_->associationClass, className) ||
-            (instance.ends_.size() > 1 && !isAsked(instance.ends_))) {
+        if (!filter_->mayWant(*this, className, instance)) {
             return unwanted();
         }
     }
@@ -331,6 +336,12 @@ inline bool Operation::isAsked(const std::vector<Instance::End>& ends) const {
         }
     }
     return false;
+}
+
+inline bool Operation::mayWant(const Operation& operation, const char* className,
+                               const Instance& association) {
+    return operation.passes(operation.filter_->associationClass, className) &&
+           (association.ends_.size() < 2 || operation.isAsked(association.ends_));
 }
 
 } // namespace oxahv

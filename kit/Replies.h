@@ -67,8 +67,10 @@ private:
     const Operation* operation_;
     Names& names_;
     bool isOne_; // whether the client asks for one instance
+    // Of a request for associations alone.
     AssociationProvider* provider_ = nullptr;
     End end_ = nullptr;
+    void (Instances::*addAssociation_)(const Instance& instance) = nullptr;
 };
 
 // Of an instance that the kit has made, its ends were noted when it was made.
@@ -154,7 +156,7 @@ inline void Instances::add(const Instance& instance) {
         names_.add(instance.path());
         return;
     default:
-        addAssociation(instance);
+        (this->*addAssociation_)(instance);
     }
 }
 

@@ -5,6 +5,7 @@
 
 #include <Trace.h>
 
+#include <cstring>
 #include <cxxabi.h>
 #include <exception>
 #include <limits>
@@ -13,34 +14,65 @@ namespace oxahv::detail {
 
 // Traces
 
-// One trace point for all functions of all providers, which are named in it.
-inline void traceFlow(const std::string& category, const char* function, const char* parameters,
-                      TK::MessageType type) {
-    constexpr const char* file = TK::traceFileName(__FILE__);
-    constexpr int line = __LINE__;
-    const std::string text = TK::tracepara(function, file, line, parameters, type);
-    HVLog::HVLogger::logLevelMessage(function, file, line, category, TK::parametersLevelCode, nullptr, 0, 0,
-                                     text);
-    HVLog::HVLogger::traceLevelMessage(function, file, line, category, TK::parametersLevelCode, nullptr, 0, 0,
-                                       text);
-}
-
-// " name=text"; a null text is left out.
-inline void appendParameter(std::string& list, const char* name, const char* text) {
-    if (text != nullptr) {
-        list.append(1, ' ').append(name).append(1, '=').append(text);
+// A parameter list: " name=text name=text", as far as a trace can show it.
+class TraceList {
+public:
+    TraceList& add(const char* name, const char* text) {
+        return append(" ").append(name).append("=").append(text);
     }
-}
+    // A null text is left out.
+    TraceList& addGiven(const char* name, const char* text) {
+        return text != nullptr ? add(name, text) : *this;
+    }
+    TraceList& add(const char* name, std::size_t number) {
+        char digits[std::numeric_limits<std::size_t>::digits10 + 2] = {};
+        char* first = digits + sizeof digits - 1;
+        do {
+            *--first = static_cast<char>('0' + number % 10);
+            number /= 10;
+        } while (number != 0);
+        return add(name, first);
+    }
+    TraceList() { *list_ = 0; }
+    const char* text() const { return list_; }
 
-inline void appendParameter(std::string& list, const char* name, std::size_t number) {
-    char digits[std::numeric_limits<std::size_t>::digits10 + 2] = {};
-    char* first = digits + sizeof digits - 1;
-    do {
-        *--first = static_cast<char>('0' + number % 10);
-        number /= 10;
-    } while (number != 0);
-    appendParameter(list, name, first);
-}
+private:
+    TraceList& append(const char* text) {
+        const std::size_t room = sizeof list_ - 1 - size_;
+        const std::size_t size = ::strnlen(text, room);
+        std::memcpy(list_ + size_, text, size);
+        size_ += size;
+        list_[size_] = '\0';
+        return *this;
+    }
+
+    std::size_t size_ = 0;
+    char list_[TK::traceBufferSize]; // NOLINT(*-member-init): written as far as it is read
+};
+
+// The trace point of all functions of all providers, which are named in it. What the logger takes is one text
+// for entry and exit, since making it anew would cost a request its second allocation.
+class FlowTrace {
+public:
+    FlowTrace(const std::string& category, const char* function) : category_(category), function_(function) {
+        text_.reserve(TK::traceBufferSize);
+    }
+
+    void log(TK::MessageType type, const TraceList& list) {
+        constexpr const char* file = TK::traceFileName(__FILE__);
+        constexpr int line = __LINE__;
+        text_ = TK::tracepara(function_, file, line, list.text(), type);
+        HVLog::HVLogger::logLevelMessage(function_, file, line, category_, TK::parametersLevelCode, nullptr,
+                                         0, 0, text_);
+        HVLog::HVLogger::traceLevelMessage(function_, file, line, category_, TK::parametersLevelCode, nullptr,
+                                           0, 0, text_);
+    }
+
+private:
+    const std::string& category_;
+    const char* function_;
+    std::string text_;
+};
 
 // Failures
 
@@ -55,10 +87,8 @@ inline void passOnTheEndOfAThread() {
 [[gnu::cold, gnu::noinline]] inline CMPIStatus statusOf(const CMPIBroker* broker, const std::string& category,
                                                         const char* function, CMPIrc code, const char* text) {
     try {
-        std::string parameters;
-        appendParameter(parameters, "code", static_cast<std::size_t>(code));
-        appendParameter(parameters, "text", text);
-        traceFlow(category, function, parameters.c_str(), TK::EXITING);
+        FlowTrace trace(category, function);
+        trace.log(TK::EXITING, TraceList().add("code", static_cast<std::size_t>(code)).add("text", text));
     } catch (...) {
         passOnTheEndOfAThread();
     }
@@ -121,6 +151,10 @@ struct Service {
         });
     }
 
+    static EndFilter filter(const char* associationClass, const char* resultClass, const char* role,
+                            const char* resultRole) {
+        return {{associationClass}, {resultClass}, role, resultRole, Operation::mayWant};
+    }
     static Instance end(AssociationProvider& provider, const Operation& operation, const Path& path) {
         return provider.end(operation, path);
     }
@@ -129,6 +163,7 @@ struct Service {
         Instances instances(operation, reply);
         instances.provider_ = &provider;
         instances.end_ = end;
+        instances.addAssociation_ = &Instances::addAssociation;
         provider.associations(operation, instances);
     }
     static void list(InstanceProvider& provider, const Operation& operation, Names& reply) {
@@ -154,22 +189,24 @@ private:
     static void run(const ServerCall& call, const void* closure, Serve serve) {
         const Operation operation(call.hosted.category, Context(call.hosted.broker, call.context), call.path,
                                   call.properties, call.wanted, call.filter);
-        std::string parameters;
-        appendParameter(parameters, "class", operation.className());
-        appendParameter(parameters, "method", call.method);
-        if (call.filter != nullptr) {
-            appendParameter(parameters, "associationClass", call.filter->associationClass.ancestor);
-            appendParameter(parameters, "resultClass", call.filter->resultClass.ancestor);
-            appendParameter(parameters, "role", call.filter->role);
-            appendParameter(parameters, "resultRole", call.filter->resultRole);
-        }
-        traceFlow(call.hosted.category, call.function, parameters.c_str(), TK::ENTERING);
+        FlowTrace trace(call.hosted.category, call.function);
+        traceEntry(trace, call, operation);
         Names reply(call.result);
         serve(closure, operation, reply);
         require(CMReturnDone(writable(call.result)), "end the reply");
-        parameters.clear();
-        appendParameter(parameters, "results", reply.count_);
-        traceFlow(call.hosted.category, call.function, parameters.c_str(), TK::EXITING);
+        trace.log(TK::EXITING, TraceList().add("results", reply.count_));
+    }
+
+    static void traceEntry(FlowTrace& trace, const ServerCall& call, const Operation& operation) {
+        TraceList list;
+        list.add("class", operation.className()).addGiven("method", call.method);
+        if (call.filter != nullptr) {
+            list.addGiven("associationClass", call.filter->associationClass.ancestor)
+                .addGiven("resultClass", call.filter->resultClass.ancestor)
+                .addGiven("role", call.filter->role)
+                .addGiven("resultRole", call.filter->resultRole);
+        }
+        trace.log(TK::ENTERING, list);
     }
 };
 

@@ -53,33 +53,4 @@ Hosted& hostedOf(const MI* mi) {
     return *static_cast<Hosted*>(const_cast<void*>(static_cast<const void*>(mi->hdl)));
 }
 
-// Makes the object of a provider's class.
-using Construct = void (*)(Hosted& hosted, const Context& context);
-
-template <class Provider>
-void construct(Hosted& hosted, const Context& context) {
-    static_assert(
-        std::is_convertible_v<Provider*, InstanceProvider*> ||
-            std::is_convertible_v<Provider*, AssociationProvider*> ||
-            std::is_convertible_v<Provider*, MethodProvider*>,
-        "a provider derives from InstanceProvider, AssociationProvider or MethodProvider, publicly");
-    Provider* object = nullptr;
-    if constexpr (std::is_constructible_v<Provider, const Context&>) {
-        object = new Provider(context);
-    } else {
-        object = new Provider();
-    }
-    hosted.object = object;
-    hosted.destroy = [](void* provider) { delete static_cast<Provider*>(provider); };
-    if constexpr (std::is_convertible_v<Provider*, InstanceProvider*>) {
-        hosted.instances = object;
-    }
-    if constexpr (std::is_convertible_v<Provider*, AssociationProvider*>) {
-        hosted.associations = object;
-    }
-    if constexpr (std::is_convertible_v<Provider*, MethodProvider*>) {
-        hosted.methods = object;
-    }
-}
-
 } // namespace oxahv::detail

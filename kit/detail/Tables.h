@@ -116,7 +116,7 @@ inline CMPIStatus associators(CMPIAssociationMI* mi, const CMPIContext* context,
                               const CMPIObjectPath* path, const char* associationClass,
                               const char* resultClass, const char* role, const char* resultRole,
                               const char** properties) {
-    EndFilter filter = {{associationClass}, {resultClass}, role, resultRole};
+    EndFilter filter = Service::filter(associationClass, resultClass, role, resultRole);
     return associate(
         {hostedOf(mi), __func__, context, result, path, properties, Wanted::associators, &filter});
 }
@@ -124,7 +124,7 @@ inline CMPIStatus associators(CMPIAssociationMI* mi, const CMPIContext* context,
 inline CMPIStatus associatorNames(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
                                   const CMPIObjectPath* path, const char* associationClass,
                                   const char* resultClass, const char* role, const char* resultRole) {
-    EndFilter filter = {{associationClass}, {resultClass}, role, resultRole};
+    EndFilter filter = Service::filter(associationClass, resultClass, role, resultRole);
     return associate(
         {hostedOf(mi), __func__, context, result, path, nullptr, Wanted::associatorNames, &filter});
 }
@@ -132,14 +132,14 @@ inline CMPIStatus associatorNames(CMPIAssociationMI* mi, const CMPIContext* cont
 inline CMPIStatus references(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
                              const CMPIObjectPath* path, const char* resultClass, const char* role,
                              const char** properties) {
-    EndFilter filter = {{resultClass}, {nullptr}, role, nullptr};
+    EndFilter filter = Service::filter(resultClass, nullptr, role, nullptr);
     return associate(
         {hostedOf(mi), __func__, context, result, path, properties, Wanted::references, &filter});
 }
 
 inline CMPIStatus referenceNames(CMPIAssociationMI* mi, const CMPIContext* context, const CMPIResult* result,
                                  const CMPIObjectPath* path, const char* resultClass, const char* role) {
-    EndFilter filter = {{resultClass}, {nullptr}, role, nullptr};
+    EndFilter filter = Service::filter(resultClass, nullptr, role, nullptr);
     return associate(
         {hostedOf(mi), __func__, context, result, path, nullptr, Wanted::referenceNames, &filter});
 }
@@ -165,18 +165,55 @@ inline CMPIStatus invokeMethod(CMPIMethodMI* mi, const CMPIContext* context, con
 // newer than CMPI 1.0 come last and stay empty.
 #pragma GCC diagnostic push
 #pragma GCC diagnostic ignored "-Wmissing-field-initializers"
-inline void fillTables(Hosted& hosted) {
-    const char* const name = hosted.module.name;
-    hosted.instanceTable = {CMPICurrentVersion,     CMPICurrentVersion, name,        cleanupInstances,
-                            enumerateInstanceNames, enumerateInstances, getInstance, createInstance,
-                            modifyInstance,         deleteInstance,     execQuery};
-    hosted.associationTable = {CMPICurrentVersion, CMPICurrentVersion, name,       cleanupAssociations,
-                               associators,        associatorNames,    references, referenceNames};
-    hosted.methodTable = {CMPICurrentVersion, CMPICurrentVersion, name, cleanupMethods, invokeMethod};
+inline CMPIInstanceMIFT instanceTable(const char* name) {
+    return {CMPICurrentVersion,     CMPICurrentVersion, name,        cleanupInstances,
+            enumerateInstanceNames, enumerateInstances, getInstance, createInstance,
+            modifyInstance,         deleteInstance,     execQuery};
+}
+inline CMPIAssociationMIFT associationTable(const char* name) {
+    return {CMPICurrentVersion, CMPICurrentVersion, name,       cleanupAssociations,
+            associators,        associatorNames,    references, referenceNames};
+}
+inline CMPIMethodMIFT methodTable(const char* name) {
+    return {CMPICurrentVersion, CMPICurrentVersion, name, cleanupMethods, invokeMethod};
 }
 #pragma GCC diagnostic pop
 
 // Factories
+
+// Makes the object of a provider's class.
+using Construct = void (*)(Hosted& hosted, const Context& context);
+
+template <class Provider>
+void construct(Hosted& hosted, const Context& context) {
+    static_assert(
+        std::is_convertible_v<Provider*, InstanceProvider*> ||
+            std::is_convertible_v<Provider*, AssociationProvider*> ||
+            std::is_convertible_v<Provider*, MethodProvider*>,
+        "a provider derives from InstanceProvider, AssociationProvider or MethodProvider, publicly");
+    Provider* object = nullptr;
+    if constexpr (std::is_constructible_v<Provider, const Context&>) {
+        object = new Provider(context);
+    } else {
+        object = new Provider();
+    }
+    hosted.object = object;
+    hosted.destroy = [](void* provider) { delete static_cast<Provider*>(provider); };
+    // The code of a kind that the class does not have is not compiled.
+    const char* const name = hosted.module.name;
+    if constexpr (std::is_convertible_v<Provider*, InstanceProvider*>) {
+        hosted.instances = object;
+        hosted.instanceTable = instanceTable(name);
+    }
+    if constexpr (std::is_convertible_v<Provider*, AssociationProvider*>) {
+        hosted.associations = object;
+        hosted.associationTable = associationTable(name);
+    }
+    if constexpr (std::is_convertible_v<Provider*, MethodProvider*>) {
+        hosted.methods = object;
+        hosted.methodTable = methodTable(name);
+    }
+}
 
 inline Hosted& find(Module& module, const CMPIBroker* broker, const CMPIContext* context,
                     const char* category, Construct construct) {
@@ -186,7 +223,6 @@ inline Hosted& find(Module& module, const CMPIBroker* broker, const CMPIContext*
         }
     }
     auto hosted = std::make_unique<Hosted>(module, broker, category);
-    fillTables(*hosted);
     const Utf8Thread utf8(hosted->locale);
     construct(*hosted, Context(broker, context));
     hosted->next = module.first;
