@@ -5,6 +5,7 @@
 #include "hosting/AttachedThreads.h"
 #include "hosting/Delivery.h"
 #include "hosting/Hosting.h"
+#include "hosting/Indications.h"
 #include "objects/Records.h"
 #include "tables/Hooks.h"
 
@@ -39,6 +40,8 @@ public:
     void setContextEntry(const std::string& name, const std::string& text);
     // Puts the program's entries into a new context.
     void addContextEntries(Context& context);
+    // And what it says of the client.
+    void addClientEntries(Context& context, const std::string& principal, CMPIFlags flags);
 
 private:
     std::array<std::atomic<int>, kindCount>
@@ -57,6 +60,7 @@ public:
     Delivery delivery;
     Hooks hooks;
     AttachedThreads attachedThreads; // after the owners and before the providers, which may leave threads
+    Indications indications{*this};
     Hosting hosting{*this};
     std::atomic<NewInstances> newInstances{NewInstances::full};
 };

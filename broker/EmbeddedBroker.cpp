@@ -63,6 +63,13 @@ void EmbeddedBroker::Impl::addContextEntries(Context& context) {
     }
 }
 
+void EmbeddedBroker::Impl::addClientEntries(Context& context, const std::string& principal, CMPIFlags flags) {
+    CMPIValue value = {};
+    value.uint32 = flags;
+    context.values.set(CMPIInvocationFlags, Value::number(value, CMPI_uint32));
+    context.values.set(CMPIPrincipal, Value::text(*this, principal));
+}
+
 EmbeddedBroker::EmbeddedBroker() : impl_(std::make_unique<Impl>()) {}
 EmbeddedBroker::~EmbeddedBroker() = default;
 

@@ -29,14 +29,7 @@ class Request::Impl {
 public:
     explicit Impl(EmbeddedBroker& broker) : core(broker.impl()) {
         core.addContextEntries(context);
-        setFlags(0);
-        context.values.set(CMPIPrincipal, Value::text(core, ""));
-    }
-
-    void setFlags(CMPIFlags flags) {
-        CMPIValue value = {};
-        value.uint32 = flags;
-        context.values.set(CMPIInvocationFlags, Value::number(value, CMPI_uint32));
+        core.addClientEntries(context, "", 0);
     }
 
     // The context of a request for a path.
@@ -74,7 +67,9 @@ void Request::setContextEntry(const std::string& name, const std::string& text) 
 }
 
 void Request::setInvocationFlags(CMPIFlags flags) {
-    impl_->setFlags(flags);
+    CMPIValue value = {};
+    value.uint32 = flags;
+    impl_->context.values.set(CMPIInvocationFlags, Value::number(value, CMPI_uint32));
 }
 
 void Request::setProgressHandler(std::function<void(std::size_t results)> handler) {

@@ -186,6 +186,7 @@ void Hosting::load(const std::string& file, const std::string& name, std::vector
 
 void Hosting::unload(const std::string& name) {
     std::shared_ptr<HostedProvider> provider = take(name);
+    core_.indications.leave(provider);
     const std::future<void> gone = provider->gone();
     provider.reset();
     gone.wait();
@@ -222,6 +223,13 @@ Hosting::Providers Hosting::find(const ObjectPath& path, const Operation& operat
     std::stable_partition(found.begin(), found.end(),
                           [](const auto& provider) { return !Ongoing::includes(provider.get()); });
     return found;
+}
+
+Hosting::Providers Hosting::findForIndications(const std::string& className) const {
+    return providersThat([&](const HostedProvider& p) {
+        return p.mi<CMPIIndicationMI>() != nullptr && (p.servesAll() || p.serves(core_.classes, className) ||
+                                                       p.servesPartOf(core_.classes, className));
+    });
 }
 
 // Has a provider serve a request.

@@ -13,6 +13,8 @@ namespace oxahv {
 
 class Hosting {
 public:
+    using Providers = std::vector<std::shared_ptr<HostedProvider>>;
+
     explicit Hosting(Core& core) : core_(core) {}
     ~Hosting(); // NOLINT(bugprone-exception-escape): see there
     Hosting(const Hosting&) = delete;
@@ -37,12 +39,13 @@ public:
     Reply setProperty(const CMPIContext* context, const CMPIObjectPath* path, const char* name,
                       const CMPIValue* value, CMPIType type);
 
+    // Those with an indication MI that serve the class, one above it or one below it, or all classes.
+    Providers findForIndications(const std::string& className) const;
+
     // The answer to a request that no provider gets.
     static Reply refused(CMPIrc code, std::string message = {});
 
 private:
-    using Providers = std::vector<std::shared_ptr<HostedProvider>>;
-
     // Who wants to know of a request's results, and how many have come before.
     struct Progress {
         const std::function<void(std::size_t)>* handler;

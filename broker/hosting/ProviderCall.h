@@ -17,6 +17,11 @@ struct Outcome {
     bool isThrown = false;
 };
 
+// The same as words for a person.
+inline std::string wordsOf(const Outcome& outcome) {
+    return codeName(outcome.code) + (outcome.message.empty() ? "" : ": " + outcome.message);
+}
+
 // Calls a function that returns a CMPIStatus. Throws std::bad_alloc where there is no room for the message.
 template <class Function>
 Outcome callProvider(const Function& function) {

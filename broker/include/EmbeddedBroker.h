@@ -57,6 +57,7 @@
 
 #include "Declarations.h"
 #include "Request.h"
+#include "Subscription.h"
 #include "TKExport.h"
 #include "Testing.h"
 #include "Text.h"

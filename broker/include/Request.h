@@ -62,8 +62,7 @@ struct AssociationFilter {
 
 /**
  * A client's request, with its CMPI context. While it lives, it owns what the broker makes on this thread.
- * Requests nest: an upcall of a provider runs in the request that it serves. Of one that fails the provider
- * gets the code without the message.
+ * Requests nest: an upcall of a provider runs in the request that it serves.
  *
  * The operations find the provider by the class of the path, call its MI function, and collect what it
  * returns. Of several providers that serve the class, the next is asked where one refuses it

@@ -34,17 +34,24 @@ void detachThread(Core& core, const CMPIContext* context) {
     AttachedThreads::detach(core);
 }
 
-// There is nobody to deliver to.
-void deliverIndication(Core& /*core*/, const CMPIContext* /*context*/, const char* /*nameSpace*/,
-                       const CMPIInstance* /*indication*/) {
-    throw Failure{CMPI_RC_ERR_NOT_SUPPORTED};
+void deliverIndication(Core& core, const CMPIContext* context, const char* nameSpace,
+                       const CMPIInstance* handle) {
+    requireContext(context);
+    const Instance* const indication = Instance::of(handle);
+    if (indication == nullptr) {
+        throw Failure{CMPI_RC_ERR_INVALID_HANDLE};
+    }
+    core.indications.deliver(required(nameSpace), *indication);
 }
 
 // What a request yielded, or its failure.
 
 const Reply& succeeded(const Reply& reply) {
-    if (!reply.ok()) {
+    if (!reply.ok() && reply.message.empty()) {
         throw Failure{reply.code};
+    }
+    if (!reply.ok()) {
+        failWith(reply.code, reply.message);
     }
     return reply;
 }
@@ -176,7 +183,11 @@ CMPIEnumeration* referencesFiltered(Core& /*core*/, const CMPIContext* /*context
 } // namespace
 
 const CMPIBrokerFT requestTable = {
-    0,
+    CMPI_MB_InstanceManipulation | CMPI_MB_AssociationTraversal | CMPI_MB_QueryExecution |
+        CMPI_MB_QueryNormalization | CMPI_MB_BasicQualifierSupport | CMPI_MB_Indications |
+        CMPI_MB_OSEncapsulationSupport | CMPI_MB_Supports_PropertyMI | CMPI_MB_Supports_IndicationMI |
+        CMPI_MB_Supports_QueryNormalization | CMPI_MB_Supports_Qualifier | CMPI_MB_Supports_MemEnhancements |
+        CMPI_MB_Supports_Extended_Error | CMPI_MB_Logging | CMPI_MB_Tracing | CMPI_MB_PropertyFiltering,
     CMPICurrentVersion,
     "oxahvbroker",
     SLOT(CMPIBrokerFT, prepareAttachThread, prepareAttachThread),
