@@ -28,18 +28,18 @@ private:
 class Request::Impl {
 public:
     explicit Impl(EmbeddedBroker& broker) : core(broker.impl()) {
-        core.addContextEntries(context);
-        core.addClientEntries(context, "", 0);
+        core.addContextEntries(*context);
+        core.addClientEntries(*context, "", 0);
     }
 
     // The context of a request for a path.
     const CMPIContext* contextFor(const CMPIObjectPath* path) {
         const ObjectPath* const target = ObjectPath::of(path);
         if (target != nullptr) {
-            context.values.set(CMPIInitNameSpace, Value::text(core, target->nameSpace));
+            context->values.set(CMPIInitNameSpace, Value::text(core, target->nameSpace));
         }
-        context.progress = &progress;
-        return &context;
+        context->receiver = &receiver;
+        return context.get();
     }
 
     template <auto slot, class... Arguments>
@@ -48,9 +48,9 @@ public:
     }
 
     Core& core;
-    Context context{core}; // nobody's: a provider that releases it does no harm
+    Exposed<Context> context{new Context(core)}; // nobody's: a provider that releases it does no harm
     Owner owner{core};
-    std::function<void(std::size_t)> progress;
+    Receiver receiver;
     Owner::Scope scope{owner};
 };
 
@@ -59,21 +59,26 @@ Request::Request(EmbeddedBroker& broker) : impl_(std::make_unique<Impl>(broker))
 Request::~Request() = default;
 
 const CMPIContext* Request::context() const {
-    return &impl_->context;
+    return impl_->context.get();
 }
 
 void Request::setContextEntry(const std::string& name, const std::string& text) {
-    impl_->context.values.set(name, Value::text(impl_->core, text));
+    impl_->context->values.set(name, Value::text(impl_->core, text));
 }
 
 void Request::setInvocationFlags(CMPIFlags flags) {
     CMPIValue value = {};
     value.uint32 = flags;
-    impl_->context.values.set(CMPIInvocationFlags, Value::number(value, CMPI_uint32));
+    impl_->context->values.set(CMPIInvocationFlags, Value::number(value, CMPI_uint32));
 }
 
 void Request::setProgressHandler(std::function<void(std::size_t results)> handler) {
-    impl_->progress = std::move(handler);
+    impl_->receiver.progress = std::move(handler);
+}
+
+void Request::setResultHandlers(InstanceHandler instances, PathHandler paths) {
+    impl_->receiver.instances = std::move(instances);
+    impl_->receiver.paths = std::move(paths);
 }
 
 CMPIObjectPath* Request::objectPath(const std::string& nameSpace, const std::string& className) {

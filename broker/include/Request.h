@@ -52,6 +52,13 @@ struct Reply {
     bool ok() const { return code == CMPI_RC_OK; }
 };
 
+/** Gets an instance that a request yields. The instance, and what the handler makes in the broker on this
+ * thread, are freed when it returns. Its calls of slots are not recorded, and no fault strikes them. What it
+ * throws, the provider gets as `CMPI_RC_ERR_FAILED`. */
+using InstanceHandler = std::function<void(const CMPIInstance* instance)>;
+/** The same for an object path. */
+using PathHandler = std::function<void(const CMPIObjectPath* path)>;
+
 /** Filters of an association request; an empty text is no filter. */
 struct AssociationFilter {
     std::string associationClass; ///< only by associations of this class; for references: not looked at
@@ -107,6 +114,20 @@ public:
      * far, after each of them and on the thread that returned it; null: nobody. It must not throw.
      */
     void setProgressHandler(std::function<void(std::size_t results)> handler);
+
+    /**
+     * Hands the results of the operations that follow to functions, in place of putting them into the reply:
+     * each as soon as the provider returns it, on the thread that returned it; it is freed then. The reply
+     * has the status and the rest.
+     *
+     * So memory does not grow with the number of results, even where the provider releases nothing: an
+     * instance, object path, string, array or date/time that it made after its first result, and that it has
+     * not used again in the meantime, is freed a thousand results later. Whoever uses it after that gets
+     * `CMPI_RC_ERR_INVALID_HANDLE`. What the provider has looked into stays until the request ends.
+     * @param instances gets the instances; null: they are in the reply.
+     * @param paths gets the object paths; null: they are in the reply.
+     */
+    void setResultHandlers(InstanceHandler instances, PathHandler paths);
 
     /** A new object path, made through the broker's own slot; null when that refuses. */
     CMPIObjectPath* objectPath(const std::string& nameSpace, const std::string& className);

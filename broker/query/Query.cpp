@@ -151,7 +151,7 @@ void Query::check(const Classes& classes) const {
     if (!classes.any()) {
         return;
     }
-    const std::shared_ptr<const DeclaredClass> declared = classes.find(className_);
+    const DeclaredClass* const declared = classes.find(className_);
     if (declared == nullptr) {
         failWith(CMPI_RC_ERR_INVALID_CLASS, "class " + className_ + " is not declared");
     }
