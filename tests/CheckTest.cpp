@@ -66,7 +66,8 @@ std::string faultyClasses() {
                        "[Abstract] class Faulty_End : Faulty_Base {};"
                        "[Association, Abstract] class Faulty_Link {"
                        " [Key] Faulty_Base REF Near; [Key] Faulty_End REF Far; };"
-                       "class Faulty_Hang : Faulty_Base {}; class Faulty_HangClosed : Faulty_Base {};";
+                       "class Faulty_Hang : Faulty_Base {}; class Faulty_HangClosed : Faulty_Base {};"
+                       "class Faulty_HangWithProcess : Faulty_Base {};";
     for (const auto& [name, findings] : expectedFindings) {
         text += "class Faulty_" + name + " : Faulty_Base {";
         text += name == "UntypedKeys" || name == "KeyOrder" ? "[Key] uint16 Index; };" : "};";
@@ -161,6 +162,30 @@ TEST_F(TheCheck, FindsCrashesOutsideOfRequests) {
         EXPECT_EQ(report["findings"][0]["text"], c.text);
         EXPECT_EQ(report["findings"].size(), c.isServed ? 3U : 1U);
         EXPECT_EQ(report["classes"][1]["served"], c.isServed);
+    }
+}
+
+// In whatever session they are.
+TEST_F(TheCheck, LeavesNoProcessesWhenItIsKilled) {
+    for (const char* const signal : {"INT", "KILL"}) {
+        const File process;
+        // Without job control, which dash has on terminals alone, what runs in the background ignores INT.
+        const std::string output =
+            shell("bash -c 'set -m; " RUNNER " " + faulty_ + "--context ProcessFile=" + process.path() +
+                  " check --class Faulty_HangWithProcess >/dev/null 2>&1 & check=$!;"
+                  " until [ -s " +
+                  process.path() +
+                  " ]; do sleep 0.01; done;"
+                  " process=$(cat " +
+                  process.path() +
+                  "); kill -0 $process && echo runs;"
+                  " kill -" +
+                  signal +
+                  " $check; wait $check;"
+                  " while kill -0 $process; do sleep 0.01; done; echo gone' 2>/dev/null")
+                .output;
+        EXPECT_NE(output.find("runs\n"), std::string::npos) << output;
+        EXPECT_NE(output.find("gone\n"), std::string::npos) << output;
     }
 }
 
@@ -272,7 +297,8 @@ Texts offered(const std::string& words) {
 } // namespace
 
 TEST(Completion, OffersWhatTheHelpShows) {
-    for (const std::string verb : {"", "ein", "ei", "gi", "an", "ai", "rn", "ri", "cm", "ci", "mi", "di", "xq", "check"}) {
+    for (const std::string verb :
+         {"", "ein", "ei", "gi", "an", "ai", "rn", "ri", "cm", "ci", "mi", "di", "xq", "check"}) {
         const Texts all = offered(verb + " --");
         const std::string help = run(verb + " --help").output;
         std::istringstream lines(help.substr(0, help.find("Exit status"))); // examples follow

@@ -7,6 +7,7 @@
 #include <csignal>
 #include <cstddef>
 #include <cstdlib>
+#include <fstream>
 #include <iostream>
 #include <stdexcept>
 #include <string>
@@ -215,6 +216,21 @@ void callUp(const Target& target, const CMPIContext* context) {
     }
 }
 
+// Starts a process in a session of its own, which writes its number to a file.
+std::string processFile;
+
+void startProcess() {
+    if (::fork() != 0) {
+        return;
+    }
+    ::setsid();
+    if (::fork() == 0) {
+        std::ofstream(processFile) << ::getpid() << std::flush;
+        std::this_thread::sleep_for(std::chrono::minutes(5));
+    }
+    ::_exit(0);
+}
+
 // What the context wants the provider to do: to crash when it is loaded, or at its end.
 std::string crash;
 
@@ -283,6 +299,9 @@ static CMPIStatus FaultyGetInstance(CMPIInstanceMI*, const CMPIContext* context,
             std::this_thread::sleep_for(std::chrono::minutes(1));
             std::cerr << "the child is left over\n";
             ::_exit(0);
+        }
+        if (target.has("HangWithProcess")) {
+            startProcess();
         }
         if (target.has("CallsUp")) {
             callUp(target, context);
@@ -383,6 +402,8 @@ extern "C" CMPI_EXPORT CMPIInstanceMI* FaultyProvider_Create_InstanceMI(const CM
                                                                         CMPIStatus* status) {
     const CMPIData wanted = CMGetContextEntry(context, "Crash", nullptr);
     crash = wanted.type == CMPI_string ? textOf(wanted.value.string) : "";
+    const CMPIData file = CMGetContextEntry(context, "ProcessFile", nullptr);
+    processFile = file.type == CMPI_string ? textOf(file.value.string) : "";
     crashAt("load");
     return FaultyInstances_Create_InstanceMI(theBroker, context, status);
 }
