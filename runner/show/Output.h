@@ -9,7 +9,7 @@
 
 namespace oxahv::runner {
 
-enum class Format { mof, json };
+enum class Format { mof, json, junit }; // junit of a check alone
 
 // As MOF-like text, or as one JSON array of objects.
 void printInstances(std::ostream& out, Format format, const std::vector<CMPIInstance*>& instances);
