@@ -140,9 +140,20 @@ CMPIData arrayOf(const EmbeddedBroker& broker, Request& request, const Argument&
     return data;
 }
 
+// A text NULL has to stand in quotes.
 CMPIData dataOf(const EmbeddedBroker& broker, Request& request, const Argument& argument) {
+    if (argument.texts.size() == 1 && argument.texts.front() == "NULL") {
+        return {argument.type == CMPI_null ? static_cast<CMPIType>(CMPI_string) : argument.type,
+                CMPI_nullValue,
+                {}};
+    }
     return (argument.type & CMPI_ARRAY) != 0 ? arrayOf(broker, request, argument)
                                              : valueOf(request, argument, argument.texts.front());
+}
+
+// CMPI takes a null pointer for NULL.
+const CMPIValue* valueIn(const CMPIData& data) {
+    return CMIsNullValue(data) ? nullptr : &data.value;
 }
 
 } // namespace
@@ -156,7 +167,7 @@ CMPIArgs* argumentsFrom(EmbeddedBroker& broker, Request& request, const CMPIObje
     const auto declared = [&](const std::string& name) { return argumentOf(declaration, name); };
     for (const Argument& argument : parsed(argumentWord, texts, declared)) {
         const CMPIData data = dataOf(broker, request, argument);
-        require(CMAddArg(arguments, argument.name.c_str(), &data.value, data.type));
+        require(CMAddArg(arguments, argument.name.c_str(), valueIn(data), data.type));
     }
     return arguments;
 }
@@ -173,7 +184,7 @@ CMPIInstance* instanceFrom(EmbeddedBroker& broker, Request& request, const CMPIO
     const auto declared = [&](const std::string& name) { return propertyOf(broker, className, name); };
     for (const Argument& property : parsed(propertyWord, texts, declared)) {
         const CMPIData data = dataOf(broker, request, property);
-        require(CMSetProperty(instance, property.name.c_str(), &data.value, data.type));
+        require(CMSetProperty(instance, property.name.c_str(), valueIn(data), data.type));
     }
     return instance;
 }

@@ -20,7 +20,7 @@ struct Words {
     std::vector<std::string> pathChanges;
 
     void putInto(Options& options) const {
-        options.format = format == "json" ? Format::json : Format::mof;
+        options.format = format == "json" ? Format::json : format == "junit" ? Format::junit : Format::mof;
         options.hasConduct = keyMode != "exact" || newInstances != "full" || !pathChanges.empty();
         Conduct& conduct = options.conduct;
         conduct.keyMode = keyModes.at(keyMode);
@@ -87,8 +87,8 @@ void addOptions(CLI::App& app, Options& options, Words& words) {
     app.add_option("--namespace", options.nameSpace, "the namespace of the request")
         ->type_name("NS")
         ->capture_default_str();
-    app.add_option("--output", words.format, "how results are printed: mof or json")
-        ->check(CLI::IsMember({"mof", "json"}).description(""))
+    app.add_option("--output", words.format, "how results are printed: mof, json or, of check, junit")
+        ->check(CLI::IsMember({"mof", "json", "junit"}).description(""))
         ->type_name("FORM");
     app.add_flag("--trace", options.showsTraces, "show the provider's traces on the standard error stream");
     app.add_option("--keys", words.keyMode, "how keys reach it: exact, untyped, signed, chars or text")

@@ -165,6 +165,9 @@ void loadProviders(EmbeddedBroker& broker, const Options& options) {
 }
 
 int run(const Options& options, const Operation& operation, const Operands& operands) {
+    if (options.format == Format::junit) {
+        throw BrokerError("--output junit is for check");
+    }
     EmbeddedBroker broker;
     prepare(broker, options);
     tellCrashesInOneLine(broker);

@@ -22,13 +22,14 @@ constexpr const char* methodFooter =
     R"(With --mof, the class's declaration tells which parameters there are and of what type. Of an
 array, each name=value adds an element. Without declaration a value is a number, TRUE or FALSE where
 it looks like one, and a text otherwise. A text may stand in double quotes, and has to where it
-looks like a number. With --output json the result is an array of one object {"path", "method",
-"returnValue", "parameters"}.)";
+looks like a number or is NULL, which without quotes is no value. With --output json the result is
+an array of one object {"path", "method", "returnValue", "parameters"}.)";
 
 constexpr const char* valuesFooter =
     R"(With --mof, the class's declaration tells the properties' types. Of an array, each name=value
 adds an element. Without declaration a value is a number, TRUE or FALSE where it looks like one, and
-a text otherwise. A text may stand in double quotes, and has to where it looks like a number.)";
+a text otherwise. A text may stand in double quotes, and has to where it looks like a number or is
+NULL, which without quotes is no value.)";
 
 void addFilters(CLI::App& command, Takes takes, AssociationFilter& filter) {
     const bool isWhole = takes == Takes::filter;

@@ -3,16 +3,24 @@
 // Faulty_Link with an instance of Faulty_End that is named by the class.
 #include <cmpimacs.h>
 
+#include <ProviderUtilities.h>
+
 #include <chrono>
+#include <clocale>
 #include <csignal>
 #include <cstddef>
 #include <cstdlib>
+#include <fcntl.h>
+#include <fstream>
 #include <iostream>
+#include <map>
 #include <stdexcept>
 #include <string>
 #include <strings.h>
+#include <sys/stat.h>
 #include <thread>
 #include <unistd.h>
+#include <vector>
 
 static const CMPIBroker* broker;
 
@@ -66,9 +74,14 @@ private:
     }
 };
 
+bool crashesAlways = false; // when a call fails, as a careless provider does
+
 template <class Handle>
 Handle* made(Handle* handle) {
     if (handle == nullptr) {
+        if (crashesAlways) {
+            std::raise(SIGKILL);
+        }
         throw Failure{CMPI_RC_ERR_FAILED};
     }
     return handle;
@@ -76,15 +89,25 @@ Handle* made(Handle* handle) {
 
 void require(const CMPIStatus& status) {
     if (status.rc != CMPI_RC_OK) {
+        if (crashesAlways) {
+            std::raise(SIGKILL);
+        }
         throw Failure{status.rc};
     }
 }
+
+// How many more instances the class Many has.
+constexpr int manyInstances = 998;
+
+// What clients have written; its key and the text. Only the class Writes keeps it.
+std::map<std::string, std::string> written = {{"a", "text"}, {"b", "text"}};
 
 // Objects
 
 CMPIObjectPath* pathOf(const Target& target, const std::string& className, const std::string& key) {
     CMPIObjectPath* const path =
-        made(CMNewObjectPath(broker, target.nameSpace.c_str(), className.c_str(), nullptr));
+        made(CMNewObjectPath(broker, target.has("OtherNameSpace") ? "root/other" : target.nameSpace.c_str(),
+                             className.c_str(), nullptr));
     if (!target.has("KeyMissing")) {
         require(CMAddKey(path, "Name", key.c_str(), CMPI_chars));
     }
@@ -127,7 +150,10 @@ void give(const CMPIResult* result, const Target& target, const std::string& key
     CMPIInstance* const instance = newInstance(target, pathOf(target, className, key), properties);
     CMPIValue value = {};
     value.uint32 = 1;
-    CMSetProperty(instance, "Text", target.has("Encoding") ? "\xff" : "text", CMPI_chars);
+    const char* const text = target.has("Encoding") ? "\xff"
+                             : target.has("Writes") ? written[key].c_str()
+                                                    : "text";
+    CMSetProperty(instance, "Text", text, CMPI_chars);
     CMSetProperty(instance, target.has("Undeclared") ? "Nothing" : "Number", &value,
                   target.has("Type") ? CMPI_uint8 : CMPI_uint32);
     value.dateTime = CMNewDateTimeFromChars(
@@ -138,8 +164,15 @@ void give(const CMPIResult* result, const Target& target, const std::string& key
     if (target.has("NullKey")) {
         CMSetProperty(instance, "Name", nullptr, CMPI_string);
     }
+    if (target.has("TextLost")) {
+        std::wstring umlaut = L"\u00e4";
+        TK::ProviderUtilities::setProperty(instance, "Text", umlaut);
+    }
     CMPIInstance* const copy = target.has("LeftOverInFault") ? CMClone(instance, nullptr) : nullptr;
-    require(CMReturnInstance(result, instance));
+    const CMPIStatus status = CMReturnInstance(result, instance);
+    if (!target.has("FaultHidden")) {
+        require(status);
+    }
     if (copy != nullptr) {
         CMRelease(copy);
     }
@@ -150,6 +183,7 @@ template <class Work>
 CMPIStatus answer(const CMPIResult* result, const CMPIObjectPath* path, Work work) {
     try {
         const Target target(path);
+        crashesAlways = target.has("CrashAlways");
         if (!target.begins("Faulty_") || target.has("NotServed")) {
             throw Failure{CMPI_RC_ERR_NOT_SUPPORTED};
         }
@@ -177,7 +211,10 @@ bool isOr(const char* filter, const char* text) {
 }
 
 bool isOfClass(const char* filter, CMPIObjectPath* path) {
-    return filter == nullptr || CMClassPathIsA(broker, path, filter, nullptr) != 0;
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    const bool isOf = filter == nullptr || CMClassPathIsA(broker, path, filter, &status) != 0;
+    require(status);
+    return isOf;
 }
 
 struct Link {
@@ -215,6 +252,41 @@ void callUp(const Target& target, const CMPIContext* context) {
     }
 }
 
+// Changes all of the process that a provider can, and leaves what it can.
+void leaveResidue() {
+    std::cout << "to the standard output" << std::flush;
+    std::setlocale(LC_NUMERIC, "C.UTF-8");
+    ::umask(0);
+    ::setenv("FAULTY", "set", 1);
+    ::unsetenv("HOME");
+    std::signal(SIGUSR1, SIG_IGN);
+    require({::chdir("/") == 0 ? CMPI_RC_OK : CMPI_RC_ERR_FAILED, nullptr});
+    static std::vector<char*> kept;
+    kept.push_back(new char[1000]);
+    static_cast<void>(::open("/dev/null", O_RDONLY));
+    ::close(STDERR_FILENO);
+    static bool isFirst = true;
+    if (isFirst) {
+        std::thread([] { std::this_thread::sleep_for(std::chrono::hours(1)); }).detach();
+        isFirst = false;
+    }
+}
+
+// Starts a process in a session of its own, which writes its number to a file.
+std::string processFile;
+
+void startProcess() {
+    if (::fork() != 0) {
+        return;
+    }
+    ::setsid();
+    if (::fork() == 0) {
+        std::ofstream(processFile) << ::getpid() << std::flush;
+        std::this_thread::sleep_for(std::chrono::minutes(5));
+    }
+    ::_exit(0);
+}
+
 // What the context wants the provider to do: to crash when it is loaded, or at its end.
 std::string crash;
 
@@ -228,12 +300,53 @@ void crashAt(const char* when) {
 
 // The function tables. The broker answers that a null function is not supported.
 
-constexpr std::nullptr_t FaultyCreateInstance = nullptr;
-constexpr std::nullptr_t FaultyModifyInstance = nullptr;
-constexpr std::nullptr_t FaultyDeleteInstance = nullptr;
 constexpr std::nullptr_t FaultyExecQuery = nullptr;
 constexpr std::nullptr_t FaultyAssociationCleanup = nullptr;
 constexpr std::nullptr_t FaultyMethodCleanup = nullptr;
+
+namespace {
+
+// Faulty_Writes does as it is told, Faulty_Writing answers so and does nothing.
+template <class Work>
+CMPIStatus write(const CMPIResult* result, const CMPIObjectPath* path, Work work) {
+    return answer(result, path, [&](const Target& target) {
+        if (target.has("Writes")) {
+            work(target);
+        } else if (!target.has("Writing")) {
+            throw Failure{CMPI_RC_ERR_NOT_SUPPORTED};
+        }
+    });
+}
+
+} // namespace
+
+static CMPIStatus FaultyCreateInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+                                       const CMPIObjectPath* path, const CMPIInstance*) {
+    return write(result, path, [&](const Target& target) {
+        if (!written.emplace(target.key, "text").second) {
+            throw Failure{CMPI_RC_ERR_ALREADY_EXISTS};
+        }
+        require(CMReturnObjectPath(result, pathOf(target, target.className, target.key)));
+    });
+}
+
+static CMPIStatus FaultyModifyInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+                                       const CMPIObjectPath* path, const CMPIInstance* instance,
+                                       const char**) {
+    return write(result, path, [&](const Target& target) {
+        const CMPIData text = CMGetProperty(instance, "Text", nullptr);
+        written[target.key] = textOf(text.value.string);
+    });
+}
+
+static CMPIStatus FaultyDeleteInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+                                       const CMPIObjectPath* path) {
+    return write(result, path, [&](const Target& target) {
+        if (written.erase(target.key) == 0) {
+            throw Failure{CMPI_RC_ERR_NOT_FOUND};
+        }
+    });
+}
 
 static CMPIStatus FaultyCleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
     crashAt("end");
@@ -249,6 +362,9 @@ static CMPIStatus FaultyEnumInstanceNames(CMPIInstanceMI*, const CMPIContext*, c
         if (target.has("LeftOver")) {
             CMClone(pathOf(target, target.className, "a"), nullptr);
         }
+        for (int i = 0; target.has("Many") && i < manyInstances; ++i) {
+            require(CMReturnObjectPath(result, pathOf(target, target.className, "many" + std::to_string(i))));
+        }
         require(CMReturnObjectPath(result, pathOf(target, target.className, "a")));
         if (!target.has("NamesDiffer")) {
             const char* const other = target.has("Duplicate") ? "a" : "b";
@@ -263,6 +379,9 @@ static CMPIStatus FaultyEnumInstances(CMPIInstanceMI*, const CMPIContext*, const
         if (target.has("Failed")) {
             throw Failure{CMPI_RC_ERR_FAILED};
         }
+        for (int i = 0; target.has("Many") && i < manyInstances; ++i) {
+            give(result, target, "many" + std::to_string(i), properties, true);
+        }
         give(result, target, "a", properties, true);
         if (!target.has("Duplicate")) {
             give(result, target, "b", properties, true);
@@ -276,13 +395,27 @@ static CMPIStatus FaultyGetInstance(CMPIInstanceMI*, const CMPIContext* context,
     return answer(result, path, [&](const Target& target) {
         const CMPIData index = CMGetKey(path, "Index", nullptr);
         const bool isTyped = index.type == CMPI_uint16 && index.value.uint16 == 1;
-        if ((target.key != "a" && target.key != "b") || (target.has("UntypedKeys") && !isTyped)) {
+        const bool isThere = target.has("Writes")
+                                 ? written.count(target.key) != 0
+                                 : target.key == "a" || target.key == "b" ||
+                                       (target.has("Many") && target.key.rfind("many", 0) == 0 &&
+                                        target.key.find('-') == std::string::npos);
+        if (!isThere || (target.has("UntypedKeys") && !isTyped)) {
             throw Failure{CMPI_RC_ERR_NOT_FOUND};
         }
         if (target.has("CrashWithChild") && ::fork() == 0) {
             std::this_thread::sleep_for(std::chrono::minutes(1));
             std::cerr << "the child is left over\n";
             ::_exit(0);
+        }
+        if (target.has("Residue")) {
+            leaveResidue();
+        }
+        if (target.has("Sanitizer")) {
+            std::cerr << "/x/Provider.cpp:1:2: runtime error: signed integer overflow\n";
+        }
+        if (target.has("HangWithProcess") || target.has("ResidueProcess")) {
+            startProcess();
         }
         if (target.has("CallsUp")) {
             callUp(target, context);
@@ -363,7 +496,7 @@ static CMPIStatus FaultyInvokeMethod(CMPIMethodMI*, const CMPIContext*, const CM
                                      CMPIArgs* out) {
     return answer(result, path, [&](const Target& target) {
         CMPIValue value = {};
-        value.uint32 = 1;
+        value.uint32 = target.has("ArgumentAccepted") ? 0 : 1;
         const bool isFaulty = target.has("MethodResult");
         require(CMReturnData(result, &value, isFaulty ? CMPI_uint16 : CMPI_uint32));
         if (isFaulty) {
@@ -383,6 +516,8 @@ extern "C" CMPI_EXPORT CMPIInstanceMI* FaultyProvider_Create_InstanceMI(const CM
                                                                         CMPIStatus* status) {
     const CMPIData wanted = CMGetContextEntry(context, "Crash", nullptr);
     crash = wanted.type == CMPI_string ? textOf(wanted.value.string) : "";
+    const CMPIData file = CMGetContextEntry(context, "ProcessFile", nullptr);
+    processFile = file.type == CMPI_string ? textOf(file.value.string) : "";
     crashAt("load");
     return FaultyInstances_Create_InstanceMI(theBroker, context, status);
 }

@@ -24,7 +24,8 @@ Result resultOf(const CMPIObjectPath* path, const std::string& nameSpace) {
     result.className = textOf(CMGetClassName(path, nullptr));
     result.path = pathText(path);
     result.keys = plainOf(keysOf(path), nameSpace);
-    const std::string own = foldedName(textOf(CMGetNameSpace(path, nullptr)));
+    result.nameSpace = textOf(CMGetNameSpace(path, nullptr));
+    const std::string own = foldedName(result.nameSpace);
     result.identity = (own != foldedName(nameSpace) ? own : "") + ':' + foldedName(result.className);
     for (const auto& [name, key] : result.keys) {
         result.identity += ',' + foldedName(name) + '=' + key.identity;
@@ -52,6 +53,27 @@ bool hasUtf8(const CMPIData& data) {
                                                                      : textOf(data.value.string));
 }
 
+// What ranges are about: the numbers and texts of a value.
+std::vector<std::string> elementsOf(const CMPIData& data) {
+    if (CMIsNullValue(data)) {
+        return {};
+    }
+    if (CMIsArray(data)) {
+        std::vector<std::string> elements;
+        const CMPICount size = CMGetArrayCount(data.value.array, nullptr);
+        for (CMPICount i = 0; i < size; ++i) {
+            for (std::string& element : elementsOf(CMGetArrayElementAt(data.value.array, i, nullptr))) {
+                elements.push_back(std::move(element));
+            }
+        }
+        return elements;
+    }
+    if (isText(data)) {
+        return {data.type == CMPI_chars ? std::string(data.value.chars) : textOf(data.value.string)};
+    }
+    return {valueText(data)};
+}
+
 PlainData plainOf(const CMPIData& data, const std::string& nameSpace) {
     PlainData plain;
     plain.type = data.type;
@@ -59,6 +81,7 @@ PlainData plainOf(const CMPIData& data, const std::string& nameSpace) {
     plain.isUtf8 = hasUtf8(data);
     plain.text = valueText(data);
     plain.identity = plain.text;
+    plain.elements = elementsOf(data);
     if (!plain.isNull && data.type == CMPI_ref) {
         const Result referred = resultOf(data.value.ref, nameSpace);
         plain.identity = referred.identity;

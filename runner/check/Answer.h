@@ -13,11 +13,12 @@ namespace oxahv::runner {
 struct PlainData {
     CMPIType type = CMPI_null;
     bool isNull = true;
-    bool isUtf8 = true;          // whether all its texts are
-    std::string text;            // as MOF writes it
-    std::string identity;        // of a reference: the identity of the path, else the text
-    std::string referredClass{}; // of a reference: the class of the path
-    std::string referredPath{};  // and the path, as a command line takes it
+    bool isUtf8 = true;                  // whether all its texts are
+    std::string text;                    // as MOF writes it
+    std::string identity;                // of a reference: the identity of the path, else the text
+    std::string referredClass{};         // of a reference: the class of the path
+    std::string referredPath{};          // and the path, as a command line takes it
+    std::vector<std::string> elements{}; // of numbers and texts, of arrays too: each as it is, without quotes
 };
 
 bool operator==(const PlainData& a, const PlainData& b);
@@ -27,6 +28,7 @@ using NamedData = std::map<std::string, PlainData, encoding::NameLess>;
 // An instance or an object path.
 struct Result {
     std::string className;
+    std::string nameSpace{};
     std::string path;     // as a command line takes it
     std::string identity; // the same for all paths of one instance, whatever their order of keys
     bool isInstance = false;

@@ -1,9 +1,9 @@
 #include "check/Check.h"
 
 #include "check/CrashLine.h"
-#include "check/Examination.h"
-#include "check/Strain.h"
-#include "check/Unloading.h"
+#include "check/Passes.h"
+#include "check/Report.h"
+#include "check/Untested.h"
 #include "show/ProgressLine.h"
 #include "show/Text.h"
 #include "show/Values.h"
@@ -12,6 +12,7 @@
 #include <algorithm>
 #include <chrono>
 #include <iostream>
+#include <limits>
 #include <map>
 #include <set>
 #include <unistd.h>
@@ -20,114 +21,29 @@ namespace oxahv::runner {
 
 namespace {
 
-struct Pass {
-    const char* name;
-    Conduct conduct;
-    bool reports; // what any request shows; the last passes look for something else
-    void (*strain)(Client& client);
-};
-
-const std::vector<Pass>& passes() {
-    constexpr auto full = NewInstances::full;
-    static const std::vector<Pass> all = {
-        {"exact keys", {}, true, nullptr},
-        {"untyped keys", {KeyMode::untyped}, true, strainByConduct},
-        {"signed keys", {KeyMode::signedIntegers}, true, strainByConduct},
-        {"chars keys", {KeyMode::chars}, true, strainByConduct},
-        {"text keys", {KeyMode::text}, true, strainByConduct},
-        {"bare instances", {KeyMode::exact, NewInstances::bare}, true, nullptr},
-        {"reversed keys", {KeyMode::exact, full, {true, false, ""}}, true, strainByConduct},
-        {"other case", {KeyMode::exact, full, {false, true, ""}}, true, strainByConduct},
-        {"host", {KeyMode::exact, full, {false, false, "host.example.com"}}, true, strainByConduct},
-        {"threads", {}, false, strainByThreads},
-        {"faults", {}, false, strainByFaults},
-    };
-    return all;
-}
-constexpr const char* unloadingPass = "unloading";
-
-// In the child
-
-constexpr const char* loading = "loading the provider";
-constexpr const char* cleaningUp = "the provider's cleanup";
-
-void unloadProviders(Client& client) {
-    client.doing(cleaningUp, [&] {
-        for (const Library& library : client.options().libraries) {
-            client.broker().unload(providerName(library));
-        }
-    });
+// How many instances of a class are asked for by name in a pass.
+std::size_t sampleSize(bool isExhaustive) {
+    return isExhaustive ? std::numeric_limits<std::size_t>::max() : 100;
 }
 
-void endProvider(Client& client, std::size_t before) {
-    if (client.task().skipped.count(cleaningUp) != 0) {
-        return;
+// The kind of fault that a line of a sanitizer's report names, without numbers that differ from time to time;
+// empty for all other lines.
+std::string sanitizerReport(const std::string& line) {
+    const std::size_t undefined = line.find("runtime error: ");
+    if (undefined != std::string::npos) {
+        return "UndefinedBehaviorSanitizer: " +
+               line.substr(undefined + std::string("runtime error: ").size());
     }
-    unloadProviders(client);
-    const std::size_t after = client.broker().liveObjects().total();
-    if (after > before) {
-        client.find(CheckKind::leftOver, cleaningUp,
-                    "objects left at the end: " + std::to_string(after - before));
+    for (const char* const begin : {"ERROR: AddressSanitizer: ", "ERROR: LeakSanitizer: ",
+                                    "WARNING: ThreadSanitizer: ", "WARNING: MemorySanitizer: "}) {
+        const std::size_t found = line.find(begin);
+        if (found != std::string::npos) {
+            const std::string text = line.substr(line.find(' ', found) + 1);
+            return text.substr(0, std::min(text.find(" on "), text.find(" (pid=")));
+        }
     }
+    return "";
 }
-
-void load(Client& client) {
-    client.broker().setUnservedHandler([&client](const std::string& className) {
-        client.tell({Message::Kind::unserved, 0, className});
-    });
-    client.doing(loading, [&] { loadProviders(client.broker(), client.options()); });
-}
-
-void runTask(EmbeddedBroker& broker, const Options& options, const CheckTask& task, const Pass& pass,
-             ChildOutput& output) {
-    Client client(broker, options, task, output, pass.reports);
-    const std::size_t before = broker.liveObjects().total();
-    try {
-        load(client);
-        apply(broker, pass.conduct);
-        Examination(client).run();
-        client.setReports(true);
-        if (pass.strain != nullptr) {
-            pass.strain(client);
-        }
-        if (pass.reports) {
-            endProvider(client, before);
-        }
-    } catch (const std::exception& exception) {
-        client.tell({Message::Kind::unusable, 0, exception.what()});
-    }
-    broker.setUnservedHandler(nullptr);
-}
-
-// Sends what every client sends, unloads the libraries and looks whether they are gone.
-void runUnloading(EmbeddedBroker& broker, const Options& options, const CheckTask& task,
-                  const std::vector<std::string>& classes, ChildOutput& output) {
-    Client client(broker, options, task, output, false); // what the requests show has been told
-    try {
-        load(client);
-        for (const std::string& className : classes) {
-            client.askPlainly(queryOf("ei", className));
-            const std::optional<Answer> names = client.askPlainly(queryOf("ein", className));
-            if (names && !names->results.empty()) {
-                client.askPlainly(queryOf("gi", names->results.front().path));
-            }
-        }
-        unloadProviders(client);
-        client.setReports(true);
-        for (const Library& library : options.libraries) {
-            const std::string why = whyStillMapped(library.file);
-            if (!why.empty()) {
-                client.find(CheckKind::staysMapped, cleaningUp,
-                            providerName(library) + " stays mapped when it is unloaded: " + why);
-            }
-        }
-    } catch (const std::exception& exception) {
-        client.tell({Message::Kind::unusable, 0, exception.what()});
-    }
-    broker.setUnservedHandler(nullptr);
-}
-
-// In the parent
 
 class CheckRun {
 public:
@@ -144,12 +60,17 @@ private:
     std::vector<std::string> classNames() const;
     MethodCall methodCall(const std::string& text) const;
     void runClass(std::size_t position, std::size_t count);
-    void runPass(const Pass& pass, CheckTask& task, CheckedClass& checked);
-    bool runOnce(CheckTask& task, CheckedClass& checked, const std::function<void(ChildOutput&)>& work);
+    using Work = std::function<void(const CheckTask& task, ChildOutput& output)>;
+    void runPasses(CheckTask& task, CheckedClass& checked);
+    void runUntilFinished(CheckTask& task, CheckedClass& checked, const Work& work);
+    bool runOnce(CheckTask& task, CheckedClass& checked, const Work& work);
+    void receive(const Message& message, CheckTask& task, CheckedClass& checked);
+    void receiveError(const std::string& line, const CheckTask& task);
+    void finishReport();
+    void showProgress(const std::string& request);
     std::vector<std::string> servedClasses() const;
-    void mindRefusals();
+    void reportRefusals();
     void unload(const std::vector<std::string>& classes);
-    void receive(const Message& message, CheckedClass& checked);
     void reportEnd(const ChildResult& result, CheckTask& task);
 
     const Options& options_;
@@ -158,11 +79,17 @@ private:
     std::vector<MethodCall> methods_;
     CheckReport report_;
     bool canLoad_ = true;
+    bool hasHung_ = false;
     ProgressLine progress_;
-    std::string place_;                         // for the progress
-    std::map<std::size_t, std::string> atWork_; // the child's requests that have begun and not ended
-    std::string unserved_;                      // the class of the child's last upcall that found no provider
-    std::set<std::string> skipped_;             // all that has ended or blocked the provider
+    std::string class_;                           // for the progress
+    std::string place_;                           // the same with the pass
+    std::size_t left_ = 0;                        // of the pass's queries, when they are counted
+    std::map<std::size_t, Message> atWork_;       // what the child has begun and not ended
+    std::string lastRequest_;                     // that the child has begun
+    std::map<std::string, unsigned int> crashes_; // of groups of queries with a failing call
+    std::string unserved_;             // the class of the child's last upcall that found no provider
+    std::vector<std::string> untried_; // what children could not try
+    std::set<std::string> skipped_;    // all that has ended or blocked the provider
 };
 
 std::vector<std::string> CheckRun::classNames() const {
@@ -228,6 +155,10 @@ CheckReport CheckRun::run() {
     for (const Pass& pass : passes()) {
         report_.passes.emplace_back(pass.name);
     }
+    if (!methods_.empty()) {
+        report_.passes.emplace_back(argumentsPass);
+    }
+    report_.passes.emplace_back(residuePass);
     report_.passes.emplace_back(unloadingPass);
     for (const std::string& name : classNames()) {
         report_.classes.push_back({name, false, 0, ""});
@@ -247,7 +178,7 @@ CheckReport CheckRun::run() {
             return std::move(report_);
         }
     }
-    mindRefusals();
+    reportRefusals();
     const std::vector<std::string> served = servedClasses();
     if (!served.empty()) {
         unload(served);
@@ -257,6 +188,7 @@ CheckReport CheckRun::run() {
                           report_.classes.front().name + " is " + report_.classes.front().answer +
                           "; name its MOF files with --mof");
     }
+    finishReport();
     return std::move(report_);
 }
 
@@ -277,7 +209,7 @@ std::string schemaOf(const std::string& className) {
 
 // Classes of others, such as the standard's, are refused rightly. That one of the provider's own schema is
 // not known to it is most often a mistake in a name.
-void CheckRun::mindRefusals() {
+void CheckRun::reportRefusals() {
     std::set<std::string> schemas;
     for (const std::string& name : servedClasses()) {
         schemas.insert(schemaOf(name));
@@ -293,15 +225,35 @@ void CheckRun::mindRefusals() {
     }
 }
 
+void CheckRun::finishReport() {
+    std::vector<std::string> called;
+    for (const MethodCall& call : methods_) {
+        called.push_back(call.className + '.' + call.method);
+    }
+    report_.untested =
+        untestedBy(broker_, report_, called, sampleSize(checkOptions_.isExhaustive), checkOptions_.writes);
+    for (const std::string& text : untried_) {
+        if (std::find(report_.untested.begin(), report_.untested.end(), text) == report_.untested.end()) {
+            report_.untested.push_back(text);
+        }
+    }
+    for (const std::string& text : report_.untested) {
+        if (checkOptions_.isStrict) {
+            report_.findings.add({CheckKind::untested, "", "", "", text});
+        }
+    }
+}
+
 void CheckRun::unload(const std::vector<std::string>& classes) {
     CheckTask task;
     task.pass = unloadingPass;
     task.skipped = skipped_;
-    place_ = std::string(unloadingPass) + ": ";
+    place_ = unloadingPass;
     if (task.skipped.count(cleaningUp) == 0) {
         CheckedClass unused;
-        runOnce(task, unused,
-                [&](ChildOutput& output) { runUnloading(broker_, options_, task, classes, output); });
+        runOnce(task, unused, [&](const CheckTask& given, ChildOutput& output) {
+            runUnloading(broker_, options_, given, classes, output);
+        });
     }
 }
 
@@ -311,48 +263,81 @@ void CheckRun::runClass(std::size_t position, std::size_t count) {
     task.className = checked.name;
     task.isNamed = !checkOptions_.classes.empty();
     task.threads = checkOptions_.threads;
+    task.rounds = checkOptions_.repetitions;
     for (const MethodCall& call : methods_) {
         if (sameName(call.className, checked.name)) {
             task.methods.push_back(call);
         }
     }
-    for (const Pass& pass : passes()) {
-        place_ = '[' + std::to_string(position + 1) + '/' + std::to_string(count) + "] " + pass.name + ": ";
-        task.pass = pass.name;
-        task.conduct = pass.conduct;
-        runPass(pass, task, checked);
-        if (!checked.isServed) {
-            break;
-        }
-    }
+    class_ = checked.name + " (" + std::to_string(position + 1) + " of " + std::to_string(count) + "), ";
+    runPasses(task, checked);
 }
 
-// Each time that a child ends early or hangs, the request that did it is left out and the pass run again.
-void CheckRun::runPass(const Pass& pass, CheckTask& task, CheckedClass& checked) {
-    constexpr int mostAttempts = 20;
-    for (int attempt = 0; attempt < mostAttempts; ++attempt) {
-        const bool isFinished = runOnce(
-            task, checked, [&](ChildOutput& output) { runTask(broker_, options_, task, pass, output); });
-        canLoad_ = task.skipped.count(loading) == 0;
-        if (isFinished || !canLoad_) {
+void CheckRun::runPasses(CheckTask& task, CheckedClass& checked) {
+    constexpr std::size_t fewer = 5; // how keys come makes no difference between instances
+    const auto run = [&](const char* name, const Work& work) {
+        task.pass = name;
+        task.firstKnown = 0;
+        crashes_.clear();
+        place_ = class_ + name;
+        runUntilFinished(task, checked, work);
+    };
+    for (const Pass& pass : passes()) {
+        task.isFirst = &pass == &passes().front();
+        task.sample =
+            checkOptions_.isExhaustive || task.isFirst ? sampleSize(checkOptions_.isExhaustive) : fewer;
+        task.writes = checkOptions_.writes && task.isFirst;
+        task.conduct = pass.conduct;
+        run(pass.name, [&](const CheckTask& given, ChildOutput& output) {
+            runPass(broker_, options_, given, pass, output);
+        });
+        if (!checked.isServed || !canLoad_) {
             return;
         }
     }
-    report_.findings.add({CheckKind::crash, task.className, task.pass, "",
-                          "the pass was given up after " + std::to_string(mostAttempts) +
-                              " crashes and hangs; what follows is not checked"});
+    if (!task.methods.empty()) {
+        run(argumentsPass, [&](const CheckTask& given, ChildOutput& output) {
+            runArguments(broker_, options_, given, output);
+        });
+    }
+    run(residuePass,
+        [&](const CheckTask& given, ChildOutput& output) { runResidue(broker_, options_, given, output); });
 }
 
-bool CheckRun::runOnce(CheckTask& task, CheckedClass& checked,
-                       const std::function<void(ChildOutput&)>& work) {
+// Each time that a child ends early or hangs, what did it is left out, and another child goes on.
+void CheckRun::runUntilFinished(CheckTask& task, CheckedClass& checked, const Work& work) {
+    constexpr int mostCrashes = 300;
+    constexpr int mostHangs = 5;
+    int crashes = 0;
+    int hangs = 0;
+    while (crashes < mostCrashes && hangs < mostHangs) {
+        if (task.isFirst) {
+            task.known.clear(); // this child tells them anew
+        }
+        if (runOnce(task, checked, work)) {
+            return;
+        }
+        canLoad_ = task.skipped.count(loading) == 0;
+        if (!canLoad_) {
+            return;
+        }
+        ++(hasHung_ ? hangs : crashes);
+    }
+    report_.findings.add({CheckKind::crash, task.className, task.pass, "",
+                          "the pass was given up after " + std::to_string(crashes) + " crashes and " +
+                              std::to_string(hangs) + " hangs; what follows is not checked"});
+}
+
+bool CheckRun::runOnce(CheckTask& task, CheckedClass& checked, const Work& work) {
     atWork_.clear();
     unserved_.clear();
+    left_ = 0;
     std::cout.flush();
-    const ChildResult result =
-        runInChild(work,
-                   {[&](const std::string& line) { receive(messageOf(line), checked); },
-                    [](const std::string& line) { std::cerr << line << '\n'; }},
-                   std::chrono::seconds(checkOptions_.timeoutSeconds));
+    const ChildReceiver receiver = {[&](const std::string& line) { receive(messageOf(line), task, checked); },
+                                    [&](const std::string& line) { receiveError(line, task); }};
+    const ChildResult result = runInChild([&](ChildOutput& output) { work(task, output); }, receiver,
+                                          std::chrono::seconds(checkOptions_.timeoutSeconds));
+    hasHung_ = result.end == ChildEnd::hung;
     if (result.end == ChildEnd::finished) {
         return true;
     }
@@ -360,12 +345,13 @@ bool CheckRun::runOnce(CheckTask& task, CheckedClass& checked,
     return false;
 }
 
-void CheckRun::receive(const Message& message, CheckedClass& checked) {
+void CheckRun::receive(const Message& message, CheckTask& task, CheckedClass& checked) {
     switch (message.kind) {
     case Message::Kind::begin:
         ++report_.requests;
-        atWork_[message.number] = message.text;
-        progress_.show(place_ + message.text);
+        atWork_[message.number] = message;
+        lastRequest_ = message.text;
+        showProgress(message.text);
         break;
     case Message::Kind::end:
         atWork_.erase(message.number);
@@ -385,35 +371,56 @@ void CheckRun::receive(const Message& message, CheckedClass& checked) {
         break;
     case Message::Kind::unusable:
         throw BrokerError(message.text);
+    case Message::Kind::asked:
+        task.known.push_back(message.known);
+        break;
+    case Message::Kind::queriesLeft:
+        task.firstKnown += left_ > message.number ? left_ - message.number : 0;
+        left_ = message.number;
+        break;
+    case Message::Kind::untested:
+        untried_.push_back(message.text);
+        break;
     }
 }
 
-// What a request does, without its operands: what ends the provider in one way is one finding.
-std::string briefly(const std::string& request) {
-    const std::size_t fault = request.find(" --fault ");
-    const std::string verb = request.substr(0, request.find(' '));
-    const bool isVerb = verb.size() == 2 || verb == "ein";
-    if (!isVerb || fault == std::string::npos) {
-        return isVerb ? verb : request;
-    }
-    const std::size_t slot = fault + std::string(" --fault ").size();
-    return verb + " with " + request.substr(slot, request.rfind(':') - slot) + " failing";
+// The pass, the class and what is left come first: a line of a terminal may be too short for the rest.
+void CheckRun::showProgress(const std::string& request) {
+    progress_.show(place_ + (left_ > 0 ? ", " + std::to_string(left_) + " left" : "") + ": " + request);
 }
 
-// Of several threads' requests, each may be the one that did it.
+// What the child writes to its standard error stream is the user's to read, and a sanitizer's report besides.
+void CheckRun::receiveError(const std::string& line, const CheckTask& task) {
+    std::cerr << line << '\n';
+    const std::string report = sanitizerReport(line);
+    const bool isTold = task.pass == unloadingPass; // which repeats requests of earlier passes
+    if (!report.empty() && !isTold) {
+        report_.findings.add({CheckKind::sanitizer, task.className, task.pass, lastRequest_, report});
+    }
+}
+
+// Of several threads' requests, each may be the one that did it. What one slot's failing calls do again and
+// again is given up for that slot.
 void CheckRun::reportEnd(const ChildResult& result, CheckTask& task) {
+    constexpr unsigned int mostOfAGroup = 4;
     std::string requests;
-    for (const auto& [number, text] : atWork_) {
-        requests += (requests.empty() ? "" : " | ") + text;
-        task.skipped.insert(text);
-        skipped_.insert(text);
+    for (const auto& [number, begun] : atWork_) {
+        requests += (requests.empty() ? "" : " | ") + begun.text;
+        task.skipped.insert(begun.text);
+        skipped_.insert(begun.text);
+        if (!begun.group.empty()) {
+            task.skippedFaults.insert(begun.summary);
+            if (++crashes_[begun.group] >= mostOfAGroup) {
+                task.skippedFaults.insert(begun.group);
+            }
+        }
     }
     const bool isCrash = result.end == ChildEnd::crashed;
     const std::string what =
         (isCrash ? result.text : "no answer for " + std::to_string(checkOptions_.timeoutSeconds) + " s") +
         (isCrash && !unserved_.empty() ? " after " + unservedWords(unserved_) : "");
     report_.findings.add({isCrash ? CheckKind::crash : CheckKind::hang, task.className, task.pass, requests,
-                          atWork_.empty() ? what : briefly(atWork_.begin()->second) + ": " + what});
+                          atWork_.empty() ? what : atWork_.begin()->second.summary + ": " + what});
 }
 
 } // namespace

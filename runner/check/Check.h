@@ -14,6 +14,10 @@ struct CheckOptions {
     std::vector<std::string> methods; // CLASS.METHOD name=value ...
     unsigned int threads = 4;
     unsigned int timeoutSeconds = 30; // for one request
+    unsigned int repetitions = 1;     // of the threads' requests
+    bool isExhaustive = false;        // whether all instances are asked for by name
+    bool isStrict = false;            // whether what was not tested is a finding
+    bool writes = false;              // whether instances are created, changed and deleted
 };
 
 // Checks the provider and prints the report on the standard output. Returns the exit status, 1 when anything

@@ -9,16 +9,17 @@ namespace oxahv::runner {
 namespace {
 
 constexpr const char* checkFooter =
-    R"(Does with each class what clients do: names, instances, each by its name, one that does not exist,
-property lists, associations from both ends with every filter, methods; and compares all with the
-class's declaration. Then again as other servers do it (every mode of --keys, bare new instances,
-changed paths), from several threads at once, and with the broker's calls failing in turn: of each
-slot the first 100 of a request, and the last. In the end the library has to be unloaded. A method
-that --method names is called many times so, and does its work each time: name none that must not
-be repeated. The provider runs in child processes: a crash or a hang is a finding. JSON is an array
-of one object {"library", "provider", "passes", "requests", "classes", "findings"}; a finding is
-{"check", "severity", "class", "pass", "request", "text", "count"}. Exit status 1 when there are
-findings.
+    R"(Sends what clients send for each class: names, instances, single instances (of many a sample), one
+that does not exist, property lists, associations from both ends with every filter, methods; and
+compares the answers with each other and with the class's declaration. Then again as other servers
+do it (every mode of --keys, bare new instances, changed paths), from several threads at once, and
+with each kind of the broker's calls failing in turn. Looks for what the provider leaves in its
+process, and whether its library can be unloaded. A method that --method names is called many times,
+also with wrong arguments, and does its work each time: name none that must not be repeated. The
+provider runs in child processes: a crash or a hang is a finding. What was not tested comes last.
+The page "What check finds" explains each finding. JSON is an array of one object {"library",
+"provider", "passes", "requests", "classes", "findings", "untested"}; a finding is {"check",
+"severity", "class", "pass", "request", "text", "count"}. Exit status 1 when there are findings.
 
   oxahv-provider --library ./libDemoPort.so --mof Demo.mof check --class Demo_Port
   oxahv-provider --library ./libDemoPort.so --mof Demo.mof check --method 'Demo_Port.Reset Mode=1')";
@@ -45,6 +46,14 @@ std::function<int(const Options&)> declareCheck(CLI::App& command) {
         ->check(CLI::Range(1U, 86400U).description(""))
         ->type_name("SECONDS")
         ->capture_default_str();
+    command.add_option("--repeat", checkOptions->repetitions, "how many times they do it")
+        ->check(CLI::Range(1U, 1000000U).description(""))
+        ->type_name("N")
+        ->capture_default_str();
+    command.add_flag("--writes", checkOptions->writes, "create, change and delete instances, and undo it");
+    command.add_flag("--exhaustive", checkOptions->isExhaustive,
+                     "ask for all instances by name, not a sample");
+    command.add_flag("--strict", checkOptions->isStrict, "report what was not tested as findings");
     command.footer(checkFooter);
     return [checkOptions](const Options& options) { return runCheck(options, *checkOptions); };
 }

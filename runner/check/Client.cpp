@@ -1,5 +1,7 @@
 #include "check/Client.h"
 
+#include "check/LostTexts.h"
+
 namespace oxahv::runner {
 
 namespace {
@@ -45,6 +47,10 @@ bool isException(const Answer& answer) {
     return answer.code == CMPI_RC_ERR_FAILED && answer.message.rfind("exception", 0) == 0;
 }
 
+Message beginOf(const Query& query, const std::string& text) {
+    return {Message::Kind::begin, 0, text, query.operation->name};
+}
+
 bool isStandard(CMPIrc code) {
     return codeName(code) != "CMPI_RC_" + std::to_string(static_cast<int>(code));
 }
@@ -53,14 +59,16 @@ bool isStandard(CMPIrc code) {
 
 // Tells the parent what is begun before it begins, so that it knows what was at work when the process ends.
 template <class Work>
-auto Client::tracked(const std::string& text, Work work) {
+auto Client::tracked(const Message& begin, Work work) {
     struct End {
         Client& client;
         std::size_t number;
         ~End() { client.tell({Message::Kind::end, number, ""}); }
     };
     const std::size_t number = ++number_;
-    tell({Message::Kind::begin, number, text});
+    Message message = begin;
+    message.number = number;
+    tell(message);
     const End end = {*this, number};
     return work();
 }
@@ -74,7 +82,7 @@ std::optional<Answer> Client::ask(const Query& query) {
     std::vector<ProviderCall> calls;
     Answer answer;
     try {
-        answer = tracked(text, [&] { return sendRecorded(broker_, options_, query, calls); });
+        answer = tracked(beginOf(query, text), [&] { return sendRecorded(broker_, options_, query, calls); });
     } catch (const BrokerError& error) {
         find(CheckKind::failed, text, std::string("the request cannot be made: ") + error.what());
         return std::nullopt;
@@ -84,7 +92,15 @@ std::optional<Answer> Client::ask(const Query& query) {
     if (answer.ok() && !answer.isDone) {
         find(CheckKind::notDone, text, query.operation->name + std::string(" does not call returnDone"));
     }
-    asked_.push_back({query, answer.code, std::move(calls), checkLeftOver(query, before)});
+    checkLostText(query, text);
+    asked_.push_back({query, answer.code, checkLeftOver(query, before)});
+    const Yields yields = query.operation->yields;
+    const bool isRead = yields != Yields::nothing && yields != Yields::onePath; // can be repeated
+    if (task_.isFirst && isRead) {
+        Message message = {Message::Kind::asked, 0, ""};
+        message.known = asked_.back();
+        tell(message);
+    }
     return answer;
 }
 
@@ -96,8 +112,13 @@ std::optional<Answer> Client::askPlainly(const Query& query, const FailingCall* 
     if (task_.skipped.count(text) != 0) {
         return std::nullopt;
     }
+    Message begin = beginOf(query, text);
+    if (failing != nullptr) {
+        begin.summary = wordsOf(query, *failing);
+        begin.group = groupOf(query, *failing);
+    }
     try {
-        Answer answer = tracked(text, [&] { return send(broker_, options_, query, failing); });
+        Answer answer = tracked(begin, [&] { return send(broker_, options_, query, failing); });
         checkCode(text, answer);
         return answer;
     } catch (const BrokerError&) { // the call that fails is one of the client's own
@@ -105,8 +126,20 @@ std::optional<Answer> Client::askPlainly(const Query& query, const FailingCall* 
     }
 }
 
+std::optional<Answer> Client::askRecorded(const Query& query, std::vector<ProviderCall>& calls) {
+    const std::string text = textOf(query);
+    if (task_.skipped.count(text) != 0) {
+        return std::nullopt;
+    }
+    try {
+        return tracked(beginOf(query, text), [&] { return sendRecorded(broker_, options_, query, calls); });
+    } catch (const BrokerError&) {
+        return std::nullopt;
+    }
+}
+
 void Client::doing(const std::string& name, const std::function<void()>& work) {
-    tracked(name, work);
+    tracked({Message::Kind::begin, 0, name, name}, work);
 }
 
 void Client::fail(const std::string& request, const std::string& what, const Answer& answer) {
@@ -117,7 +150,9 @@ void Client::fail(const std::string& request, const std::string& what, const Ans
 
 void Client::find(CheckKind kind, const std::string& request, const std::string& text) {
     if (reports_) {
-        tell({Message::Kind::finding, 0, "", {kind, task_.className, task_.pass, request, text}});
+        Message message = {Message::Kind::finding, 0, ""};
+        message.finding = {kind, task_.className, task_.pass, request, text};
+        tell(message);
     }
 }
 
@@ -137,6 +172,14 @@ void Client::checkCalls(const std::string& request, const std::vector<ProviderCa
                 find(refusal.kind, request, refusal.text(made.call));
             }
         }
+    }
+}
+
+// The library traces each text that the locale cannot convert, and goes on without it.
+void Client::checkLostText(const Query& query, const std::string& request) {
+    if (takeLostTexts() > 0) {
+        find(CheckKind::textLost, request,
+             query.operation->name + std::string(" loses text that the locale cannot convert"));
     }
 }
 

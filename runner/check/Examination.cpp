@@ -1,7 +1,9 @@
 #include "check/Examination.h"
 
 #include "check/Associations.h"
+#include "check/MethodArguments.h"
 #include "check/Results.h"
+#include "check/Writing.h"
 #include "show/Text.h"
 #include "show/Values.h"
 
@@ -90,6 +92,16 @@ std::string propertyDifference(const Result& got, const Result& listed) {
                             : "";
 }
 
+// At most that many of the results, from the first to the last at equal distances.
+std::vector<const Result*> sampleOf(const std::vector<Result>& results, std::size_t most) {
+    std::vector<const Result*> sample;
+    const std::size_t count = std::min(results.size(), most);
+    for (std::size_t i = 0; i < count; ++i) {
+        sample.push_back(&results[count > 1 ? i * (results.size() - 1) / (count - 1) : 0]);
+    }
+    return sample;
+}
+
 const Result* findResult(const std::vector<Result>& results, const std::string& identity) {
     const auto found = std::find_if(results.begin(), results.end(),
                                     [&](const Result& result) { return result.identity == identity; });
@@ -103,15 +115,22 @@ void Examination::run() {
         return;
     }
     compareNames();
-    for (const Result& name : names_) {
-        lookUp(name);
+    const std::size_t sample = client_.task().sample;
+    for (const Result* const name : sampleOf(names_, sample)) {
+        lookUp(*name);
     }
     lookUpAbsent();
     askForProperties();
-    for (std::size_t i = 0; i < names_.size(); ++i) {
-        Associations(client_, names_[i].path, names_[i].identity).run(i == 0);
+    const bool isAll = names_.size() <= sample;
+    bool isThorough = client_.task().isFirst; // filters do not depend on how keys come
+    for (const Result* const name : sampleOf(names_, isAll ? sample : (sample + 9) / 10)) {
+        Associations(client_, name->path, name->identity).run(isThorough);
+        isThorough = false;
     }
     callMethods();
+    if (client_.task().writes) {
+        write();
+    }
 }
 
 // The names and the instances; whether the class is served at all.
@@ -215,12 +234,15 @@ void Examination::compareProperties(const std::string& request, const Result& go
     }
 }
 
-void Examination::lookUpAbsent() {
+std::string Examination::pathOfAbsent() const {
     const std::string& nameSpace = client_.options().nameSpace;
     const std::string& className = client_.task().className;
-    const std::string path = names_.empty()
-                                 ? absentPath(client_.broker().propertiesOf(className), nameSpace, className)
-                                 : absentPath(names_, nameSpace);
+    return names_.empty() ? absentPath(client_.broker().propertiesOf(className), nameSpace, className)
+                          : absentPath(names_, nameSpace);
+}
+
+void Examination::lookUpAbsent() {
+    const std::string path = pathOfAbsent();
     const std::optional<Answer> answer = path.empty() ? std::nullopt : client_.ask(queryOf("gi", path));
     const bool isRight =
         !answer || answer->code == CMPI_RC_ERR_NOT_FOUND || answer->code == CMPI_RC_ERR_NOT_SUPPORTED;
@@ -294,7 +316,7 @@ bool Examination::yieldsMore(const Result& result, const std::vector<std::string
 void Examination::callMethods() {
     for (const MethodCall& call : client_.task().methods) {
         Operands operands;
-        operands.target = names_.empty() ? client_.task().className : names_.front().path;
+        operands.target = methodTarget();
         operands.method = call.method;
         operands.values = call.arguments;
         const Query query = queryOf("cm", std::move(operands));
@@ -302,7 +324,18 @@ void Examination::callMethods() {
         if (answer) {
             checkMethodResult(client_, query, *answer);
         }
+        if (client_.task().isFirst) {
+            callWithWrongArguments(client_, methodTarget(), call);
+        }
     }
+}
+
+const std::string& Examination::methodTarget() const {
+    return names_.empty() ? client_.task().className : names_.front().path;
+}
+
+void Examination::write() {
+    Writing(client_, instances_, pathOfAbsent()).run();
 }
 
 } // namespace oxahv::runner

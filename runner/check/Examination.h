@@ -29,6 +29,9 @@ private:
     bool yieldsMore(const Result& result, const std::vector<std::string>& wanted) const;
     void checkList(const Query& query, const std::vector<std::string>& wanted);
     void callMethods();
+    void write();
+    std::string pathOfAbsent() const;
+    const std::string& methodTarget() const;
 
     Client& client_;
     bool hasNames_ = false; // whether the provider lists names, and instances

@@ -1,109 +1,8 @@
 #include "check/Findings.h"
 
-#include "show/Text.h"
-
-#include <nlohmann/json.hpp>
-
 #include <algorithm>
 
 namespace oxahv::runner {
-
-namespace {
-
-using Json = nlohmann::ordered_json;
-
-const Check& checkOf(CheckKind kind) {
-    return checks()[static_cast<std::size_t>(kind)];
-}
-
-const char* wordOf(Severity severity) {
-    return severity == Severity::error ? "error" : "warning";
-}
-
-// The table
-
-std::string counted(std::size_t count, const std::string& one, const std::string& many) {
-    return std::to_string(count) + ' ' + (count == 1 ? one : many);
-}
-
-void printClasses(std::ostream& out, const std::vector<CheckedClass>& classes) {
-    std::string refused;
-    for (const CheckedClass& checked : classes) {
-        if (checked.isServed) {
-            out << "checked     " << checked.name << ": "
-                << counted(checked.instances, "instance", "instances") << '\n';
-        } else {
-            refused += "not served  " + checked.name + ": " + printable(checked.answer) + '\n';
-        }
-    }
-    out << refused;
-}
-
-void printFinding(std::ostream& out, const Finding& finding, bool isColoured) {
-    const Check& check = checkOf(finding.kind);
-    const char* const colour = check.severity == Severity::error ? "\033[31m" : "\033[33m";
-    out << (isColoured ? colour : "") << wordOf(check.severity) << (isColoured ? "\033[0m" : "") << "  "
-        << check.name << "  " << finding.className << (finding.className.empty() ? "" : ": ")
-        << printable(finding.text) << '\n';
-    if (!finding.request.empty()) {
-        out << "    " << printable(finding.request) << '\n';
-    }
-    out << "    " << check.meaning << "; pass: " << finding.pass;
-    if (finding.count > 1) {
-        out << ", " << finding.count << " times";
-    }
-    out << '\n';
-}
-
-void printTable(std::ostream& out, const CheckReport& report, bool isColoured) {
-    printClasses(out, report.classes);
-    const std::vector<Finding> findings = report.findings.sorted();
-    std::size_t errors = 0;
-    for (const Finding& finding : findings) {
-        printFinding(out, finding, isColoured);
-        errors += checkOf(finding.kind).severity == Severity::error ? 1 : 0;
-    }
-    out << counted(report.requests, "request", "requests") << ", " << counted(errors, "error", "errors")
-        << ", " << counted(findings.size() - errors, "warning", "warnings") << '\n';
-}
-
-// JSON
-
-Json jsonOf(const CheckedClass& checked) {
-    Json json = {{"class", checked.name}, {"served", checked.isServed}, {"instances", checked.instances}};
-    if (!checked.isServed) {
-        json["answer"] = checked.answer;
-    }
-    return json;
-}
-
-Json jsonOf(const Finding& finding) {
-    const Check& check = checkOf(finding.kind);
-    return {{"check", check.name},   {"severity", wordOf(check.severity)}, {"class", finding.className},
-            {"pass", finding.pass},  {"request", finding.request},         {"text", finding.text},
-            {"count", finding.count}};
-}
-
-template <class Item>
-Json jsonOf(const std::vector<Item>& items) {
-    Json array = Json::array();
-    for (const Item& item : items) {
-        array.push_back(jsonOf(item));
-    }
-    return array;
-}
-
-void printJson(std::ostream& out, const CheckReport& report) {
-    const Json json = Json::array({{{"library", report.library},
-                                    {"provider", report.provider},
-                                    {"passes", report.passes},
-                                    {"requests", report.requests},
-                                    {"classes", jsonOf(report.classes)},
-                                    {"findings", jsonOf(report.findings.sorted())}}});
-    out << json.dump(2, ' ', false, Json::error_handler_t::replace) << '\n';
-}
-
-} // namespace
 
 const std::vector<Check>& checks() {
     constexpr Severity error = Severity::error;
@@ -144,9 +43,32 @@ const std::vector<Check>& checks() {
          "the answer is another when the keys come as other servers deliver them"},
         {CheckKind::staysMapped, "stays-mapped", error,
          "the library cannot be unloaded: to replace it under a running server crashes that"},
+        {CheckKind::otherNameSpace, "other-namespace", error,
+         "a path is in another namespace than the one asked for"},
+        {CheckKind::range, "range", error, "a value is not one that its qualifiers allow"},
+        {CheckKind::textLost, "text-lost", error,
+         "a text is lost, since the server's locale cannot convert it"},
+        {CheckKind::argumentAccepted, "argument-accepted", error,
+         "a method succeeds with an argument that it should refuse"},
+        {CheckKind::writing, "write", error,
+         "an instance is not created, changed or deleted as the answer says"},
+        {CheckKind::faultHidden, "fault-hidden", error,
+         "a call of the broker fails, and the answer is OK and not whole"},
+        {CheckKind::residue, "residue", error,
+         "the provider changes the server's process, or leaves something in it"},
+        {CheckKind::sanitizer, "sanitizer", error, "a sanitizer that the provider is built with reports it"},
         {CheckKind::notDone, "not-done", warning, "the provider does not tell the broker that it is done"},
+        {CheckKind::untested, "untested", warning, "the check has not tried it"},
     };
     return all;
+}
+
+const Check& checkOf(CheckKind kind) {
+    return checks()[static_cast<std::size_t>(kind)];
+}
+
+const char* wordOf(Severity severity) {
+    return severity == Severity::error ? "error" : "warning";
 }
 
 void Findings::add(Finding finding) {
@@ -169,14 +91,6 @@ std::vector<Finding> Findings::sorted() const {
     std::stable_sort(findings.begin(), findings.end(),
                      [&](const Finding& a, const Finding& b) { return rank(a) < rank(b); });
     return findings;
-}
-
-void printReport(std::ostream& out, Format format, const CheckReport& report, bool isColoured) {
-    if (format == Format::json) {
-        printJson(out, report);
-    } else {
-        printTable(out, report, isColoured);
-    }
 }
 
 } // namespace oxahv::runner

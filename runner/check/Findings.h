@@ -1,9 +1,6 @@
 // What a check of a provider finds, and how it is reported.
 #pragma once
 
-#include "show/Output.h"
-
-#include <ostream>
 #include <string>
 #include <vector>
 
@@ -43,7 +40,16 @@ enum class CheckKind {
     leftOver,
     keysUnread,
     staysMapped,
-    notDone
+    otherNameSpace,
+    range,
+    textLost,
+    argumentAccepted,
+    writing,
+    faultHidden,
+    residue,
+    sanitizer,
+    notDone,
+    untested
 };
 
 struct Check {
@@ -55,6 +61,10 @@ struct Check {
 
 // In the order of CheckKind.
 const std::vector<Check>& checks();
+const Check& checkOf(CheckKind kind);
+
+// "error" or "warning".
+const char* wordOf(Severity severity);
 
 struct Finding {
     CheckKind kind = CheckKind::crash;
@@ -76,32 +86,5 @@ public:
 private:
     std::vector<Finding> all_;
 };
-
-// A class that was to be checked.
-struct CheckedClass {
-    std::string name;
-    bool isServed = false;
-    std::size_t instances = 0;
-    std::string answer; // of a class that is not served: the provider's
-};
-
-struct CheckReport {
-    std::string library;
-    std::string provider;
-    std::vector<std::string> passes;
-    std::vector<CheckedClass> classes;
-    std::size_t requests = 0;
-    Findings findings;
-};
-
-// As a table for a person, or as a JSON array of one object:
-//
-//   {"library", "provider": texts, "passes": [text], "requests": number,
-//    "classes": [{"class": text, "served": boolean, "instances": number, "answer": text}],
-//    "findings": [{"check", "severity", "class", "pass", "request", "text": texts, "count": number}]}
-//
-// where "answer" is there for classes that are not served, and "severity" is "error" or "warning".
-// `isColoured` sets the table's severities off by colours.
-void printReport(std::ostream& out, Format format, const CheckReport& report, bool isColoured);
 
 } // namespace oxahv::runner

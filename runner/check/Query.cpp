@@ -143,6 +143,14 @@ std::string shapeOf(const Query& query) {
     return shape + (query.operands.properties ? '+' : '-');
 }
 
+std::string groupOf(const Query& query, const FailingCall& failing) {
+    return query.operation->name + (" with " + failing.slot);
+}
+
+std::string wordsOf(const Query& query, const FailingCall& failing) {
+    return groupOf(query, failing) + (failing.name.empty() ? "" : " of " + failing.name) + " failing";
+}
+
 Answer send(EmbeddedBroker& broker, const Options& options, const Query& query, const FailingCall* failing) {
     return sendHooked(broker, options, query, failing, nullptr);
 }

@@ -25,11 +25,23 @@ std::string textOf(const Query& query);
 // provider.
 std::string shapeOf(const Query& query);
 
+// A query that the provider has answered before, in another process.
+struct KnownQuery {
+    Query query;
+    CMPIrc code = CMPI_RC_OK;
+    bool leavesObjects = false;
+};
+
 // A slot's call that fails: the `--fault` of the command line.
 struct FailingCall {
     std::string slot;
     unsigned int number = 1;
+    std::string name{}; // of the property, key or argument that the call is about; empty for other calls
 };
+
+// "gi with CMPIInstanceFT.setProperty of Speed failing", and without the name and what follows.
+std::string wordsOf(const Query& query, const FailingCall& failing);
+std::string groupOf(const Query& query, const FailingCall& failing);
 
 // A slot's call that the provider made. The number counts all calls of the slot from the request's beginning.
 struct ProviderCall {

@@ -1,5 +1,7 @@
 #include "check/Results.h"
 
+#include "check/Ranges.h"
+#include "show/Text.h"
 #include "show/Values.h"
 
 #include <algorithm>
@@ -47,6 +49,29 @@ void checkKeys(Client& client, const std::string& request, const Result& result)
     }
 }
 
+// What an instance is associated with may be in another namespace.
+void checkNameSpace(Client& client, const std::string& request, const Result& result,
+                    const std::string& className) {
+    const std::string& nameSpace = client.options().nameSpace;
+    if (!className.empty() && !result.nameSpace.empty() && !sameName(result.nameSpace, nameSpace)) {
+        client.find(CheckKind::otherNameSpace, request, "the path's namespace is " + result.nameSpace);
+    }
+}
+
+void checkRanges(Client& client, const std::string& request, const Result& result) {
+    if (result.properties.empty()) {
+        return;
+    }
+    for (const PropertyDeclaration& property : client.broker().propertiesOf(result.className)) {
+        const auto found = result.properties.find(property.name);
+        const std::string complaint =
+            found != result.properties.end() ? rangeComplaint(property.qualifiers, found->second) : "";
+        if (!complaint.empty()) {
+            client.find(CheckKind::range, request, "property " + property.name + ": " + complaint);
+        }
+    }
+}
+
 } // namespace
 
 bool isRefusal(CMPIrc code) {
@@ -60,7 +85,9 @@ void checkResult(Client& client, const std::string& request, const Result& resul
         client.find(CheckKind::otherClass, request,
                     "class " + result.className + " does not derive from " + className);
     }
+    checkNameSpace(client, request, result, className);
     checkKeys(client, request, result);
+    checkRanges(client, request, result);
     checkTexts(client, request, "key", result.keys);
     checkTexts(client, request, "property", result.properties);
 }
@@ -94,20 +121,24 @@ void checkMethodResult(Client& client, const Query& query, const Answer& answer)
     if (!method) {
         return;
     }
-    const auto mind = [&](const std::string& text) {
+    const auto report = [&](const std::string& text) {
         client.find(CheckKind::methodResult, request, "method " + method->name + ": " + text);
     };
     if (answer.data.size() != 1) {
-        mind("return values: " + std::to_string(answer.data.size()));
+        report("return values: " + std::to_string(answer.data.size()));
     } else if (answer.data.front().type != method->returnType) {
-        mind("the return value is of type " + typeText(answer.data.front().type));
+        report("the return value is of type " + typeText(answer.data.front().type));
+    } else if (!rangeComplaint(method->qualifiers, answer.data.front()).empty()) {
+        report("return value: " + rangeComplaint(method->qualifiers, answer.data.front()));
     }
     for (const auto& [name, value] : answer.out) {
         const ParameterDeclaration* const parameter = method->find(name);
         if (parameter == nullptr || !parameter->isOut) {
-            mind(name + " is no output parameter");
+            report(name + " is no output parameter");
         } else if (parameter->type != value.type) {
-            mind("output argument " + name + " is of type " + typeText(value.type));
+            report("output argument " + name + " is of type " + typeText(value.type));
+        } else if (!rangeComplaint(parameter->qualifiers, value).empty()) {
+            report("output argument " + name + ": " + rangeComplaint(parameter->qualifiers, value));
         }
     }
     checkTexts(client, request, "output argument", answer.out);

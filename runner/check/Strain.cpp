@@ -155,9 +155,27 @@ std::set<std::string> lastingValues(Client& client, const Query& query, const Di
     return both.empty() ? both : without(both, restlessValues(client, query));
 }
 
+void compareThreads(Client& client, const std::vector<Query>& queries) {
+    const Differences first = oneRound(client, queries);
+    const bool hasValues = std::any_of(first.begin(), first.end(),
+                                       [](const auto& entry) { return !entry.second.values.empty(); });
+    Differences second = hasValues ? oneRound(client, queries) : Differences();
+    for (const auto& [index, difference] : first) {
+        for (const std::string& text : difference.structure) {
+            client.find(CheckKind::threadsDiffer, textOf(queries[index]), text);
+        }
+        for (const std::string& text : lastingValues(client, queries[index], difference, second[index])) {
+            client.find(CheckKind::threadsDiffer, textOf(queries[index]), text);
+        }
+    }
+}
+
 // Faults
 
-constexpr unsigned int mostOfASlot = 100;
+// Of the calls for one name and of all calls of one slot. A request for a thousand instances makes the same
+// calls for each of them.
+constexpr unsigned int mostOfAName = 2;
+constexpr unsigned int mostOfASlot = 30;
 
 // A call that gives something back is not made to fail: what is left over then would be the broker's fault.
 bool canFail(const std::string& slot) {
@@ -165,52 +183,123 @@ bool canFail(const std::string& slot) {
     return member != "release" && member.rfind("free", 0) != 0 && member != "detachThread";
 }
 
+// What the call is about, where it can be said in a word.
+std::string nameOf(const Call& call) {
+    const std::string member = call.slot.substr(call.slot.find('.') + 1);
+    const bool isNamed = member.find("Property") != std::string::npos ||
+                         member.find("Key") != std::string::npos || member.find("Arg") != std::string::npos;
+    return isNamed ? call.name : "";
+}
+
 std::vector<FailingCall> failingCalls(const std::vector<ProviderCall>& calls) {
     std::map<std::string, unsigned int> last;
     for (const ProviderCall& made : calls) {
         last[made.call.slot] = made.number;
     }
-    std::map<std::string, unsigned int> counts;
+    std::map<std::string, unsigned int> ofSlot;
+    std::map<std::string, unsigned int> ofName;
     std::vector<FailingCall> failing;
     for (const ProviderCall& made : calls) {
         const std::string& slot = made.call.slot;
-        const bool isFewest = ++counts[slot] <= mostOfASlot || made.number == last[slot];
-        if (canFail(slot) && isFewest) {
-            failing.push_back({slot, made.number});
+        if (!canFail(slot)) {
+            continue;
+        }
+        const bool isNew = ++ofName[slot + ' ' + made.call.name] <= mostOfAName && ofSlot[slot] < mostOfASlot;
+        if (isNew || made.number == last[slot]) {
+            ++ofSlot[slot];
+            failing.push_back({slot, made.number, nameOf(made.call)});
         }
     }
     return failing;
 }
 
-void failEach(Client& client, const Client::Asked& asked) {
-    const auto live = [&] { return client.broker().liveObjects().total(); };
-    for (const FailingCall& failing : failingCalls(asked.calls)) {
-        const std::size_t before = live();
-        client.askPlainly(asked.query, &failing);
-        const std::size_t kept = live();
-        if (kept <= before) {
-            continue;
+// One query with each of its calls failing.
+class FaultedQuery {
+public:
+    FaultedQuery(Client& client, const Query& query) : client_(client), query_(query) {}
+
+    void run() {
+        std::vector<ProviderCall> calls;
+        whole_ = client_.askRecorded(query_, calls);
+        if (!whole_) {
+            return;
         }
-        client.askPlainly(asked.query, &failing);
-        if (live() > kept) {
-            client.find(CheckKind::leftOver,
-                        textOf(asked.query) + " --fault " + failing.slot + ':' +
-                            std::to_string(failing.number),
-                        asked.query.operation->name + (" leaves objects when " + failing.slot + " fails"));
+        for (const FailingCall& failing : failingCalls(calls)) {
+            if (!isSkipped(failing)) {
+                failOne(failing);
+            }
         }
     }
-}
+
+private:
+    // What has crashed is not made to crash again in the same way.
+    bool isSkipped(const FailingCall& failing) const {
+        const std::set<std::string>& skipped = client_.task().skippedFaults;
+        return skipped.count(wordsOf(query_, failing)) != 0 || skipped.count(groupOf(query_, failing)) != 0;
+    }
+
+    void failOne(const FailingCall& failing) {
+        const std::size_t before = live();
+        const std::optional<Answer> answer = client_.askPlainly(query_, &failing);
+        const std::size_t kept = live();
+        if (answer) {
+            compare(*answer, failing);
+        }
+        if (kept > before) {
+            const std::size_t again = live();
+            client_.askPlainly(query_, &failing);
+            if (live() > again) {
+                report(CheckKind::leftOver, failing,
+                       query_.operation->name + (" leaves objects when " + failing.slot + " fails"));
+            }
+        }
+    }
+
+    // An answer that says OK has to be whole. Values may be missing: the calls that set them have no result
+    // that a provider must mind. Only what is so a second time counts, as instances come and go.
+    void compare(const Answer& answer, const FailingCall& failing) {
+        if (!isLess(answer)) {
+            return;
+        }
+        const std::optional<Answer> now = client_.askPlainly(query_);
+        if (!now || !differenceOf(*now, *whole_).structure.empty()) {
+            whole_ = now ? now : whole_;
+            return;
+        }
+        const std::optional<Answer> again = client_.askPlainly(query_, &failing);
+        if (again && isLess(*again)) {
+            report(CheckKind::faultHidden, failing,
+                   wordsOf(query_, failing) + ": OK, but " +
+                       *differenceOf(*again, *whole_).structure.begin());
+        }
+    }
+
+    bool isLess(const Answer& answer) const {
+        return whole_->ok() && answer.ok() && !differenceOf(answer, *whole_).structure.empty();
+    }
+
+    void report(CheckKind kind, const FailingCall& failing, const std::string& text) {
+        client_.find(kind, textOf(query_) + " --fault " + failing.slot + ':' + std::to_string(failing.number),
+                     text);
+    }
+
+    std::size_t live() const { return client_.broker().liveObjects().total(); }
+
+    Client& client_;
+    const Query& query_;
+    std::optional<Answer> whole_; // without a failing call
+};
 
 } // namespace
 
 // A method does its work each time, and is not repeated. A failure has been told.
 void strainByConduct(Client& client) {
-    const std::vector<Client::Asked> all = client.asked();
+    const std::vector<KnownQuery> all = client.asked();
     const auto askAgain = [&](const Query& query, const Conduct& conduct) {
         apply(client.broker(), conduct);
         return client.askPlainly(query);
     };
-    for (const Client::Asked& asked : all) {
+    for (const KnownQuery& asked : all) {
         const Operation& operation = *asked.query.operation;
         const bool isTold = asked.code != CMPI_RC_OK && !isRefusal(asked.code);
         if (operation.target == Target::ofClass || operation.takes == Takes::method || isTold) {
@@ -231,30 +320,36 @@ void strainByConduct(Client& client) {
 
 void strainByThreads(Client& client) {
     std::vector<Query> queries;
-    for (const Client::Asked& asked : client.asked()) {
-        queries.push_back(asked.query);
+    std::map<std::string, unsigned int> ofShape;
+    constexpr unsigned int mostOfAShape = 3;
+    for (const KnownQuery& known : client.task().known) {
+        if (++ofShape[shapeOf(known.query) + codeName(known.code)] <= mostOfAShape) {
+            queries.push_back(known.query);
+        }
     }
-    const Differences first = oneRound(client, queries);
-    const bool hasValues = std::any_of(first.begin(), first.end(),
-                                       [](const auto& entry) { return !entry.second.values.empty(); });
-    Differences second = hasValues ? oneRound(client, queries) : Differences();
-    for (const auto& [index, difference] : first) {
-        for (const std::string& text : difference.structure) {
-            client.find(CheckKind::threadsDiffer, textOf(queries[index]), text);
-        }
-        for (const std::string& text : lastingValues(client, queries[index], difference, second[index])) {
-            client.find(CheckKind::threadsDiffer, textOf(queries[index]), text);
-        }
+    for (unsigned int round = 0; round < client.task().rounds; ++round) {
+        client.tell({Message::Kind::queriesLeft, client.task().rounds - round, ""});
+        compareThreads(client, queries);
     }
 }
 
-void strainByFaults(Client& client) {
+std::vector<KnownQuery> oneOfEachShape(const std::vector<KnownQuery>& known) {
     std::set<std::string> shapes;
-    const std::vector<Client::Asked> all = client.asked();
-    for (const Client::Asked& asked : all) {
-        const std::string shape = shapeOf(asked.query) + codeName(asked.code);
-        if (!asked.leavesObjects && shapes.insert(shape).second) {
-            failEach(client, asked);
+    std::vector<KnownQuery> chosen;
+    for (const KnownQuery& candidate : known) {
+        if (shapes.insert(shapeOf(candidate.query) + codeName(candidate.code)).second) {
+            chosen.push_back(candidate);
+        }
+    }
+    return chosen;
+}
+
+void strainByFaults(Client& client) {
+    const std::vector<KnownQuery> chosen = oneOfEachShape(client.task().known);
+    for (std::size_t i = client.task().firstKnown; i < chosen.size(); ++i) {
+        client.tell({Message::Kind::queriesLeft, chosen.size() - i, ""});
+        if (!chosen[i].leavesObjects) {
+            FaultedQuery(client, chosen[i].query).run();
         }
     }
 }

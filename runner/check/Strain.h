@@ -14,8 +14,12 @@ void strainByConduct(Client& client);
 // the next by itself, such as the free memory, is left out.
 void strainByThreads(Client& client);
 
-// Lets each call fail that the provider makes of the broker in turn, of each slot the first hundred ones and
-// the last, for one query of each shape. The answer may be anything that a code stands for.
+// Of queries that go the same way through a provider, and were answered alike, the first.
+std::vector<KnownQuery> oneOfEachShape(const std::vector<KnownQuery>& known);
+
+// Lets each call fail that the provider makes of the broker in turn, of each slot the first two for a name
+// and the last, for one query of each shape. The answer may be any code but OK, or the one without failing
+// call.
 void strainByFaults(Client& client);
 
 } // namespace oxahv::runner

@@ -9,7 +9,7 @@
 
 namespace oxahv::runner {
 
-enum class Format { mof, json };
+enum class Format { mof, json, junit }; // junit of a check alone
 
 // Prints instances and object paths, one as soon as it comes: as MOF-like text and a path a line, or as one
 // JSON array of objects, where a path's properties are its keys.
