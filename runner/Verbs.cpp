@@ -3,6 +3,7 @@
 #include "Operations.h"
 #include "Runner.h"
 #include "check/Check.h"
+#include "drafts/Draft.h"
 #include "serve/Serve.h"
 #include "show/Text.h"
 
@@ -126,6 +127,7 @@ const std::vector<Verb>& verbs() {
             rows.push_back(verbOf(operation));
         }
         rows.push_back({"check", "find out what the provider does wrong", true, declareCheck});
+        rows.push_back({"new", "write the first draft of a provider", false, declareNew});
 #ifdef OXAHV_HAS_SERVE
         rows.push_back({"serve", "answer CIM clients over HTTP until Ctrl-C", true, declareServe});
 #endif

@@ -267,6 +267,15 @@ TEST_F(KitValues, OfRequestsAreReadInAnyWidthWithinTheirRange) {
     }
 }
 
+TEST_F(KitValues, OfPathsAreComparedWhateverTheirType) {
+    const auto named = [&](const char* text, char16_t letter) {
+        return Path(broker_.handle(), path(text)).addKey("Letter", letter);
+    };
+    EXPECT_TRUE(named("Kit_Other.Flag=TRUE", u'a').names(named("kit_other.FLAG=TRUE", u'a')));
+    EXPECT_FALSE(named("Kit_Other.Flag=TRUE", u'a').names(named("Kit_Other.Flag=TRUE", u'b')));
+    EXPECT_FALSE(named("Kit_Other.Flag=TRUE", u'a').names(named("Kit_Other.Flag=FALSE", u'a')));
+}
+
 TEST_F(KitValues, OfRequestsAreReadByTheirType) {
     const Sent text = sent("\u00fc");
     const Sent number = sent(CMPI_uint8, &CMPIValue::uint8, CMPIUint8{7});

@@ -61,19 +61,31 @@ bool fits(std::size_t indent, const Enclosed& parts) {
     return true;
 }
 
-// A list that is longer than the rest of the line is broken inside its braces.
+std::string joined(const std::vector<Listed>& list) {
+    std::vector<std::string> texts;
+    for (const Listed& item : list) {
+        texts.push_back(item.text);
+    }
+    return '{' + joined(texts) + '}';
+}
+
 void addList(Lines& lines, std::size_t indent, const Enclosed& parts) {
-    const std::string whole = '{' + joined(parts.list) + '}';
+    const std::string whole = joined(parts.list);
     if (indent + whole.size() + parts.tail.size() <= limit) {
         lines.add(whole, parts.tail);
         return;
     }
-    lines.breakLine();
-    Lines inner("{", indent + 1);
-    for (const std::string& item : parts.list) {
-        inner.add(item, &item == &parts.list.back() ? '}' + parts.tail : ",");
+    std::vector<std::string> texts;
+    std::size_t widest = 0;
+    for (const Listed& item : parts.list) {
+        const bool isLast = &item == &parts.list.back();
+        texts.push_back((texts.empty() ? "{" : " ") + item.text + (isLast ? '}' + parts.tail : ","));
+        widest = std::max(widest, texts.back().size());
     }
-    lines.text() += inner.text();
+    for (std::size_t i = 0; i < texts.size(); ++i) {
+        lines.breakLine();
+        lines.text() += texts[i] + blanks(widest - texts[i].size()) + " // " + parts.list[i].comment;
+    }
 }
 
 bool isPlain(char32_t code) {
@@ -103,6 +115,31 @@ std::string onOneLine(std::string_view text) {
     return line;
 }
 
+std::vector<std::string> allItems(const Enclosed& parts) {
+    std::vector<std::string> items = parts.items;
+    if (!parts.list.empty()) {
+        items.push_back(joined(parts.list));
+    }
+    return items;
+}
+
+// The items in lines that begin in a column, behind what the first line starts with.
+std::string broken(const std::string& start, std::size_t column, const Enclosed& parts) {
+    Lines lines(start, column);
+    for (const std::string& item : parts.items) {
+        const bool isEnd = &item == &parts.items.back() && parts.list.empty();
+        lines.add(item, isEnd ? parts.tail : ",");
+    }
+    if (!parts.list.empty()) {
+        addList(lines, column, parts);
+    }
+    return lines.text();
+}
+
+std::ptrdiff_t lineEnds(const std::string& text) {
+    return std::count(text.begin(), text.end(), '\n');
+}
+
 // The size of the first sentence; 0 when there is but one. "e.g." ends none.
 std::size_t endOfSentence(const std::string& line) {
     for (std::size_t end = line.find(". "); end != std::string::npos; end = line.find(". ", end + 1)) {
@@ -117,25 +154,17 @@ std::size_t endOfSentence(const std::string& line) {
 
 std::string enclosed(std::size_t indent, const Enclosed& parts) {
     const std::string start = blanks(indent) + parts.head;
-    std::vector<std::string> items = parts.items;
-    if (!parts.list.empty()) {
-        items.push_back('{' + joined(parts.list) + '}');
-    }
-    std::string line = start + joined(items) + parts.tail;
-    if (line.size() <= limit || items.empty()) {
+    const std::string line = start + joined(allItems(parts)) + parts.tail;
+    if (line.size() <= limit) {
         return line;
     }
-    const bool isAligned = fits(start.size(), parts);
-    const std::size_t column = isAligned ? start.size() : indent + indentWidth;
-    Lines lines(isAligned ? start : start + '\n' + blanks(column), column);
-    for (const std::string& item : parts.items) {
-        const bool isEnd = &item == &parts.items.back() && parts.list.empty();
-        lines.add(item, isEnd ? parts.tail : ",");
-    }
-    if (!parts.list.empty()) {
-        addList(lines, column, parts);
-    }
-    return lines.text();
+    const std::string aligned = broken(start, start.size(), parts);
+    const std::size_t column = indent + indentWidth;
+    const std::string indented = broken(start + '\n' + blanks(column), column, parts);
+    // clang-format weighs breaks: one after a parenthesis against those between items.
+    const std::ptrdiff_t weight = parts.tail.back() == '{' ? 6 : 2;
+    return fits(start.size(), parts) && lineEnds(aligned) <= lineEnds(indented) - 1 + weight ? aligned
+                                                                                             : indented;
 }
 
 std::string memberFunction(std::size_t indent, const Enclosed& signature,

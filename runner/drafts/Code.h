@@ -9,11 +9,18 @@
 
 namespace oxahv::runner {
 
-// What stands between a head such as "serve(" and a tail such as ");".
+// An item of a list in braces. One that is longer than a line has each on its own, with its comment: without,
+// clang-format would put them in columns.
+struct Listed {
+    std::string text;
+    std::string comment;
+};
+
+// Items between a head such as "serve(" and a tail such as ");".
 struct Enclosed {
     std::string head;
     std::vector<std::string> items;
-    std::vector<std::string> list{}; // if not empty, the last item: a list in braces
+    std::vector<Listed> list{}; // if not empty, the last item: a list in braces
     std::string tail;
 };
 

@@ -33,7 +33,7 @@ std::vector<Kind> kindsOf(const DraftClass& drafted) {
     if (drafted.isAssociation) {
         kinds.push_back({"association", "3"});
     }
-    if (!drafted.methods.empty()) {
+    if (drafted.hasMethods) {
         kinds.push_back({"method", "5"});
     }
     return kinds;
@@ -90,7 +90,8 @@ void addClasses(const DraftProvider& provider, Values& values) {
         const bool isLast = &drafted == &provider.classes.back();
         values["CLASS_LIST"] += (isFirst ? "" : isLast ? " and " : ", ") + drafted.name;
         const std::string lineEnd = isFirst ? "" : "\n";
-        values["CLASS_NAMES"] += lineEnd + "    \"" + drafted.name + "\",";
+        values["EXPECT_NAMES"] += lineEnd + "    expectEveryName(\"" + drafted.name + "\");";
+        values["EXPECT_FAILURES"] += lineEnd + "    expectFailure(\"" + drafted.name + "\");";
         values["CLASS_OPTIONS"] += lineEnd + "            --class " + drafted.name;
     }
 }
@@ -138,19 +139,23 @@ std::vector<NewFile> filesOf(const EmbeddedBroker& broker, const DraftProvider& 
 
 } // namespace
 
-int runNew(const std::vector<std::string>& mofFiles, const std::string& nameSpace,
-           const DraftOptions& options) {
-    requirePlain(nameSpace);
+int runNew(const Options& options, const DraftOptions& draftOptions) {
+    if (options.mofFiles.empty()) {
+        throw std::runtime_error("--mof is required: it declares the classes");
+    }
+    requirePlain(options.nameSpace);
     EmbeddedBroker broker;
-    for (const std::string& file : mofFiles) {
+    for (const std::string& file : options.mofFiles) {
         broker.compileMof(file);
     }
-    const DraftProvider provider = draftProvider(broker, options.classes, options.provider, nameSpace);
-    std::vector<NewFile> files = filesOf(broker, provider, mofFiles, options.folder);
+    const DraftProvider provider =
+        draftProvider(broker, draftOptions.classes, draftOptions.provider, options.nameSpace);
+    const fs::path folder = draftOptions.folder;
+    std::vector<NewFile> files = filesOf(broker, provider, options.mofFiles, folder);
     std::sort(files.begin(), files.end(), [](const NewFile& a, const NewFile& b) { return a.name < b.name; });
-    writeNewFiles(options.folder, files);
+    writeNewFiles(folder, files);
     for (const NewFile& file : files) {
-        std::cout << (fs::path(options.folder) / file.name).string() << '\n';
+        std::cout << (folder / file.name).string() << '\n';
     }
     return 0;
 }

@@ -1,9 +1,9 @@
 // `oxahv-provider new`: the first draft of a provider, as a project that can be built and tested.
 #pragma once
 
-#include "drafts/Files.h"
-#include "drafts/Model.h"
+#include "Options.h"
 
+#include <functional>
 #include <string>
 #include <vector>
 
@@ -17,7 +17,9 @@ struct DraftOptions {
 
 // Writes the project, and the names of its files on the standard output. Returns the exit status; throws
 // std::runtime_error, one line, when it has written nothing.
-int runNew(const std::vector<std::string>& mofFiles, const std::string& nameSpace,
-           const DraftOptions& options);
+int runNew(const Options& options, const DraftOptions& draftOptions);
+
+// The verb `new`: declares its options on the command line, and returns what runs it.
+std::function<int(const Options&)> declareNew(CLI::App& command);
 
 } // namespace oxahv::runner

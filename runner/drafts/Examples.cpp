@@ -43,8 +43,14 @@ std::string textFor(const DraftClass& drafted, const DraftProperty& key) {
     std::string text = "example";
     const QualifierDeclaration* const most = key.declaration.qualifiers.find("MaxLen");
     if (most != nullptr && most->value.elements.size() == 1) {
-        if (const auto* const size = std::get_if<unsigned long long>(&most->value.elements[0])) {
-            text.resize(std::min<std::size_t>(text.size(), *size));
+        // A number of a type that no qualifier declaration says has a sign.
+        const PlainValue& size = most->value.elements[0];
+        const auto* const withSign = std::get_if<long long>(&size);
+        const auto* const withoutSign = std::get_if<unsigned long long>(&size);
+        const bool isShort = withSign != nullptr ? *withSign >= 0 && *withSign < 7
+                                                 : withoutSign != nullptr && *withoutSign < 7;
+        if (isShort) {
+            text.resize(withSign != nullptr ? static_cast<std::size_t>(*withSign) : *withoutSign);
         }
     }
     return textLiteral(text);
@@ -114,7 +120,7 @@ std::vector<std::string> exampleOf(const EmbeddedBroker& broker, const DraftProv
     std::vector<std::string> statements;
     std::vector<const DraftClass*> targets;
     std::vector<std::string> paths;
-    Scope variables({"example", "operation", "reply"});
+    Scope variables({"example", "instanceOf", "operation", "pathOf", "reply"});
     std::vector<std::string> others; // assignments of references that are no keys
     for (const DraftProperty* const reference : referencesOf(drafted)) {
         const DraftClass* const target = targetOf(broker, provider, *reference, targets);

@@ -41,6 +41,9 @@ void makeFolder(const fs::path& folder, Made& made) {
     if (folder.empty() || fs::is_directory(folder, error)) {
         return;
     }
+    if (fs::exists(folder, error)) {
+        fail(folder, ENOTDIR);
+    }
     makeFolder(folder.parent_path(), made);
     if (!fs::create_directory(folder, error) && error) {
         fail(folder, error.value());

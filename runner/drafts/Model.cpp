@@ -19,9 +19,10 @@ constexpr const char* targetsOfCMake[] = {
     "package",   "test",    "package_source", "preinstall", "rebuild_cache"};
 
 // The members of a provider's class that a method must not hide, and those of the draft itself.
-const std::set<std::string> membersOfProvider = {
-    "associate", "associations", "create", "end",   "enumerate", "enumerateNames", "get",
-    "invoke",    "method",       "modify", "query", "remove",    "serve"};
+const std::set<std::string> membersOfProvider = {"associate", "associations",   "create", "end",
+                                                 "enumerate", "enumerateNames", "get",    "instanceOf",
+                                                 "invoke",    "method",         "modify", "notWritten",
+                                                 "pathOf",    "query",          "remove", "serve"};
 
 [[noreturn]] void refuse(const std::string& reason) {
     throw std::runtime_error(reason);
@@ -69,7 +70,7 @@ const char* plainTypeOf(CMPIType type) {
     case CMPI_char16:
         return "char16_t";
     case CMPI_dateTime:
-        return "std::chrono::system_clock::time_point";
+        return "classes::Time";
     case CMPI_ref:
         return "oxahv::Path";
     case CMPI_instance:
@@ -90,6 +91,9 @@ std::string typeOf(CMPIType type, const Qualifiers& qualifiers) {
 DraftParameter parameterOf(const ParameterDeclaration& declaration, Scope& scope) {
     DraftParameter parameter = {declaration.name, scope.add(variableName(declaration.name)),
                                 typeOf(declaration.type, declaration.qualifiers),
+                                !declaration.isOut ? "in"
+                                : declaration.isIn ? "in, out"
+                                                   : "out",
                                 textOf(declaration.qualifiers, "Description")};
     const bool isLarge = (declaration.type & CMPI_ARRAY) != 0 || declaration.type == CMPI_string ||
                          declaration.type == CMPI_ref || declaration.type == CMPI_instance;
@@ -171,25 +175,45 @@ DraftClass classOf(const EmbeddedBroker& broker, const std::string& name) {
     return drafted;
 }
 
+// The methods of a class, but for those that it inherits from another one of the provider's: the function
+// that is registered for that class is called for this one, too.
+std::vector<MethodDeclaration> ownMethods(const EmbeddedBroker& broker, const DraftClass& drafted,
+                                          const std::vector<DraftClass>& classes) {
+    std::vector<MethodDeclaration> methods = broker.methodsOf(drafted.name);
+    for (const DraftClass& other : classes) {
+        if (&other == &drafted || !broker.isA(drafted.name, other.name)) {
+            continue;
+        }
+        for (const MethodDeclaration& inherited : broker.methodsOf(other.name)) {
+            methods.erase(std::remove_if(methods.begin(), methods.end(),
+                                         [&](const MethodDeclaration& method) {
+                                             return sameName(method.name, inherited.name);
+                                         }),
+                          methods.end());
+        }
+    }
+    return methods;
+}
+
 // A method is named as in CIM where no other class has one of that name.
 void addMethods(const EmbeddedBroker& broker, std::vector<DraftClass>& classes) {
     std::multiset<std::string> names;
-    for (const DraftClass& drafted : classes) {
-        for (const MethodDeclaration& method : broker.methodsOf(drafted.name)) {
-            names.insert(variableName(method.name));
-        }
-    }
     std::set<std::string> taken = membersOfProvider;
     for (const DraftClass& drafted : classes) {
         taken.insert("list" + drafted.structName);
+        for (const MethodDeclaration& method : ownMethods(broker, drafted, classes)) {
+            names.insert(variableName(method.name));
+        }
     }
     Scope functions(taken);
     for (DraftClass& drafted : classes) {
-        for (const MethodDeclaration& method : broker.methodsOf(drafted.name)) {
-            const std::string name = variableName(method.name);
-            const bool isPlain = names.count(name) == 1 && taken.count(name) == 0;
-            drafted.methods.push_back(
-                methodOf(method, functions.add(isPlain ? name : name + "Of" + drafted.structName)));
+        drafted.hasMethods = !broker.methodsOf(drafted.name).empty();
+        for (const MethodDeclaration& method : ownMethods(broker, drafted, classes)) {
+            std::string name = variableName(method.name);
+            if (names.count(name) > 1 || taken.count(name) > 0) {
+                name = name.substr(0, name.find('_')) + "Of" + drafted.structName;
+            }
+            drafted.methods.push_back(methodOf(method, functions.add(name)));
         }
     }
 }
@@ -208,7 +232,7 @@ void requireProviderName(const std::string& name) {
 DraftProvider draftProvider(const EmbeddedBroker& broker, const std::vector<std::string>& classes,
                             const std::string& provider, const std::string& nameSpace) {
     DraftProvider draft = {provider, nameSpace, {}};
-    Scope structs;
+    Scope structs({"Time"});
     for (const std::string& name : classes) {
         DraftClass drafted = classOf(broker, declaredName(broker, name));
         for (const DraftClass& other : draft.classes) {
@@ -216,7 +240,7 @@ DraftProvider draftProvider(const EmbeddedBroker& broker, const std::vector<std:
                 refuse("class " + drafted.name + " is named twice");
             }
         }
-        drafted.structName = structs.add(typeName(drafted.name));
+        drafted.structName = structs.add(structName(drafted.name));
         draft.classes.push_back(std::move(drafted));
     }
     addMethods(broker, draft.classes);

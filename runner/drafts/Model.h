@@ -18,7 +18,8 @@ struct DraftProperty {
 struct DraftParameter {
     std::string name;
     std::string variable;
-    std::string type; // with std::optional, const and &
+    std::string type;      // with std::optional, const and &
+    std::string direction; // "in", "out" or "in, out"
     std::string description;
 };
 
@@ -35,9 +36,10 @@ struct DraftClass {
     std::string structName;
     std::string description;
     bool isAssociation = false;
-    std::vector<DraftProperty> keys; // references first
-    std::vector<DraftProperty> properties;
-    std::vector<DraftMethod> methods;
+    std::vector<DraftProperty> keys{}; // references first
+    std::vector<DraftProperty> properties{};
+    bool hasMethods = false;
+    std::vector<DraftMethod> methods{}; // but for those of another class of the provider's
 };
 
 struct DraftProvider {

@@ -85,7 +85,7 @@ bool isIdentifier(std::string_view text) {
            !isReserved(std::begin(reservedWords), std::end(reservedWords), text);
 }
 
-std::string typeName(std::string_view name) {
+std::string structName(std::string_view name) {
     std::string result = joined(name, "Class");
     result[0] = capital(result[0]);
     return isReserved(std::begin(reservedTypes), std::end(reservedTypes), result) ? result + '_' : result;

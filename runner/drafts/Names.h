@@ -13,7 +13,7 @@ bool isIdentifier(std::string_view text);
 
 // "DemoPort" for "Demo_Port". Its capital makes it no keyword; the headers that a provider includes define no
 // such macro.
-std::string typeName(std::string_view name);
+std::string structName(std::string_view name);
 // "deviceID" for "DeviceID", "osType" for "OSType", "class_" for "Class".
 std::string variableName(std::string_view name);
 

@@ -15,6 +15,11 @@ namespace {
 constexpr std::size_t memberIndent = 4;
 constexpr std::size_t statementIndent = 8;
 
+constexpr const char* timeAlias =
+    R"(// A point in time. What holds an interval is a std::chrono::microseconds instead.
+using Time = std::chrono::system_clock::time_point;
+)";
+
 constexpr const char* notWritten = R"(// What a method answers until it is written.
 oxahv::Refusal notWritten(const std::string& method) {
     return oxahv::Refusal(CMPI_RC_ERR_NOT_SUPPORTED, method + " is not written yet");
@@ -37,9 +42,7 @@ std::string memberOf(const DraftProperty& property, bool hasReferences) {
         text += " = false";
     } else if (isKey && (isNumber(property.type) || property.type == "char16_t")) {
         text += " = 0";
-    } else if (hasReferences && property.declaration.type != CMPI_ref) {
-        text += "{}";
-    } else if (hasReferences && !isKey) {
+    } else if (hasReferences && (!isKey || property.declaration.type != CMPI_ref)) {
         text += "{}";
     }
     return description + std::string(memberIndent, ' ') + text + ";\n";
@@ -116,49 +119,38 @@ const char* classHead(const DraftProvider& provider) {
 
 // Such as `serve("Demo_Port", &Provider::listDemoPort);`.
 std::string registration(const char* call, const std::string& name, const std::string& function,
-                         std::vector<std::string> list = {}) {
-    return '\n' + enclosed(statementIndent,
-                           {call, {textLiteral(name), "&Provider::" + function}, std::move(list), ");"});
+                         std::vector<Listed> list = {}) {
+    return enclosed(statementIndent,
+                    {call, {textLiteral(name), "&Provider::" + function}, std::move(list), ");"})
+        .substr(statementIndent);
 }
 
-std::string methodRegistrations(const DraftClass& drafted) {
-    std::string text;
-    for (const DraftMethod& method : drafted.methods) {
-        std::vector<std::string> names;
-        for (const DraftParameter& parameter : method.parameters) {
-            names.push_back(textLiteral(parameter.name));
-        }
-        text += registration("method(", drafted.name + '.' + method.name, method.function, names);
+std::string methodRegistration(const DraftClass& drafted, const DraftMethod& method) {
+    std::vector<Listed> names;
+    for (const DraftParameter& parameter : method.parameters) {
+        names.push_back({textLiteral(parameter.name), parameter.direction});
     }
-    return text;
+    return registration("method(", drafted.name + '.' + method.name, method.function, names);
 }
 
-// A method is found for the classes derived from its own, too: theirs come first.
-std::vector<const DraftClass*> derivedFirst(const EmbeddedBroker& broker, const DraftProvider& provider) {
-    std::vector<const DraftClass*> classes;
+std::string constructor(const DraftProvider& provider) {
+    std::vector<std::string> statements;
     for (const DraftClass& drafted : provider.classes) {
-        const auto base = std::find_if(classes.begin(), classes.end(), [&](const DraftClass* other) {
-            return broker.isA(drafted.name, other->name);
-        });
-        classes.insert(base, &drafted);
-    }
-    return classes;
-}
-
-std::string registrations(const EmbeddedBroker& broker, const DraftProvider& provider) {
-    std::string text;
-    for (const DraftClass& drafted : provider.classes) {
-        text += registration("serve(", drafted.name, "list" + drafted.structName);
+        statements.push_back(registration("serve(", drafted.name, "list" + drafted.structName));
     }
     for (const DraftClass& drafted : provider.classes) {
         if (drafted.isAssociation) {
-            text += registration("associate(", drafted.name, "list" + drafted.structName);
+            statements.push_back(registration("associate(", drafted.name, "list" + drafted.structName));
         }
     }
-    for (const DraftClass* const drafted : derivedFirst(broker, provider)) {
-        text += methodRegistrations(*drafted);
+    for (const DraftClass& drafted : provider.classes) {
+        for (const DraftMethod& method : drafted.methods) {
+            statements.push_back(methodRegistration(drafted, method));
+        }
     }
-    return text.substr(1);
+    std::string text = memberFunction(memberIndent, {"Provider(", {}, {}, ") {"}, statements);
+    text.pop_back();
+    return text;
 }
 
 std::string listFunction(const EmbeddedBroker& broker, const DraftProvider& provider,
@@ -189,9 +181,10 @@ std::string methodFunction(const DraftClass& drafted, const DraftMethod& method)
         text += parameter.description.empty() ? "" : description;
     }
     const std::string name = textLiteral(drafted.name + '.' + method.name);
-    return text + memberFunction(memberIndent,
-                                 {method.returnType + ' ' + method.function + '(', parameters, {}, ") {"},
-                                 {enclosed(0, {"throw notWritten(", {name}, {}, ");"})});
+    return text +
+           memberFunction(
+               memberIndent, {method.returnType + ' ' + method.function + '(', parameters, {}, ") {"},
+               {enclosed(statementIndent, {"throw notWritten(", {name}, {}, ");"}).substr(statementIndent)});
 }
 
 } // namespace
@@ -202,7 +195,9 @@ std::string classesHeader(const DraftProvider& provider) {
         classes += structOf(drafted) + '\n' + pathFunction(drafted) + '\n' + instanceFunction(drafted) + '\n';
     }
     classes.pop_back();
-    return filled(templateText("Classes.h"), {{"PROVIDER", provider.name}, {"CLASSES", classes}});
+    const bool hasTimes = classes.find("classes::Time") != std::string::npos;
+    return filled(templateText("Classes.h"),
+                  {{"PROVIDER", provider.name}, {"TIME", hasTimes ? timeAlias : ""}, {"CLASSES", classes}});
 }
 
 std::string providerSource(const EmbeddedBroker& broker, const DraftProvider& provider) {
@@ -221,7 +216,7 @@ std::string providerSource(const EmbeddedBroker& broker, const DraftProvider& pr
     return filled(templateText("Provider.cpp"), {{"PROVIDER", provider.name},
                                                  {"NOT_WRITTEN", hasMethods ? notWritten : ""},
                                                  {"CLASS_HEAD", classHead(provider)},
-                                                 {"REGISTRATIONS", registrations(broker, provider)},
+                                                 {"CONSTRUCTOR", constructor(provider)},
                                                  {"FUNCTIONS", functions}});
 }
 
