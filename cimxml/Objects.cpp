@@ -203,7 +203,8 @@ void writeProperty(XmlWriter& writer, Environment& environment, const DeclaredCl
     if ((data.type & ~CMPI_ARRAY) == CMPI_instance && tag.embedded.empty()) {
         tag.embedded = "instance";
     }
-    if (data.type == CMPI_ref && tag.referenceClass.empty() && !CMIsNullValue(data)) {
+    if (data.type == CMPI_ref && tag.referenceClass.empty() && !CMIsNullValue(data) &&
+        data.value.ref != nullptr) {
         tag.referenceClass = classNameOf(data.value.ref);
     }
     if (property != nullptr && shown.includesClassOrigin) {

@@ -183,35 +183,14 @@ void deleteInstance(const Parameters& parameters, XmlWriter& /*writer*/) {
     require(parameters.environment().request.deleteInstance(parameters.instanceName("InstanceName")));
 }
 
-// Single properties, of which the instance's provider is asked
-
-// The declared property; nothing for a class that is not declared. Throws CimError where its class lacks it.
-std::optional<oxahv::PropertyDeclaration> declarationOf(Environment& environment, const CMPIObjectPath* path,
-                                                        const std::string& name) {
-    const auto declared = environment.schema.find(classNameOf(path));
-    if (declared == nullptr) {
-        return std::nullopt;
-    }
-    const oxahv::PropertyDeclaration* const property = declared->find(name);
-    if (property == nullptr) {
-        throw CimError(CMPI_RC_ERR_NO_SUCH_PROPERTY, "class " + declared->name + " has no property " + name);
-    }
-    return *property;
-}
+// Single properties
 
 void getProperty(const Parameters& parameters, XmlWriter& writer) {
     Environment& environment = parameters.environment();
     const CMPIObjectPath* const path = parameters.instanceName("InstanceName");
-    const std::string name = parameters.requiredText("PropertyName");
-    const bool isDeclared = declarationOf(environment, path, name).has_value();
-    const std::vector<std::string> names = {name};
-    const Reply reply = environment.request.getInstance(path, &names);
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    const CMPIData data = CMGetProperty(onlyInstance(reply), name.c_str(), &status);
-    // A declared property that the provider left out is a NULL.
-    if (!isDeclared || status.rc != CMPI_RC_ERR_NO_SUCH_PROPERTY) {
-        require(status, "property " + name);
-        writeValue(writer, environment, data);
+    const Reply reply = environment.request.getProperty(path, parameters.requiredText("PropertyName"));
+    if (!require(reply).data.empty()) {
+        writeValue(writer, environment, reply.data.front());
     }
 }
 
@@ -219,20 +198,16 @@ void setProperty(const Parameters& parameters, XmlWriter& /*writer*/) {
     Environment& environment = parameters.environment();
     const CMPIObjectPath* const path = parameters.instanceName("InstanceName");
     const std::string name = parameters.requiredText("PropertyName");
-    const auto declaration = declarationOf(environment, path, name);
+    const auto declared = environment.schema.find(classNameOf(path));
+    const oxahv::PropertyDeclaration* const property = declared != nullptr ? declared->find(name) : nullptr;
+    const CMPIType type = property != nullptr ? valueTypeOf(property->type, property->qualifiers)
+                                              : static_cast<CMPIType>(CMPI_null);
     const Element* const value = parameters.find("NewValue");
-    CMPIData data = {CMPI_string, CMPI_nullValue, {}};
+    CMPIData data = {type, CMPI_nullValue, {}};
     if (value != nullptr) {
-        const CMPIType type = declaration ? valueTypeOf(declaration->type, declaration->qualifiers)
-                                          : static_cast<CMPIType>(CMPI_null);
         data = readValue(environment, *value, type, "property " + name);
     }
-    CMPIInstance* const instance =
-        checked("property " + name, CMNewInstance, environment.broker.handle(), path);
-    require(CMSetProperty(instance, name.c_str(), CMIsNullValue(data) ? nullptr : &data.value, data.type),
-            "property " + name);
-    const std::vector<std::string> names = {name};
-    require(environment.request.modifyInstance(path, instance, &names));
+    require(environment.request.setProperty(path, name, data));
 }
 
 // Several instances
