@@ -1,6 +1,7 @@
 // A provider that keeps the instances that clients make, of the classes in mof/Kept.mof.
 #include "ProviderKit.h"
 
+#include <fstream>
 #include <map>
 #include <mutex>
 #include <string>
@@ -33,7 +34,9 @@ class KeptProvider : public oxahv::InstanceProvider,
                      public oxahv::AssociationProvider,
                      public oxahv::MethodProvider {
 public:
-    KeptProvider() {
+    // The context may name a file that is made when the provider ends.
+    explicit KeptProvider(const oxahv::Context& context)
+        : endFile_(context.get<std::optional<std::string>>("KeptEndFile").value_or("")) {
         serve("Kept_Thing", &KeptProvider::things);
         serve("Kept_Special", &KeptProvider::things);
         serve("Kept_Link", &KeptProvider::links);
@@ -45,6 +48,9 @@ public:
     ~KeptProvider() override {
         for (const auto& [id, thing] : things_) {
             CMRelease(thing.instance);
+        }
+        if (!endFile_.empty()) {
+            std::ofstream(endFile_) << "ended";
         }
     }
     KeptProvider(const KeptProvider&) = delete;
@@ -137,6 +143,7 @@ private:
 
     std::string refuse() { throw oxahv::Refusal(CMPI_RC_ERR_ACCESS_DENIED, "nöt <this>"); }
 
+    const std::string endFile_;
     std::mutex mutex_;
     Things things_;
 };
