@@ -40,7 +40,6 @@ public:
         serve("Kept_Thing", &KeptProvider::things);
         serve("Kept_Special", &KeptProvider::things);
         serve("Kept_Link", &KeptProvider::links);
-        associate("Kept_Link", &KeptProvider::links);
         method("Exchange", &KeptProvider::exchange,
                {"Flag", "Letter", "Number", "Long", "Real", "Text", "Texts", "When", "Peer"});
         method("Refuse", &KeptProvider::refuse);
@@ -84,6 +83,10 @@ public:
         const auto thing = found(operation);
         CMRelease(thing->second.instance);
         things_.erase(thing);
+    }
+
+    void associations(const oxahv::Operation& operation, oxahv::Instances& reply) override {
+        links(operation, reply);
     }
 
 private:
