@@ -101,9 +101,9 @@ std::string inside(const std::string& text, const std::string& element) {
     return start == std::string::npos || end == std::string::npos ? text : text.substr(begin, end - begin);
 }
 
-class CimXml : public testing::Test {
+class CimXmlTest : public testing::Test {
 protected:
-    CimXml() {
+    CimXmlTest() {
         broker_.compileMof(MOF_FIXTURES "/Kept.mof");
         broker_.host("Kept", {KeptProvider_Create_InstanceMI, KeptProvider_Create_AssociationMI,
                               KeptProvider_Create_MethodMI});
@@ -139,7 +139,7 @@ std::string array(const std::string& name, const std::string& type, const std::s
            "</VALUE.ARRAY></PROPERTY.ARRAY>";
 }
 
-TEST_F(CimXml, CarriesValuesOfEveryType) {
+TEST_F(CimXmlTest, CarriesValuesOfEveryType) {
     struct Row {
         std::string name;
         std::string sent;
@@ -178,7 +178,7 @@ TEST_F(CimXml, CarriesValuesOfEveryType) {
     }
 }
 
-TEST_F(CimXml, ReplacesCharactersThatXmlLacks) {
+TEST_F(CimXmlTest, ReplacesCharactersThatXmlLacks) {
     oxahv::Request request(broker_);
     CMPIObjectPath* const path = request.objectPathFromText("Kept_Thing.Id=\"x\"", "root/cimv2");
     CMPIInstance* const wanted = CMNewInstance(broker_.handle(), path, nullptr);
@@ -194,7 +194,7 @@ TEST_F(CimXml, ReplacesCharactersThatXmlLacks) {
     EXPECT_EQ(response.summary, "GetInstance (3 characters that XML does not have became U+FFFD)");
 }
 
-TEST_F(CimXml, RefusesWithCodesAndReasons) {
+TEST_F(CimXmlTest, RefusesWithCodesAndReasons) {
     create("a");
     struct Row {
         std::string operation;
@@ -268,7 +268,7 @@ TEST_F(CimXml, RefusesWithCodesAndReasons) {
     }
 }
 
-TEST_F(CimXml, KeepsWhatClientsCreateChangeAndDelete) {
+TEST_F(CimXmlTest, KeepsWhatClientsCreateChangeAndDelete) {
     create("a", property("Text", "string", "old") + property("U8", "uint8", "1"));
     const std::string change = "<VALUE.NAMEDINSTANCE>" + thing("a") +
                                instance(property("Text", "string", "new") + property("U8", "uint8", "2")) +
@@ -290,7 +290,7 @@ TEST_F(CimXml, KeepsWhatClientsCreateChangeAndDelete) {
     EXPECT_EQ(ask("EnumerateInstanceNames", classNamed("Kept_Thing")), "");
 }
 
-TEST_F(CimXml, EnumeratesSubclassesToo) {
+TEST_F(CimXmlTest, EnumeratesSubclassesToo) {
     create("a", property("Text", "string", "x"));
     create("b", property("Text", "string", "y") + property("Extra", "string", "z"), "Kept_Special");
     EXPECT_EQ(ask("EnumerateInstanceNames", classNamed("kept_thing")),
@@ -319,7 +319,7 @@ TEST_F(CimXml, EnumeratesSubclassesToo) {
               "TRANSLATABLE=\"false\"><VALUE>64</VALUE></QUALIFIER><VALUE>b</VALUE></PROPERTY>");
 }
 
-TEST_F(CimXml, TraversesAssociations) {
+TEST_F(CimXmlTest, TraversesAssociations) {
     create("a");
     create("b", "", "Kept_Special");
     create("c");
@@ -355,7 +355,7 @@ TEST_F(CimXml, TraversesAssociations) {
             "</PROPERTY.REFERENCE>");
 }
 
-TEST_F(CimXml, CallsMethods) {
+TEST_F(CimXmlTest, CallsMethods) {
     create("a");
     const std::string object = "<LOCALINSTANCEPATH>" + local + thing("a") + "</LOCALINSTANCEPATH>";
     const std::string peer = "<VALUE.REFERENCE><LOCALINSTANCEPATH>" + local + typed(thing("p")) +
@@ -397,7 +397,7 @@ TEST_F(CimXml, CallsMethods) {
               error + "4\" DESCRIPTION=\"argument Text appears twice\"/>");
 }
 
-TEST_F(CimXml, AnswersFromTheDeclaredClasses) {
+TEST_F(CimXmlTest, AnswersFromTheDeclaredClasses) {
     EXPECT_EQ(ask("EnumerateClassNames", ""),
               R"(<CLASSNAME NAME="Kept_Link"/><CLASSNAME NAME="Kept_Part"/><CLASSNAME NAME="Kept_Thing"/>)");
     EXPECT_EQ(ask("EnumerateClassNames", classNamed("Kept_Thing") + value("DeepInheritance", "TRUE")),
@@ -437,7 +437,7 @@ TEST_F(CimXml, AnswersFromTheDeclaredClasses) {
     EXPECT_NE(ask("EnumerateQualifiers", "").find(maxLen), std::string::npos);
 }
 
-TEST_F(CimXml, AnswersEachRequestOfAMessage) {
+TEST_F(CimXmlTest, AnswersEachRequestOfAMessage) {
     create("a");
     const std::string other = R"(<LOCALNAMESPACEPATH><NAMESPACE NAME="root"/></LOCALNAMESPACEPATH>)";
     const HttpRequest request = {
@@ -468,7 +468,7 @@ TEST_F(CimXml, AnswersEachRequestOfAMessage) {
             "</MULTIRSP></MESSAGE></CIM>\n");
 }
 
-TEST_F(CimXml, RefusesWhatIsNoRequest) {
+TEST_F(CimXmlTest, RefusesWhatIsNoRequest) {
     struct Row {
         const char* what;
         void (*change)(HttpRequest& request);
@@ -563,7 +563,7 @@ TEST_F(CimXml, RefusesWhatIsNoRequest) {
 
 // Each call of the broker and each allocation of some requests fails in turn. What comes of it is an answer,
 // which a client can read, or std::bad_alloc, and nothing stays behind.
-TEST_F(CimXml, SurvivesEveryFailure) {
+TEST_F(CimXmlTest, SurvivesEveryFailure) {
     create("a", array("Texts", "string", "<VALUE.NULL/><VALUE>x</VALUE>") +
                     property("When", "datetime", "20260329013000.000250+060"));
     create("b");

@@ -124,7 +124,7 @@ std::string answerTo(const Server& server, const std::string& request) {
     return client.receiveAll();
 }
 
-TEST(Serve, TalksToAClientOfTheField) {
+TEST(ServeTest, TalksToAClientOfTheField) {
     if (shell("command -v wbemcli").status != 0) {
         GTEST_SKIP() << "wbemcli is not installed";
     }
@@ -198,7 +198,7 @@ TEST(Serve, TalksToAClientOfTheField) {
     }
 }
 
-TEST(Serve, ShowsEachRequestOnATerminal) {
+TEST(ServeTest, ShowsEachRequestOnATerminal) {
     const Server server;
     const std::string response = answerTo(server, goodRequest());
     EXPECT_EQ(statusOf(response), "HTTP/1.1 200 OK");
@@ -215,7 +215,7 @@ TEST(Serve, ShowsEachRequestOnATerminal) {
         << second;
 }
 
-TEST(Serve, EndsWithTheProvidersCleanup) {
+TEST(ServeTest, EndsWithTheProvidersCleanup) {
     for (const int signal : {SIGINT, SIGTERM}) {
         const File ended;
         Server server(kept + "--context KeptEndFile=" + ended.path());
@@ -228,7 +228,7 @@ TEST(Serve, EndsWithTheProvidersCleanup) {
     }
 }
 
-TEST(Serve, SurvivesClientsThatBehaveBadly) {
+TEST(ServeTest, SurvivesClientsThatBehaveBadly) {
     const Server server(kept, "--timeout 1");
     struct Row {
         std::string request;
@@ -280,7 +280,7 @@ TEST(Serve, SurvivesClientsThatBehaveBadly) {
     EXPECT_EQ(statusOf(answerTo(server, goodRequest())), "HTTP/1.1 200 OK");
 }
 
-TEST(Serve, AnswersSeveralClientsAtOnce) {
+TEST(ServeTest, AnswersSeveralClientsAtOnce) {
     Server server;
     std::vector<std::thread> clients;
     for (int i = 0; i < 8; ++i) {
@@ -296,7 +296,7 @@ TEST(Serve, AnswersSeveralClientsAtOnce) {
     EXPECT_EQ(server.end(SIGINT), 0);
 }
 
-TEST(Serve, ListensOnThisMachineAlone) {
+TEST(ServeTest, ListensOnThisMachineAlone) {
     const std::string own =
         ": only this machine's own addresses are served, 127.0.0.1 and [::1]: requests are "
         "not authenticated";
