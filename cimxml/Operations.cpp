@@ -273,11 +273,11 @@ std::string classInQuery(const std::string& query) {
     std::string before;
     for (std::size_t begin = query.find_first_not_of(space); begin != std::string::npos;) {
         const std::size_t end = std::min(query.find_first_of(space, begin), query.size());
-        const std::string word = query.substr(begin, end - begin);
+        std::string word = query.substr(begin, end - begin);
         if (sameName(before, "from")) {
             return word;
         }
-        before = word;
+        before = std::move(word);
         begin = query.find_first_not_of(space, end);
     }
     throw CimError(CMPI_RC_ERR_INVALID_QUERY, "the query names no class: there is no FROM in it");

@@ -74,11 +74,11 @@ std::shared_ptr<const DeclaredClass> Schema::find(const std::string& className) 
 
 std::vector<std::string> Schema::subclassesOf(const std::string& className, bool all) const {
     std::vector<std::string> names;
-    for (const std::string& name : broker_.declaredClasses()) {
-        const bool derives =
-            all && !sameName(name, className) && (className.empty() || broker_.isA(name, className));
-        if (derives || (!all && sameName(broker_.superclassOf(name), className))) {
-            names.push_back(name);
+    for (const std::string& candidate : broker_.declaredClasses()) {
+        const bool derives = all && !sameName(candidate, className) &&
+                             (className.empty() || broker_.isA(candidate, className));
+        if (derives || (!all && sameName(broker_.superclassOf(candidate), className))) {
+            names.push_back(candidate);
         }
     }
     return names;
