@@ -69,7 +69,7 @@ std::string valueOf(const HttpRequest& request, std::string_view header, const c
     return value != nullptr ? *value : otherwise;
 }
 
-// What stands before the names of extension headers: RFC 2774 lets the client choose two digits.
+// The prefix of the extension headers' names. RFC 2774 lets the client choose its two digits.
 std::string extensionPrefix(const HttpRequest& request) {
     const std::string man = valueOf(request, "Man", "");
     const std::vector<std::string_view> parts = split(man, ';');

@@ -75,8 +75,8 @@ std::shared_ptr<const DeclaredClass> Schema::find(const std::string& className) 
 std::vector<std::string> Schema::subclassesOf(const std::string& ancestor, bool all) const {
     std::vector<std::string> names;
     for (const std::string& candidate : broker_.declaredClasses()) {
-        const bool derives = all && !sameName(candidate, ancestor) &&
-                             (ancestor.empty() || broker_.isA(candidate, ancestor));
+        const bool derives =
+            all && !sameName(candidate, ancestor) && (ancestor.empty() || broker_.isA(candidate, ancestor));
         if (derives || (!all && sameName(broker_.superclassOf(candidate), ancestor))) {
             names.push_back(candidate);
         }

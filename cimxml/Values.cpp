@@ -178,7 +178,7 @@ std::string characterText(CMPIChar16 code) {
     return text;
 }
 
-// A value that is none of NULL, and whose handle is null all the same, would be followed to nowhere.
+// A broken provider or broker may hand out a value that is not NULL by its state, with a null handle.
 void requireHandle(const CMPIData& data) {
     const bool hasHandle = (data.type & CMPI_ARRAY) != 0 || data.type == CMPI_string ||
                            data.type == CMPI_chars || data.type == CMPI_dateTime || data.type == CMPI_ref ||

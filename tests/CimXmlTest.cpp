@@ -562,7 +562,7 @@ TEST_F(CimXmlTest, RefusesWhatIsNoRequest) {
 }
 
 // Each call of the broker and each allocation of some requests fails in turn. What comes of it is an answer,
-// which a client can read, or std::bad_alloc, and nothing stays behind.
+// which a client can read, or std::bad_alloc, and nothing leaks.
 TEST_F(CimXmlTest, SurvivesEveryFailure) {
     create("a", array("Texts", "string", "<VALUE.NULL/><VALUE>x</VALUE>") +
                     property("When", "datetime", "20260329013000.000250+060"));
