@@ -384,8 +384,15 @@ TEST_F(CimXmlTest, CallsMethods) {
               0U);
 
     const std::string error = "<ERROR CODE=\"";
-    EXPECT_EQ(content(methodRequest("Refuse", path, object, "")),
-              error + "2\" DESCRIPTION=\"nöt &lt;this&gt;\"/>");
+    for (const auto& [authorization, user] :
+         {std::pair("", ""), std::pair("basic YW5uYTpnZWhlaW0=", "anna"), std::pair("Basic w7w=", "ü"),
+          std::pair("Basic /zp4", ""), std::pair("Basic AA==", ""),
+          std::pair("Bearer YW5uYTpnZWhlaW0=", "")}) {
+        HttpRequest request = methodRequest("Refuse", path, object, "");
+        request.headers.emplace_back("Authorization", authorization);
+        EXPECT_EQ(content(request), error + "2\" DESCRIPTION=\"nöt &lt;this&gt;" + user + "\"/>")
+            << authorization;
+    }
     EXPECT_EQ(content(methodRequest("Odd", path, object, "")),
               error + "17\" DESCRIPTION=\"class Kept_Thing has no method Odd\"/>");
     EXPECT_EQ(content(methodRequest("Exchange", path, object, plain("Odd", "uint8", "1"))),

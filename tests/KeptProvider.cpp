@@ -144,7 +144,11 @@ private:
         return number;
     }
 
-    std::string refuse() { throw oxahv::Refusal(CMPI_RC_ERR_ACCESS_DENIED, "nöt <this>"); }
+    // The principal is who asks.
+    std::string refuse(const oxahv::Operation& operation) {
+        const auto principal = operation.context().get<std::optional<std::string>>("CMPIPrincipal");
+        throw oxahv::Refusal(CMPI_RC_ERR_ACCESS_DENIED, "nöt <this>" + principal.value_or(""));
+    }
 
     const std::string endFile_;
     std::mutex mutex_;
