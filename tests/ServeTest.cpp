@@ -251,22 +251,25 @@ TEST(ServeTest, SurvivesClientsThatBehaveBadly) {
     for (const Row& row : rows) {
         EXPECT_EQ(statusOf(answerTo(server, row.request)), row.status) << row.request.substr(0, 300);
     }
-    {
-        const Client slow(server); // never silent for long, and never done
-        slow.send(header + "Content-Length: 100000\r\n\r\n");
-        while (slow.send("x")) {
-            std::this_thread::sleep_for(std::chrono::milliseconds(100));
-        }
-        EXPECT_EQ(statusOf(slow.receiveAll()), "HTTP/1.1 408 Request Timeout");
-        const std::string chunk = "10000\r\n" + std::string(0x10000, ' ') + "\r\n";
-        const Client large(server); // announces no size
-        large.send(header + "Transfer-Encoding: chunked\r\n\r\n");
-        for (int i = 0; i < 65; ++i) {
-            large.send(chunk);
-        }
-        large.send("0\r\n\r\n");
-        EXPECT_EQ(statusOf(large.receiveAll()), "HTTP/1.1 413 Content Too Large");
+    const Client slow(server); // never silent for long, and never done
+    slow.send(header + "Content-Length: 100000\r\n\r\n");
+    while (slow.send("x")) {
+        std::this_thread::sleep_for(std::chrono::milliseconds(100));
     }
+    EXPECT_EQ(statusOf(slow.receiveAll()), "HTTP/1.1 408 Request Timeout");
+    EXPECT_EQ(statusOf(answerTo(server, goodRequest())), "HTTP/1.1 200 OK");
+}
+
+TEST(ServeTest, SurvivesClientsThatWantTooMuch) {
+    const Server server;
+    const Client large(server); // announces no size
+    large.send(header + "Transfer-Encoding: chunked\r\n\r\n");
+    for (int i = 0; i < 65; ++i) {
+        large.send("10000\r\n" + std::string(0x10000, ' ') + "\r\n");
+    }
+    large.send("0\r\n\r\n");
+    EXPECT_EQ(statusOf(large.receiveAll()), "HTTP/1.1 413 Content Too Large");
+
     std::vector<std::unique_ptr<Client>> idle; // more than the server holds
     for (int i = 0; i < 600; ++i) {
         idle.push_back(std::make_unique<Client>(server));
@@ -274,10 +277,13 @@ TEST(ServeTest, SurvivesClientsThatBehaveBadly) {
             idle.back()->send(goodRequest().substr(0, static_cast<std::size_t>(i)));
         }
     }
-    idle.resize(500);
-    EXPECT_EQ(statusOf(answerTo(server, goodRequest())), "HTTP/1.1 200 OK");
-    idle.clear();
-    EXPECT_EQ(statusOf(answerTo(server, goodRequest())), "HTTP/1.1 200 OK");
+    idle.resize(500); // the server learns of it soon
+    std::string response;
+    for (int i = 0; i < 100 && response.empty(); ++i) {
+        response = answerTo(server, goodRequest());
+        std::this_thread::sleep_for(std::chrono::milliseconds(response.empty() ? 100 : 0));
+    }
+    EXPECT_EQ(statusOf(response), "HTTP/1.1 200 OK");
 }
 
 TEST(ServeTest, AnswersSeveralClientsAtOnce) {
