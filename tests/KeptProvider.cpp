@@ -107,7 +107,8 @@ private:
     void things(const oxahv::Operation& operation, oxahv::Instances& reply) {
         const std::lock_guard<std::mutex> lock(mutex_);
         for (const auto& [id, thing] : things_) {
-            if (!operation.isFor(thing.className.c_str())) {
+            // As some providers do, this one returns those of the subclass for the class too.
+            if (!operation.isFor(thing.className.c_str()) && !operation.isFor("Kept_Thing")) {
                 continue;
             }
             oxahv::Instance instance = operation.instance(thing.className.c_str(), {{"Id", id}});
