@@ -12,7 +12,7 @@
 
 namespace cimxml {
 
-// Throws CimError with the status's code and message, if it is none of success.
+// Throws CimError with the status's code and message, unless the code is CMPI_RC_OK.
 void require(const CMPIStatus& status, const std::string& what);
 
 // What a call returns that takes a status last. Throws CimError when it fails or returns a null handle.

@@ -39,7 +39,7 @@ ErrorElement errorOf(const CimError& error) {
 class Performance {
 public:
     Performance(oxahv::EmbeddedBroker& broker, const std::string& nameSpace, const HttpRequest& request)
-        : broker_(broker), nameSpace_(nameSpace) {
+        : broker_(broker), nameSpace_(nameSpace), user_(userOf(request)) {
         const std::string* const host = request.find("Host");
         hostName_ = host != nullptr ? *host : "localhost";
     }
@@ -77,6 +77,7 @@ private:
                            "there is no namespace " + call.nameSpace + ", only " + nameSpace_);
         }
         oxahv::Request request(broker_);
+        request.setContextEntry(CMPIPrincipal, user_);
         Environment environment{broker_, request, Schema(broker_), nameSpace_, hostName_};
         call.isMethod ? performMethod(environment, call, writer)
                       : performOperation(environment, call, writer);
@@ -85,6 +86,7 @@ private:
     oxahv::EmbeddedBroker& broker_;
     const std::string& nameSpace_;
     std::string hostName_;
+    std::string user_;
 };
 
 } // namespace

@@ -1,6 +1,7 @@
 #include "Http.h"
 
 #include <Names.h>
+#include <Utf8.h>
 
 #include <algorithm>
 #include <charconv>
@@ -64,12 +65,33 @@ std::string percentDecoded(std::string_view text) {
     return result;
 }
 
+// Decodes up to the first character that base64 does not have.
+std::string base64Decoded(std::string_view text) {
+    constexpr std::string_view digits = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
+    std::string result;
+    unsigned int bits = 0;
+    unsigned int count = 0;
+    for (const char c : text) {
+        const std::size_t digit = digits.find(c);
+        if (digit == std::string_view::npos) {
+            break;
+        }
+        bits = (bits << 6U | static_cast<unsigned int>(digit)) & 0xFFFFU;
+        count += 6;
+        if (count >= 8) {
+            count -= 8;
+            result += static_cast<char>(static_cast<unsigned char>(bits >> count & 0xFFU));
+        }
+    }
+    return result;
+}
+
 std::string valueOf(const HttpRequest& request, std::string_view header, const char* otherwise) {
     const std::string* const value = request.find(header);
     return value != nullptr ? *value : otherwise;
 }
 
-// What stands before the names of extension headers: RFC 2774 lets the client choose two digits.
+// The prefix of the extension headers' names. RFC 2774 lets the client choose its two digits.
 std::string extensionPrefix(const HttpRequest& request) {
     const std::string man = valueOf(request, "Man", "");
     const std::vector<std::string_view> parts = split(man, ';');
@@ -180,6 +202,18 @@ Headers CimHeaders::ofAnswer() const {
         headers.emplace_back("Man", std::string(extension) + "; ns=" + prefix_.substr(0, prefix_.size() - 1));
     }
     return headers;
+}
+
+std::string userOf(const HttpRequest& request) {
+    constexpr std::string_view scheme = "Basic ";
+    const std::string header = valueOf(request, "Authorization", "");
+    if (!sameName(std::string_view(header).substr(0, scheme.size()), scheme)) {
+        return "";
+    }
+    const std::string decoded = base64Decoded(trimmed(std::string_view(header).substr(scheme.size())));
+    const std::string user = decoded.substr(0, decoded.find(':'));
+    const bool isText = encoding::isUtf8(user) && user.find('\0') == std::string::npos;
+    return isText ? user : "";
 }
 
 HttpResponse refusal(const HttpError& error) {

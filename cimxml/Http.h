@@ -49,6 +49,10 @@ private:
     std::string prefix_; // before the names of extension headers: "NN-" in an M-POST request
 };
 
+// The user's name in a header Authorization of the scheme Basic; empty where there is none. Nobody has
+// checked it.
+std::string userOf(const HttpRequest& request);
+
 // The answer to a request that cannot be read.
 HttpResponse refusal(const HttpError& error);
 

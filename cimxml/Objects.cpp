@@ -111,7 +111,10 @@ void readProperty(Environment& environment, CMPIInstance* instance, const Declar
 CMPIObjectPath* newPathOf(Environment& environment, const Element& instance, const DeclaredClass* declared) {
     const std::string className = instance.attribute("CLASSNAME");
     CMPIObjectPath* const path = newPath(environment, environment.nameSpace, className);
-    for (const Element& property : declared != nullptr ? instance.children : std::vector<Element>()) {
+    if (declared == nullptr) { // nobody knows which of its properties are keys
+        return path;
+    }
+    for (const Element& property : instance.children) {
         const oxahv::PropertyDeclaration* const key = declared->find(property.attribute("NAME"));
         if (key == nullptr || !key->isKey) {
             continue;
@@ -203,7 +206,8 @@ void writeProperty(XmlWriter& writer, Environment& environment, const DeclaredCl
     if ((data.type & ~CMPI_ARRAY) == CMPI_instance && tag.embedded.empty()) {
         tag.embedded = "instance";
     }
-    if (data.type == CMPI_ref && tag.referenceClass.empty() && !CMIsNullValue(data)) {
+    if (data.type == CMPI_ref && tag.referenceClass.empty() && !CMIsNullValue(data) &&
+        data.value.ref != nullptr) {
         tag.referenceClass = classNameOf(data.value.ref);
     }
     if (property != nullptr && shown.includesClassOrigin) {

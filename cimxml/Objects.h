@@ -14,7 +14,7 @@ struct Shown {
     bool localOnly = false; // only what its class itself declares
     bool includesQualifiers = false;
     bool includesClassOrigin = false;
-    const std::vector<std::string>* properties = nullptr; // the property list; null is none
+    const std::vector<std::string>* properties = nullptr; // the property list; null: all
     std::string declaredBy{}; // only properties that this class has too; empty: all
 };
 

@@ -4,13 +4,13 @@
 #include "Failure.h"
 #include "Objects.h"
 #include "Parameters.h"
+#include "Results.h"
 #include "Values.h"
 
 #include <Names.h>
 
 #include <algorithm>
-#include <iterator>
-#include <set>
+#include <optional>
 
 namespace cimxml {
 
@@ -54,57 +54,37 @@ const CMPIInstance* onlyInstance(const Reply& reply) {
 
 // Enumerations
 
-// The results of an enumeration of a class and of the classes that derive from it, each of which may have a
-// provider of its own. A provider of the superclass may have returned some of them already.
-class Union {
-public:
-    void add(const Reply& reply) {
-        for (CMPIInstance* const instance : reply.instances) {
-            if (isNew(pathOf(instance))) {
-                instances.push_back(instance);
-            }
-        }
-        for (CMPIObjectPath* const path : reply.objectPaths) {
-            if (isNew(path)) {
-                paths.push_back(path);
-            }
-        }
-    }
-
-    std::vector<CMPIInstance*> instances;
-    std::vector<CMPIObjectPath*> paths;
-
-private:
-    bool isNew(const CMPIObjectPath* path) { return seen_.insert(oxahv::pathText(path)).second; }
-
-    std::set<std::string> seen_;
-};
-
 bool isRefusal(const Reply& reply) {
     return !reply.isServed || reply.code == CMPI_RC_ERR_NOT_SUPPORTED ||
            reply.code == CMPI_RC_ERR_INVALID_CLASS;
 }
 
-// `ask` sends the request for one class.
+// Enumerates a class and the classes that derive from it, each of which may have a provider of its own. A
+// provider of the superclass may have returned some of their instances already. `ask` sends the request for
+// one class.
 template <class Ask>
-Union enumerate(const Parameters& parameters, const std::string& className, const Ask& ask) {
-    Union results;
-    const Reply first = ask(classPath(parameters, className));
-    bool isServed = !isRefusal(first);
-    if (isServed) {
-        results.add(require(first));
-    }
-    for (const std::string& subclass : parameters.environment().schema.subclassesOf(className, true)) {
-        const Reply reply = ask(classPath(parameters, subclass));
-        if (!isRefusal(reply)) {
-            results.add(require(reply));
+void enumerate(const Parameters& parameters, const std::string& className,
+               const oxahv::InstanceHandler& writeInstances, const oxahv::PathHandler& writePaths,
+               const Ask& ask) {
+    Environment& environment = parameters.environment();
+    std::vector<std::string> classes = environment.schema.subclassesOf(className, true);
+    classes.insert(classes.begin(), className);
+    Results results(environment, classes.size() > 1, writeInstances, writePaths);
+    std::optional<Reply> refusal; // the first one
+    bool isServed = false;
+    for (const std::string& name : classes) {
+        const std::size_t before = results.count();
+        const Reply reply = ask(classPath(parameters, name));
+        if (!isRefusal(reply) || results.count() > before) {
+            results.require(reply);
             isServed = true;
+        } else if (!refusal) {
+            refusal = reply;
         }
     }
     if (!isServed) {
-        require(first);
+        results.require(*refusal);
     }
-    return results;
 }
 
 void enumerateInstances(const Parameters& parameters, XmlWriter& writer) {
@@ -114,26 +94,22 @@ void enumerateInstances(const Parameters& parameters, XmlWriter& writer) {
     if (!parameters.boolean("DeepInheritance", true)) {
         selection.shown.declaredBy = className;
     }
-    const Union results = enumerate(parameters, className, [&](const CMPIObjectPath* path) {
-        return environment.request.enumerateInstances(path, selection.list());
-    });
-    for (const CMPIInstance* const instance : results.instances) {
+    const auto write = [&](const CMPIInstance* instance) {
         writer.element("VALUE.NAMEDINSTANCE", {}, [&] {
             writeInstanceName(writer, environment, pathOf(instance));
             writeInstance(writer, environment, instance, selection.shown);
         });
-    }
+    };
+    enumerate(parameters, className, write, nullptr, [&](const CMPIObjectPath* path) {
+        return environment.request.enumerateInstances(path, selection.list());
+    });
 }
 
 void enumerateInstanceNames(const Parameters& parameters, XmlWriter& writer) {
-    const std::string className = parameters.requiredClassName("ClassName");
     Environment& environment = parameters.environment();
-    const Union results = enumerate(parameters, className, [&](const CMPIObjectPath* path) {
-        return environment.request.enumerateInstanceNames(path);
-    });
-    for (const CMPIObjectPath* const path : results.paths) {
-        writeInstanceName(writer, environment, path);
-    }
+    const auto write = [&](const CMPIObjectPath* path) { writeInstanceName(writer, environment, path); };
+    enumerate(parameters, parameters.requiredClassName("ClassName"), nullptr, write,
+              [&](const CMPIObjectPath* path) { return environment.request.enumerateInstanceNames(path); });
 }
 
 // Single instances
@@ -183,35 +159,14 @@ void deleteInstance(const Parameters& parameters, XmlWriter& /*writer*/) {
     require(parameters.environment().request.deleteInstance(parameters.instanceName("InstanceName")));
 }
 
-// Single properties, of which the instance's provider is asked
-
-// The declared property; nothing for a class that is not declared. Throws CimError where its class lacks it.
-std::optional<oxahv::PropertyDeclaration> declarationOf(Environment& environment, const CMPIObjectPath* path,
-                                                        const std::string& name) {
-    const auto declared = environment.schema.find(classNameOf(path));
-    if (declared == nullptr) {
-        return std::nullopt;
-    }
-    const oxahv::PropertyDeclaration* const property = declared->find(name);
-    if (property == nullptr) {
-        throw CimError(CMPI_RC_ERR_NO_SUCH_PROPERTY, "class " + declared->name + " has no property " + name);
-    }
-    return *property;
-}
+// Single properties
 
 void getProperty(const Parameters& parameters, XmlWriter& writer) {
     Environment& environment = parameters.environment();
     const CMPIObjectPath* const path = parameters.instanceName("InstanceName");
-    const std::string name = parameters.requiredText("PropertyName");
-    const bool isDeclared = declarationOf(environment, path, name).has_value();
-    const std::vector<std::string> names = {name};
-    const Reply reply = environment.request.getInstance(path, &names);
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    const CMPIData data = CMGetProperty(onlyInstance(reply), name.c_str(), &status);
-    // A declared property that the provider left out is a NULL.
-    if (!isDeclared || status.rc != CMPI_RC_ERR_NO_SUCH_PROPERTY) {
-        require(status, "property " + name);
-        writeValue(writer, environment, data);
+    const Reply reply = environment.request.getProperty(path, parameters.requiredText("PropertyName"));
+    if (!require(reply).data.empty()) {
+        writeValue(writer, environment, reply.data.front());
     }
 }
 
@@ -219,39 +174,42 @@ void setProperty(const Parameters& parameters, XmlWriter& /*writer*/) {
     Environment& environment = parameters.environment();
     const CMPIObjectPath* const path = parameters.instanceName("InstanceName");
     const std::string name = parameters.requiredText("PropertyName");
-    const auto declaration = declarationOf(environment, path, name);
+    const auto declared = environment.schema.find(classNameOf(path));
+    const oxahv::PropertyDeclaration* const property = declared != nullptr ? declared->find(name) : nullptr;
+    const CMPIType type = property != nullptr ? valueTypeOf(property->type, property->qualifiers)
+                                              : static_cast<CMPIType>(CMPI_null);
     const Element* const value = parameters.find("NewValue");
-    CMPIData data = {CMPI_string, CMPI_nullValue, {}};
+    CMPIData data = {type, CMPI_nullValue, {}};
     if (value != nullptr) {
-        const CMPIType type = declaration ? valueTypeOf(declaration->type, declaration->qualifiers)
-                                          : static_cast<CMPIType>(CMPI_null);
         data = readValue(environment, *value, type, "property " + name);
     }
-    CMPIInstance* const instance =
-        checked("property " + name, CMNewInstance, environment.broker.handle(), path);
-    require(CMSetProperty(instance, name.c_str(), CMIsNullValue(data) ? nullptr : &data.value, data.type),
-            "property " + name);
-    const std::vector<std::string> names = {name};
-    require(environment.request.modifyInstance(path, instance, &names));
+    require(environment.request.setProperty(path, name, data));
 }
 
 // Several instances
 
-void writeObjects(const Parameters& parameters, XmlWriter& writer, const Reply& reply, const Shown& shown) {
+// `ask` sends the request.
+template <class Ask>
+void writeObjects(const Parameters& parameters, XmlWriter& writer, const Shown& shown, const Ask& ask) {
     Environment& environment = parameters.environment();
-    for (const CMPIInstance* const instance : require(reply).instances) {
+    const auto write = [&](const CMPIInstance* instance) {
         writer.element("VALUE.OBJECTWITHPATH", {}, [&] {
             writeInstancePath(writer, environment, pathOf(instance));
             writeInstance(writer, environment, instance, shown);
         });
-    }
+    };
+    const Results results(environment, false, write, nullptr);
+    results.require(ask(environment.request));
 }
 
-void writePaths(const Parameters& parameters, XmlWriter& writer, const Reply& reply) {
+template <class Ask>
+void writePaths(const Parameters& parameters, XmlWriter& writer, const Ask& ask) {
     Environment& environment = parameters.environment();
-    for (const CMPIObjectPath* const path : require(reply).objectPaths) {
+    const auto write = [&](const CMPIObjectPath* path) {
         writer.element("OBJECTPATH", {}, [&] { writeInstancePath(writer, environment, path); });
-    }
+    };
+    const Results results(environment, false, nullptr, write);
+    results.require(ask(environment.request));
 }
 
 // The instance at one end of associations.
@@ -269,27 +227,33 @@ oxahv::AssociationFilter filterOf(const Parameters& parameters) {
 
 void associators(const Parameters& parameters, XmlWriter& writer) {
     const Selection selection(parameters);
-    const Reply reply = parameters.environment().request.associators(objectName(parameters),
-                                                                     filterOf(parameters), selection.list());
-    writeObjects(parameters, writer, reply, selection.shown);
+    const CMPIObjectPath* const path = objectName(parameters);
+    const oxahv::AssociationFilter filter = filterOf(parameters);
+    writeObjects(parameters, writer, selection.shown, [&](oxahv::Request& request) {
+        return request.associators(path, filter, selection.list());
+    });
 }
 
 void associatorNames(const Parameters& parameters, XmlWriter& writer) {
-    writePaths(
-        parameters, writer,
-        parameters.environment().request.associatorNames(objectName(parameters), filterOf(parameters)));
+    const CMPIObjectPath* const path = objectName(parameters);
+    const oxahv::AssociationFilter filter = filterOf(parameters);
+    writePaths(parameters, writer,
+               [&](oxahv::Request& request) { return request.associatorNames(path, filter); });
 }
 
 void references(const Parameters& parameters, XmlWriter& writer) {
     const Selection selection(parameters);
-    const Reply reply = parameters.environment().request.references(objectName(parameters),
-                                                                    filterOf(parameters), selection.list());
-    writeObjects(parameters, writer, reply, selection.shown);
+    const CMPIObjectPath* const path = objectName(parameters);
+    const oxahv::AssociationFilter filter = filterOf(parameters);
+    writeObjects(parameters, writer, selection.shown,
+                 [&](oxahv::Request& request) { return request.references(path, filter, selection.list()); });
 }
 
 void referenceNames(const Parameters& parameters, XmlWriter& writer) {
+    const CMPIObjectPath* const path = objectName(parameters);
+    const oxahv::AssociationFilter filter = filterOf(parameters);
     writePaths(parameters, writer,
-               parameters.environment().request.referenceNames(objectName(parameters), filterOf(parameters)));
+               [&](oxahv::Request& request) { return request.referenceNames(path, filter); });
 }
 
 // The class that a query is about, which decides who is asked: the word after FROM.
@@ -298,11 +262,11 @@ std::string classInQuery(const std::string& query) {
     std::string before;
     for (std::size_t begin = query.find_first_not_of(space); begin != std::string::npos;) {
         const std::size_t end = std::min(query.find_first_of(space, begin), query.size());
-        const std::string word = query.substr(begin, end - begin);
+        std::string word = query.substr(begin, end - begin);
         if (sameName(before, "from")) {
             return word;
         }
-        before = word;
+        before = std::move(word);
         begin = query.find_first_not_of(space, end);
     }
     throw CimError(CMPI_RC_ERR_INVALID_QUERY, "the query names no class: there is no FROM in it");
@@ -311,9 +275,9 @@ std::string classInQuery(const std::string& query) {
 void execQuery(const Parameters& parameters, XmlWriter& writer) {
     const std::string language = parameters.requiredText("QueryLanguage");
     const std::string query = parameters.requiredText("Query");
-    const Reply reply = parameters.environment().request.execQuery(classPath(parameters, classInQuery(query)),
-                                                                   query, language);
-    writeObjects(parameters, writer, reply, {});
+    const CMPIObjectPath* const path = classPath(parameters, classInQuery(query));
+    writeObjects(parameters, writer, {},
+                 [&](oxahv::Request& request) { return request.execQuery(path, query, language); });
 }
 
 // Classes and qualifiers

@@ -13,7 +13,7 @@ void performOperation(Environment& environment, const Call& call, XmlWriter& wri
 // Calls a method and writes the content of its METHODRESPONSE. Throws CimError.
 void performMethod(Environment& environment, const Call& call, XmlWriter& writer);
 
-// Throws CimError for a reply that is none of success.
+// Throws CimError with the reply's code and message, unless the code is CMPI_RC_OK.
 const oxahv::Reply& require(const oxahv::Reply& reply);
 
 } // namespace cimxml

@@ -72,20 +72,16 @@ std::shared_ptr<const DeclaredClass> Schema::find(const std::string& className) 
     return declared;
 }
 
-std::vector<std::string> Schema::subclassesOf(const std::string& className, bool all) const {
+std::vector<std::string> Schema::subclassesOf(const std::string& ancestor, bool all) const {
     std::vector<std::string> names;
-    for (const std::string& name : broker_.declaredClasses()) {
+    for (const std::string& candidate : broker_.declaredClasses()) {
         const bool derives =
-            all && !sameName(name, className) && (className.empty() || broker_.isA(name, className));
-        if (derives || (!all && sameName(broker_.superclassOf(name), className))) {
-            names.push_back(name);
+            all && !sameName(candidate, ancestor) && (ancestor.empty() || broker_.isA(candidate, ancestor));
+        if (derives || (!all && sameName(broker_.superclassOf(candidate), ancestor))) {
+            names.push_back(candidate);
         }
     }
     return names;
-}
-
-bool Schema::isA(const std::string& className, const std::string& ancestor) const {
-    return broker_.isA(className, ancestor);
 }
 
 } // namespace cimxml

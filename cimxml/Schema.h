@@ -34,8 +34,7 @@ public:
     std::shared_ptr<const DeclaredClass> find(const std::string& className);
     // The names of the declared classes that derive from one, at first hand only or all; of those without a
     // superclass for an empty name.
-    std::vector<std::string> subclassesOf(const std::string& className, bool all) const;
-    bool isA(const std::string& className, const std::string& ancestor) const;
+    std::vector<std::string> subclassesOf(const std::string& ancestor, bool all) const;
 
 private:
     const oxahv::EmbeddedBroker& broker_;

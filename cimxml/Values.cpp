@@ -178,7 +178,18 @@ std::string characterText(CMPIChar16 code) {
     return text;
 }
 
+// A broken provider or broker may hand out a value that is not NULL by its state, with a null handle.
+void requireHandle(const CMPIData& data) {
+    const bool hasHandle = (data.type & CMPI_ARRAY) != 0 || data.type == CMPI_string ||
+                           data.type == CMPI_chars || data.type == CMPI_dateTime || data.type == CMPI_ref ||
+                           data.type == CMPI_instance;
+    if (hasHandle && data.value.string == nullptr) { // all handles lie at the same place
+        throw CimError(CMPI_RC_ERR_FAILED, "the broker returned no " + typeNameOf(data.type));
+    }
+}
+
 void writeElement(XmlWriter& writer, Environment& environment, const CMPIData& data) {
+    requireHandle(data);
     if (data.type == CMPI_ref) {
         writer.element("VALUE.REFERENCE", {}, [&] { writeReference(writer, environment, data.value.ref); });
     } else if (data.type == CMPI_instance) {
@@ -319,6 +330,7 @@ void writeValue(XmlWriter& writer, Environment& environment, const CMPIData& dat
         writeElement(writer, environment, data);
         return;
     }
+    requireHandle(data);
     const bool isReference = elementType(data.type) == CMPI_ref;
     writer.element(isReference ? "VALUE.REFARRAY" : "VALUE.ARRAY", {}, [&] {
         const CMPICount count = checked("array", CMGetArrayCount, data.value.array);
@@ -355,6 +367,7 @@ void writeDeclaredValue(XmlWriter& writer, const oxahv::DeclaredValue& value) {
 }
 
 std::string plainText(const CMPIData& data) {
+    requireHandle(data);
     switch (data.type) {
     case CMPI_char16:
         return characterText(data.value.char16);
@@ -365,7 +378,7 @@ std::string plainText(const CMPIData& data) {
     case CMPI_string:
         return textOf(data.value.string);
     case CMPI_chars:
-        return data.value.chars != nullptr ? data.value.chars : "";
+        return data.value.chars;
     case CMPI_dateTime:
         return textOf(checked("date", CMGetStringFormat, data.value.dateTime));
     default:

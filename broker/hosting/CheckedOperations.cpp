@@ -122,6 +122,9 @@ Reply Hosting::modifyProperty(const CMPIContext* context, const CMPIObjectPath* 
                               const CMPIData& data) {
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     CMPIInstance* const instance = CMNewInstance(&core_.record, path, &status);
+    if (status.rc == CMPI_RC_OK && instance == nullptr) { // a fault that a test has asked for
+        return refused(CMPI_RC_ERR_FAILED);
+    }
     if (status.rc == CMPI_RC_OK) {
         const bool isNull = (data.state & CMPI_nullValue) != 0;
         status = CMSetProperty(instance, name, isNull ? nullptr : &data.value, data.type);

@@ -46,7 +46,7 @@ MHD_Result takeHeader(void* request, MHD_ValueKind /*kind*/, const char* name, c
     return MHD_YES;
 }
 
-// The announced length of the body; 0 where there is none or it is no number.
+// The announced length of the body; 0 where none is announced, or no number.
 unsigned long long announcedLength(const HttpRequest& request) {
     const std::string* const text = request.find("Content-Length");
     unsigned long long length = 0;

@@ -28,7 +28,7 @@ constexpr const char* serveFooter =
 ends it at once. The first line of the standard output is the address that it listens on. On a terminal
 the standard error stream gets a line for each request. Only this machine's own addresses are served,
 since nobody is asked for a password. What clients may send is bounded: 4 MiB a body, 32 KiB a header,
-30 seconds for both, 512 connections, 8 requests at once.
+512 connections; of the requests 8 are answered at a time.
 
   oxahv-provider --library ./libDemoPort.so --mof Demo.mof serve
   wbemcli ein http://localhost:5988/root/cimv2:Demo_Port)";
@@ -63,11 +63,16 @@ cimxml::HttpResponse answer(const cimxml::Front& front, const cimxml::HttpReques
     return response;
 }
 
-int serve(const Options& options, const std::string& listen) {
+struct ServeOptions {
+    std::string listen = "127.0.0.1:5988";
+    unsigned int timeoutSeconds = HttpLimits().seconds;
+};
+
+int serve(const Options& options, const ServeOptions& serveOptions) {
     if (!options.faults.empty()) {
         throw BrokerError("--fault is for single requests; serve takes none");
     }
-    const Address address = addressFrom(listen);
+    const Address address = addressFrom(serveOptions.listen);
     const EndingSignals signals;
     RequestLines lines;
     EmbeddedBroker broker; // its end calls the providers' cleanup, when no request is left
@@ -76,8 +81,10 @@ int serve(const Options& options, const std::string& listen) {
     loadProviders(broker, options);
     apply(broker, options.conduct);
     const cimxml::Front front(broker, options.nameSpace);
+    HttpLimits limits;
+    limits.seconds = serveOptions.timeoutSeconds;
     HttpServer server(
-        address, {}, [&](const cimxml::HttpRequest& request) { return answer(front, request, lines); },
+        address, limits, [&](const cimxml::HttpRequest& request) { return answer(front, request, lines); },
         [&](const std::string& line) { lines.write(line); });
     std::cout << server.address().text() << std::endl;
     while (!signals.wait(std::chrono::seconds(1))) {
@@ -89,12 +96,16 @@ int serve(const Options& options, const std::string& listen) {
 } // namespace
 
 std::function<int(const Options&)> declareServe(CLI::App& command) {
-    const auto listen = std::make_shared<std::string>("127.0.0.1:5988"); // lives as long as the action
-    command.add_option("--listen", *listen, "where to listen; port 0 is any free one")
+    const auto serveOptions = std::make_shared<ServeOptions>(); // lives as long as the action
+    command.add_option("--listen", serveOptions->listen, "where to listen; port 0 is any free one")
         ->type_name("ADDRESS:PORT")
         ->capture_default_str();
+    command.add_option("--timeout", serveOptions->timeoutSeconds, "how long a request may take to come in")
+        ->check(CLI::Range(1U, 3600U).description(""))
+        ->type_name("SECONDS")
+        ->capture_default_str();
     command.footer(serveFooter);
-    return [listen](const Options& options) { return serve(options, *listen); };
+    return [serveOptions](const Options& options) { return serve(options, *serveOptions); };
 }
 
 } // namespace oxahv::runner
