@@ -5,8 +5,10 @@
 #pragma once
 
 #include "AssociationProvider.h"
+#include "IndicationProvider.h"
 #include "InstanceProvider.h"
 #include "MethodProvider.h"
+#include "PropertyProvider.h"
 #include "detail/Tables.h"
 
 #include <TKExport.h>
@@ -33,8 +35,9 @@
         OxahvClass_##name, ::std::is_convertible_v<OxahvClass_##name*, ::oxahv::Kind##Provider*>>::get()
 
 /**
- * Defines the factory functions of a provider, `NAME_Create_InstanceMI`, `NAME_Create_AssociationMI` and
- * `NAME_Create_MethodMI`: those of the kinds that the class derives from. At namespace scope, once in a
+ * Defines the factory functions of a provider, `NAME_Create_InstanceMI`,
+ * `NAME_Create_AssociationMI`, `NAME_Create_MethodMI`, `NAME_Create_PropertyMI` and
+ * `NAME_Create_IndicationMI`: those of the kinds that the class derives from. At namespace scope, once in a
  * library for each name, and followed by a semicolon.
  *
  * The server's first call of a factory makes an object of the class, for each broker one that all kinds
@@ -42,13 +45,15 @@
  * nothing; what it throws becomes the factory's status. It must not send requests to the server.
  *
  * @param name the provider's name (the MI name), an identifier.
- * @param Class a class that derives from InstanceProvider, AssociationProvider or MethodProvider, or from
- * several of them. Where it has a member `static constexpr const char* traceCategory`, that is the category
- * of its traces; else the provider's name is.
+ * @param Class a class that derives from InstanceProvider, AssociationProvider, MethodProvider,
+ * PropertyProvider or IndicationProvider, or from several of them. Where it has a member `static constexpr
+ * const char* traceCategory`, that is the category of its traces; else the provider's name is.
  */
 #define OXAHV_PROVIDER(name, Class)                           \
     using OxahvClass_##name = Class;                          \
     static ::oxahv::detail::Module oxahvModule_##name{#name}; \
     OXAHV_FACTORY_(name, Instance, instanceMI);               \
     OXAHV_FACTORY_(name, Association, associationMI);         \
-    OXAHV_FACTORY_(name, Method, methodMI)
+    OXAHV_FACTORY_(name, Method, methodMI);                   \
+    OXAHV_FACTORY_(name, Property, propertyMI);               \
+    OXAHV_FACTORY_(name, Indication, indicationMI)

@@ -38,8 +38,9 @@ namespace oxahv {
  * - The result is the method's return value; its C++ type has to be that of the CIM type that the method
  *   declares. `void` returns none.
  *
- * A method that is not registered answers `CMPI_RC_ERR_METHOD_NOT_FOUND`. Threads, failure and locale are as
- * of InstanceProvider.
+ * A method that is not registered answers `CMPI_RC_ERR_METHOD_NOT_FOUND`, an argument that the method does
+ * not have `CMPI_RC_ERR_INVALID_PARAMETER` with its name. Threads, failure and locale are as of
+ * InstanceProvider.
  */
 class MethodProvider {
 public:
@@ -83,6 +84,7 @@ private:
 inline void MethodProvider::invoke(const detail::MethodCall& call) {
     for (const std::unique_ptr<detail::Method>& method : methods_) {
         if (method->isFor(call)) {
+            method->refuseUnknown(call);
             return method->call(*this, call);
         }
     }

@@ -25,10 +25,10 @@ public:
         if (probe.construct) {
             probe.construct(context);
         }
-        ++probe.objects;
         method("Kit_Item.Add", &ProbeProvider::add, {"Left", "Right", "Sum"});
         method("Describe", &ProbeProvider::describe, {"Values", "When", "Peer", "Text", "Other"});
         method("Reset", &ProbeProvider::reset);
+        ++probe.objects;
     }
     ~ProbeProvider() override { --probe.objects; }
     ProbeProvider(const ProbeProvider&) = delete;
@@ -40,6 +40,17 @@ public:
     }
     oxahv::Path create(const oxahv::Operation& operation, const oxahv::Instance& wanted) override {
         return probe.create ? probe.create(operation, wanted) : InstanceProvider::create(operation, wanted);
+    }
+    void modify(const oxahv::Operation& operation, const oxahv::Instance& wanted) override {
+        return probe.modify ? probe.modify(operation, wanted) : InstanceProvider::modify(operation, wanted);
+    }
+    void remove(const oxahv::Operation& operation) override {
+        return probe.remove ? probe.remove(operation) : InstanceProvider::remove(operation);
+    }
+    void query(const oxahv::Operation& operation, const char* query, const char* language,
+               oxahv::Instances& reply) override {
+        return probe.query ? probe.query(operation, query, language, reply)
+                           : InstanceProvider::query(operation, query, language, reply);
     }
     void associations(const oxahv::Operation& operation, oxahv::Instances& reply) override {
         return probe.associations ? probe.associations(operation, reply)
@@ -108,10 +119,9 @@ KitTest::KitTest() {
 }
 
 KitTest::~KitTest() {
-    probe.construct = nullptr;
-    probe.enumerate = nullptr;
-    probe.associations = nullptr;
-    probe.create = nullptr;
+    const unsigned int objects = probe.objects;
+    probe = {};
+    probe.objects = objects;
 }
 
 oxahv::Reply KitTest::enumerate(

@@ -15,6 +15,11 @@ struct Probe {
     std::function<void(const oxahv::Operation& operation, oxahv::Instances& reply)> enumerate;
     std::function<void(const oxahv::Operation& operation, oxahv::Instances& reply)> associations;
     std::function<oxahv::Path(const oxahv::Operation& operation, const oxahv::Instance& wanted)> create;
+    std::function<void(const oxahv::Operation& operation, const oxahv::Instance& wanted)> modify;
+    std::function<void(const oxahv::Operation& operation)> remove;
+    std::function<void(const oxahv::Operation& operation, const char* query, const char* language,
+                       oxahv::Instances& reply)>
+        query;
     unsigned int objects = 0; // of the provider, alive
 };
 extern Probe probe;

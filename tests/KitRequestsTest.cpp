@@ -108,7 +108,7 @@ protected:
     }
 };
 
-TEST_F(KitRequests, OfInstancesFollowFromAllOfThem) {
+TEST_F(KitRequests, InstanceRequestsFollowFromEnumerate) {
     const std::string one = "[Name=\"one\" Number=1 Size=1 Note=\"\u00fc\u20ac\"] ";
     const std::string two = "[Name=\"two\" Number=2 Size=2] ";
     const std::string both = std::string(onePath) + ' ' + twoPath + ' ';
@@ -136,7 +136,7 @@ TEST_F(KitRequests, OfInstancesFollowFromAllOfThem) {
     EXPECT_EQ(textOf(enumerate({})), "CMPI_RC_ERR_NOT_SUPPORTED this provider lists no instances");
 }
 
-TEST_F(KitRequests, MayNameAnInstanceWithKeysOfAnyType) {
+TEST_F(KitRequests, GetFindsInstancesByKeysOfAnyType) {
     oxahv::EmbeddedBroker lenient;
     lenient.host("KitProbe", probeFactories);
     Request request(lenient);
@@ -165,7 +165,7 @@ TEST_F(KitRequests, MayNameAnInstanceWithKeysOfAnyType) {
     EXPECT_EQ(get(reinterpret_cast<const char*>(&value), CMPI_uint64).code, CMPI_RC_ERR_NOT_FOUND);
 }
 
-TEST_F(KitRequests, MayBeServedByWhatTheProviderOverrides) {
+TEST_F(KitRequests, OverriddenFunctionsServeTheirRequests) {
     const CMPIInstance* const sent = CMNewInstance(broker_.handle(), path(onePath), nullptr);
     probe.create = [](const Operation& operation, const Instance& wanted) {
         EXPECT_EQ(wanted.get<std::optional<int>>("size"), std::nullopt);
@@ -184,7 +184,7 @@ TEST_F(KitRequests, MayBeServedByWhatTheProviderOverrides) {
     EXPECT_EQ(request_.execQuery(path("Kit_Item"), "select", "WQL").code, CMPI_RC_ERR_NOT_SUPPORTED);
 }
 
-TEST_F(KitRequests, OfAssociationsFollowFromAllOfThem) {
+TEST_F(KitRequests, AssociationRequestsFollowFromOneList) {
     const auto names = [&](const char* object, const oxahv::AssociationFilter& filter) {
         return textOf(request_.associatorNames(path(object), filter));
     };
@@ -234,7 +234,7 @@ TEST_F(KitRequests, OfAssociationsFollowFromAllOfThem) {
     EXPECT_EQ(request_.associators(path(onePath)).code, CMPI_RC_ERR_NOT_SUPPORTED);
 }
 
-TEST_F(KitRequests, CallMethodsWithTypedArguments) {
+TEST_F(KitRequests, MethodsTakeTypedArguments) {
     using Bytes = std::uint8_t;
     EXPECT_EQ(call("add", arguments({{"Left", Bytes{2}}, {"Right", std::int16_t{-3}}, {"sum", 10}})),
               "returns 0 Sum=9 ");
@@ -263,6 +263,8 @@ TEST_F(KitRequests, CallMethodsWithTypedArguments) {
         return textOf(request.invokeMethod(object, "Add", in));
     };
     EXPECT_EQ(callThere("Kit_Item", arguments({{"Left", 256U}})), invalid + "Left is out of range");
+    EXPECT_EQ(callThere("Kit_Item", arguments({{"Left", 2U}, {"Middle", 1}})),
+              "CMPI_RC_ERR_INVALID_PARAMETER method Add has no argument Middle");
     EXPECT_EQ(callThere("Kit_Item", arguments({{"Left", "2"}})), invalid + "Left is no integer");
     EXPECT_EQ(callThere("Kit_Value", arguments({{"Left", 2U}})),
               "CMPI_RC_ERR_METHOD_NOT_FOUND class Kit_Value has no method Add");
@@ -271,7 +273,7 @@ TEST_F(KitRequests, CallMethodsWithTypedArguments) {
               invalid + "Values is no array");
 }
 
-TEST_F(KitRequests, FailWithTheCodeAndTextOfWhatFailed) {
+TEST_F(KitRequests, ExceptionsBecomeCodesAndTexts) {
     const auto failing = [&](const std::function<void()>& failure) {
         return textOf(enumerate([&](const Operation& /*operation*/, Instances& /*reply*/) { failure(); }));
     };
@@ -286,7 +288,7 @@ TEST_F(KitRequests, FailWithTheCodeAndTextOfWhatFailed) {
               "CMPI_RC_ERR_ACCESS_DENIED the broker did not end the reply");
 }
 
-TEST_F(KitRequests, ReachAnObjectThatEachBrokerHasOneOf) {
+TEST_F(KitRequests, EachBrokerHasOneProviderObject) {
     EXPECT_EQ(probe.objects, 1U) << "of three kinds";
     {
         oxahv::EmbeddedBroker other;
@@ -315,7 +317,7 @@ TEST_F(KitRequests, ReachAnObjectThatEachBrokerHasOneOf) {
     EXPECT_FALSE(textOf(request_.enumerateInstanceNames(path("Kit_Item"))).empty());
 }
 
-TEST_F(KitRequests, RunInUtf8AndLeaveTheServersLocale) {
+TEST_F(KitRequests, FunctionsRunInUtf8AndRestoreTheLocale) {
     const std::string before = std::setlocale(LC_ALL, nullptr);
     std::setlocale(LC_ALL, "C"); // as most servers run
     const std::string note = "Note=\"\u00fc\u20ac\"";
@@ -343,7 +345,7 @@ TEST_F(KitRequests, RunInUtf8AndLeaveTheServersLocale) {
     std::setlocale(LC_ALL, before.c_str());
 }
 
-TEST_F(KitRequests, AreTraced) {
+TEST_F(KitRequests, EntryExitAndFailureAreTraced) {
     std::string traces;
     HVLog::HVLogger::setSink([&](const HVLog::Message& message) {
         if (message.channel == HVLog::Channel::trace && message.category == "Kit.Probe") {
@@ -365,7 +367,7 @@ TEST_F(KitRequests, AreTraced) {
                       "EXITING: invokeMethod() code=17 text=class Kit_Item has no method Unserved\n");
 }
 
-TEST_F(KitRequests, AnswerWithACodeWhateverFailsBelowThem) {
+TEST_F(KitRequests, AnyFailureBelowBecomesACode) {
     const std::vector<std::string> wanted = {"Note", "Size"};
     const CMPIInstance* const sent = CMNewInstance(broker_.handle(), path(onePath), nullptr);
     const std::chrono::system_clock::time_point when(std::chrono::seconds(1));
@@ -379,11 +381,35 @@ TEST_F(KitRequests, AnswerWithACodeWhateverFailsBelowThem) {
         if (operation.isFor("Kit_Item")) {
             return listItems(operation, reply);
         }
+        const Path peer = item(operation, "two", 2);
         reply.add(operation.instance("Kit_Value", {{"Id", 1}})
+                      .set("boolean", true)
+                      .set("char16", u'x')
+                      .set("sint8", std::optional<int>(-1))
+                      .set("real32", 0.5)
+                      .set("uint8", nullptr)
+                      .set("ref", peer)
+                      .set("refA", std::vector<Path>{peer})
+                      .set("embedded", operation.instance(peer).set("Note", L"\u00fc"))
+                      .set("datetimeA", std::vector<std::chrono::seconds>{std::chrono::seconds(1)})
                       .set("datetime", zonedDate())
                       .set("stringA", std::vector<std::wstring>{L"\u00fc"})
                       .set("uint16A", std::vector<int>{1})
                       .set("string", std::string_view("x")));
+    };
+    probe.modify = [](const Operation& operation, const Instance& instance) {
+        EXPECT_EQ(instance.get<std::optional<std::wstring>>("Note"), std::nullopt);
+        operation.isRelated("Kit_Part", "Kit_Item");
+        operation.fetch(operation.path());
+    };
+    probe.remove = [](const Operation& operation) {
+        operation.context().get<std::optional<std::string>>("CMPIPrincipal");
+        if (operation.key<std::string>("name") != "one" || operation.key<std::optional<int>>("Number") != 1) {
+            throw oxahv::Refusal(CMPI_RC_ERR_NOT_FOUND);
+        }
+    };
+    probe.query = [](const Operation& operation, const char* query, const char* language, Instances& reply) {
+        reply.add(operation.instance(item(operation, query, 3)).set("Note", language));
     };
     using Send = std::function<Reply(Request&, const CMPIObjectPath*)>;
     const struct {
@@ -395,6 +421,9 @@ TEST_F(KitRequests, AnswerWithACodeWhateverFailsBelowThem) {
         {"Kit_Value", [](auto& request, auto* object) { return request.enumerateInstances(object); }},
         {onePath, [&](auto& request, auto* object) { return request.getInstance(object, &wanted); }},
         {"kit_item", [&](auto& request, auto* object) { return request.createInstance(object, sent); }},
+        {onePath, [&](auto& request, auto* object) { return request.modifyInstance(object, sent); }, true},
+        {onePath, [](auto& request, auto* object) { return request.deleteInstance(object); }},
+        {"Kit_Item", [](auto& request, auto* object) { return request.execQuery(object, "three", "WQL"); }},
         {onePath, [&](auto& request, auto* object) { return request.associators(object, {}, &wanted); }},
         {twoPath, [](auto& request, auto* object) { return request.references(object); }},
         {twoPath,
@@ -411,7 +440,9 @@ TEST_F(KitRequests, AnswerWithACodeWhateverFailsBelowThem) {
         ways.push_back(way);
     }
     ways.push_back(wayOfTheLogger());
+    constexpr KeyMode modes[] = {KeyMode::exact, KeyMode::untyped, KeyMode::chars};
     for (const auto& operation : operations) {
+        broker_.setKeyMode(modes[(&operation - operations) % 3]);
         Request caller(broker_);
         const CMPIObjectPath* const target = caller.objectPathFromText(operation.path, "root/cimv2");
         const std::string whole = textOf(operation.send(caller, target));
@@ -446,7 +477,45 @@ TEST_F(KitRequests, AnswerWithACodeWhateverFailsBelowThem) {
     }
 }
 
-TEST_F(KitRequests, AreServedAtOnce) {
+TEST_F(KitRequests, FactoriesAnswerAnyFailureWithACode) {
+    probe.construct = [](const oxahv::Context& context) { context.get<std::string>("KitEntry"); };
+    // Whether there was an n-th occasion to fail in the way with that number.
+    const auto host = [](std::size_t number, unsigned int n) {
+        oxahv::EmbeddedBroker other;
+        other.setContextEntry("KitEntry", "x");
+        std::vector<Way> ways = waysOfTheBroker(other);
+        for (const Way& way : waysOfMemory()) {
+            ways.push_back(way);
+        }
+        const Way& way = ways.at(number);
+        SCOPED_TRACE(way.name + ' ' + std::to_string(n));
+        const unsigned int before = probe.objects;
+        bool isHosted = false;
+        way.begin(n);
+        try {
+            other.host("KitProbe", probeFactories);
+            isHosted = true;
+        } catch (const oxahv::BrokerError&) {
+        } catch (const std::bad_alloc&) { // the broker itself had no room for the provider
+        }
+        const bool isReached = way.end(n);
+        EXPECT_TRUE(isHosted || isReached);
+        if (isHosted) {
+            EXPECT_EQ(probe.objects, before + 1);
+            other.unload("KitProbe");
+        }
+        if (way.thrown != Thrown::badAlloc || !failing::failedIn("oxahvbroker")) {
+            EXPECT_EQ(probe.objects, before);
+        }
+        return isReached;
+    };
+    for (const std::size_t number : {0U, 1U, 2U, 3U, 4U, 5U, 6U}) {
+        for (unsigned int n = 1; host(number, n); ++n) {
+        }
+    }
+}
+
+TEST_F(KitRequests, SeveralThreadsAreServedAtOnce) {
     std::atomic<unsigned int> failures{0};
     std::vector<std::thread> threads(4);
     for (std::thread& thread : threads) {
@@ -468,7 +537,7 @@ TEST_F(KitRequests, AreServedAtOnce) {
     EXPECT_EQ(failures, 0U);
 }
 
-TEST_F(KitRequests, LetTheEndOfAThreadThrough) {
+TEST_F(KitRequests, EndOfAThreadPassesThrough) {
     static locale_t atEnd;
     probe.enumerate = [](const Operation& /*operation*/, Instances& /*reply*/) { ::pthread_exit(&atEnd); };
     pthread_t thread = {};

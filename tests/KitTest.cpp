@@ -115,7 +115,7 @@ protected:
     }
 };
 
-TEST_F(KitValues, OfEveryTypeAreSetAndReadBack) {
+TEST_F(KitValues, EveryTypeIsSetAndReadBack) {
     expect("boolean", true, "TRUE");
     expect("char16", u'\u20ac', "8364");
     expect("uint8", std::uint8_t{255}, "255");
@@ -148,7 +148,7 @@ TEST_F(KitValues, OfEveryTypeAreSetAndReadBack) {
     expect("datetimeA", std::vector<Instant>{instant}, std::string("{\"") + utcText + "\"}");
 }
 
-TEST_F(KitValues, AreTakenFromWhateverTheProviderHas) {
+TEST_F(KitValues, LiteralsAndViewsTakeTheDeclaredType) {
     enum class State : std::uint16_t { enabled = 2 };
     const std::string text = "text";
     expect("uint16", State::enabled, "2");
@@ -168,7 +168,7 @@ TEST_F(KitValues, AreTakenFromWhateverTheProviderHas) {
     expect("real64", 0.5F, "0.5");
 }
 
-TEST_F(KitValues, AreNullWhereThereIsNone) {
+TEST_F(KitValues, EmptyOptionalsAndNullPointersSetNull) {
     const Reply reply = enumerate([](const Operation& operation, Instances& instances) {
         Instance value = operation.instance("Kit_Value", {{"Id", 1U}});
         value.set("uint16", 7).set("uint16", std::optional<std::uint16_t>());
@@ -183,7 +183,7 @@ TEST_F(KitValues, AreNullWhereThereIsNone) {
     }
 }
 
-TEST_F(KitValues, MayBeObjects) {
+TEST_F(KitValues, ReferencesAndInstancesAreSetAndReadBack) {
     const Reply reply = enumerate([](const Operation& operation, Instances& instances) {
         const Path item = operation.path("Kit_Item", {{"Name", "one"}, {"Number", 1}});
         instances.add(operation.instance("Kit_Value", {{"Id", 1}})
@@ -199,7 +199,7 @@ TEST_F(KitValues, MayBeObjects) {
     EXPECT_EQ(value.get<Instance>("embedded").path().key<std::string>("Name"), "one");
 }
 
-TEST_F(KitValues, ThatCimCannotRepresentAreRefused) {
+TEST_F(KitValues, ValuesThatCimLacksAreRefused) {
     const auto failure = [&](const char* property, const oxahv::Value& value) {
         return failureOf(enumerate([&](const Operation& operation, Instances& /*reply*/) {
             operation.instance("Kit_Value", {{"Id", 1}}).set(property, value);
@@ -224,7 +224,7 @@ TEST_F(KitValues, ThatCimCannotRepresentAreRefused) {
               "CMPI_RC_ERR_NO_SUCH_PROPERTY the broker did not set property Misspelt");
 }
 
-TEST_F(KitValues, OfRequestsAreReadInAnyWidthWithinTheirRange) {
+TEST_F(KitValues, NumberKeysOfAnyWidthAreReadWithinTheirRange) {
     const char* const outside = "key Key is out of range";
     const char* const none = "key Key is no integer";
     const struct {
@@ -267,7 +267,7 @@ TEST_F(KitValues, OfRequestsAreReadInAnyWidthWithinTheirRange) {
     }
 }
 
-TEST_F(KitValues, OfPathsAreComparedWhateverTheirType) {
+TEST_F(KitValues, PathsCompareKeysOfEveryType) {
     const auto named = [&](const char* text, char16_t letter) {
         return Path(broker_.handle(), path(text)).addKey("Letter", letter);
     };
@@ -276,7 +276,7 @@ TEST_F(KitValues, OfPathsAreComparedWhateverTheirType) {
     EXPECT_FALSE(named("Kit_Other.Flag=TRUE", u'a').names(named("Kit_Other.Flag=FALSE", u'a')));
 }
 
-TEST_F(KitValues, OfRequestsAreReadByTheirType) {
+TEST_F(KitValues, KeysAreReadByTheirType) {
     const Sent text = sent("\u00fc");
     const Sent number = sent(CMPI_uint8, &CMPIValue::uint8, CMPIUint8{7});
     const Sent real = sent(CMPI_real64, &CMPIValue::real64, 1e300);

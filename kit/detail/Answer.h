@@ -184,6 +184,31 @@ struct Service {
         provider.query(operation, query, language, instances);
     }
     static void invoke(MethodProvider& provider, const MethodCall& call) { provider.invoke(call); }
+    static void getProperty(PropertyProvider& provider, const Operation& operation, const CMPIResult* result,
+                            const char* name) {
+        ValueReply reply(operation, result, name);
+        provider.getProperty(operation, name, reply);
+    }
+    static void setProperty(PropertyProvider& provider, const Operation& operation, const char* name,
+                            const CMPIData& data) {
+        provider.setProperty(operation, name,
+                             SentValue({operation.broker(), "property", name, true, false, data}));
+    }
+
+    // A call that is about no object.
+    template <class Function>
+    static CMPIStatus answerWithoutObject(const Hosted& hosted, const char* name, const Function& function) {
+        try {
+            const Utf8Thread utf8(hosted.locale);
+            FlowTrace trace(hosted.category, name);
+            trace.log(TK::ENTERING, TraceList());
+            function();
+            trace.log(TK::EXITING, TraceList());
+            return {CMPI_RC_OK, nullptr};
+        } catch (...) {
+            return statusOfException(hosted.broker, hosted.category, name);
+        }
+    }
 
 private:
     static void run(const ServerCall& call, const void* closure, Serve serve) {
@@ -193,7 +218,9 @@ private:
         traceEntry(trace, call, operation);
         Names reply(call.result);
         serve(closure, operation, reply);
-        require(CMReturnDone(writable(call.result)), "end the reply");
+        if (call.result != nullptr) { // as there is none for indications
+            require(CMReturnDone(writable(call.result)), "end the reply");
+        }
         trace.log(TK::EXITING, TraceList().add("results", reply.count_));
     }
 

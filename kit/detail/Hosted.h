@@ -2,8 +2,10 @@
 #pragma once
 
 #include "../AssociationProvider.h"
+#include "../IndicationProvider.h"
 #include "../InstanceProvider.h"
 #include "../MethodProvider.h"
+#include "../PropertyProvider.h"
 #include "Utf8Thread.h"
 
 #include <mutex>
@@ -39,13 +41,19 @@ struct Hosted {
     InstanceProvider* instances = nullptr;
     AssociationProvider* associations = nullptr;
     MethodProvider* methods = nullptr;
+    PropertyProvider* properties = nullptr;
+    IndicationProvider* indications = nullptr;
 
     CMPIInstanceMIFT instanceTable{};
     CMPIAssociationMIFT associationTable{};
     CMPIMethodMIFT methodTable{};
+    CMPIPropertyMIFT propertyTable{};
+    CMPIIndicationMIFT indicationTable{};
     CMPIInstanceMI instanceMI{this, &instanceTable};
     CMPIAssociationMI associationMI{this, &associationTable};
     CMPIMethodMI methodMI{this, &methodTable};
+    CMPIPropertyMI propertyMI{this, &propertyTable};
+    CMPIIndicationMI indicationMI{this, &indicationTable};
 };
 
 template <class MI>

@@ -4,12 +4,14 @@
 
 #include "../Operation.h"
 
+#include <algorithm>
 #include <cstddef>
 #include <cstring>
 #include <strings.h>
 #include <tuple>
 #include <type_traits>
 #include <utility>
+#include <vector>
 
 namespace oxahv {
 
@@ -30,12 +32,27 @@ struct MethodCall {
         }
         return argumentOf(operation.broker(), in, argument);
     }
+    // What the client sent, by its place.
+    CMPICount count() const {
+        Status status;
+        const CMPICount count = CMGetArgCount(writable(in), &status);
+        require(status, "count the arguments of", name);
+        return count;
+    }
+    const char* nameAt(CMPICount index) const {
+        Status status;
+        CMPIString* argument = nullptr;
+        CMGetArgAt(writable(in), index, &argument, &status);
+        require(status, "list the arguments of", name);
+        return requiredChars(argument, "tell the name of an argument");
+    }
 };
 
 // A registered method, whatever its signature.
 class Method {
 public:
-    explicit Method(const char* name) : name_(name) {}
+    Method(const char* name, const char* const* parameters, std::size_t count)
+        : name_(name), parameters_(parameters, parameters + count) {}
     virtual ~Method() = default;
     Method(const Method&) = delete;
     Method& operator=(const Method&) = delete;
@@ -51,8 +68,25 @@ public:
                call.operation.isRelated(call.operation.className(), std::string(name_, point).c_str());
     }
 
+    // CIM has a client told about an argument that the method does not have.
+    void refuseUnknown(const MethodCall& call) const {
+        const CMPICount count = call.in != nullptr ? call.count() : 0;
+        for (CMPICount i = 0; i < count; ++i) {
+            const char* const argument = call.nameAt(i);
+            if (std::none_of(parameters_.begin(), parameters_.end(),
+                             [&](const char* parameter) { return sameName(parameter, argument); })) {
+                throw Refusal(CMPI_RC_ERR_INVALID_PARAMETER,
+                              std::string("method ") + call.name + " has no argument " + argument);
+            }
+        }
+    }
+
+protected:
+    const char* const* parameters() const { return parameters_.data(); }
+
 private:
     const char* name_;
+    std::vector<const char*> parameters_;
 };
 
 // An input argument.
@@ -130,11 +164,7 @@ class BoundMethod : public Method {
 
 public:
     BoundMethod(const char* name, Function function, const char* const* parameters)
-        : Method(name), function_(function) {
-        for (std::size_t i = 0; i < Form::named; ++i) {
-            names_[i] = parameters[i];
-        }
-    }
+        : Method(name, parameters, Form::named), function_(function) {}
 
     void call(MethodProvider& provider, const MethodCall& call) const override {
         run(provider, call, std::make_index_sequence<count>());
@@ -145,7 +175,7 @@ private:
     void run(MethodProvider& provider, const MethodCall& call, std::index_sequence<index...> /*all*/) const {
         // In braces: the first argument that is wrong is the one that the client is told about.
         typename Form::Arguments arguments{std::tuple_element_t<index, typename Form::Arguments>(
-            call, names_ + Form::template nameAt<index>)...};
+            call, parameters() + Form::template nameAt<index>)...};
         auto& own = static_cast<typename Form::Class&>(provider);
         if constexpr (std::is_void_v<typename Form::Return>) {
             (own.*function_)(std::get<index>(arguments).pass()...);
@@ -153,11 +183,10 @@ private:
             const typename Form::Return result = (own.*function_)(std::get<index>(arguments).pass()...);
             ValueAccess::giveResult(call.operation.broker(), call.result, call.name, result);
         }
-        (std::get<index>(arguments).handOver(call, names_ + Form::template nameAt<index>), ...);
+        (std::get<index>(arguments).handOver(call, parameters() + Form::template nameAt<index>), ...);
     }
 
     Function function_;
-    const char* names_[Form::named + 1] = {};
 };
 
 } // namespace detail

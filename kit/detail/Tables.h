@@ -161,6 +161,86 @@ inline CMPIStatus invokeMethod(CMPIMethodMI* mi, const CMPIContext* context, con
     });
 }
 
+// Single properties
+
+inline CMPIStatus cleanupProperties(CMPIPropertyMI* mi, const CMPIContext* /*context*/,
+                                    CMPIBoolean /*ends*/) {
+    return release(hostedOf(mi));
+}
+
+inline CMPIStatus setProperty(CMPIPropertyMI* mi, const CMPIContext* context, const CMPIResult* result,
+                              const CMPIObjectPath* path, const char* name, const CMPIData data) {
+    const Hosted& hosted = hostedOf(mi);
+    return Service::answer({hosted, __func__, context, result, path},
+                           [&](const Operation& operation, Names& /*reply*/) {
+                               Service::setProperty(*hosted.properties, operation, name, data);
+                           });
+}
+
+inline CMPIStatus getProperty(CMPIPropertyMI* mi, const CMPIContext* context, const CMPIResult* result,
+                              const CMPIObjectPath* path, const char* name) {
+    const Hosted& hosted = hostedOf(mi);
+    return Service::answer({hosted, __func__, context, result, path},
+                           [&](const Operation& operation, Names& /*reply*/) {
+                               Service::getProperty(*hosted.properties, operation, result, name);
+                           });
+}
+
+// Indications
+
+inline CMPIStatus cleanupIndications(CMPIIndicationMI* mi, const CMPIContext* /*context*/,
+                                     CMPIBoolean /*ends*/) {
+    return release(hostedOf(mi));
+}
+
+inline CMPIStatus authorizeFilter(CMPIIndicationMI* mi, const CMPIContext* context,
+                                  const CMPISelectExp* filter, const char* className,
+                                  const CMPIObjectPath* path, const char* owner) {
+    const Hosted& hosted = hostedOf(mi);
+    return Service::answer(
+        {hosted, __func__, context, nullptr, path}, [&](const Operation& operation, Names& /*reply*/) {
+            hosted.indications->authorize(operation, {filter, className}, owner != nullptr ? owner : "");
+        });
+}
+
+inline CMPIStatus mustPoll(CMPIIndicationMI* /*mi*/, const CMPIContext* /*context*/,
+                           const CMPISelectExp* /*filter*/, const char* /*className*/,
+                           const CMPIObjectPath* /*path*/) {
+    return {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
+}
+
+inline CMPIStatus activateFilter(CMPIIndicationMI* mi, const CMPIContext* context,
+                                 const CMPISelectExp* filter, const char* className,
+                                 const CMPIObjectPath* path, CMPIBoolean isFirst) {
+    const Hosted& hosted = hostedOf(mi);
+    return Service::answer({hosted, __func__, context, nullptr, path},
+                           [&](const Operation& operation, Names& /*reply*/) {
+                               hosted.indications->activate(operation, {filter, className}, isFirst != 0);
+                           });
+}
+
+inline CMPIStatus deactivateFilter(CMPIIndicationMI* mi, const CMPIContext* context,
+                                   const CMPISelectExp* filter, const char* className,
+                                   const CMPIObjectPath* path, CMPIBoolean isLast) {
+    const Hosted& hosted = hostedOf(mi);
+    return Service::answer({hosted, __func__, context, nullptr, path},
+                           [&](const Operation& operation, Names& /*reply*/) {
+                               hosted.indications->deactivate(operation, {filter, className}, isLast != 0);
+                           });
+}
+
+inline CMPIStatus enableIndications(CMPIIndicationMI* mi, const CMPIContext* context) {
+    const Hosted& hosted = hostedOf(mi);
+    return Service::answerWithoutObject(hosted, __func__,
+                                        [&] { hosted.indications->enable(Context(hosted.broker, context)); });
+}
+
+inline CMPIStatus disableIndications(CMPIIndicationMI* mi, const CMPIContext* context) {
+    const Hosted& hosted = hostedOf(mi);
+    return Service::answerWithoutObject(
+        hosted, __func__, [&] { hosted.indications->disable(Context(hosted.broker, context)); });
+}
+
 // The tables are filled by the order of their members, whose names differ between headers. Slots that are
 // newer than CMPI 1.0 come last and stay empty.
 #pragma GCC diagnostic push
@@ -177,6 +257,14 @@ inline CMPIAssociationMIFT associationTable(const char* name) {
 inline CMPIMethodMIFT methodTable(const char* name) {
     return {CMPICurrentVersion, CMPICurrentVersion, name, cleanupMethods, invokeMethod};
 }
+inline CMPIPropertyMIFT propertyTable(const char* name) {
+    return {CMPICurrentVersion, CMPICurrentVersion, name, cleanupProperties, setProperty, getProperty};
+}
+inline CMPIIndicationMIFT indicationTable(const char* name) {
+    return {CMPICurrentVersion, CMPICurrentVersion, name,           cleanupIndications,
+            authorizeFilter,    mustPoll,           activateFilter, deactivateFilter,
+            enableIndications,  disableIndications};
+}
 #pragma GCC diagnostic pop
 
 // Factories
@@ -189,8 +277,10 @@ void construct(Hosted& hosted, const Context& context) {
     static_assert(
         std::is_convertible_v<Provider*, InstanceProvider*> ||
             std::is_convertible_v<Provider*, AssociationProvider*> ||
-            std::is_convertible_v<Provider*, MethodProvider*>,
-        "a provider derives from InstanceProvider, AssociationProvider or MethodProvider, publicly");
+            std::is_convertible_v<Provider*, MethodProvider*> ||
+            std::is_convertible_v<Provider*, PropertyProvider*> ||
+            std::is_convertible_v<Provider*, IndicationProvider*>,
+        "a provider derives publicly from InstanceProvider or another of the kit's provider classes");
     Provider* object = nullptr;
     if constexpr (std::is_constructible_v<Provider, const Context&>) {
         object = new Provider(context);
@@ -212,6 +302,14 @@ void construct(Hosted& hosted, const Context& context) {
     if constexpr (std::is_convertible_v<Provider*, MethodProvider*>) {
         hosted.methods = object;
         hosted.methodTable = methodTable(name);
+    }
+    if constexpr (std::is_convertible_v<Provider*, PropertyProvider*>) {
+        hosted.properties = object;
+        hosted.propertyTable = propertyTable(name);
+    }
+    if constexpr (std::is_convertible_v<Provider*, IndicationProvider*>) {
+        hosted.indications = object;
+        hosted.indicationTable = indicationTable(name);
     }
 }
 
