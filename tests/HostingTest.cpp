@@ -45,9 +45,9 @@ struct Provider {
 using First = Provider<1>;
 using Second = Provider<2>;
 
-class AHostedProvider : public testing::Test {
+class HostedProviderTest : public testing::Test {
 protected:
-    ~AHostedProvider() override { First::end = nullptr; }
+    ~HostedProviderTest() override { First::end = nullptr; }
 
     CMPIObjectPath* path(const char* className) { return request_.objectPath("root", className); }
     // The answers of a reply, in words.
@@ -75,7 +75,7 @@ auto returning(int paths, CMPIrc code) {
 
 } // namespace
 
-TEST_F(AHostedProvider, IsAskedForAssociationsBesideOthers) {
+TEST_F(HostedProviderTest, SharesAssociationsWithOthers) {
     broker_.declare(ClassDeclaration("End"));
     broker_.declare(ClassDeclaration("Other"));
     broker_.declare(ClassDeclaration("Link").association().reference("A", "End").reference("B", "End"));
@@ -112,7 +112,7 @@ TEST_F(AHostedProvider, IsAskedForAssociationsBesideOthers) {
     EXPECT_EQ(answersOf(request_.referenceNames(path("Other"))), "OK: Three=1");
 }
 
-TEST_F(AHostedProvider, LeavesAClassThatItRefusesToTheNext) {
+TEST_F(HostedProviderTest, PassesARefusedClassToTheNext) {
     broker_.host("One", {First::instance}, {"Demo"});
     broker_.host("Two", {Second::instance}, {"Demo"});
     First::serve = returning(0, CMPI_RC_ERR_NOT_SUPPORTED);
@@ -122,7 +122,7 @@ TEST_F(AHostedProvider, LeavesAClassThatItRefusesToTheNext) {
     EXPECT_EQ(answersOf(request_.enumerateInstanceNames(path("Demo"))), "ERR_NOT_FOUND: One=0");
 }
 
-TEST_F(AHostedProvider, ReturnsErrorsWhoseFieldsReachTheReply) {
+TEST_F(HostedProviderTest, ReturnsErrorsWithTheirFields) {
     broker_.host("One", {First::instance});
     const auto answering = [this](const char* text) {
         const CMPIBroker* const b = broker_.handle();
@@ -144,7 +144,7 @@ TEST_F(AHostedProvider, ReturnsErrorsWhoseFieldsReachTheReply) {
     EXPECT_EQ(answering("another").message, "another");
 }
 
-TEST_F(AHostedProvider, SeesTheContextThatTheClientSets) {
+TEST_F(HostedProviderTest, SeesTheContextOfTheClient) {
     broker_.host("One", {First::instance});
     std::string seen;
     First::serve = [&](const CMPIContext* context, const CMPIResult*, const CMPIObjectPath*) {
@@ -160,7 +160,7 @@ TEST_F(AHostedProvider, SeesTheContextThatTheClientSets) {
     EXPECT_EQ(seen, "\"somebody\" 3 \"de\" ");
 }
 
-TEST_F(AHostedProvider, CallsUpAThousandRequestsDeepAndNoDeeper) {
+TEST_F(HostedProviderTest, NestsAtMostAThousandUpcalls) {
     broker_.host("One", {First::instance}, {"Demo"});
     unsigned int calls = 0;
     const CMPIBroker* const b = broker_.handle();
@@ -177,7 +177,7 @@ TEST_F(AHostedProvider, CallsUpAThousandRequestsDeepAndNoDeeper) {
     EXPECT_EQ(innermost.rc, CMPI_RC_ERR_FAILED);
 }
 
-TEST_F(AHostedProvider, WhoseCleanupThrowsEndsAndIsTold) {
+TEST_F(HostedProviderTest, EndsAlthoughItsCleanupThrows) {
     std::string told;
     broker_.setMessageHandler([&](const oxahv::BrokerMessage& message) {
         told = message.component + '|' + message.text + (message.isBrokers ? "|broker" : "");

@@ -93,9 +93,9 @@ using Second = Provider<2>;
 
 constexpr std::chrono::milliseconds atOnce(0);
 
-class ASubscription : public testing::Test {
+class SubscriptionTest : public testing::Test {
 protected:
-    ASubscription() {
+    SubscriptionTest() {
         broker_.declare(ClassDeclaration("Demo_Indication")
                             .property("Source", CMPI_string)
                             .property("SourceInstance", CMPI_string));
@@ -132,7 +132,7 @@ const oxahv::IndicationFilter alerts = {"SELECT * FROM Demo_Alert", "WQL", "root
 
 } // namespace
 
-TEST_F(ASubscription, CallsItsProviderAsAServerDoes) {
+TEST_F(SubscriptionTest, CallsItsProviderLikeAServer) {
     std::optional<Subscription> one(std::in_place, broker_, alerts);
     EXPECT_EQ(First::takeLog(), "authorize(Demo_Alert,root/demo:Demo_Alert,me) poll activate(first) enable ");
     EXPECT_EQ(First::text(CMGetSelExpString(First::filter, nullptr)), alerts.query);
@@ -150,7 +150,7 @@ TEST_F(ASubscription, CallsItsProviderAsAServerDoes) {
     EXPECT_EQ(First::takeLog(), "deactivate(last) disable ");
 }
 
-TEST_F(ASubscription, GetsTheIndicationsThatPassItsFilter) {
+TEST_F(SubscriptionTest, GetsIndicationsThatPassItsFilter) {
     Subscription all(broker_, {"SELECT * FROM Demo_Indication", "WQL", "/root/demo"});
     Subscription high(broker_, {"SELECT Level FROM Demo_Alert WHERE Level > 3", "WQL", "Root/Demo"});
     const std::pair<const char*, int> rows[] = {{"root/demo", 5}, {"root/demo", 2}, {"root/other", 9}};
@@ -174,7 +174,7 @@ TEST_F(ASubscription, GetsTheIndicationsThatPassItsFilter) {
               CMPI_RC_ERR_INVALID_HANDLE);
 }
 
-TEST_F(ASubscription, GetsWhatAThreadOfTheProviderDelivers) {
+TEST_F(SubscriptionTest, GetsIndicationsOfAnAttachedThread) {
     Subscription subscription(broker_, alerts);
     const CMPIBroker* const b = broker_.handle();
     CMPIContext* const prepared = b->bft->prepareAttachThread(b, request_.context());
@@ -192,7 +192,7 @@ TEST_F(ASubscription, GetsWhatAThreadOfTheProviderDelivers) {
     CMRelease(prepared);
 }
 
-TEST_F(ASubscription, SaysWhyThereIsNone) {
+TEST_F(SubscriptionTest, ReportsWhyItFails) {
     const auto codeOf = [&](const char* query, const char* language) {
         try {
             const Subscription subscription(broker_, {query, language});
@@ -217,7 +217,7 @@ TEST_F(ASubscription, SaysWhyThereIsNone) {
     EXPECT_EQ(First::takeLog(), "authorize(Demo_Alert,root/cimv2:Demo_Alert,) poll activate(first) ");
 }
 
-TEST_F(ASubscription, IsOfTheProvidersThatTakeItUntilTheyAreUnloaded) {
+TEST_F(SubscriptionTest, LastsUntilItsProvidersAreUnloaded) {
     broker_.host("Second", Second::factories());
     Second::authorization = CMPI_RC_ERR_NOT_SUPPORTED;
     Subscription one(broker_, alerts);
@@ -236,7 +236,7 @@ TEST_F(ASubscription, IsOfTheProvidersThatTakeItUntilTheyAreUnloaded) {
 }
 
 // A destructor that no thread's end and no exception can leave.
-TEST_F(ASubscription, EndsWhateverItsProviderDoes) {
+TEST_F(SubscriptionTest, EndsWhateverItsProviderDoes) {
     std::string told;
     broker_.setMessageHandler([&](const oxahv::BrokerMessage& message) { told = message.text; });
     {
@@ -256,7 +256,7 @@ TEST_F(ASubscription, EndsWhateverItsProviderDoes) {
 }
 
 // For the thread sanitizer: deliveries while subscriptions come and go.
-TEST_F(ASubscription, MayEndWhileAnotherThreadDelivers) {
+TEST_F(SubscriptionTest, MayEndWhileAnotherThreadDelivers) {
     std::atomic<bool> isOver{false};
     std::thread thread([&] {
         while (!isOver) {

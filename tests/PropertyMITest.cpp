@@ -36,9 +36,9 @@ const CMPIPropertyMIFT reading = {0, 0, "", {}, {}, readProperty, {}};
 const CMPIPropertyMIFT writing = {0, 0, "", {}, writeProperty, readProperty, {}};
 const CMPIInstanceMIFT modifying = {0, 0, "", {}, {}, {}, {}, {}, modify, {}, {}, {}};
 
-class AProperty : public testing::Test {
+class PropertyMITest : public testing::Test {
 protected:
-    AProperty() {
+    PropertyMITest() {
         asked.clear();
         broker_.declare(oxahv::ClassDeclaration("Demo").key("K", CMPI_uint8).property("Speed", CMPI_uint8));
     }
@@ -60,7 +60,7 @@ protected:
 
 } // namespace
 
-TEST_F(AProperty, IsServedByItsMI) {
+TEST_F(PropertyMITest, ServesItsProperties) {
     host(create<writing>);
     EXPECT_EQ(request_.getProperty(path(), "Speed").data.at(0).value.uint8, 7);
     EXPECT_EQ(set("9", CMPI_uint8), CMPI_RC_OK);
@@ -77,7 +77,7 @@ TEST_F(AProperty, IsServedByItsMI) {
     EXPECT_EQ(asked, "get Speed set speed=9 set Speed=3 get Speed ");
 }
 
-TEST_F(AProperty, IsWrittenByItsInstanceWhereTheMIOnlyReads) {
+TEST_F(PropertyMITest, WritesThroughTheInstanceWhereItOnlyReads) {
     host(create<reading>);
     EXPECT_EQ(set("9", CMPI_uint8), CMPI_RC_OK);
     CMPIData none = {};

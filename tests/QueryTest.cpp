@@ -16,7 +16,7 @@ namespace {
 
 enum class Truth { no, unknown, yes };
 
-class AQuery : public testing::Test {
+class QueryTest : public testing::Test {
 protected:
     CMPIInstance* instanceOf(const char* className) {
         return CMNewInstance(handle_, request_.objectPath("root", className), nullptr);
@@ -96,7 +96,7 @@ struct Condition {
 
 } // namespace
 
-TEST_F(AQuery, ComparesValuesOfEveryType) {
+TEST_F(QueryTest, ComparesValuesOfEveryType) {
     const CMPIInstance* const instance = demo();
     for (const auto& [truth, condition] : std::initializer_list<Condition>{
              {"yes", "U8 = 200 AND u8 >= 200 AND 0xC8 = U8 AND 199 < U8 AND U8 <> -56"},
@@ -143,7 +143,7 @@ TEST_F(AQuery, ComparesValuesOfEveryType) {
     EXPECT_EQ(ask("SELECT * FROM Other", "WQL", instance), "0");
 }
 
-TEST_F(AQuery, MatchesThePatternsOfItsLanguage) {
+TEST_F(QueryTest, MatchesThePatternsOfItsLanguage) {
     CMPIInstance* const instance = instanceOf("Demo");
     struct Match {
         const char* language;
@@ -179,7 +179,7 @@ TEST_F(AQuery, MatchesThePatternsOfItsLanguage) {
     }
 }
 
-TEST_F(AQuery, KnowsTheClassByItsOtherNamesInTheCimQueryLanguage) {
+TEST_F(QueryTest, KnowsTheClassByItsAliases) {
     const CMPIInstance* const instance = demo();
     for (const auto& [truth, query] : std::initializer_list<Condition>{
              {"1", "SELECT Demo.* FROM Demo WHERE Demo.U8 = 200"},
@@ -191,7 +191,7 @@ TEST_F(AQuery, KnowsTheClassByItsOtherNamesInTheCimQueryLanguage) {
     }
 }
 
-TEST_F(AQuery, IsRefusedWithThePlaceOfTheFault) {
+TEST_F(QueryTest, ReportsErrorsWithTheirPlaces) {
     const std::string invalid = "ERR_INVALID_QUERY query, column ";
     const std::string unsupported = "ERR_QUERY_FEATURE_NOT_SUPPORTED query, column ";
     struct Refusal {
@@ -343,7 +343,7 @@ private:
 
 } // namespace
 
-TEST_F(AQuery, SaysTheSameInItsNormalForms) {
+TEST_F(QueryTest, NormalFormsAreEquivalent) {
     std::mt19937 random(7); // NOLINT(cert-msc51-cpp): the same conditions in every run
     int accepted = 0;
     for (int i = 0; i < 1000; ++i) {
@@ -372,7 +372,7 @@ TEST_F(AQuery, SaysTheSameInItsNormalForms) {
     EXPECT_TRUE(accepted > 200 && accepted < 800) << accepted;
 }
 
-TEST_F(AQuery, IsTakenApart) {
+TEST_F(QueryTest, HandsOutItsParts) {
     broker_.declare(ClassDeclaration("Demo").property("Number", CMPI_uint8).property("Text", CMPI_string));
     const char* const text =
         "SELECT Number, Text FROM Demo WHERE NOT (Number < 7 OR 'x' = Text AND Text IS NULL)"
@@ -419,7 +419,7 @@ TEST_F(AQuery, IsTakenApart) {
     EXPECT_GT(broker_.liveObjects().total(), live) << "what the request has";
 }
 
-TEST_F(AQuery, WithoutAConditionIsAnEmptyConjunction) {
+TEST_F(QueryTest, WithoutAConditionIsAnEmptyConjunction) {
     CMPIArray* projection = CMNewArray(handle_, 1, CMPI_string, nullptr);
     const CMPISelectExp* const query =
         CMNewSelectExp(handle_, "SELECT * FROM Demo", "WQL", &projection, nullptr);
@@ -429,7 +429,7 @@ TEST_F(AQuery, WithoutAConditionIsAnEmptyConjunction) {
     EXPECT_EQ(CMGetSubCondCountAndType(CMGetCod(query, nullptr), nullptr, nullptr), 0U);
 }
 
-TEST_F(AQuery, DoesNotExplodeInANormalForm) {
+TEST_F(QueryTest, LimitsTheSizeOfNormalForms) {
     std::string text = "SELECT * FROM Demo WHERE a = 0";
     for (int i = 0; i < 400; ++i) {
         text += " AND (a = 1 OR b = 2)";
@@ -442,7 +442,7 @@ TEST_F(AQuery, DoesNotExplodeInANormalForm) {
     EXPECT_EQ(CMGetSubCondCountAndType(CMGetCod(query, &status), nullptr, nullptr), 401U);
 }
 
-TEST_F(AQuery, SurvivesOutOfMemory) {
+TEST_F(QueryTest, SurvivesOutOfMemory) {
     const CMPIInstance* const instance = demo();
     const std::string text =
         "SELECT a FROM Demo WHERE NOT (U8 = 200 OR Text LIKE 'a long pattern%') OR a = 1";
