@@ -49,7 +49,8 @@ private:
         client_.askPlainly(query);
         const std::vector<std::string> left = newDescriptors(second, currentState());
         if (!newDescriptors(warm, second).empty() && !left.empty()) {
-            client_.find(CheckKind::residue, request, verb + " leaves " + left.front() + " open each time");
+            client_.find(CheckKind::residue, request,
+                         (verb + " leaves ").append(left.front()).append(" open each time"));
         }
         last_ = currentState();
         findLeak(query);
@@ -66,9 +67,11 @@ private:
         growth(query, many);
         const std::size_t bytes = growth(query, many);
         if (bytes >= many * least) {
-            client_.find(CheckKind::residue, textOf(query),
-                         query.operation->name +
-                             (" leaves " + std::to_string(bytes / many) + " bytes of the heap each time"));
+            std::string text = query.operation->name;
+            text.append(" leaves ")
+                .append(std::to_string(bytes / many))
+                .append(" bytes of the heap each time");
+            client_.find(CheckKind::residue, textOf(query), text);
         }
     }
 
