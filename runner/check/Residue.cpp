@@ -5,6 +5,7 @@
 #include "check/Strain.h"
 #include "show/Text.h"
 
+#include <algorithm>
 #include <chrono>
 #include <dlfcn.h>
 #include <thread>
@@ -65,7 +66,10 @@ private:
             return;
         }
         growth(query, many);
-        const std::size_t bytes = growth(query, many);
+        std::size_t bytes = growth(query, many);
+        for (int i = 0; i < 3 && bytes >= many * least; ++i) { // a table that grows at last is none
+            bytes = std::min(bytes, growth(query, many));
+        }
         if (bytes >= many * least) {
             std::string text = query.operation->name;
             text.append(" leaves ")
