@@ -41,6 +41,7 @@ configure_package_config_file(
     ${PROJECT_SOURCE_DIR}/cmake/oxahvproviderutilities-config.cmake.in
     ${PROJECT_BINARY_DIR}/oxahvproviderutilities-config.cmake
     INSTALL_DESTINATION ${oxahv_package_dir}
+    PATH_VARS CMAKE_INSTALL_BINDIR
     NO_SET_AND_CHECK_MACRO)
 write_basic_package_version_file(
     ${PROJECT_BINARY_DIR}/oxahvproviderutilities-config-version.cmake COMPATIBILITY SameMajorVersion)

@@ -37,3 +37,31 @@ function(oxahv_add_provider name)
             INSTALL_RPATH "$ORIGIN/..;${folder}")
     endif()
 endfunction()
+
+# oxahv_add_provider_check(TARGET MOF FILE… [CLASSES CLASS…] [ARGUMENTS ARGUMENT…]) adds the test TARGET.check: oxahv-provider
+# checks the library TARGET, whose MI name is the target's, with the classes of the MOF files or some of them. The arguments are
+# further ones of `check`, such as --strict.
+function(oxahv_add_provider_check target)
+    cmake_parse_arguments(PARSE_ARGV 1 check "" "" "MOF;CLASSES;ARGUMENTS")
+    if(NOT check_MOF)
+        message(FATAL_ERROR "oxahv_add_provider_check(${target}) needs MOF and the files that declare the provider's classes")
+    endif()
+    if(TARGET oxahvrunner)
+        set(command $<TARGET_FILE:oxahvrunner>)
+    else()
+        find_program(OXAHV_PROVIDER_COMMAND oxahv-provider HINTS ${OXAHV_PROVIDER_COMMAND_FOLDER} REQUIRED
+            DOC "Checks providers")
+        set(command ${OXAHV_PROVIDER_COMMAND})
+    endif()
+    set(arguments "")
+    foreach(file IN LISTS check_MOF)
+        cmake_path(ABSOLUTE_PATH file BASE_DIRECTORY ${CMAKE_CURRENT_SOURCE_DIR})
+        list(APPEND arguments --mof ${file})
+    endforeach()
+    list(APPEND arguments check)
+    foreach(class IN LISTS check_CLASSES)
+        list(APPEND arguments --class ${class})
+    endforeach()
+    add_test(NAME ${target}.check
+        COMMAND ${command} --library $<TARGET_FILE:${target}> --provider ${target} ${arguments} ${check_ARGUMENTS})
+endfunction()

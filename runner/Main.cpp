@@ -7,6 +7,7 @@
 
 #include <CLI/CLI.hpp>
 
+#include <algorithm>
 #include <iostream>
 #include <stdexcept>
 #include <string>
@@ -26,6 +27,14 @@ that cannot be used.
   oxahv-provider --library ./libDemoPort.so --output json ei Demo_Port
   oxahv-provider --library ./libDemoPort.so --mof Demo.mof cm Demo_Port.Number=3 SetSpeed Speed=1000
   oxahv-provider --library ./libDemoPort.so --mof Demo.mof check)";
+
+// The parser takes a verb that it does not know for one word too many.
+std::string complaintOf(const CLI::App& app, const CLI::ParseError& error) {
+    const std::vector<std::string> words = app.remaining();
+    const auto word = std::find_if(words.begin(), words.end(),
+                                   [](const std::string& candidate) { return candidate.rfind('-', 0) != 0; });
+    return app.get_subcommands().empty() && word != words.end() ? "there is no verb " + *word : error.what();
+}
 
 bool hasLibrary(const Options& options) {
     return !options.libraries.empty() && !options.libraries.back().file.empty();
@@ -58,7 +67,7 @@ int parseAndRun(int argc, char** argv) {
     } catch (const CLI::Success& help) { // or the version
         return app.exit(help);
     } catch (const CLI::ParseError& error) {
-        throw std::runtime_error(std::string(error.what()) + usage);
+        throw std::runtime_error(complaintOf(app, error) + usage);
     }
     reader.finish();
     for (std::size_t i = 0; i < actions.size(); ++i) {

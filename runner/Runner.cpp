@@ -1,8 +1,11 @@
 #include "Runner.h"
 
+#include "RequestText.h"
+#include "UnknownNames.h"
 #include "check/CrashLine.h"
 #include "show/ProgressLine.h"
 #include "show/Text.h"
+#include "show/Values.h"
 
 #include <HVLogger.h>
 
@@ -145,6 +148,12 @@ void prepare(EmbeddedBroker& broker, const Options& options) {
 
 // A name without a folder would be looked for among the system's libraries.
 static void load(EmbeddedBroker& broker, const Library& library) {
+    std::error_code problem;
+    if (std::filesystem::exists(library.file, problem) &&
+        !std::filesystem::is_regular_file(library.file, problem)) {
+        throw BrokerError("cannot load provider library: " + library.file +
+                          ": it is no regular file"); // opening a pipe would wait for its writer
+    }
     const std::string name = providerName(library);
     try {
         broker.load(std::filesystem::absolute(library.file), name, library.classes);
@@ -170,7 +179,7 @@ int run(const Options& options, const Operation& operation, const Operands& oper
     }
     EmbeddedBroker broker;
     prepare(broker, options);
-    tellCrashesInOneLine(broker);
+    tellCrashesInOneLine(broker, requestText(operation, operands));
     loadProviders(broker, options);
     apply(broker, options.conduct);
     for (const std::string& fault : options.faults) {
@@ -178,6 +187,10 @@ int run(const Options& options, const Operation& operation, const Operands& oper
     }
     Request request(broker);
     const CMPIObjectPath* const target = targetOf(request, options, operation, operands);
+    for (const std::string& sentence :
+         unknownNames(broker, textOf(CMGetClassName(target, nullptr)), operands)) {
+        std::cerr << "oxahv-provider: " << printable(sentence) << '\n';
+    }
     ResultPrinter printer(std::cout, options.format);
     Reply reply = performed(broker, request, target, operation, operands, printer);
     broker.clearFaults(); // they are the request's; what is printed is asked of the broker too

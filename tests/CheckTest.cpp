@@ -296,9 +296,11 @@ TEST_F(TheCheck, SaysWhichLibraryAnUpcallLacks) {
     const std::string mofOption = "--mof " + mof.path() + ' ';
     const std::string get = "gi 'Faulty_CallsUp.Name=\"a\"'";
     const std::string other = "--library " TEST_PROVIDER " --serves Other_Thing ";
-    EXPECT_EQ(shell(RUNNER " " + library_ + mofOption + get + " 2>&1 | cat").output,
-              "oxahv-provider: the provider crashed: aborted after it asked for class Other_Thing, which no "
-              "loaded library serves; load that one too, with a further --library\n");
+    EXPECT_EQ(
+        shell(RUNNER " " + library_ + mofOption + get + " 2>&1 | cat").output,
+        "oxahv-provider: the provider crashed: signal 6 (aborted) in gi 'Faulty_CallsUp.Name=\"a\"' after "
+        "it asked for class Other_Thing, which no loaded library serves; load that one too, with a "
+        "further --library\n");
     EXPECT_EQ(run(library_ + other + mofOption + get).status, 0);
     EXPECT_EQ(run("--provider FaultyProvider " + other + library_ + mofOption + get).status, 2)
         << "a provider's name is of the library before it";

@@ -216,12 +216,12 @@ TEST(MofTest, ReportsErrorsInIncludedFiles) {
     const ThreadLocale english("C"); // the system's words for its errors
     EmbeddedBroker broker;
     const std::pair<const char*, std::string> rows[] = {
-        {"None.mof", "None.mof:1:1: cannot read " + folder + "/None.mof: No such file or directory"},
-        {"sub", "sub:1:1: cannot read " + folder + "/sub: it is no regular file"},
-        {"Circle.mof", "sub/Circle.mof:2:20: " + folder + "/sub/../Circle.mof includes itself"},
+        {"None.mof", "cannot read " + folder + "/None.mof: No such file or directory"},
+        {"sub", "cannot read " + folder + "/sub: it is no regular file"},
+        {"Circle.mof", folder + "/sub/Circle.mof:2:20: " + folder + "/sub/../Circle.mof includes itself"},
     };
     for (const auto& row : rows) {
-        EXPECT_EQ(errorOf([&] { broker.compileMof(folder + '/' + row.first); }), folder + '/' + row.second);
+        EXPECT_EQ(errorOf([&] { broker.compileMof(folder + '/' + row.first); }), row.second);
     }
     const std::string text = "class A {};\n#pragma include (\"sub/\" \"Faulty.mof\")";
     EXPECT_EQ(errorOf([&] { broker.compileMofText(text, folder + "/x.mof"); }),

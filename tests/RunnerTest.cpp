@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <nlohmann/json.hpp>
 #include <sstream>
+#include <sys/stat.h>
 
 namespace {
 
@@ -219,6 +220,10 @@ TEST(RunnerTest, ReportsErrorsInOneLine) {
     const std::string port = "gi 'OXATK_EthernetPort.DeviceID=\"none\"'";
     const File noLibrary("no library");
     const File brokenMof("class Demo {\n  uint32;\n};\n");
+    const File placeOfPipe;
+    const std::string pipe = placeOfPipe.path();
+    std::filesystem::remove(pipe);
+    ASSERT_EQ(::mkfifo(pipe.c_str(), 0600), 0);
     const struct {
         int status; // 1: the provider's answer, 2: the user's mistake
         std::string arguments;
@@ -256,7 +261,10 @@ TEST(RunnerTest, ReportsErrorsInOneLine) {
          "--library"},
         {2, "--library " + noLibrary.path() + " ein X",
          "*; ldd shows what the library needs and what it lacks"},
-        {2, test + "--mof /nowhere.mof ein Demo", "/nowhere.mof:1:1: cannot read /nowhere.mof: *"},
+        {2, test + "--mof /nowhere.mof ein Demo", "cannot read /nowhere.mof: *"},
+        {2, "--library " + pipe + " ein X",
+         "cannot load provider library: " + pipe + ": it is no regular file*"},
+        {2, test + "eii Demo", "there is no verb eii" + usage},
         {2, test + "--mof " + brokenMof.path() + " ein Demo", brokenMof.path() + ":2:9: *"},
     };
     for (const auto& c : cases) {
@@ -264,6 +272,16 @@ TEST(RunnerTest, ReportsErrorsInOneLine) {
     }
     EXPECT_EQ(run(test + "ein Demo", "2>&1 >/dev/full").output,
               "oxahv-provider: cannot write to the standard output\n");
+}
+
+// A client may send them, and a finding of the check may be such a request.
+TEST(RunnerTest, NamesWhatTheMofDoesNotDeclare) {
+    const std::string declared = host + hostClasses;
+    EXPECT_EQ(run(declared + "ei OXATK_OperatingSystem --properties Nmae,OSType", "2>&1 >/dev/null").output,
+              "oxahv-provider: class OXATK_OperatingSystem has no property Nmae\n");
+    EXPECT_EQ(
+        run(declared + "an " + quoted(pathOf("OXATK_ComputerSystem")) + " --assoc-class OXATK_Runing").output,
+        "oxahv-provider: class OXATK_Runing is not declared\n");
 }
 
 // Lets the n-th call of the broker fail, until the request succeeds.

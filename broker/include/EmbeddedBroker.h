@@ -119,7 +119,8 @@ public:
      * declared. A qualifier without a declared type is taken with the type that its value has.
      * @param file path of a regular file, at most 256 MiB with all that it includes.
      * @throws BrokerError whose text is `file:line:column: message`, lines and characters counted from 1, for
-     * the first error; one of reading an included file stands where its pragma does.
+     * the first error; one of reading an included file stands where its pragma does. When `file` itself
+     * cannot be read, the text is the message alone.
      */
     void compileMof(const std::string& file);
     /**

@@ -122,11 +122,13 @@ void MofCompiler::compileFile(const std::filesystem::path& file, const MofSource
     const std::filesystem::path place = std::filesystem::canonical(file, error);
     const bool isRegular = !error && std::filesystem::is_regular_file(place, error);
     const auto size = isRegular ? std::filesystem::file_size(place, error) : 0;
-    if (error) {
-        asker.fail(offset, "cannot read " + file.string() + ": " + error.message());
-    }
-    if (!isRegular) {
-        asker.fail(offset, "cannot read " + file.string() + ": it is no regular file");
+    if (error || !isRegular) {
+        const std::string reason = error ? error.message() : "it is no regular file";
+        const std::string complaint = "cannot read " + file.string() + ": " + reason;
+        if (asker.text.empty()) { // no text asks for the first file
+            throw BrokerError(complaint);
+        }
+        asker.fail(offset, complaint);
     }
     if (std::find(open_.begin(), open_.end(), place) != open_.end()) {
         asker.fail(offset, file.string() + " includes itself");

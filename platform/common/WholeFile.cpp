@@ -157,7 +157,7 @@ std::optional<struct stat> statusOf(const std::filesystem::path& target) {
 } // namespace
 
 std::string read(const std::string& path) {
-    const Descriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
+    const Descriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK)); // a pipe's would wait
     if (!file.isOpen()) {
         if (errno == ENOENT) {
             return {};
@@ -167,8 +167,13 @@ std::string read(const std::string& path) {
     // One byte more than the file has, so that its end needs no further block. What is no regular file has no
     // size to go by, and a file may grow.
     struct stat status {};
+    const bool isKnown = ::fstat(file.get(), &status) == 0;
+    if (isKnown && S_ISFIFO(status.st_mode)) {
+        errno = EINVAL;
+        fail("cannot read what is no file,", path);
+    }
     std::string content;
-    content.resize(::fstat(file.get(), &status) == 0 ? static_cast<std::size_t>(status.st_size) + 1 : 1);
+    content.resize(isKnown ? static_cast<std::size_t>(status.st_size) + 1 : 1);
     for (std::size_t filled = 0;;) {
         const ssize_t size = ::read(file.get(), &content[filled], content.size() - filled);
         if (size == 0) {

@@ -18,6 +18,8 @@ namespace {
 // What a signal handler may read: no line is longer.
 std::array<char, 512> unserved;
 std::atomic<std::size_t> unservedSize{0};
+std::array<char, 512> crashed; // the request, written before the handler is there
+std::size_t crashedSize = 0;
 
 // A line that cannot be written is lost: the process is at its end.
 void write(const char* text, std::size_t size) {
@@ -39,14 +41,20 @@ const char* nameOf(int number) {
     }
 }
 
-// The handler is gone when it begins: the signal that it raises ends the process.
 void tell(int number) {
     constexpr const char* begin = "oxahv-provider: the provider crashed: ";
     write(begin, std::strlen(begin));
+    const std::array<char, 2> digits = {static_cast<char>('0' + number / 10),
+                                        static_cast<char>('0' + number % 10)};
+    write("signal ", std::strlen("signal "));
+    write(number < 10 ? &digits[1] : digits.data(), number < 10 ? 1 : 2);
+    write(" (", 2);
     write(nameOf(number), std::strlen(nameOf(number)));
+    write(")", 1);
+    write(crashed.data(), crashedSize);
     write(unserved.data(), unservedSize.load());
     write("\n", 1);
-    static_cast<void>(::raise(number));
+    ::_exit(1);
 }
 
 void noteUnserved(const std::string& className) {
@@ -67,7 +75,10 @@ std::string unservedWords(const std::string& className) {
 }
 
 // An overflow of the stack leaves no room on it. A handler that is there already, a sanitizer's, says more.
-void tellCrashesInOneLine(EmbeddedBroker& broker) {
+void tellCrashesInOneLine(EmbeddedBroker& broker, const std::string& request) {
+    const std::string words = request.empty() ? "" : " in " + printable(request, crashed.size() / 4);
+    crashedSize = std::min(words.size(), crashed.size());
+    std::copy_n(words.begin(), crashedSize, crashed.begin());
     static std::array<char, 65536> stack;
     stack_t own = {};
     own.ss_sp = stack.data();

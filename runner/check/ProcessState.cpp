@@ -64,9 +64,11 @@ std::size_t currentThreads() {
 }
 
 std::string octal(mode_t mode) {
-    std::array<char, 16> text{};
-    std::snprintf(text.data(), text.size(), "%03o", static_cast<unsigned int>(mode));
-    return text.data();
+    std::string text;
+    for (const unsigned int shift : {6U, 3U, 0U}) {
+        text += static_cast<char>('0' + (mode >> shift & 7U));
+    }
+    return text;
 }
 
 void compareEnvironments(const ProcessState& before, const ProcessState& after,
@@ -172,9 +174,9 @@ CapturedOutput::~CapturedOutput() {
     ::close(file_);
 }
 
-std::string CapturedOutput::take() {
+std::string CapturedOutput::take() const {
     std::cout.flush();
-    std::fflush(stdout);
+    static_cast<void>(std::fflush(stdout));
     std::string text(static_cast<std::size_t>(std::max<off_t>(::lseek(file_, 0, SEEK_END), 0)), '\0');
     const ssize_t size = ::pread(file_, text.data(), text.size(), 0);
     text.resize(static_cast<std::size_t>(std::max<ssize_t>(size, 0)));

@@ -2,8 +2,8 @@
 #pragma once
 
 #include <array>
+#include <clocale>
 #include <csignal>
-#include <locale.h>
 #include <map>
 #include <string>
 #include <sys/stat.h>
@@ -43,7 +43,7 @@ public:
     CapturedOutput& operator=(const CapturedOutput&) = delete;
 
     // What was written since the last call.
-    std::string take();
+    std::string take() const;
 
 private:
     int file_;

@@ -127,10 +127,11 @@ std::optional<std::pair<Number, Number>> limitsOf(CMPIType type) {
 }
 
 std::optional<std::string> unmapped(const std::vector<std::string>& map, Number least, Number most) {
-    constexpr Number attempts = 1000;
-    for (Number number = most; number >= least && number > most - attempts; --number) {
-        if (!isMapped(map, wordsOf(number))) {
-            return wordsOf(number);
+    constexpr int attempts = 1000;
+    for (int i = 0; i < attempts && most - static_cast<Number>(i) >= least; ++i) {
+        const std::string text = wordsOf(most - static_cast<Number>(i));
+        if (!isMapped(map, text)) {
+            return text;
         }
     }
     return std::nullopt;

@@ -5,6 +5,7 @@
 #include "check/Strain.h"
 #include "show/Text.h"
 
+#include <algorithm>
 #include <chrono>
 #include <dlfcn.h>
 #include <thread>
@@ -49,7 +50,8 @@ private:
         client_.askPlainly(query);
         const std::vector<std::string> left = newDescriptors(second, currentState());
         if (!newDescriptors(warm, second).empty() && !left.empty()) {
-            client_.find(CheckKind::residue, request, verb + " leaves " + left.front() + " open each time");
+            client_.find(CheckKind::residue, request,
+                         (verb + " leaves ").append(left.front()).append(" open each time"));
         }
         last_ = currentState();
         findLeak(query);
@@ -64,11 +66,16 @@ private:
             return;
         }
         growth(query, many);
-        const std::size_t bytes = growth(query, many);
+        std::size_t bytes = growth(query, many);
+        for (int i = 0; i < 3 && bytes >= many * least; ++i) { // a table that grows at last is none
+            bytes = std::min(bytes, growth(query, many));
+        }
         if (bytes >= many * least) {
-            client_.find(CheckKind::residue, textOf(query),
-                         query.operation->name +
-                             (" leaves " + std::to_string(bytes / many) + " bytes of the heap each time"));
+            std::string text = query.operation->name;
+            text.append(" leaves ")
+                .append(std::to_string(bytes / many))
+                .append(" bytes of the heap each time");
+            client_.find(CheckKind::residue, textOf(query), text);
         }
     }
 
