@@ -75,6 +75,11 @@ void load(Client& client) {
     client.broker().setUnservedHandler([&client](const std::string& className) {
         client.tell({Message::Kind::unserved, 0, className});
     });
+    client.broker().setMessageHandler([&client](const BrokerMessage& message) {
+        if (message.isBrokers) {
+            client.find(CheckKind::exception, cleaningUp, message.text);
+        }
+    });
     client.doing(loading, [&] { loadProviders(client.broker(), client.options()); });
 }
 
@@ -97,6 +102,7 @@ void runTask(EmbeddedBroker& broker, const Options& options, const CheckTask& ta
         client.tell({Message::Kind::unusable, 0, exception.what()});
     }
     broker.setUnservedHandler(nullptr);
+    broker.setMessageHandler(nullptr);
 }
 
 // Sends what every client sends, unloads the libraries and looks whether they are gone.
@@ -125,6 +131,7 @@ void runUnloading(EmbeddedBroker& broker, const Options& options, const CheckTas
         client.tell({Message::Kind::unusable, 0, exception.what()});
     }
     broker.setUnservedHandler(nullptr);
+    broker.setMessageHandler(nullptr);
 }
 
 // In the parent
