@@ -134,7 +134,17 @@ void apply(EmbeddedBroker& broker, const Conduct& conduct) {
     broker.setPathDelivery(conduct.pathDelivery);
 }
 
+// What the broker itself has to say of a provider, in a line; a provider's own messages are its server's.
+static void tellMessages(EmbeddedBroker& broker) {
+    broker.setMessageHandler([](const BrokerMessage& message) {
+        if (message.isBrokers) {
+            std::cerr << "oxahv-provider: " << printable(message.text) << '\n';
+        }
+    });
+}
+
 void prepare(EmbeddedBroker& broker, const Options& options) {
+    tellMessages(broker);
     if (options.showsTraces) {
         showTraces();
     }

@@ -2,6 +2,7 @@
 
 #include "Operations.h"
 #include "Runner.h"
+#include "Watch.h"
 #include "check/Check.h"
 #include "drafts/Draft.h"
 #include "serve/Serve.h"
@@ -128,6 +129,7 @@ const std::vector<Verb>& verbs() {
         }
         rows.push_back({"check", "find out what the provider does wrong", true, declareCheck});
         rows.push_back({"new", "write the first draft of a provider", false, declareNew});
+        rows.push_back({"watch", "print the indications of CLASS until Ctrl-C", true, declareWatch});
 #ifdef OXAHV_HAS_SERVE
         rows.push_back({"serve", "answer CIM clients over HTTP until Ctrl-C", true, declareServe});
 #endif

@@ -67,6 +67,18 @@ TEST(RunnerTest, PrintsPathsAndInstances) {
               "OXATK_ComputerSystem");
 }
 
+TEST(RunnerTest, WatchesIndications) {
+    expectRun(test + "watch Demo --count 2", 0,
+              "instance of Demo {\n  Number = 1;\n};\ninstance of Demo {\n  Number = 2;\n};\n");
+    EXPECT_EQ(jsonOf(test +
+                     "watch --query 'SELECT * FROM Demo WHERE Number > 1' --count 1")["properties"]["Number"],
+              2);
+    expectRun(test + "watch Refused", 1,
+              "oxahv-provider: CMPI_RC_ERR_ACCESS_DENIED: provider TestProvider refuses the filter: "
+              "CMPI_RC_ERR_ACCESS_DENIED\n");
+    expectRun(test + "watch", 2, "oxahv-provider: watch takes either a CLASS or --query\n");
+}
+
 TEST(RunnerTest, ShowsTraces) {
     EXPECT_EQ(run(host + "ein OXATK_ComputerSystem", "2>&1 >/dev/null").output, "");
     const std::string traces = run(host + "--trace ein OXATK_ComputerSystem", "2>&1 >/dev/null").output;

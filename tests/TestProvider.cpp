@@ -86,6 +86,31 @@ CMPIStatus invokeMethod(CMPIMethodMI*, const CMPIContext*, const CMPIResult* res
     return CMReturnData(result, &count, CMPI_uint32);
 }
 
+CMPIStatus authorizeFilter(CMPIIndicationMI*, const CMPIContext*, const CMPISelectExp*, const char* className,
+                           const CMPIObjectPath*, const char*) {
+    CMReturn(std::strcmp(className, "Refused") == 0 ? CMPI_RC_ERR_ACCESS_DENIED : CMPI_RC_OK);
+}
+
+CMPIStatus deActivateFilter(CMPIIndicationMI*, const CMPIContext*, const CMPISelectExp*, const char*,
+                            const CMPIObjectPath*, CMPIBoolean) {
+    CMReturn(CMPI_RC_OK);
+}
+
+// Delivers two indications at once, numbered.
+CMPIStatus activateFilter(CMPIIndicationMI*, const CMPIContext* context, const CMPISelectExp*,
+                          const char* className, const CMPIObjectPath* path, CMPIBoolean) {
+    const char* const nameSpace = CMGetCharsPtr(CMGetNameSpace(path, nullptr), nullptr);
+    for (CMPIUint32 number = 1; number <= 2; ++number) {
+        CMPIInstance* const indication =
+            CMNewInstance(theBroker, CMNewObjectPath(theBroker, nameSpace, className, nullptr), nullptr);
+        CMPIValue value = {};
+        value.uint32 = number;
+        CMSetProperty(indication, "Number", &value, CMPI_uint32);
+        CBDeliverIndication(theBroker, context, nameSpace, indication);
+    }
+    CMReturn(CMPI_RC_OK);
+}
+
 // Lives in this library alone, with all that a handler needs of it.
 class NoProvider : public std::exception {
 public:
@@ -113,6 +138,17 @@ extern "C" CMPI_EXPORT CMPIMethodMI* TestProvider_Create_MethodMI(const CMPIBrok
     static CMPIMethodMIFT table = {};
     static CMPIMethodMI mi = {nullptr, &table};
     table.invokeMethod = invokeMethod;
+    return &mi;
+}
+
+extern "C" CMPI_EXPORT CMPIIndicationMI* TestProvider_Create_IndicationMI(const CMPIBroker* broker,
+                                                                          const CMPIContext*, CMPIStatus*) {
+    static CMPIIndicationMIFT table = {};
+    static CMPIIndicationMI mi = {nullptr, &table};
+    table.authorizeFilter = authorizeFilter;
+    table.activateFilter = activateFilter;
+    table.deActivateFilter = deActivateFilter;
+    theBroker = broker;
     return &mi;
 }
 

@@ -15,6 +15,11 @@ void load(Client& client) {
     client.broker().setUnservedHandler([&client](const std::string& className) {
         client.tell({Message::Kind::unserved, 0, className});
     });
+    client.broker().setMessageHandler([&client](const BrokerMessage& message) {
+        if (message.isBrokers) {
+            client.find(CheckKind::exception, cleaningUp, message.text);
+        }
+    });
     client.doing(loading, [&] { loadProviders(client.broker(), client.options()); });
 }
 
@@ -52,6 +57,7 @@ void runClient(EmbeddedBroker& broker, const Options& options, const CheckTask& 
         client.tell({Message::Kind::unusable, 0, exception.what()});
     }
     broker.setUnservedHandler(nullptr);
+    broker.setMessageHandler(nullptr);
 }
 
 } // namespace
