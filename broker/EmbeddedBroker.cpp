@@ -208,6 +208,10 @@ std::vector<Misuse> EmbeddedBroker::takeMisuses() {
     return impl_->quarantine.takeMisuses();
 }
 
+void EmbeddedBroker::forgetDeadObjects() {
+    impl_->quarantine.clear();
+}
+
 LiveObjects EmbeddedBroker::liveObjects() const {
     return impl_->liveObjects();
 }

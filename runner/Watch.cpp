@@ -39,7 +39,9 @@ void printIndications(EmbeddedBroker& broker, Subscription& subscription, const 
     for (unsigned long printed = 0; watched.count == 0 || printed < watched.count;) {
         const Request request(broker); // owns the indication
         if (CMPIInstance* const indication = subscription.next(std::chrono::milliseconds(100))) {
-            printInstances(std::cout, options.format, {indication});
+            ResultPrinter printer(std::cout, options.format);
+            printer.print(indication);
+            printer.end();
             std::cout.flush();
             ++printed;
         } else if (!std::cout || signals.wait(std::chrono::milliseconds(0))) {

@@ -221,6 +221,11 @@ public:
      * address that `getCharPtr` returned.
      */
     std::vector<Misuse> takeMisuses();
+    /**
+     * Frees the memory of all dead objects, so that what the process has allocated can be compared. Uses of
+     * those objects are no longer noticed: the caller knows that nobody has a handle of them.
+     */
+    void forgetDeadObjects();
     /** Counts of the objects that are alive now. */
     LiveObjects liveObjects() const;
     /**

@@ -41,10 +41,22 @@ std::string* takeChars(String& string) {
 } // namespace
 
 Quarantine::~Quarantine() {
+    clear();
+}
+
+void Quarantine::clear() noexcept {
     for (auto& shard : yards_) {
-        while (Grave* const grave = shard.part.oldest) {
-            shard.part.oldest = grave->younger;
-            clear(grave);
+        Yard& yard = shard.part;
+        Grave* grave = nullptr;
+        {
+            const std::lock_guard<std::mutex> lock(yard.mutex);
+            grave = std::exchange(yard.oldest, nullptr);
+            yard.youngest = nullptr;
+            yard.count = 0;
+            yard.bytes = 0;
+        }
+        while (grave != nullptr) {
+            forget(std::exchange(grave, grave->younger));
         }
     }
 }
@@ -54,7 +66,7 @@ std::atomic<const char*>& Quarantine::placeOf(const char* text) const {
     return texts_[(address / 16 ^ address / 16384) % textPlaces];
 }
 
-void Quarantine::clear(Grave* grave) noexcept {
+void Quarantine::forget(Grave* grave) noexcept {
     if (grave->text != nullptr) {
         const char* text = grave->text;
         placeOf(text).compare_exchange_strong(text, nullptr, std::memory_order_acq_rel);
@@ -105,7 +117,7 @@ void Quarantine::bury(Object* object) noexcept {
         stays = yard.oldest;
     }
     while (gone != stays) {
-        clear(std::exchange(gone, gone->younger));
+        forget(std::exchange(gone, gone->younger));
     }
 }
 

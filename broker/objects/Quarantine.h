@@ -36,6 +36,9 @@ public:
         return text != nullptr && placeOf(text).load(std::memory_order_acquire) == text;
     }
 
+    // Frees all of it, also what other threads have buried.
+    void clear() noexcept;
+
     // Notes a use of what has died.
     void note(std::string_view slot, const void* handle) noexcept;
     std::vector<Misuse> takeMisuses();
@@ -59,7 +62,7 @@ private:
 
     // The only place of a text among those of dead strings; the text that dies last has it.
     std::atomic<const char*>& placeOf(const char* text) const;
-    void clear(Grave* grave) noexcept;
+    void forget(Grave* grave) noexcept;
 
     Shards<Yard> yards_;
     mutable std::array<std::atomic<const char*>, textPlaces> texts_{};
