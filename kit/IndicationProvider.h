@@ -114,19 +114,21 @@ public:
 
     /** Looks at a filter before it is activated; throws a Refusal to turn it down. @param operation names the
      * indications' class @param owner who subscribes; may be empty */
-    virtual void authorize(const Operation& /*operation*/, const SubscriptionFilter& /*filter*/,
-                           const char* /*owner*/) {}
+    virtual void authorize([[maybe_unused]] const Operation& operation,
+                           [[maybe_unused]] const SubscriptionFilter& filter,
+                           [[maybe_unused]] const char* owner) {}
     /** A filter is activated. @param isFirst whether it is the first for its class */
-    virtual void activate(const Operation& /*operation*/, const SubscriptionFilter& /*filter*/,
-                          bool /*isFirst*/) {}
+    virtual void activate([[maybe_unused]] const Operation& operation,
+                          [[maybe_unused]] const SubscriptionFilter& filter, [[maybe_unused]] bool isFirst) {}
     /** A filter is deactivated. @param isLast whether it was the last for its class */
-    virtual void deactivate(const Operation& /*operation*/, const SubscriptionFilter& /*filter*/,
-                            bool /*isLast*/) {}
+    virtual void deactivate([[maybe_unused]] const Operation& operation,
+                            [[maybe_unused]] const SubscriptionFilter& filter, [[maybe_unused]] bool isLast) {
+    }
     /** Indications may be delivered from now on. */
-    virtual void enable(const Context& /*context*/) {}
+    virtual void enable([[maybe_unused]] const Context& context) {}
     /** Indications are no longer wanted. The provider's own threads have to end here, or in its destructor.
      */
-    virtual void disable(const Context& /*context*/) {}
+    virtual void disable([[maybe_unused]] const Context& context) {}
 };
 
 } // namespace oxahv
