@@ -4,24 +4,56 @@
 #include <charconv>
 #include <cmpimacs.h>
 #include <cstddef>
+#include <type_traits>
 #include <utility>
 
 namespace floors {
 
 namespace {
 
+// The member of a value that holds a type, and CMPI's code of it.
 template <class Member>
-void set(CMPIInstance* instance, const char* name, Member CMPIValue::*member, Member value, CMPIType type) {
-    CMPIValue record = {};
-    record.*member = value;
-    CMSetProperty(instance, name, &record, type);
+struct Slot {
+    Member CMPIValue::*member;
+    CMPIType type;
+};
+
+template <class Value>
+constexpr auto slotOf() {
+    if constexpr (std::is_same_v<Value, bool>) {
+        return Slot<CMPIBoolean>{&CMPIValue::boolean, CMPI_boolean};
+    } else if constexpr (std::is_same_v<Value, unsigned char>) {
+        return Slot<CMPIUint8>{&CMPIValue::uint8, CMPI_uint8};
+    } else if constexpr (std::is_same_v<Value, unsigned short>) {
+        return Slot<CMPIUint16>{&CMPIValue::uint16, CMPI_uint16};
+    } else if constexpr (std::is_same_v<Value, unsigned int>) {
+        return Slot<CMPIUint32>{&CMPIValue::uint32, CMPI_uint32};
+    } else if constexpr (std::is_same_v<Value, unsigned long long>) {
+        return Slot<CMPIUint64>{&CMPIValue::uint64, CMPI_uint64};
+    } else if constexpr (std::is_same_v<Value, short>) {
+        return Slot<CMPISint16>{&CMPIValue::sint16, CMPI_sint16};
+    } else if constexpr (std::is_same_v<Value, float>) {
+        return Slot<CMPIReal32>{&CMPIValue::real32, CMPI_real32};
+    } else if constexpr (std::is_same_v<Value, double>) {
+        return Slot<CMPIReal64>{&CMPIValue::real64, CMPI_real64};
+    } else if constexpr (std::is_same_v<Value, CMPIObjectPath*>) {
+        return Slot<CMPIObjectPath*>{&CMPIValue::ref, CMPI_ref};
+    } else if constexpr (std::is_same_v<Value, CMPIDateTime*>) {
+        return Slot<CMPIDateTime*>{&CMPIValue::dateTime, CMPI_dateTime};
+    } else if constexpr (std::is_same_v<Value, CMPIArray*>) {
+        return Slot<CMPIArray*>{&CMPIValue::array, CMPI_ARRAY};
+    } else {
+        static_assert(std::is_same_v<Value, CMPIString*>);
+        return Slot<CMPIString*>{&CMPIValue::string, CMPI_string};
+    }
 }
 
-template <class Member>
-void set(CMPIObjectPath* path, const char* name, Member CMPIValue::*member, Member value, CMPIType type) {
-    CMPIValue record = {};
-    record.*member = value;
-    CMAddKey(path, name, &record, type);
+void call(CMPIInstance* instance, const char* name, CMPIValue* value, CMPIType type) {
+    CMSetProperty(instance, name, value, type);
+}
+
+void call(CMPIObjectPath* path, const char* name, CMPIValue* value, CMPIType type) {
+    CMAddKey(path, name, value, type);
 }
 
 CMPIData call(const CMPIInstance* instance, const char* name, CMPIStatus& status) {
@@ -36,15 +68,16 @@ CMPIData call(const CMPIObjectPath* path, const char* name, CMPIStatus& status) 
     return CMGetKey(const_cast<CMPIObjectPath*>(path), name, &status);
 }
 
-template <class Object, class Member, class Out>
-bool get(const Object* object, const char* name, Member CMPIValue::*member, Out& out) {
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    const CMPIData data = call(object, name, status);
-    if (status.rc != CMPI_RC_OK || (data.state & CMPI_nullValue) != 0) {
-        return false;
+template <class Object, class Value>
+void set(Object* object, const char* name, Value value) {
+    if constexpr (std::is_same_v<Value, const char*>) {
+        call(object, name, reinterpret_cast<CMPIValue*>(const_cast<char*>(value)), CMPI_chars);
+    } else {
+        constexpr auto slot = slotOf<Value>();
+        CMPIValue record = {};
+        record.*slot.member = static_cast<std::decay_t<decltype(record.*slot.member)>>(value);
+        call(object, name, &record, slot.type);
     }
-    out = static_cast<Out>(data.value.*member);
-    return true;
 }
 
 const char* charsOf(CMPIString* string) {
@@ -62,209 +95,158 @@ bool assign(CMPIString* string, std::string& out) {
     return true;
 }
 
-template <class Object>
-bool getText(const Object* object, const char* name, std::string& out) {
-    CMPIString* string = nullptr;
-    return get(object, name, &CMPIValue::string, string) && assign(string, out);
+} // namespace
+
+template <class Value>
+void setProperty(CMPIInstance* instance, const char* name, Value value) {
+    set(instance, name, value);
 }
 
-template <class Push>
-bool pushElements(const CMPIInstance* instance, const char* name, const Push& push) {
+template <class Value>
+void setKeyProperty(CMPIObjectPath* path, const char* name, Value value) {
+    set(path, name, value);
+}
+
+template <class Object, class Out>
+bool get(const Object* object, const char* name, Out& out) {
+    if constexpr (std::is_same_v<Out, std::string>) {
+        CMPIString* string = nullptr;
+        return get(object, name, string) && assign(string, out);
+    } else {
+        CMPIStatus status = {CMPI_RC_OK, nullptr};
+        const CMPIData data = call(object, name, status);
+        if (status.rc != CMPI_RC_OK || (data.state & CMPI_nullValue) != 0) {
+            return false;
+        }
+        out = static_cast<Out>(data.value.*slotOf<Out>().member);
+        return true;
+    }
+}
+
+bool getDate(const CMPIInstance* instance, const char* name, std::string& out) {
+    CMPIDateTime* dateTime = nullptr;
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    return get(instance, name, dateTime) && assign(CMGetStringFormat(dateTime, &status), out);
+}
+
+template <class Element>
+bool getArray(const CMPIInstance* instance, const char* name, std::vector<Element>& out) {
     CMPIArray* array = nullptr;
-    if (!get(instance, name, &CMPIValue::array, array)) {
+    if (!get(instance, name, array)) {
         return false;
     }
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     const CMPICount count = CMGetArrayCount(array, &status);
     for (CMPICount i = 0; i < count; ++i) {
         const CMPIData element = CMGetArrayElementAt(array, i, &status);
-        if (status.rc == CMPI_RC_OK) {
-            push(element.value);
+        if (status.rc != CMPI_RC_OK) {
+            continue;
+        }
+        if constexpr (std::is_same_v<Element, std::string>) {
+            const char* const chars = charsOf(element.value.string);
+            if (chars != nullptr) {
+                out.emplace_back(chars);
+            }
+        } else {
+            out.push_back(element.value.*slotOf<Element>().member);
         }
     }
     return true;
 }
 
-template <class Number>
-void pushNumber(Keys& keys, TK::Moniker::ComponentType type, std::string&& name, Number number) {
-    std::array<char, 20> digits{};
-    const auto* const end = std::to_chars(digits.data(), digits.data() + digits.size(), number).ptr;
-    keys.push_back(
-        {type, std::move(name), std::string(digits.data(), static_cast<std::size_t>(end - digits.data()))});
-}
-
-} // namespace
-
-void setProperty(CMPIInstance* instance, const char* name, bool value) {
-    set(instance, name, &CMPIValue::boolean, static_cast<CMPIBoolean>(value), CMPI_boolean);
-}
-
-void setProperty(CMPIInstance* instance, const char* name, unsigned char value) {
-    set(instance, name, &CMPIValue::uint8, value, CMPI_uint8);
-}
-
-void setProperty(CMPIInstance* instance, const char* name, unsigned short value) {
-    set(instance, name, &CMPIValue::uint16, value, CMPI_uint16);
-}
-
-void setProperty(CMPIInstance* instance, const char* name, unsigned int value) {
-    set(instance, name, &CMPIValue::uint32, static_cast<CMPIUint32>(value), CMPI_uint32);
-}
-
-void setProperty(CMPIInstance* instance, const char* name, unsigned long long value) {
-    set(instance, name, &CMPIValue::uint64, static_cast<CMPIUint64>(value), CMPI_uint64);
-}
-
-void setProperty(CMPIInstance* instance, const char* name, short value) {
-    set(instance, name, &CMPIValue::sint16, value, CMPI_sint16);
-}
-
-void setProperty(CMPIInstance* instance, const char* name, float value) {
-    set(instance, name, &CMPIValue::real32, value, CMPI_real32);
-}
-
-void setProperty(CMPIInstance* instance, const char* name, double value) {
-    set(instance, name, &CMPIValue::real64, value, CMPI_real64);
-}
-
-void setProperty(CMPIInstance* instance, const char* name, CMPIString* value) {
-    set(instance, name, &CMPIValue::string, value, CMPI_string);
-}
-
-void setProperty(CMPIInstance* instance, const char* name, CMPIObjectPath* value) {
-    set(instance, name, &CMPIValue::ref, value, CMPI_ref);
-}
-
-void setProperty(CMPIInstance* instance, const char* name, const char* value) {
-    CMSetProperty(instance, name, reinterpret_cast<CMPIValue*>(const_cast<char*>(value)), CMPI_chars);
-}
-
-void setKeyProperty(CMPIObjectPath* path, const char* name, unsigned char value) {
-    set(path, name, &CMPIValue::uint8, value, CMPI_uint8);
-}
-
-void setKeyProperty(CMPIObjectPath* path, const char* name, unsigned short value) {
-    set(path, name, &CMPIValue::uint16, value, CMPI_uint16);
-}
-
-void setKeyProperty(CMPIObjectPath* path, const char* name, unsigned int value) {
-    set(path, name, &CMPIValue::uint32, static_cast<CMPIUint32>(value), CMPI_uint32);
-}
-
-void setKeyProperty(CMPIObjectPath* path, const char* name, unsigned long long value) {
-    set(path, name, &CMPIValue::uint64, static_cast<CMPIUint64>(value), CMPI_uint64);
-}
-
-void setKeyProperty(CMPIObjectPath* path, const char* name, CMPIString* value) {
-    set(path, name, &CMPIValue::string, value, CMPI_string);
-}
-
-void setKeyProperty(CMPIObjectPath* path, const char* name, CMPIObjectPath* value) {
-    set(path, name, &CMPIValue::ref, value, CMPI_ref);
-}
-
-void setKeyProperty(CMPIObjectPath* path, const char* name, const char* value) {
-    CMAddKey(path, name, reinterpret_cast<CMPIValue*>(const_cast<char*>(value)), CMPI_chars);
-}
-
-bool getProperty(const CMPIInstance* instance, const char* name, unsigned short& out) {
-    return get(instance, name, &CMPIValue::uint16, out);
-}
-
-bool getProperty(const CMPIInstance* instance, const char* name, unsigned int& out) {
-    return get(instance, name, &CMPIValue::uint32, out);
-}
-
-bool getProperty(const CMPIInstance* instance, const char* name, bool& out) {
-    return get(instance, name, &CMPIValue::boolean, out);
-}
-
-bool getProperty(const CMPIInstance* instance, const char* name, CMPIString** out) {
-    return get(instance, name, &CMPIValue::string, *out);
-}
-
-bool getProperty(const CMPIArgs* args, const char* name, unsigned short& out) {
-    return get(args, name, &CMPIValue::uint16, out);
-}
-
-bool getProperty(const CMPIArgs* args, const char* name, unsigned int& out) {
-    return get(args, name, &CMPIValue::uint32, out);
-}
-
-bool getProperty(const CMPIArgs* args, const char* name, bool& out) {
-    return get(args, name, &CMPIValue::boolean, out);
-}
-
-bool getKeyProperty(const CMPIObjectPath* path, const char* name, CMPIString** out) {
-    return get(path, name, &CMPIValue::string, *out);
-}
-
-bool getKeyProperty(const CMPIObjectPath* path, const char* name, CMPIObjectPath** out) {
-    return get(path, name, &CMPIValue::ref, *out);
-}
-
-bool getProperty(const CMPIInstance* instance, const char* name, std::string& out) {
-    return getText(instance, name, out);
-}
-
-bool getProperty(const CMPIArgs* args, const char* name, std::string& out) {
-    return getText(args, name, out);
-}
-
-bool getKeyProperty(const CMPIObjectPath* path, const char* name, std::string& out) {
-    return getText(path, name, out);
-}
-
-bool getDate(const CMPIInstance* instance, const char* name, std::string& out) {
-    CMPIDateTime* dateTime = nullptr;
+template <class Element>
+void setArray(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
+              const std::vector<Element>& elements) {
+    constexpr bool areTexts = std::is_same_v<Element, std::string>;
+    constexpr auto slot = slotOf<std::conditional_t<areTexts, CMPIString*, Element>>();
     CMPIStatus status = {CMPI_RC_OK, nullptr};
-    return get(instance, name, &CMPIValue::dateTime, dateTime) &&
-           assign(CMGetStringFormat(dateTime, &status), out);
-}
-
-bool getArray(const CMPIInstance* instance, const char* name, std::vector<unsigned short>& out) {
-    return pushElements(instance, name, [&out](const CMPIValue& value) { out.push_back(value.uint16); });
-}
-
-bool getArray(const CMPIInstance* instance, const char* name, std::vector<std::string>& out) {
-    return pushElements(instance, name, [&out](const CMPIValue& value) {
-        const char* const chars = charsOf(value.string);
-        if (chars != nullptr) {
-            out.emplace_back(chars);
+    CMPIValue value = {};
+    CMPIArray* const array = CMNewArray(broker, static_cast<CMPICount>(elements.size()), slot.type, &status);
+    for (CMPICount i = 0; i < elements.size(); ++i) {
+        if constexpr (areTexts) {
+            value.string = CMNewString(broker, elements[i].c_str(), &status);
+        } else {
+            value.*slot.member = elements[i];
         }
-    });
+        CMSetArrayElementAt(array, i, &value, slot.type);
+    }
+    value.array = array;
+    CMSetProperty(instance, name, &value, static_cast<CMPIType>(slot.type | CMPI_ARRAY));
 }
 
-void push(Keys& keys, std::string name, unsigned char value) {
-    keys.push_back({TK::Moniker::COMPONENT_UINT8, std::move(name), std::string(1, static_cast<char>(value))});
+template <class Number>
+void push(Keys& keys, std::string name, Number number) {
+    if constexpr (std::is_same_v<Number, unsigned char>) {
+        keys.push_back(
+            {TK::Moniker::COMPONENT_UINT8, std::move(name), std::string(1, static_cast<char>(number))});
+    } else {
+        constexpr auto type = sizeof(Number) == 2   ? TK::Moniker::COMPONENT_UINT16
+                              : sizeof(Number) == 4 ? TK::Moniker::COMPONENT_UINT32
+                                                    : TK::Moniker::COMPONENT_UINT64;
+        std::array<char, 20> digits{};
+        char* const end = std::to_chars(digits.data(), digits.data() + digits.size(), number).ptr;
+        keys.push_back({type, std::move(name), std::string(digits.data(), end)});
+    }
 }
 
-void push(Keys& keys, std::string name, unsigned short value) {
-    pushNumber(keys, TK::Moniker::COMPONENT_UINT16, std::move(name), value);
+template <class Number>
+void read(const std::string& text, Number& number) {
+    if constexpr (std::is_same_v<Number, unsigned char>) {
+        number = static_cast<unsigned char>(text[0]);
+    } else {
+        std::from_chars(text.data(), text.data() + text.size(), number);
+    }
 }
 
-void push(Keys& keys, std::string name, unsigned int value) {
-    pushNumber(keys, TK::Moniker::COMPONENT_UINT32, std::move(name), value);
-}
-
-void push(Keys& keys, std::string name, unsigned long long value) {
-    pushNumber(keys, TK::Moniker::COMPONENT_UINT64, std::move(name), value);
-}
-
-void read(const std::string& text, unsigned char& value) {
-    value = static_cast<unsigned char>(text[0]);
-}
-
-void read(const std::string& text, unsigned short& value) {
-    std::from_chars(text.data(), text.data() + text.size(), value);
-}
-
-void read(const std::string& text, unsigned int& value) {
-    std::from_chars(text.data(), text.data() + text.size(), value);
-}
-
-void read(const std::string& text, unsigned long long& value) {
-    std::from_chars(text.data(), text.data() + text.size(), value);
-}
+// What the rows call.
+template TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, bool value);
+template TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, unsigned char value);
+template TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, unsigned short value);
+template TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, unsigned int value);
+template TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, unsigned long long value);
+template TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, short value);
+template TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, float value);
+template TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, double value);
+template TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, CMPIString* value);
+template TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, CMPIObjectPath* value);
+template TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, CMPIDateTime* value);
+template TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, const char* value);
+template TK_EXPORT void setKeyProperty(CMPIObjectPath* path, const char* name, unsigned char value);
+template TK_EXPORT void setKeyProperty(CMPIObjectPath* path, const char* name, unsigned short value);
+template TK_EXPORT void setKeyProperty(CMPIObjectPath* path, const char* name, unsigned int value);
+template TK_EXPORT void setKeyProperty(CMPIObjectPath* path, const char* name, unsigned long long value);
+template TK_EXPORT void setKeyProperty(CMPIObjectPath* path, const char* name, CMPIString* value);
+template TK_EXPORT void setKeyProperty(CMPIObjectPath* path, const char* name, CMPIObjectPath* value);
+template TK_EXPORT void setKeyProperty(CMPIObjectPath* path, const char* name, const char* value);
+template TK_EXPORT bool get(const CMPIInstance* instance, const char* name, unsigned short& out);
+template TK_EXPORT bool get(const CMPIInstance* instance, const char* name, unsigned int& out);
+template TK_EXPORT bool get(const CMPIInstance* instance, const char* name, bool& out);
+template TK_EXPORT bool get(const CMPIInstance* instance, const char* name, CMPIString*& out);
+template TK_EXPORT bool get(const CMPIInstance* instance, const char* name, std::string& out);
+template TK_EXPORT bool get(const CMPIArgs* args, const char* name, unsigned short& out);
+template TK_EXPORT bool get(const CMPIArgs* args, const char* name, unsigned int& out);
+template TK_EXPORT bool get(const CMPIArgs* args, const char* name, bool& out);
+template TK_EXPORT bool get(const CMPIArgs* args, const char* name, std::string& out);
+template TK_EXPORT bool get(const CMPIObjectPath* path, const char* name, CMPIString*& out);
+template TK_EXPORT bool get(const CMPIObjectPath* path, const char* name, CMPIObjectPath*& out);
+template TK_EXPORT bool get(const CMPIObjectPath* path, const char* name, std::string& out);
+template TK_EXPORT bool getArray(const CMPIInstance* instance, const char* name,
+                                 std::vector<unsigned short>& out);
+template TK_EXPORT bool getArray(const CMPIInstance* instance, const char* name,
+                                 std::vector<std::string>& out);
+template TK_EXPORT void setArray(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
+                                 const std::vector<unsigned char>& elements);
+template TK_EXPORT void setArray(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
+                                 const std::vector<unsigned short>& elements);
+template TK_EXPORT void setArray(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
+                                 const std::vector<std::string>& elements);
+template TK_EXPORT void push(Keys& keys, std::string name, unsigned char number);
+template TK_EXPORT void push(Keys& keys, std::string name, unsigned short number);
+template TK_EXPORT void push(Keys& keys, std::string name, unsigned int number);
+template TK_EXPORT void push(Keys& keys, std::string name, unsigned long long number);
+template TK_EXPORT void read(const std::string& text, unsigned char& number);
+template TK_EXPORT void read(const std::string& text, unsigned short& number);
+template TK_EXPORT void read(const std::string& text, unsigned int& number);
+template TK_EXPORT void read(const std::string& text, unsigned long long& number);
 
 } // namespace floors

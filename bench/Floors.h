@@ -1,5 +1,5 @@
-// What cannot be undercut: the bare CMPI calls of each accessor, in plain functions of a shared library of
-// their own, and a plain list of keys.
+// The least that an operation can cost: the bare CMPI calls of each accessor and a plain list of keys. The
+// functions are in a shared library of their own, so that calling them costs what calling the library does.
 #pragma once
 
 #include "ProviderUtilities.h"
@@ -9,58 +9,32 @@
 
 namespace floors {
 
-// The bare CMPI call with the value in its record.
-TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, bool value);
-TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, unsigned char value);
-TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, unsigned short value);
-TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, unsigned int value);
-TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, unsigned long long value);
-TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, short value);
-TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, float value);
-TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, double value);
-TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, CMPIString* value);
-TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, CMPIObjectPath* value);
-TK_EXPORT void setProperty(CMPIInstance* instance, const char* name, const char* value);
-TK_EXPORT void setKeyProperty(CMPIObjectPath* path, const char* name, unsigned char value);
-TK_EXPORT void setKeyProperty(CMPIObjectPath* path, const char* name, unsigned short value);
-TK_EXPORT void setKeyProperty(CMPIObjectPath* path, const char* name, unsigned int value);
-TK_EXPORT void setKeyProperty(CMPIObjectPath* path, const char* name, unsigned long long value);
-TK_EXPORT void setKeyProperty(CMPIObjectPath* path, const char* name, CMPIString* value);
-TK_EXPORT void setKeyProperty(CMPIObjectPath* path, const char* name, CMPIObjectPath* value);
-TK_EXPORT void setKeyProperty(CMPIObjectPath* path, const char* name, const char* value);
+// The bare CMPI call with the value in its record; a C text is handed over as it is.
+template <class Value>
+void setProperty(CMPIInstance* instance, const char* name, Value value);
+template <class Value>
+void setKeyProperty(CMPIObjectPath* path, const char* name, Value value);
 
-// The bare CMPI call, and the two tests without which its data may not be used.
-TK_EXPORT bool getProperty(const CMPIInstance* instance, const char* name, unsigned short& out);
-TK_EXPORT bool getProperty(const CMPIInstance* instance, const char* name, unsigned int& out);
-TK_EXPORT bool getProperty(const CMPIInstance* instance, const char* name, bool& out);
-TK_EXPORT bool getProperty(const CMPIInstance* instance, const char* name, CMPIString** out);
-TK_EXPORT bool getProperty(const CMPIArgs* args, const char* name, unsigned short& out);
-TK_EXPORT bool getProperty(const CMPIArgs* args, const char* name, unsigned int& out);
-TK_EXPORT bool getProperty(const CMPIArgs* args, const char* name, bool& out);
-TK_EXPORT bool getKeyProperty(const CMPIObjectPath* path, const char* name, CMPIString** out);
-TK_EXPORT bool getKeyProperty(const CMPIObjectPath* path, const char* name, CMPIObjectPath** out);
-
-// The bare calls and one assignment.
-TK_EXPORT bool getProperty(const CMPIInstance* instance, const char* name, std::string& out);
-TK_EXPORT bool getProperty(const CMPIArgs* args, const char* name, std::string& out);
-TK_EXPORT bool getKeyProperty(const CMPIObjectPath* path, const char* name, std::string& out);
+// The bare CMPI call on an instance, arguments or an object path, and the two tests without which its data
+// may not be used. A text takes one more call and an assignment.
+template <class Object, class Out>
+bool get(const Object* object, const char* name, Out& out);
 TK_EXPORT bool getDate(const CMPIInstance* instance, const char* name, std::string& out);
 
-// The bare calls and a push of each element.
-TK_EXPORT bool getArray(const CMPIInstance* instance, const char* name, std::vector<unsigned short>& out);
-TK_EXPORT bool getArray(const CMPIInstance* instance, const char* name, std::vector<std::string>& out);
+// The bare calls for an array, and what each element costs at least: a push, or a call that sets it.
+template <class Element>
+bool getArray(const CMPIInstance* instance, const char* name, std::vector<Element>& out);
+template <class Element>
+void setArray(const CMPIBroker* broker, CMPIInstance* instance, const char* name,
+              const std::vector<Element>& elements);
 
-// Appends the record that Moniker::addKey appends, its digits written by to_chars.
+// Appends the record that Moniker::addKey appends; to_chars writes its digits.
 using Keys = std::vector<TK::Moniker::KeyComponent>;
-TK_EXPORT void push(Keys& keys, std::string name, unsigned char value);
-TK_EXPORT void push(Keys& keys, std::string name, unsigned short value);
-TK_EXPORT void push(Keys& keys, std::string name, unsigned int value);
-TK_EXPORT void push(Keys& keys, std::string name, unsigned long long value);
+template <class Number>
+void push(Keys& keys, std::string name, Number number);
 
-// Reads the text that Moniker::addKey makes of a number by from_chars; that of a byte is the byte itself.
-TK_EXPORT void read(const std::string& text, unsigned char& value);
-TK_EXPORT void read(const std::string& text, unsigned short& value);
-TK_EXPORT void read(const std::string& text, unsigned int& value);
-TK_EXPORT void read(const std::string& text, unsigned long long& value);
+// Reads with from_chars the text that Moniker::addKey makes of a number; that of a byte is the byte itself.
+template <class Number>
+void read(const std::string& text, Number& number);
 
 } // namespace floors

@@ -3,9 +3,9 @@
 // The logger's two functions are defined here and do nothing, so that each trace point pays for its texts and
 // for two calls through the dynamic linker. So are the heap's entry points, which count.
 //
-// A row is measured in rounds. Each takes one slice of time of the operation, of its floor and of the naive
-// build, one right after the other, and of each the shortest slice counts: whatever else the machine does
-// hits all alike, and a short slice is likely to be spared.
+// A row is measured in rounds. Each takes one slice of time of the operation and one of its floor, right after
+// each other, and of each the shortest slice counts: whatever else the machine does hits both alike, and a
+// short slice is likely to be spared.
 #include "HVLogger.h"
 #include "Rows.h"
 
@@ -101,14 +101,12 @@ void waitFor(const std::atomic<bool>& flag) {
 // One side of a row, and its shortest slice.
 class Side {
 public:
-    Side(const rows::Run& run, double units)
-        : run_(run), units_(units), calls_(run ? callsPerSlice(run) : 0) {}
+    Side(const rows::Run& run, double units) : run_(run), units_(units), calls_(callsPerSlice(run)) {}
 
-    bool exists() const { return calls_ != 0; }
     double perUnit() const { return shortest_ / (static_cast<double>(calls_) * units_); }
 
     double measure() {
-        const double time = exists() ? timeOf(run_, calls_, CLOCK_THREAD_CPUTIME_ID) : 0;
+        const double time = timeOf(run_, calls_, CLOCK_THREAD_CPUTIME_ID);
         shortest_ = std::min(shortest_, time);
         return time;
     }
@@ -176,20 +174,14 @@ double allocationsOf(const rows::Run& run, double units) {
 void measure(benchmark::State& state, const rows::Row& row) {
     Side operation(row.operation, row.units);
     Side floor(row.floor, row.floorUnits);
-    Side naive(row.naive, row.units);
     for ([[maybe_unused]] auto round : state) {
-        state.SetIterationTime((operation.measure() + floor.measure() + naive.measure()) / 1e9);
+        state.SetIterationTime((operation.measure() + floor.measure()) / 1e9);
     }
     state.counters["ns"] = operation.perUnit();
-    if (floor.exists()) {
-        state.counters["floor_ns"] = floor.perUnit();
-        state.counters["at_most_floor"] = row.atMostFloor;
-        state.counters["over_floor"] = row.overFloor;
-    }
-    if (naive.exists()) {
-        state.counters["naive_ns"] = naive.perUnit();
-        state.counters["times_faster"] = row.timesFaster;
-    }
+    state.counters["floor_ns"] = floor.perUnit();
+    state.counters["at_most_floor"] = row.atMostFloor;
+    state.counters["over_floor"] = row.overFloor;
+    state.counters["at_most_baseline"] = row.atMostBaseline;
     if (!row.isGrowth()) {
         state.counters["allocations"] = allocationsOf(row.operation, row.units);
         state.counters["allocations_at_most"] =
@@ -200,10 +192,10 @@ void measure(benchmark::State& state, const rows::Row& row) {
     state.SetLabel(row.floorName);
 }
 
-// What a second thread brings to a row, and to its floor or else to the naive build.
+// What a second thread brings to a row and to its floor.
 void measureGain(benchmark::State& state, const rows::Row& row) {
     TwoThreads operation(row.operation, row.units);
-    TwoThreads floor(row.floor ? row.floor : row.naive, row.units);
+    TwoThreads floor(row.floor, row.units);
     for ([[maybe_unused]] auto round : state) {
         state.SetIterationTime((operation.measure() + floor.measure()) / 1e9);
     }
@@ -211,7 +203,7 @@ void measureGain(benchmark::State& state, const rows::Row& row) {
     state.counters["two_ns"] = operation.atOnce();
     state.counters["floor_one_ns"] = floor.inTurn();
     state.counters["floor_two_ns"] = floor.atOnce();
-    state.SetLabel(row.floor ? row.floorName : "the naive build");
+    state.SetLabel(row.floorName);
 }
 
 // A measurement of a row, as Google Benchmark takes it.
@@ -271,7 +263,7 @@ int main(int argc, char** argv) {
         add(row.name, measure, row, row.isGrowth() ? std::min<std::size_t>(rounds, 3) : rounds);
     }
     for (const rows::Row& row : table) {
-        if (!row.isGrowth()) {
+        if (row.onTwoThreads) {
             // Two processors are free at once more seldom than one.
             add("two threads: " + row.name, measureGain, row, 3 * rounds);
         }

@@ -1,5 +1,5 @@
-// The rows of the benchmark's table: each operation of the library, the floor that it is held against, and
-// the same operation in the naive build.
+// The rows of the benchmark's table: each operation of the library beside its floor, which is what the
+// hardware, the C library or the bare CMPI calls make it cost at least.
 #pragma once
 
 #include <benchmark/benchmark.h>
@@ -31,25 +31,24 @@ Run repeat(Function function) {
 struct Row {
     std::string name;
     Run operation;
-    Run naive; // empty where there is none
-    Run floor; // empty where the naive build alone is the measure
     std::string floorName;
-    // How many units of work, of which a time is told, one call of the operation and of the floor does.
+    Run floor;
+    // How many units of work one call of the operation and of the floor does: the table shows the time of a
+    // unit.
     double units = 1;
     double floorUnits = 1;
-    // Goals; 0 stands for none.
+    // Whether it is measured on two threads as well, since it allocates or shares something.
+    bool onTwoThreads = false;
+
+    // Goals; 0 means that there is none.
     double atMostFloor = 0;           // the operation's time, in times of the floor's
     double overFloor = 0;             // nanoseconds that the operation may take beyond the floor
-    double timesFaster = 0;           // the naive build's time, in times of the operation's
-    double allocations = -1;          // blocks of memory per unit, at most; -1 when nothing is said
+    double atMostBaseline = 0;        // the operation's time, in times of the baseline's, when there is one
+    double allocations = -1;          // blocks of memory per unit, at most; -1 for no goal
     double allocationsOverFloor = -1; // the same, beyond the floor's
 
-    // Whether it tells what a unit costs in a large input: its floor is the same operation on a small one.
+    // Whether it compares a unit of a large input with one of a small input.
     bool isGrowth() const { return floorUnits != units; }
-
-    // What the operation and its naive twin result in, as text; empty where there is no twin.
-    std::function<std::string()> result;
-    std::function<std::string()> naiveResult;
 };
 
 // All rows, in the order of the table. `large` is how many characters the growing ones grow to.

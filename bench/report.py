@@ -1,20 +1,22 @@
 #!/usr/bin/env python3
-"""Makes one table of the passes of a benchmark, of both builds where there is a baseline, and of what loading costs.
+"""Makes one table of the passes of a benchmark, of both builds where there is a baseline, and of what building and
+loading cost.
 
 Of each number the smallest of all passes counts. script/bench calls this.
 """
 import argparse
 import datetime
 import json
+import os
 import pathlib
 import platform
 import re
 import subprocess
+import tempfile
 
-MOST_INITIALISERS = 3
 LEAST_GAIN = 0.97
 REASONS = pathlib.Path(__file__).with_name("missed.md")
-MET, MISSED = "", " ✗"
+MISSED = " ✗"
 
 
 def output_of(*command):
@@ -39,21 +41,42 @@ def measured(build, passes):
     return rows
 
 
-def load_costs(build, programs, times):
-    """What loading a library costs: its name, number, unit and goal."""
+def compile_time(build, header, times):
+    """The processor's seconds that a file takes which includes one header, at -O2."""
+    commands = json.loads(found(build, "compile_commands.json").read_text())
+    command = next(each["command"] for each in commands if each["file"].endswith("bench/Kit.cpp"))
+    folders = re.findall(r"-I\S+", command)
+    compiler = next(word for word in command.split() if re.search(r"(\+\+|cc)(-\d+)?$", word) and "ccache" not in word)
+    with tempfile.TemporaryDirectory() as folder:
+        source = pathlib.Path(folder, "header.cpp")
+        source.write_text(f"#include <{header}>\n")
+        seconds = []
+        for _ in range(times):
+            before = os.times()
+            output_of(compiler, "-std=c++17", "-O2", *folders, "-c", source, "-o", f"{folder}/header.o")
+            after = os.times()
+            seconds.append(after.children_user - before.children_user)
+        return min(seconds)
+
+
+def costs_of(build, programs, times):
+    """What building and loading cost: name, number, unit and the most that is allowed."""
     library = found(build, "liboxahvproviderutilities.so.1.*").resolve()
     relocations = sum(int(n) for n in re.findall(r"contains (\d+) entr", output_of("readelf", "-rW", library)))
     section = re.search(r"\.init_array\s+\S+\s+\S+\s+\S+\s+([0-9a-f]+)", output_of("readelf", "-SW", library))
-    stripped = build / "stripped.so"
-    output_of("strip", "-o", stripped, library)
+    text = re.search(r"^(\d+)", output_of("size", library).splitlines()[1].strip())
     loader = found(programs, "oxahvbench-load")
-    return {
-        "load: relocations": (relocations, "", None),
+    rows = [
+        ("size: the library's code", int(text[1]) / 1024, " KiB", 100),
+        ("load: relocations", relocations, "", None),
         # The C compiler's own start-up code has one entry.
-        "load: dynamic initialisers": (int(section[1], 16) // 8 - 1, "", MOST_INITIALISERS),
-        "load: size, stripped": (stripped.stat().st_size / 1024, " KiB", None),
-        "load: dlopen": (min(int(output_of(loader, library)) for _ in range(times)) / 1000, " µs", None),
-    }
+        ("load: dynamic initialisers", int(section[1], 16) // 8 - 1, "", 3),
+        ("load: dlopen", min(int(output_of(loader, library)) for _ in range(times)) / 1000, " µs", None),
+    ]
+    headers = [("Trace.h", 0.5), ("ProviderUtilities.h", None), ("ProviderKit.h", None)] if build == programs else []
+    rows += [(f"compile: #include <{header}>", compile_time(build, header, min(times, 5)), " s", most)
+             for header, most in headers]
+    return {name: (value, unit, most) for name, value, unit, most in rows}
 
 
 def number(value):
@@ -61,40 +84,31 @@ def number(value):
     return f"{value:,.0f}" if value >= 100 else f"{value:.3g}"
 
 
-def goal(value, bound, met):
-    return {"value": value, "bound": bound, "met": met}
+def goal(text, met):
+    return {"text": text if met else text + MISSED, "met": met}
 
 
 def timed_row(name, row, old):
     """A row of times, with what it is held against."""
-    entry = {"name": name, "ns": row["ns"], "floor": row["floor"], "text": number(row["ns"])}
-    if "floor_ns" in row:
-        ratio = row["ns"] / row["floor_ns"]
-        entry["floor_text"] = number(row["floor_ns"])
-        entry["floor_ns"] = row["floor_ns"]
-        entry["ratio"] = ratio
-        if row["at_most_floor"]:
-            entry["goal"] = goal(ratio, f"≤ {row['at_most_floor']:g}", ratio <= row["at_most_floor"])
-            entry["used"] = ratio / row["at_most_floor"]
-        if row.get("over_floor"):
-            over = entry["over"] = row["ns"] - row["floor_ns"]
-            entry["goal"] = goal(over, f"≤ floor + {row['over_floor']:g} ns", over <= row["over_floor"])
-            entry["used"] = row["ns"] / (row["floor_ns"] + row["over_floor"])
-    if "naive_ns" in row:
-        entry["naive_ns"] = row["naive_ns"]
-        entry["faster"] = row["naive_ns"] / row["ns"]
-        if row["times_faster"]:
-            entry["faster_goal"] = goal(entry["faster"], f"≥ {row['times_faster']:g}",
-                                        entry["faster"] >= row["times_faster"])
-            entry["used"] = row["times_faster"] / entry["faster"]
+    ratio = row["ns"] / row["floor_ns"]
+    entry = {"name": name, "ns": row["ns"], "text": number(row["ns"]), "floor": row["floor"], "goals": {},
+             "floor_ns": row["floor_ns"], "floor_text": number(row["floor_ns"]), "ratio": ratio}
+    if row["at_most_floor"]:
+        entry["goals"]["floor"] = goal(f"≤ {row['at_most_floor']:g}", ratio <= row["at_most_floor"])
+    if row["over_floor"]:
+        over = row["ns"] - row["floor_ns"]
+        entry["goals"]["floor"] = goal(f"≤ floor + {row['over_floor']:g} ns", over <= row["over_floor"])
     if "allocations" in row:
         most = row["allocations_at_most"]
         entry["allocations"] = row["allocations"]
         if most >= 0:
-            entry["allocation_goal"] = goal(row["allocations"], f"≤ {most:.3g}", row["allocations"] <= most)
+            entry["goals"]["allocations"] = goal(f"≤ {most:.3g}", row["allocations"] <= most)
     if old:
         entry["baseline"] = number(old["ns"])
-        entry["speed_up"] = old["ns"] / row["ns"]
+        entry["of_baseline"] = row["ns"] / old["ns"]
+        if row["at_most_baseline"]:
+            most = row["at_most_baseline"]
+            entry["goals"]["baseline"] = goal(f"≤ {most:g}", entry["of_baseline"] <= most)
     return entry
 
 
@@ -103,63 +117,56 @@ def thread_row(name, row, old):
     gain = row["one_ns"] / row["two_ns"]
     floor = row["floor_one_ns"] / row["floor_two_ns"]
     entry = {"name": name, "text": f"{gain:.2f}×", "floor": row["floor"], "floor_text": f"{floor:.2f}×",
-             "gain": gain, "floor_gain": floor, "ratio": gain / floor,
-             "goal": goal(gain / floor, f"≥ {LEAST_GAIN}", gain / floor >= LEAST_GAIN),
-             "used": LEAST_GAIN * floor / gain}
+             "ratio": gain / floor, "goals": {"floor": goal(f"≥ {LEAST_GAIN}", gain / floor >= LEAST_GAIN)}}
     if old:
         entry["baseline"] = f"{old['one_ns'] / old['two_ns']:.2f}×"
     return entry
 
 
-def load_row(name, cost, old):
+def cost_row(name, cost, old):
     value, unit, most = cost
-    entry = {"name": name, "value": value, "text": number(value) + unit}
+    entry = {"name": name, "value": value, "text": number(value) + unit, "goals": {}}
     if most is not None:
-        entry["goal"] = goal(value, f"≤ {most}", value <= most)
+        entry["goals"]["floor"] = goal(f"≤ {most}{unit}", value <= most)
     if old:
         entry["baseline"] = number(old[0]) + unit
-        entry["speed_up"] = old[0] / value if value else None
+        entry["of_baseline"] = value / old[0] if old[0] else None
     return entry
 
 
 def all_entries(arguments):
     build = arguments.build
-    rows = measured(build, arguments.passes)
     times = 3 if arguments.short else 40
-    costs = load_costs(build, build, times)
     old_rows, old_costs = {}, {}
     if arguments.baseline:
         old_build = pathlib.Path(arguments.baseline[1])
         old_rows = measured(old_build, arguments.passes)
-        old_costs = load_costs(old_build, build, times)
+        old_costs = costs_of(old_build, build, times)
     entries = []
-    for name, row in rows.items():
+    for name, row in measured(build, arguments.passes).items():
         make = thread_row if "two_ns" in row else timed_row
         entries.append(make(name, row, old_rows.get(name)))
-    return entries + [load_row(name, cost, old_costs.get(name)) for name, cost in costs.items()]
-
-
-def mark(entry, key):
-    return "" if key not in entry else entry[key]["bound"] + (MET if entry[key]["met"] else MISSED)
+    return entries + [cost_row(name, cost, old_costs.get(name)) for name, cost in costs_of(build, build, times).items()]
 
 
 def table(entries, baseline):
     """The table's head and its lines of texts."""
-    head = ["operation", "ns", "floor", "floor ns", "× floor", "goal", "naive ns", "× faster", "goal",
-            "allocations", "goal"]
-    lines = []
-    for entry in entries:
-        line = [entry["name"], entry["text"], entry.get("floor", "") if "floor_text" in entry else "",
-                entry.get("floor_text", ""), f"{entry['ratio']:.3g}" if "ratio" in entry else "",
-                mark(entry, "goal"), number(entry["naive_ns"]) if "naive_ns" in entry else "",
-                f"{entry['faster']:.3g}" if "faster" in entry else "", mark(entry, "faster_goal"),
-                f"{entry['allocations']:.3g}" if "allocations" in entry else "", mark(entry, "allocation_goal")]
-        if baseline:
-            line += [entry.get("baseline", ""), f"{entry['speed_up']:.3g}" if entry.get("speed_up") else ""]
-        lines.append(line)
+    head = ["operation", "ns", "floor", "floor ns", "× floor", "goal", "allocations", "goal"]
     if baseline:
-        head += [baseline[0], "speed-up"]
-    return head, lines
+        head += [baseline[0], "× " + baseline[0], "goal"]
+
+    def line(entry):
+        def mark(kind):
+            return entry["goals"][kind]["text"] if kind in entry["goals"] else ""
+
+        def ratio(key):
+            return f"{entry[key]:.3g}" if entry.get(key) is not None else ""
+
+        texts = [entry["name"], entry["text"], entry.get("floor", ""), entry.get("floor_text", ""), ratio("ratio"),
+                 mark("floor"), ratio("allocations"), mark("allocations")]
+        return texts + ([entry.get("baseline", ""), ratio("of_baseline"), mark("baseline")] if baseline else [])
+
+    return head, [line(entry) for entry in entries]
 
 
 TEXT_COLUMNS = (0, 2)
@@ -180,14 +187,9 @@ def markdown(head, lines):
     return "\n".join("| " + " | ".join(line) + " |" for line in [head, rule] + lines)
 
 
-def goals_of(entry):
-    """Whether each goal of a row is met."""
-    return [entry[key]["met"] for key in ("goal", "faster_goal", "allocation_goal") if key in entry]
-
-
 def summary(entries):
     """How many goals are met."""
-    goals = [met for entry in entries for met in goals_of(entry)]
+    goals = [each["met"] for entry in entries for each in entry["goals"].values()]
     return f"{sum(goals)} of {len(goals)} goals met; {MISSED.strip()} marks a miss"
 
 
@@ -200,7 +202,7 @@ def reasons():
 def missed(entries):
     """The page's section on the rows that miss a goal; empty when none does."""
     known = reasons()
-    names = [entry["name"] for entry in entries if not all(goals_of(entry))]
+    names = [entry["name"] for entry in entries if not all(each["met"] for each in entry["goals"].values())]
     texts = [f"**{name}**: {known.get(name) or known.get(name.split(':')[0], 'not looked into')}" for name in names]
     return "\n\n".join(["", "## What is missed, and why", *texts]) + "\n" if texts else ""
 
@@ -214,56 +216,55 @@ def machine():
             "commit": output_of("git", "rev-parse", "--short", "HEAD").strip()}
 
 
+# The picture's rows, one for each kind of operation.
+SHOWN = ("getClassId, found", "getClassId, not found: unrelated", "setProperty: 8", "setKeyProperty: 4",
+         "getProperty of an instance: ", "setProperty: wide", "addKey", "getValue", "path to moniker", "moniker to path",
+         "createObjectPath", "getClassId of a path", "trace point", "ValidateInput, clean, 16", "AStringToWString, 16",
+         "WStringToAString, 16", "date", "array setter, 64 numbers,", "array setter, 64 texts", "array getter",
+         "ReadUint32", "WriteUint32", "whole request", "getInstance")
+
+
 def draw(entries, path):
-    """A bar per goal: how much of what the goal allows is used."""
+    """How long each operation and its floor take, one above the other, narrow enough for a phone."""
     import matplotlib  # pylint: disable=import-outside-toplevel
     matplotlib.use("Agg")
     from matplotlib import pyplot  # pylint: disable=import-outside-toplevel
-    shown = [entry for entry in entries if "used" in entry]
-    labels = []
-    for entry in shown:
-        if "faster_goal" in entry and "goal" not in entry:
-            labels.append(f"{entry['faster']:.3g}× faster than naive  (goal {entry['faster_goal']['bound']}×)")
-        elif "over" in entry:
-            labels.append(f"{entry['over']:.0f} ns over {entry['floor']}  (goal {entry['goal']['bound']})")
-        elif "gain" in entry:
-            labels.append(f"gains {entry['ratio']:.2f} of what the floor does  (goal {entry['goal']['bound']})")
-        else:
-            labels.append(f"{entry['ratio']:.3g}× {entry['floor']}  (goal {entry['goal']['bound']}×)")
-    used = [entry["used"] for entry in shown]
+    shown = [entry for entry in entries if "ns" in entry and entry["name"].startswith(SHOWN)]
     pyplot.rcParams.update({"svg.hashsalt": "oxahv", "svg.fonttype": "none"})
-    figure, axes = pyplot.subplots(figsize=(13, 0.27 * len(shown) + 1.4), layout="constrained")
-    axes.barh(range(len(shown)), used, color=["#2a7f62" if share <= 1 else "#c0392b" for share in used], height=0.72)
+    figure, axes = pyplot.subplots(figsize=(5, 0.36 * len(shown) + 1), layout="constrained")
+    for i, entry in enumerate(shown):
+        axes.plot([entry["floor_ns"], entry["ns"]], [i, i], color="#9bb5aa", linewidth=2, zorder=1)
+        axes.text(0.01, i - 0.28, f"{entry['name']}: {entry['text']} ns", fontsize=9, va="center",
+                  transform=axes.get_yaxis_transform())
+    rows = range(len(shown))
+    axes.scatter([entry["floor_ns"] for entry in shown], rows, marker="|", s=60, color="#444", label="floor", zorder=2)
+    axes.scatter([entry["ns"] for entry in shown], rows, s=28, color="#2a7f62", label="operation", zorder=3)
     axes.set_xscale("log")
-    axes.set_xlim(min(used) / 1.5, max(max(used), 1) * 30)
-    axes.axvline(1, color="black", linewidth=1)
-    for i, (share, label) in enumerate(zip(used, labels)):
-        axes.text(max(share, 1) * 1.06, i, label, va="center", fontsize=8)
-    axes.set_yticks(range(len(shown)), [entry["name"] for entry in shown], fontsize=8)
-    axes.set_ylim(len(shown) - 0.4, -0.6)
-    axes.set_xlabel("share of the goal's allowance (left of the line: met)")
-    axes.spines[["top", "right"]].set_visible(False)
+    axes.set_ylim(len(shown) - 0.4, -0.8)
+    axes.set_yticks([])
+    axes.set_xlabel("nanoseconds", fontsize=9)
+    axes.grid(axis="x", color="#ddd", linewidth=0.6)
+    axes.spines[["top", "right", "left"]].set_visible(False)
+    figure.legend(loc="outside upper left", ncols=2, frameon=False, fontsize=9)
     figure.savefig(path, metadata={"Date": None} if path.suffix == ".svg" else None)
 
 
 def page(head, lines, entries, facts):
     return f"""# Performance
 
-What each operation costs, beside its floor and beside a naive build of the same operation. Renewed by
-`script/bench --record`.
+What each operation costs, beside the least that it can cost. Renewed by `script/bench --record`.
 
 {facts['date']}, commit {facts['commit']}: {facts['processor']}, {facts['processors']} processors; {facts['system']};
 {facts['compiler']}; {facts['libc']}.
 
 - **ns** is the shortest time of one call (or of one unit, where the name says so) in several hundred interleaved
-  slices; a row "two threads" shows how many times one thread's work two do, a row "load" its own unit.
-- **floor** is what the operation cannot undercut, or is held against; **naive** a literal build of the operation, with
-  string streams, copies and printf (`bench/Naive.cpp`).
+  slices; a row "two threads" shows how many times one thread's work two do; the rows at the end show their own unit.
+- **floor** is what the operation cannot undercut, or is held against.
 - **allocations** counts the heap blocks taken per call.
 - Broker and logger do next to nothing, so that the times are the library's own.
 - {summary(entries)}.
 
-![How much of each goal's allowance is used](performance.svg)
+![How long each operation and its floor take](performance.svg)
 
 {markdown(head, lines)}
 {missed(entries)}"""
@@ -285,7 +286,7 @@ def main():
     print(plain(head, lines))
     print("\n" + summary(entries))
     for name in reasons().keys() - {part for entry in entries for part in (entry["name"], entry["name"].split(":")[0])}:
-        print(f"{REASONS.name} tells of a row that does not exist: {name}")
+        print(f"{REASONS.name} explains a row that does not exist: {name}")
     arguments.json.write_text(json.dumps({"machine": facts, "rows": entries}, indent=1, ensure_ascii=False))
     if arguments.record:
         arguments.record.mkdir(exist_ok=True)
