@@ -74,7 +74,7 @@ inline void AssociationProvider::associations(const Operation& operation, Instan
     for (const Served& served : classes_) {
         if (operation.filter_ == nullptr ||
             operation.passes(operation.filter_->associationClass, served.className)) {
-            (this->*served.function)(operation, reply);
+            detail::callMember(*this, served.function, operation, reply);
         }
     }
 }

@@ -88,7 +88,7 @@ private:
 inline void InstanceProvider::enumerate(const Operation& operation, Instances& reply) {
     for (const Served& served : classes_) {
         if (operation.isFor(served.className)) {
-            return (this->*served.function)(operation, reply);
+            return detail::callMember(*this, served.function, operation, reply);
         }
     }
     if (classes_.empty()) {

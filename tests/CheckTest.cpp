@@ -206,7 +206,10 @@ TEST_F(TheCheck, FindsWhatAProviderLeavesInItsProcess) {
           "gi sets the environment variable FAULTY\n", "gi removes the environment variable HOME\n",
           "gi changes the working folder to /\n",
           "gi changes the handler of signal 10 (User defined signal 1)\n", "gi closes descriptor 2, ",
-          " of the heap each time\n", " (/dev/null) open", "the provider leaves a thread running"}) {
+#ifndef __SANITIZE_ADDRESS__ // which has a heap of its own
+          " of the heap each time\n",
+#endif
+          " (/dev/null) open", "the provider leaves a thread running"}) {
         EXPECT_NE(residue.find(part), std::string::npos) << part << '\n' << residue;
     }
 }
@@ -337,7 +340,7 @@ TEST_F(TheCheck, NamesWhatKeepsALibraryMapped) {
     EXPECT_NE(text.find("it is linked with -z nodelete"), std::string::npos) << text;
 #else
     EXPECT_NE(text.find("unique symbols, to which other libraries bind: "), std::string::npos) << text;
-    EXPECT_NE(text.find("Shared<int>::count;"), std::string::npos) << text;
+    EXPECT_NE(text.find("Shared<int>::count"), std::string::npos) << text;
 #endif
 }
 

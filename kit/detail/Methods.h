@@ -150,9 +150,11 @@ struct Signature<R (C::*)(Parameters...)> {
     using Return = R;
     using Arguments = std::tuple<Argument<Parameters>...>;
     static constexpr std::size_t named = (Argument<Parameters>::names + ... + 0);
-    // The place of a parameter's name: the request, which has none, can only be the first.
+    // The place of a parameter's name: the request, which has none and asks for none, can only be the first.
     template <std::size_t index>
-    static constexpr std::size_t nameAt = index + named - sizeof...(Parameters);
+    static constexpr std::size_t nameAt = index + named < sizeof...(Parameters)
+                                              ? 0
+                                              : index + named - sizeof...(Parameters);
 };
 template <class C, class R, class... Parameters>
 struct Signature<R (C::*)(Parameters...) const> : Signature<R (C::*)(Parameters...)> {};
