@@ -129,6 +129,11 @@ TEST_F(TheCheck, FindsEachFault) {
         const std::string name = className.substr(std::min(className.size(), sizeof "Faulty_" - 1));
         const std::string check = finding["check"];
         const std::string pass = finding["pass"];
+#ifdef __SANITIZE_ADDRESS__ // which reports a crash too
+        if (check == "sanitizer" && found[name] == "crash ") {
+            continue;
+        }
+#endif
         found[name] += check + (pass == "exact keys" ? "" : '@' + pass) + ' ';
         const bool isWarning = check == "not-done" || check == "list-ignored";
         EXPECT_EQ(finding["severity"], isWarning ? "warning" : "error");

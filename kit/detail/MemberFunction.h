@@ -15,7 +15,7 @@ Kept memberOfBase(Own function) {
 
 // Calls such a function. GCC's sanitizer takes the adjusted object for the base and reports it.
 template <class Base, class Function, class... Arguments>
-[[gnu::no_sanitize("vptr")]] void callMember(Base& base, Function function, Arguments&... arguments) {
+__attribute__((no_sanitize("vptr"))) void callMember(Base& base, Function function, Arguments&... arguments) {
     (base.*function)(arguments...);
 }
 
