@@ -19,6 +19,7 @@ std::unique_ptr<Object> objectIn(const void* handle) {
     if (object == nullptr) {
         throw Failure{CMPI_RC_ERR_INVALID_HANDLE};
     }
+    requireShallow(*object);
     return object->clone();
 }
 

@@ -30,7 +30,8 @@ CMPIInstance* newInstance(Core& core, const CMPIObjectPath* handle) {
             throw Failure{CMPI_RC_ERR_INVALID_CLASS};
         }
         for (const PropertyDeclaration& property : declared->properties) {
-            instance->properties.set(property.name, Value::null(property.type));
+            instance->properties.set(property.name,
+                                     Value::null(valueType(property.type, property.qualifiers)));
         }
     }
     instance->setPath(path->copy());
