@@ -13,6 +13,7 @@ namespace {
 using Json = nlohmann::ordered_json;
 
 Json jsonOf(const CMPIData& data);
+Json jsonOf(const CMPIInstance* embedded);
 
 // The double that is written as shortly as the number is: 0.1, not 0.10000000149011612.
 double shortest(const CMPIData& real) {
@@ -68,6 +69,8 @@ Json jsonOf(const CMPIData& data) {
         return data.value.chars;
     case CMPI_dateTime:
         return textOf(CMGetStringFormat(data.value.dateTime, nullptr));
+    case CMPI_instance:
+        return jsonOf(data.value.inst);
     case CMPI_ref:
         return pathText(data.value.ref);
     default:
@@ -81,6 +84,12 @@ Json jsonOf(const std::vector<NamedValue>& values) {
         object[value.name] = jsonOf(value.data);
     }
     return object;
+}
+
+// An embedded instance has no path of its own.
+Json jsonOf(const CMPIInstance* embedded) {
+    return {{"class", textOf(CMGetClassName(CMGetObjectPath(embedded, nullptr), nullptr))},
+            {"properties", jsonOf(propertiesOf(embedded))}};
 }
 
 Json jsonOf(const CMPIObjectPath* path, const std::vector<NamedValue>& values) {
