@@ -6,6 +6,7 @@
 #include "hosting/Delivery.h"
 #include "hosting/Hosting.h"
 #include "hosting/Indications.h"
+#include "objects/Quarantine.h"
 #include "objects/Records.h"
 #include "tables/Hooks.h"
 
@@ -13,7 +14,6 @@
 #include <atomic>
 #include <functional>
 #include <map>
-#include <shared_mutex>
 
 namespace oxahv {
 
@@ -25,7 +25,8 @@ extern const CMPIBrokerMemFT memoryTable;
 class EmbeddedBroker::Impl {
 public:
     void countObject(Kind kind, int change) {
-        counts_[static_cast<std::size_t>(kind)].fetch_add(change, std::memory_order_relaxed);
+        counts_[shardOfThread()].part[static_cast<std::size_t>(kind)].fetch_add(change,
+                                                                                std::memory_order_relaxed);
     }
     LiveObjects liveObjects() const;
 
@@ -44,19 +45,21 @@ public:
     void addClientEntries(Context& context, const std::string& principal, CMPIFlags flags);
 
 private:
-    std::array<std::atomic<int>, kindCount>
-        counts_{}; // before the owner, whose objects are counted to the last
-    mutable std::shared_mutex handlerMutex_;
+    // Before the owner, whose objects are counted to the last. What one thread makes another may free: a
+    // single part may fall below zero, the sum is exact.
+    Shards<std::array<std::atomic<int>, kindCount>> counts_{};
+    mutable ShardedMutex handlerMutex_;
     std::function<void(const BrokerMessage&)> handler_;
     std::function<void(const std::string&)> unservedHandler_;
-    std::shared_mutex contextMutex_;
+    ShardedMutex contextMutex_;
     std::map<std::string, std::string> contextEntries_;
 
 public:
     CMPIBroker record = {this, &requestTable, &encapsulationTable, &systemTable, &memoryTable};
+    Quarantine quarantine;
+    Classes classes; // before the owners, whose instances have its names
     Owner owner{*this};
     Owner clones{*this}; // apart from what a memory mark frees: they are their callers'
-    Classes classes;
     Delivery delivery;
     Hooks hooks;
     AttachedThreads attachedThreads; // after the owners and before the providers, which may leave threads

@@ -3,6 +3,8 @@
 #include "Core.h"
 #include "mof/MofCompiler.h"
 
+#include <shared_mutex>
+
 namespace oxahv {
 
 BrokerError::BrokerError(const std::string& message) : std::runtime_error(message) {}
@@ -10,8 +12,11 @@ BrokerError::~BrokerError() = default;
 
 LiveObjects EmbeddedBroker::Impl::liveObjects() const {
     const auto count = [this](Kind kind) {
-        return static_cast<std::size_t>(
-            counts_[static_cast<std::size_t>(kind)].load(std::memory_order_relaxed));
+        int sum = 0;
+        for (const auto& shard : counts_) {
+            sum += shard.part[static_cast<std::size_t>(kind)].load(std::memory_order_relaxed);
+        }
+        return static_cast<std::size_t>(sum);
     };
     LiveObjects live;
     live.instances = count(Kind::instance);
@@ -28,36 +33,36 @@ LiveObjects EmbeddedBroker::Impl::liveObjects() const {
 }
 
 void EmbeddedBroker::Impl::tell(const BrokerMessage& message) const {
-    const std::shared_lock<std::shared_mutex> lock(handlerMutex_);
+    const std::shared_lock<ShardedMutex> lock(handlerMutex_);
     if (handler_) {
         handler_(message);
     }
 }
 
 void EmbeddedBroker::Impl::setMessageHandler(std::function<void(const BrokerMessage&)> handler) {
-    const std::unique_lock<std::shared_mutex> lock(handlerMutex_);
+    const std::unique_lock<ShardedMutex> lock(handlerMutex_);
     handler_.swap(handler);
 }
 
 void EmbeddedBroker::Impl::tellUnserved(const std::string& className) const {
-    const std::shared_lock<std::shared_mutex> lock(handlerMutex_);
+    const std::shared_lock<ShardedMutex> lock(handlerMutex_);
     if (unservedHandler_) {
         unservedHandler_(className);
     }
 }
 
 void EmbeddedBroker::Impl::setUnservedHandler(std::function<void(const std::string&)> handler) {
-    const std::unique_lock<std::shared_mutex> lock(handlerMutex_);
+    const std::unique_lock<ShardedMutex> lock(handlerMutex_);
     unservedHandler_.swap(handler);
 }
 
 void EmbeddedBroker::Impl::setContextEntry(const std::string& name, const std::string& text) {
-    const std::unique_lock<std::shared_mutex> lock(contextMutex_);
+    const std::unique_lock<ShardedMutex> lock(contextMutex_);
     contextEntries_[name] = text;
 }
 
 void EmbeddedBroker::Impl::addContextEntries(Context& context) {
-    const std::shared_lock<std::shared_mutex> lock(contextMutex_);
+    const std::shared_lock<ShardedMutex> lock(contextMutex_);
     for (const auto& [name, text] : contextEntries_) {
         context.values.set(name, Value::text(*this, text));
     }
@@ -197,6 +202,10 @@ void EmbeddedBroker::startRecording() {
 
 std::vector<Call> EmbeddedBroker::stopRecording() {
     return impl_->hooks.stopRecording();
+}
+
+std::vector<Misuse> EmbeddedBroker::takeMisuses() {
+    return impl_->quarantine.takeMisuses();
 }
 
 LiveObjects EmbeddedBroker::liveObjects() const {

@@ -28,18 +28,18 @@ private:
 class Request::Impl {
 public:
     explicit Impl(EmbeddedBroker& broker) : core(broker.impl()) {
-        core.addContextEntries(context);
-        core.addClientEntries(context, "", 0);
+        core.addContextEntries(*context);
+        core.addClientEntries(*context, "", 0);
     }
 
     // The context of a request for a path.
     const CMPIContext* contextFor(const CMPIObjectPath* path) {
         const ObjectPath* const target = ObjectPath::of(path);
         if (target != nullptr) {
-            context.values.set(CMPIInitNameSpace, Value::text(core, target->nameSpace));
+            context->values.set(CMPIInitNameSpace, Value::text(core, target->nameSpace));
         }
-        context.progress = &progress;
-        return &context;
+        context->receiver = &receiver;
+        return context.get();
     }
 
     template <auto slot, class... Arguments>
@@ -47,10 +47,23 @@ public:
         return core.hosting.serve<slot>(contextFor(path), path, arguments...);
     }
 
+    // The same, with handlers that get the results in place of the reply.
+    template <auto slot, class... Arguments>
+    Reply stream(const InstanceHandler& instances, const PathHandler& paths, const CMPIObjectPath* path,
+                 Arguments... arguments) {
+        struct Handlers {
+            Receiver& receiver;
+            ~Handlers() { receiver.instances = nullptr, receiver.paths = nullptr; }
+        } const handlers{receiver};
+        receiver.instances = instances;
+        receiver.paths = paths;
+        return serve<slot>(path, arguments...);
+    }
+
     Core& core;
-    Context context{core}; // nobody's: a provider that releases it does no harm
+    Exposed<Context> context{new Context(core)}; // nobody's: a provider that releases it does no harm
     Owner owner{core};
-    std::function<void(std::size_t)> progress;
+    Receiver receiver;
     Owner::Scope scope{owner};
 };
 
@@ -59,11 +72,11 @@ Request::Request(EmbeddedBroker& broker) : impl_(std::make_unique<Impl>(broker))
 Request::~Request() = default;
 
 const CMPIContext* Request::context() const {
-    return &impl_->context;
+    return impl_->context.get();
 }
 
 void Request::setContextEntry(const std::string& name, const std::string& text) {
-    impl_->context.values.set(name, Value::text(impl_->core, text));
+    impl_->context->values.set(name, Value::text(impl_->core, text));
 }
 
 void Request::setInvocationFlags(CMPIFlags flags) {
@@ -73,7 +86,7 @@ void Request::setInvocationFlags(CMPIFlags flags) {
 }
 
 void Request::setProgressHandler(std::function<void(std::size_t results)> handler) {
-    impl_->progress = std::move(handler);
+    impl_->receiver.progress = std::move(handler);
 }
 
 CMPIObjectPath* Request::objectPath(const std::string& nameSpace, const std::string& className) {
@@ -94,11 +107,11 @@ CMPIObjectPath* Request::deliver(const CMPIObjectPath* path) {
 
 Reply Request::enumerateInstances(const CMPIObjectPath* classPath,
                                   const std::vector<std::string>* properties) {
-    return impl_->serve<&CMPIInstanceMIFT::enumerateInstances>(classPath, PropertyArray(properties).get());
+    return enumerateInstances(classPath, properties, nullptr);
 }
 
 Reply Request::enumerateInstanceNames(const CMPIObjectPath* classPath) {
-    return impl_->serve<&CMPIInstanceMIFT::enumerateInstanceNames>(classPath);
+    return enumerateInstanceNames(classPath, nullptr);
 }
 
 Reply Request::getInstance(const CMPIObjectPath* path, const std::vector<std::string>* properties) {
@@ -120,31 +133,67 @@ Reply Request::deleteInstance(const CMPIObjectPath* path) {
 
 Reply Request::execQuery(const CMPIObjectPath* classPath, const std::string& query,
                          const std::string& language) {
-    return impl_->serve<&CMPIInstanceMIFT::execQuery>(classPath, query.c_str(), language.c_str());
+    return execQuery(classPath, query, language, nullptr);
 }
 
 Reply Request::associators(const CMPIObjectPath* path, const AssociationFilter& filter,
                            const std::vector<std::string>* properties) {
-    return impl_->serve<&CMPIAssociationMIFT::associators>(
-        path, filter.associationClass.c_str(), filter.resultClass.c_str(), filter.role.c_str(),
-        filter.resultRole.c_str(), PropertyArray(properties).get());
+    return associators(path, filter, properties, nullptr);
 }
 
 Reply Request::associatorNames(const CMPIObjectPath* path, const AssociationFilter& filter) {
-    return impl_->serve<&CMPIAssociationMIFT::associatorNames>(
-        path, filter.associationClass.c_str(), filter.resultClass.c_str(), filter.role.c_str(),
-        filter.resultRole.c_str());
+    return associatorNames(path, filter, nullptr);
 }
 
 Reply Request::references(const CMPIObjectPath* path, const AssociationFilter& filter,
                           const std::vector<std::string>* properties) {
-    return impl_->serve<&CMPIAssociationMIFT::references>(
-        path, filter.resultClass.c_str(), filter.role.c_str(), PropertyArray(properties).get());
+    return references(path, filter, properties, nullptr);
 }
 
 Reply Request::referenceNames(const CMPIObjectPath* path, const AssociationFilter& filter) {
-    return impl_->serve<&CMPIAssociationMIFT::referenceNames>(path, filter.resultClass.c_str(),
-                                                              filter.role.c_str());
+    return referenceNames(path, filter, nullptr);
+}
+
+Reply Request::enumerateInstances(const CMPIObjectPath* classPath, const std::vector<std::string>* properties,
+                                  const InstanceHandler& handler) {
+    return impl_->stream<&CMPIInstanceMIFT::enumerateInstances>(handler, {}, classPath,
+                                                                PropertyArray(properties).get());
+}
+
+Reply Request::enumerateInstanceNames(const CMPIObjectPath* classPath, const PathHandler& handler) {
+    return impl_->stream<&CMPIInstanceMIFT::enumerateInstanceNames>({}, handler, classPath);
+}
+
+Reply Request::execQuery(const CMPIObjectPath* classPath, const std::string& query,
+                         const std::string& language, const InstanceHandler& handler) {
+    return impl_->stream<&CMPIInstanceMIFT::execQuery>(handler, {}, classPath, query.c_str(),
+                                                       language.c_str());
+}
+
+Reply Request::associators(const CMPIObjectPath* path, const AssociationFilter& filter,
+                           const std::vector<std::string>* properties, const InstanceHandler& handler) {
+    return impl_->stream<&CMPIAssociationMIFT::associators>(
+        handler, {}, path, filter.associationClass.c_str(), filter.resultClass.c_str(), filter.role.c_str(),
+        filter.resultRole.c_str(), PropertyArray(properties).get());
+}
+
+Reply Request::associatorNames(const CMPIObjectPath* path, const AssociationFilter& filter,
+                               const PathHandler& handler) {
+    return impl_->stream<&CMPIAssociationMIFT::associatorNames>(
+        {}, handler, path, filter.associationClass.c_str(), filter.resultClass.c_str(), filter.role.c_str(),
+        filter.resultRole.c_str());
+}
+
+Reply Request::references(const CMPIObjectPath* path, const AssociationFilter& filter,
+                          const std::vector<std::string>* properties, const InstanceHandler& handler) {
+    return impl_->stream<&CMPIAssociationMIFT::references>(
+        handler, {}, path, filter.resultClass.c_str(), filter.role.c_str(), PropertyArray(properties).get());
+}
+
+Reply Request::referenceNames(const CMPIObjectPath* path, const AssociationFilter& filter,
+                              const PathHandler& handler) {
+    return impl_->stream<&CMPIAssociationMIFT::referenceNames>({}, handler, path, filter.resultClass.c_str(),
+                                                               filter.role.c_str());
 }
 
 Reply Request::getProperty(const CMPIObjectPath* path, const std::string& name) {

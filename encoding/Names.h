@@ -27,6 +27,8 @@ inline bool sameName(std::string_view a, std::string_view b) {
 
 // Orders names, as the comparison of a container.
 struct NameLess {
+    using is_transparent = void; // no text is made of what is looked up
+
     bool operator()(std::string_view a, std::string_view b) const {
         return std::lexicographical_compare(a.begin(), a.end(), b.begin(), b.end(), [](char x, char y) {
             return static_cast<unsigned char>(foldedLetter(x)) < static_cast<unsigned char>(foldedLetter(y));

@@ -1,12 +1,13 @@
 #include "Core.h"
 
 #include <algorithm>
+#include <shared_mutex>
 
 namespace oxahv {
 
 void Classes::declare(const ClassDeclaration& declaration) {
     const std::lock_guard<std::mutex> changing(changing_);
-    const std::unique_lock<std::shared_mutex> lock(mutex_);
+    const std::unique_lock<ShardedMutex> lock(mutex_);
     declarations_.declare(declaration);
     any_.store(true, std::memory_order_release);
 }
@@ -15,21 +16,21 @@ void Classes::change(const std::function<void(Declarations&)>& change) {
     const std::lock_guard<std::mutex> changing(changing_);
     Declarations changed = declarations_;
     change(changed);
-    const std::unique_lock<std::shared_mutex> lock(mutex_);
+    const std::unique_lock<ShardedMutex> lock(mutex_);
     std::swap(declarations_, changed);
     any_.store(declarations_.anyClass(), std::memory_order_release);
 }
 
-std::shared_ptr<const DeclaredClass> Classes::find(std::string_view name) const {
+const DeclaredClass* Classes::find(std::string_view name) const {
     if (!any()) {
         return nullptr;
     }
-    const std::shared_lock<std::shared_mutex> lock(mutex_);
-    return declarations_.find(name);
+    const std::shared_lock<ShardedMutex> lock(mutex_);
+    return declarations_.find(name).get();
 }
 
 std::vector<std::string> Classes::names() const {
-    const std::shared_lock<std::shared_mutex> lock(mutex_);
+    const std::shared_lock<ShardedMutex> lock(mutex_);
     return declarations_.classNames();
 }
 
@@ -39,7 +40,7 @@ std::vector<QualifierType> Classes::qualifierTypes() const {
 }
 
 bool Classes::isA(std::string_view className, std::string_view ancestor) const {
-    const std::shared_ptr<const DeclaredClass> declared = find(className);
+    const DeclaredClass* const declared = find(className);
     return declared != nullptr ? declared->isA(ancestor) : sameName(className, ancestor);
 }
 
@@ -62,6 +63,15 @@ bool hasType(const Classes& classes, const Value& value, const ValueType& type) 
     return std::all_of(elements.begin(), elements.end(), [&](const Value& element) {
         return isInstanceOf(classes, element.data(), type.embeddedClass);
     });
+}
+
+NamedValues nullValues(const DeclaredClass& declared) {
+    std::vector<Value> values;
+    values.reserve(declared.properties.size());
+    for (const PropertyDeclaration& property : declared.properties) {
+        values.push_back(Value::null(valueType(property.type, property.qualifiers)));
+    }
+    return {declared.propertyNames, std::move(values)};
 }
 
 Value checkedValue(Core& core, const CMPIValue* value, CMPIType type, const ValueType& declared) {

@@ -3,13 +3,12 @@
 #pragma once
 
 #include "classes/DeclaredClass.h"
-#include "objects/Value.h"
+#include "objects/NamedValues.h"
+#include "objects/Shards.h"
 
 #include <atomic>
 #include <functional>
-#include <memory>
 #include <mutex>
-#include <shared_mutex>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -23,18 +22,21 @@ public:
     // Applies a change of many declarations as a whole or, when it throws, not at all.
     void change(const std::function<void(Declarations&)>& change);
     bool any() const { return any_.load(std::memory_order_acquire); }
-    // Null for a class that is not declared.
-    std::shared_ptr<const DeclaredClass> find(std::string_view name) const;
+    // Null for a class that is not declared. Valid as long as the broker: what is declared stays.
+    const DeclaredClass* find(std::string_view name) const;
     std::vector<std::string> names() const;
     std::vector<QualifierType> qualifierTypes() const;
     bool isA(std::string_view className, std::string_view ancestor) const;
 
 private:
     std::mutex changing_; // held by who changes the declarations, while others read on
-    mutable std::shared_mutex mutex_;
+    mutable ShardedMutex mutex_;
     Declarations declarations_;
     std::atomic<bool> any_{false};
 };
+
+// A NULL of its type for each property of a class.
+NamedValues nullValues(const DeclaredClass& declared);
 
 // What a slot hands out for a declared value; texts and arrays are the current owner's.
 CMPIData dataOf(Core& core, const DeclaredValue& declared);

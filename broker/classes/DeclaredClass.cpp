@@ -7,7 +7,8 @@
 namespace oxahv {
 
 const PropertyDeclaration* DeclaredClass::find(std::string_view property) const {
-    return named(properties, property);
+    const std::size_t index = propertyNames.find(property);
+    return index != Names::none ? &properties[index] : nullptr;
 }
 
 const MethodDeclaration* DeclaredClass::findMethod(std::string_view method) const {
@@ -43,27 +44,31 @@ bool isFirstOfName(const std::vector<Declaration>& declarations, std::size_t ind
     return named(declarations, declarations[index].name) == &declarations[index];
 }
 
-// Adds a class's own property to the inherited ones; a redeclaration may make it a key.
-void addProperty(DeclaredClass& declared, const ClassDeclaration& declaration, std::size_t index) {
+// Adds a class's own property to the inherited ones; a redeclaration may make it a key. `own` has the names
+// of the declaration's properties so far.
+void addProperty(DeclaredClass& declared, const ClassDeclaration& declaration, std::size_t index,
+                 Names& own) {
     PropertyDeclaration property = declaration.properties()[index];
     const std::string what = "class " + declared.name + ": property " + property.name;
-    if (!isFirstOfName(declaration.properties(), index)) {
+    if (own.find(property.name) != Names::none) {
         throw DeclarationError(what + " stands twice", Part::property, index);
     }
+    own.add(property.name);
     property.isKey = property.isKey || property.qualifiers.isTrue("Key");
-    for (PropertyDeclaration& inherited : declared.properties) {
-        if (sameName(inherited.name, property.name)) {
-            requireSameType(what, inherited.type, property.type, Part::property, index);
-            property.isKey = property.isKey || inherited.isKey;
-            if (property.defaultValue.type == CMPI_null) {
-                property.defaultValue = inherited.defaultValue;
-            }
-            property.qualifiers = property.qualifiers.over(inherited.qualifiers);
-            inherited = std::move(property);
-            return;
-        }
+    const std::size_t inheritedIndex = declared.propertyNames.find(property.name);
+    if (inheritedIndex == Names::none) {
+        declared.propertyNames.add(property.name);
+        declared.properties.push_back(std::move(property));
+        return;
     }
-    declared.properties.push_back(std::move(property));
+    PropertyDeclaration& inherited = declared.properties[inheritedIndex];
+    requireSameType(what, inherited.type, property.type, Part::property, index);
+    property.isKey = property.isKey || inherited.isKey;
+    if (property.defaultValue.type == CMPI_null) {
+        property.defaultValue = inherited.defaultValue;
+    }
+    property.qualifiers = property.qualifiers.over(inherited.qualifiers);
+    inherited = std::move(property);
 }
 
 // The qualifiers of a method and its parameters over those of the method that it overrides.
@@ -150,6 +155,7 @@ void inherit(DeclaredClass& declared) {
     declared.properties = superclass.properties;
     for (PropertyDeclaration& property : declared.properties) {
         property.qualifiers = Qualifiers().over(property.qualifiers);
+        declared.propertyNames.add(property.name);
     }
     for (const auto& method : superclass.methods) {
         declared.methods.push_back(inheritedMethod(method));
@@ -166,8 +172,7 @@ void Declarations::declare(const ClassDeclaration& declaration) {
     if (declaration.name().empty()) {
         throw DeclarationError("a class needs a name", Part::name);
     }
-    const std::string key = foldedName(declaration.name());
-    if (classes_.count(key) != 0) {
+    if (classes_.count(declaration.name()) != 0) {
         throw DeclarationError("class " + declaration.name() + " is declared already", Part::name);
     }
     auto declared = std::make_shared<DeclaredClass>();
@@ -182,33 +187,34 @@ void Declarations::declare(const ClassDeclaration& declaration) {
         }
         inherit(*declared);
     }
+    Names ownProperties;
     for (std::size_t i = 0; i < declaration.properties().size(); ++i) {
-        addProperty(*declared, declaration, i);
+        addProperty(*declared, declaration, i, ownProperties);
     }
     for (std::size_t i = 0; i < declaration.methods().size(); ++i) {
         addMethod(*declared, declaration, i);
     }
-    classes_.emplace(key, std::move(declared));
+    classes_.emplace(declaration.name(), std::move(declared));
 }
 
 void Declarations::declare(QualifierType type) {
-    qualifiers_[foldedName(type.implied.name)] = std::move(type);
+    qualifiers_.insert_or_assign(type.implied.name, std::move(type));
 }
 
 std::shared_ptr<const DeclaredClass> Declarations::find(std::string_view name) const {
-    const auto found = classes_.find(foldedName(name));
+    const auto found = classes_.find(name);
     return found != classes_.end() ? found->second : nullptr;
 }
 
 const QualifierType* Declarations::findQualifier(std::string_view name) const {
-    const auto found = qualifiers_.find(foldedName(name));
+    const auto found = qualifiers_.find(name);
     return found != qualifiers_.end() ? &found->second : nullptr;
 }
 
 std::vector<std::string> Declarations::classNames() const {
     std::vector<std::string> names;
-    for (const auto& [folded, declared] : classes_) {
-        names.push_back(declared->name);
+    for (const auto& [name, declared] : classes_) {
+        names.push_back(name);
     }
     return names;
 }

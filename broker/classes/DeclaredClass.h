@@ -1,7 +1,7 @@
 // Declared classes as the broker looks them up: each complete with what it inherits.
 #pragma once
 
-#include "objects/Object.h"
+#include "objects/NamedValues.h"
 
 #include <map>
 #include <memory>
@@ -18,6 +18,7 @@ struct DeclaredClass {
     std::size_t depth = 0; // how many superclasses it has in all
     Qualifiers qualifiers;
     std::vector<PropertyDeclaration> properties;
+    Names propertyNames;                                           // in the order of the properties
     std::vector<std::shared_ptr<const MethodDeclaration>> methods; // subclasses share what they inherit
 
     const PropertyDeclaration* find(std::string_view property) const;
@@ -66,9 +67,8 @@ public:
     bool anyClass() const { return !classes_.empty(); }
 
 private:
-    // By folded name.
-    std::map<std::string, std::shared_ptr<const DeclaredClass>> classes_;
-    std::map<std::string, QualifierType> qualifiers_;
+    std::map<std::string, std::shared_ptr<const DeclaredClass>, encoding::NameLess> classes_;
+    std::map<std::string, QualifierType, encoding::NameLess> qualifiers_;
 };
 
 // A type as a declaration writes it, "uint8[]" for an array.

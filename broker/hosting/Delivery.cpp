@@ -44,32 +44,28 @@ void change(ObjectPath& path, KeyMode mode, const PathDelivery& delivery) {
         path.hostName = delivery.hostName;
     }
     if (delivery.reversesKeys) {
-        std::reverse(path.keys.begin(), path.keys.end());
+        path.keys.reverse();
     }
-    for (NamedValue& key : path.keys) {
-        if (delivery.changesCase) {
-            key.name = otherCase(std::move(key.name));
+    path.keys.rebuild([&](NamedValues& changed, const NamedValue& key) {
+        Value value = key.value;
+        if (!value.isNull() && value.type() == CMPI_ref) {
+            change(*ObjectPath::of(value.data().value.ref), mode, delivery);
+        } else if (!value.isNull()) {
+            changeKey(path.core(), value, mode);
         }
-        if (key.value.isNull()) {
-            continue;
-        }
-        if (key.value.type() == CMPI_ref) {
-            change(*ObjectPath::of(key.value.data().value.ref), mode, delivery);
-        } else {
-            changeKey(path.core(), key.value, mode);
-        }
-    }
+        changed.set(delivery.changesCase ? otherCase(key.name) : key.name, std::move(value));
+    });
 }
 
 } // namespace
 
 void Delivery::setPathDelivery(PathDelivery pathDelivery) {
-    const std::unique_lock<std::shared_mutex> lock(mutex_);
+    const std::unique_lock<ShardedMutex> lock(mutex_);
     std::swap(pathDelivery_, pathDelivery);
 }
 
 PathDelivery Delivery::pathDelivery() const {
-    const std::shared_lock<std::shared_mutex> lock(mutex_);
+    const std::shared_lock<ShardedMutex> lock(mutex_);
     return pathDelivery_;
 }
 

@@ -3,6 +3,7 @@
 #pragma once
 
 #include "EmbeddedBroker.h"
+#include "objects/Shards.h"
 
 #include <atomic>
 #include <shared_mutex>
@@ -21,7 +22,7 @@ private:
     PathDelivery pathDelivery() const;
 
     std::atomic<KeyMode> keyMode_{KeyMode::exact};
-    mutable std::shared_mutex mutex_;
+    mutable ShardedMutex mutex_;
     PathDelivery pathDelivery_;
 };
 

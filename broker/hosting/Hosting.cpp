@@ -27,9 +27,9 @@ Reply unserved(CMPIrc code, std::string message) {
 // How much an answer says: of several, the first of those that say most counts.
 enum class Weight { none, refusal, notFound, success, failure };
 
-Weight weightOf(const Reply& reply) {
-    const bool isEmpty = reply.instances.empty() && reply.objectPaths.empty();
-    if (reply.ok() || !isEmpty) {
+Weight weightOf(const Result& answer) {
+    const Reply& reply = answer.reply;
+    if (reply.ok() || answer.count > 0) {
         return reply.ok() ? Weight::success : Weight::failure;
     }
     switch (reply.code) {
@@ -54,13 +54,14 @@ public:
     explicit Answers(Reply unserved) : reply_(std::move(unserved)) {}
 
     Weight weight() const { return weight_; }
-    std::size_t results() const { return reply_.instances.size() + reply_.objectPaths.size(); }
+    std::size_t results() const { return results_; }
     Reply take() { return std::move(reply_); }
 
-    void add(const HostedProvider& provider, const Reply& answer) {
-        const Weight weight = weightOf(answer);
-        reply_.answers.push_back({provider.name(), answer.code, answer.message,
-                                  answer.instances.size() + answer.objectPaths.size()});
+    void add(const HostedProvider& provider, const Result& result) {
+        const Reply& answer = result.reply;
+        const Weight weight = weightOf(result);
+        results_ += result.count;
+        reply_.answers.push_back({provider.name(), answer.code, answer.message, result.count});
         append(reply_.instances, answer.instances);
         append(reply_.objectPaths, answer.objectPaths);
         append(reply_.data, answer.data);
@@ -79,6 +80,7 @@ public:
 private:
     Reply reply_;
     Weight weight_ = Weight::none;
+    std::size_t results_ = 0;
 };
 
 // What the thread is inside of. A provider that calls up for a class of another may be the only one that is
@@ -139,7 +141,7 @@ Hosting::~Hosting() { // NOLINT(bugprone-exception-escape): nothing that it name
 
 // The provider leaves the list under the lock, but ends without it: its cleanup may send requests.
 std::shared_ptr<HostedProvider> Hosting::take(const std::string& name) {
-    const std::unique_lock<std::shared_mutex> lock(mutex_);
+    const std::unique_lock<ShardedMutex> lock(mutex_);
     const auto found = std::find_if(providers_.begin(), providers_.end(),
                                     [&](const auto& provider) { return provider->name() == name; });
     if (found == providers_.end()) {
@@ -151,7 +153,7 @@ std::shared_ptr<HostedProvider> Hosting::take(const std::string& name) {
 }
 
 void Hosting::requireFreeName(const std::string& name) const {
-    const std::shared_lock<std::shared_mutex> lock(mutex_);
+    const std::shared_lock<ShardedMutex> lock(mutex_);
     requireFreeNameLocked(name);
 }
 
@@ -164,7 +166,7 @@ void Hosting::requireFreeNameLocked(const std::string& name) const {
 }
 
 void Hosting::add(std::shared_ptr<HostedProvider> provider) {
-    const std::unique_lock<std::shared_mutex> lock(mutex_);
+    const std::unique_lock<ShardedMutex> lock(mutex_);
     requireFreeNameLocked(provider->name()); // another thread may have been faster
     providers_.push_back(std::move(provider));
 }
@@ -194,7 +196,7 @@ void Hosting::unload(const std::string& name) {
 
 template <class Predicate>
 Hosting::Providers Hosting::providersThat(const Predicate& match) const {
-    const std::shared_lock<std::shared_mutex> lock(mutex_);
+    const std::shared_lock<ShardedMutex> lock(mutex_);
     Providers found;
     std::copy_if(providers_.begin(), providers_.end(), std::back_inserter(found),
                  [&](const auto& provider) { return match(*provider); });
@@ -232,12 +234,9 @@ Hosting::Providers Hosting::findForIndications(const std::string& className) con
     });
 }
 
-// Has a provider serve a request.
-Reply Hosting::ask(const HostedProvider& provider, const CMPIContext* context, const CMPIObjectPath* path,
-                   const Operation& operation, const Progress& progress) const {
-    Result result(core_, Owner::current(core_));
-    result.progress = progress.handler;
-    result.earlier = progress.results;
+// Has a provider serve a request; its results and its status come to be the reply of `result`.
+void Hosting::ask(const HostedProvider& provider, const CMPIContext* context, const CMPIObjectPath* path,
+                  const Operation& operation, Result& result) const {
     const CMPIObjectPath* const delivered = core_.delivery.deliver(path);
     const Outcome outcome =
         callProvider([&] { return operation.call(provider, context, &result, delivered); });
@@ -246,7 +245,6 @@ Reply Hosting::ask(const HostedProvider& provider, const CMPIContext* context, c
         reply.code = outcome.code;
         reply.message = outcome.message.empty() ? reply.message : outcome.message;
     }
-    return std::move(reply);
 }
 
 Reply Hosting::serve(const CMPIContext* context, const CMPIObjectPath* handle, const Operation& operation) {
@@ -262,7 +260,7 @@ Reply Hosting::serve(const CMPIContext* context, const CMPIObjectPath* handle, c
         return refused(CMPI_RC_ERR_FAILED, "requests are nested " + std::to_string(Ongoing::deepest) +
                                                " deep; the last is for class " + path->className);
     }
-    const std::function<void(std::size_t)>* const progress = std::exchange(own->progress, nullptr);
+    const Receiver* const receiver = std::exchange(own->receiver, nullptr);
     Answers answers(
         unserved(CMPI_RC_ERR_NOT_SUPPORTED, "no provider serves this for class " + path->className));
     for (const std::shared_ptr<HostedProvider>& provider : find(*path, operation)) {
@@ -270,7 +268,11 @@ Reply Hosting::serve(const CMPIContext* context, const CMPIObjectPath* handle, c
             continue;
         }
         const Ongoing ongoing(provider.get(), typeid(operation), path->className);
-        answers.add(*provider, ask(*provider, context, handle, operation, {progress, answers.results()}));
+        const Exposed<Result> result(new Result(core_, Owner::current(core_)));
+        result->receiver = receiver;
+        result->earlier = answers.results();
+        ask(*provider, context, handle, operation, *result);
+        answers.add(*provider, *result);
         // Associations may be of several providers; an instance is of one.
         if (!operation.isAlongAssociations() && answers.weight() > Weight::refusal) {
             break;

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "hosting/Operations.h"
+#include "objects/Shards.h"
 
 #include <functional>
 #include <memory>
@@ -46,15 +47,10 @@ public:
     static Reply refused(CMPIrc code, std::string message = {});
 
 private:
-    // Who wants to know of a request's results, and how many have come before.
-    struct Progress {
-        const std::function<void(std::size_t)>* handler;
-        std::size_t results;
-    };
 
     Reply serve(const CMPIContext* context, const CMPIObjectPath* handle, const Operation& operation);
-    Reply ask(const HostedProvider& provider, const CMPIContext* context, const CMPIObjectPath* path,
-              const Operation& operation, const Progress& progress) const;
+    void ask(const HostedProvider& provider, const CMPIContext* context, const CMPIObjectPath* path,
+             const Operation& operation, Result& result) const;
     template <class Predicate>
     Providers providersThat(const Predicate& match) const;
     Reply modifyProperty(const CMPIContext* context, const CMPIObjectPath* path, const char* name,
@@ -67,7 +63,7 @@ private:
     void requireFreeNameLocked(const std::string& name) const;
 
     Core& core_;
-    mutable std::shared_mutex mutex_;
+    mutable ShardedMutex mutex_;
     Providers providers_;
 };
 

@@ -213,6 +213,13 @@ public:
     void startRecording();
     /** Ends recording and returns the calls in order. */
     std::vector<Call> stopRecording();
+    /**
+     * The uses of dead objects and texts since the last call, in order; at most the first 1,000 of them. The
+     * broker knows an object by its memory, which it keeps for a while after the object's death: on each
+     * thread until some 4,000 others have died there or their memory exceeds 1 MiB. A text is known by the
+     * address that `getCharPtr` returned.
+     */
+    std::vector<Misuse> takeMisuses();
     /** Counts of the objects that are alive now. */
     LiveObjects liveObjects() const;
     /**

@@ -52,6 +52,12 @@ struct Reply {
     bool ok() const { return code == CMPI_RC_OK; }
 };
 
+/** Gets an instance that a request yields. The instance, and what the handler makes in the broker on this
+ * thread, are freed when it returns. What it throws, the provider gets as `CMPI_RC_ERR_FAILED`. */
+using InstanceHandler = std::function<void(const CMPIInstance* instance)>;
+/** The same for an object path. */
+using PathHandler = std::function<void(const CMPIObjectPath* path)>;
+
 /** Filters of an association request; an empty text is no filter. */
 struct AssociationFilter {
     std::string associationClass; ///< only by associations of this class; for references: not looked at
@@ -188,6 +194,38 @@ public:
      * @param value its new value, such as valueFromText makes; of another type than is declared it answers
      * `CMPI_RC_ERR_TYPE_MISMATCH`. */
     Reply setProperty(const CMPIObjectPath* path, const std::string& name, const CMPIData& value);
+    /** @} */
+
+    /** @name Operations whose results are handed on
+     * The same operations for any number of results: each result goes to a handler as soon as the provider
+     * returns it, on the thread that returned it, and is freed then; the reply has the status alone. So
+     * memory does not grow with their number, even where the provider releases nothing: an instance, path,
+     * string, array or date/time that it made after its first result, and that it has not used again in the
+     * meantime, is freed a thousand results later. Whoever uses it after that gets
+     * `CMPI_RC_ERR_INVALID_HANDLE`. What the provider has looked into stays until the request ends.
+     * @param handler gets the results; null: they are in the reply.
+     */
+    /** @{ */
+    /** All instances of a class. */
+    Reply enumerateInstances(const CMPIObjectPath* classPath, const std::vector<std::string>* properties,
+                             const InstanceHandler& handler);
+    /** The paths of all instances of a class. */
+    Reply enumerateInstanceNames(const CMPIObjectPath* classPath, const PathHandler& handler);
+    /** The instances that a query selects. */
+    Reply execQuery(const CMPIObjectPath* classPath, const std::string& query, const std::string& language,
+                    const InstanceHandler& handler);
+    /** The instances at the other ends of associations. */
+    Reply associators(const CMPIObjectPath* path, const AssociationFilter& filter,
+                      const std::vector<std::string>* properties, const InstanceHandler& handler);
+    /** The paths of the instances at the other ends. */
+    Reply associatorNames(const CMPIObjectPath* path, const AssociationFilter& filter,
+                          const PathHandler& handler);
+    /** The associations themselves. */
+    Reply references(const CMPIObjectPath* path, const AssociationFilter& filter,
+                     const std::vector<std::string>* properties, const InstanceHandler& handler);
+    /** The paths of the associations themselves. */
+    Reply referenceNames(const CMPIObjectPath* path, const AssociationFilter& filter,
+                         const PathHandler& handler);
     /** @} */
 
     /**

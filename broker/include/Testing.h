@@ -92,6 +92,16 @@ struct LiveObjects {
     }
 };
 
+/**
+ * One use of what had died before: of an object after its release, its request or the object that it was part
+ * of, or of a text after its string. The slot did nothing and answered `CMPI_RC_ERR_INVALID_HANDLE`.
+ */
+struct Misuse {
+    std::string slot;       ///< table and member, for example "CMPIInstanceFT.setProperty"
+    const void* handle;     ///< the dead object's handle, or the text's address
+    std::thread::id thread; ///< the calling thread
+};
+
 /** A message or trace that a provider wrote through the broker's `logMessage` and `trace` slots, or a message
  * of the broker's about a provider: an exception has left its `cleanup`. */
 struct BrokerMessage {

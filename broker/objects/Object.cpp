@@ -22,48 +22,98 @@ Owner::~Owner() {
     end();
 }
 
+void bury(Object* object) noexcept {
+    object->core().quarantine.bury(object);
+}
+
 void Owner::end() {
-    while (newest_ != nullptr) {
-        release(*newest_);
+    Object* object = nullptr;
+    {
+        const std::lock_guard<std::mutex> lock(mutex_);
+        object = std::exchange(newest_, nullptr);
+        oldest_ = nullptr;
+        lastKept_ = nullptr;
+        for (Object* one = object; one != nullptr; one = one->older_) {
+            one->owner_ = nullptr;
+        }
     }
+    buryAll(object);
     core_.store(nullptr, std::memory_order_relaxed);
+}
+
+// The object and the older ones in its list.
+void Owner::buryAll(Object* object) {
+    while (object != nullptr) {
+        bury(std::exchange(object, object->older_));
+    }
 }
 
 void Owner::adopt(std::unique_ptr<Object> object) {
     const std::lock_guard<std::mutex> lock(mutex_);
     Object* const given = object.release();
     given->owner_ = this;
+    given->madeAt_ = results();
     given->older_ = newest_;
-    if (newest_ != nullptr) {
-        newest_->newer_ = given;
-    }
+    (newest_ != nullptr ? newest_->newer_ : oldest_) = given;
     newest_ = given;
 }
 
 void Owner::unlink(Object& object) {
     (object.newer_ != nullptr ? object.newer_->older_ : newest_) = object.older_;
-    if (object.older_ != nullptr) {
-        object.older_->newer_ = object.newer_;
-    }
+    (object.older_ != nullptr ? object.older_->newer_ : oldest_) = object.newer_;
+    lastKept_ = lastKept_ == &object ? object.older_ : lastKept_;
     object.owner_ = nullptr;
     object.newer_ = nullptr;
     object.older_ = nullptr;
 }
 
-std::unique_ptr<Object> Owner::release(Object& object) {
-    const std::lock_guard<std::mutex> lock(mutex_);
-    unlink(object);
-    return std::unique_ptr<Object>(&object);
+void Owner::release(Object& object) {
+    {
+        const std::lock_guard<std::mutex> lock(mutex_);
+        unlink(object);
+    }
+    bury(&object);
 }
 
 void Owner::freeSince(const Object& mark) {
-    Owner doomed(*core_); // frees outside the lock
+    Object* doomed = nullptr;
     const std::lock_guard<std::mutex> lock(mutex_);
-    for (bool reached = false; !reached && newest_ != nullptr;) {
-        Object& object = *newest_;
-        reached = &object == &mark;
-        unlink(object);
-        doomed.adopt(std::unique_ptr<Object>(&object));
+    for (bool isReached = false; !isReached;) {
+        Object* const object = newest_;
+        isReached = object == &mark;
+        unlink(*object);
+        object->older_ = doomed;
+        doomed = object;
+    }
+    buryAll(doomed); // their ends come back to no owner
+}
+
+namespace {
+
+// Whether a provider makes such objects for each of its results, and uses them by their handles alone.
+bool isOfOneResult(Kind kind) {
+    return kind == Kind::instance || kind == Kind::objectPath || kind == Kind::array ||
+           kind == Kind::dateTime || kind == Kind::string;
+}
+
+} // namespace
+
+void Owner::countResult() {
+    constexpr unsigned int window = 1000;
+    const std::lock_guard<std::mutex> lock(mutex_);
+    if (results_.fetch_add(1, std::memory_order_relaxed) == 0) {
+        lastKept_ = newest_;
+    }
+    Object* object = lastKept_ != nullptr ? lastKept_->newer_ : oldest_;
+    while (object != nullptr && results() - object->madeAt_ > window) {
+        Object* const next = object->newer_;
+        if (isOfOneResult(object->kind()) && !object->isKept()) {
+            unlink(*object);
+            bury(object);
+        } else {
+            lastKept_ = object;
+        }
+        object = next;
     }
 }
 

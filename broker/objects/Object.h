@@ -12,6 +12,7 @@
 #include <mutex>
 #include <string>
 #include <string_view>
+#include <utility>
 
 namespace oxahv {
 
@@ -38,7 +39,7 @@ inline void passOnTheEndOfAThread() {
 using encoding::foldedName;
 using encoding::sameName;
 
-enum class Kind {
+enum class Kind : unsigned char {
     instance,
     objectPath,
     arguments,
@@ -66,18 +67,37 @@ public:
     Kind kind() const { return kind_; }
     // The owner that frees this object; null while it is part of another object.
     Owner* owner() const { return owner_; }
+    // Notes a use by a handle.
+    inline void touch() const;
+    // Notes that a caller has got something of it which he can use without its handle.
+    void keep() const { isKept_.store(true, std::memory_order_relaxed); }
+    bool isKept() const { return isKept_.load(std::memory_order_relaxed); }
     virtual std::unique_ptr<Object> clone() const = 0;
     // The CMPI record, as a handle of any kind.
     virtual void* record() = 0;
+    // How many bytes of memory it is in.
+    virtual std::size_t size() const = 0;
 
 private:
     friend class Owner;
     Core& core_;
     Kind kind_;
+    mutable std::atomic<bool> isKept_{false}; // whether it stays when its owner looks for what is done with
+    unsigned int madeAt_ = 0;                 // how many results the owner had counted
     Owner* owner_ = nullptr;
     Object* newer_ = nullptr; // the owner's list
     Object* older_ = nullptr;
 };
+
+// Ends an object of which somebody may still have a handle.
+void bury(Object* object) noexcept;
+
+struct Burial {
+    void operator()(Object* object) const noexcept { bury(object); }
+};
+// Owns an object whose handle others get.
+template <class Class>
+using Exposed = std::unique_ptr<Class, Burial>;
 
 // Frees its objects when it dies: a request's, an attached thread's, or the broker's.
 class Owner {
@@ -89,9 +109,14 @@ public:
 
     bool isOf(const Core& core) const { return core_.load(std::memory_order_relaxed) == &core; }
     void adopt(std::unique_ptr<Object> object);
-    std::unique_ptr<Object> release(Object& object);
+    void release(Object& object);
     // Frees what was adopted after `mark`, and `mark` itself.
     void freeSince(const Object& mark);
+    // Counts a result that has been handed on at once. From the first one on, an object that a provider makes
+    // for one result, and has done with, is freed long before the request ends: what belongs to the last
+    // results stays, and so does all that was there before the first one or is used again and again.
+    void countResult();
+    unsigned int results() const { return results_.load(std::memory_order_relaxed); }
     // Frees all objects, and belongs to no broker from then on: the broker dies before its owner does.
     void end();
 
@@ -115,13 +140,24 @@ private:
     void enter();
     void leave();
     void unlink(Object& object);
+    static void buryAll(Object* object);
 
     // Atomic, since a thread looks through its owners while a broker of one of them may die.
     std::atomic<Core*> core_;
     std::mutex mutex_;
     Object* newest_ = nullptr;
+    Object* oldest_ = nullptr;
+    Object* lastKept_ = nullptr; // this and the older ones stay to the end; null: none has been looked at
+    std::atomic<unsigned int> results_{0};
     Owner* outer_ = nullptr;
 };
+
+void Object::touch() const {
+    constexpr unsigned int soon = 100;
+    if (owner_ != nullptr && owner_->results() - madeAt_ > soon) {
+        keep();
+    }
+}
 
 // Gives a new object to the current owner of the thread and hands out its record.
 template <class Class>

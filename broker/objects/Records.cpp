@@ -9,24 +9,31 @@
 
 namespace oxahv {
 
-Object* objectOf(const void* handle) {
+// What every record begins with. The records are types of their own, so their bytes are copied: reading them
+// all through one structure would break the aliasing rule.
+struct RecordHead {
+    void* object;
+    const void* table;
+};
+
+static RecordHead headOf(const void* handle) {
+    RecordHead head{};
+    std::memcpy(&head, handle, sizeof head);
+    return head;
+}
+
+bool isRecord(const void* handle) {
     static const void* const tables[] = {
         &String::table,          &Array::table,        &DateTime::table,   &Arguments::table,
         &Context::table,         &Enumeration::table,  &ObjectPath::table, &Instance::table,
         &Result::table,          &PropertyList::table, &Error::table,      &SelectExpression::table,
         &SelectCondition::table, &SubCondition::table, &Predicate::table};
-    if (handle == nullptr) {
-        return nullptr;
-    }
-    // Every record begins with a handle and a table. The records are types of their own, so their bytes are
-    // copied: reading them all through one structure would break the aliasing rule.
-    struct {
-        void* object;
-        const void* table;
-    } record;
-    std::memcpy(&record, handle, sizeof record);
-    const bool isOurs = std::find(std::begin(tables), std::end(tables), record.table) != std::end(tables);
-    return isOurs ? static_cast<Object*>(record.object) : nullptr;
+    return std::find(std::begin(tables), std::end(tables), headOf(handle).table) != std::end(tables);
+}
+
+Object* objectOf(const void* handle) {
+    const bool isAlive = handle != nullptr && isRecord(handle) && Quarantine::of(handle) == nullptr;
+    return isAlive ? static_cast<Object*>(headOf(handle).object) : nullptr;
 }
 
 Array::Array(Core& core, CMPIType type, std::size_t size)
@@ -74,14 +81,35 @@ std::unique_ptr<Object> Instance::clone() const {
 
 void ObjectPath::declareKeys() {
     const auto declared = core().classes.find(className);
-    for (NamedValue& key : keys) {
+    const auto declaredType = [&](const NamedValue& key) {
         const PropertyDeclaration* const property = declared != nullptr ? declared->find(key.name) : nullptr;
-        key.value = key.value.asProperty(property != nullptr ? property->type : CMPIType{CMPI_null});
+        return property != nullptr ? property->type : CMPIType{CMPI_null};
+    };
+    bool isAsDeclared = true; // most are: then there is nothing to make anew
+    for (const NamedValue& key : keys) {
+        const CMPIType type = declaredType(key);
+        isAsDeclared =
+            isAsDeclared && key.value.type() != CMPI_chars && (type == CMPI_null || type == key.value.type());
     }
+    if (!isAsDeclared) {
+        keys.rebuild([&](NamedValues& changed, const NamedValue& key) {
+            changed.set(key.name, key.value.asProperty(declaredType(key)));
+        });
+    }
+}
+
+const DeclaredClass* Instance::declaredClass() const {
+    const DeclaredClass* declared = declared_.load(std::memory_order_relaxed);
+    if (declared == nullptr) {
+        declared = core().classes.find(path->className);
+        declared_.store(declared, std::memory_order_relaxed);
+    }
+    return declared;
 }
 
 void Instance::setPath(std::unique_ptr<ObjectPath> newPath) {
     path = std::move(newPath);
+    declared_.store(nullptr, std::memory_order_relaxed);
     path->declareKeys();
     if (core().newInstances.load(std::memory_order_relaxed) == NewInstances::full) {
         for (const NamedValue& key : path->keys) {
@@ -92,7 +120,7 @@ void Instance::setPath(std::unique_ptr<ObjectPath> newPath) {
 
 bool Instance::isKey(const DeclaredClass* declared, std::string_view name) const {
     const PropertyDeclaration* const property = declared != nullptr ? declared->find(name) : nullptr;
-    return property != nullptr ? property->isKey : path->keys.find(name) != nullptr;
+    return property != nullptr ? property->isKey : path->keys.find(name).has_value();
 }
 
 bool Instance::passesFilter(const DeclaredClass* declared, std::string_view name) const {
@@ -104,8 +132,38 @@ bool Instance::passesFilter(const DeclaredClass* declared, std::string_view name
 void Instance::setFilter(std::vector<std::string> names) {
     filter = std::move(names);
     isFiltered = true;
-    const auto declared = core().classes.find(path->className);
-    properties.keepOnly([&](const std::string& name) { return passesFilter(declared.get(), name); });
+    const DeclaredClass* const declared = declaredClass();
+    properties.keepOnly([&](const std::string& name) { return passesFilter(declared, name); });
+}
+
+// A handler's own objects die with the result that it is called for.
+template <class Class, class Handle>
+void Result::add(Exposed<Class> copy, std::vector<Handle*>& kept,
+                 const std::function<void(const Handle*)>* handler) {
+    ++count;
+    if (handler != nullptr && *handler) {
+        Owner own(core());
+        const Owner::Scope scope(own);
+        (*handler)(copy.get());
+        keeper.countResult();
+    } else {
+        kept.push_back(copy.get());
+        keeper.adopt(std::unique_ptr<Object>(copy.release()));
+    }
+    if (receiver != nullptr && receiver->progress) {
+        receiver->progress(earlier + count);
+    }
+}
+
+void Result::add(const Instance& instance) {
+    add(Exposed<Instance>(static_cast<Instance*>(instance.clone().release())), reply.instances,
+        receiver != nullptr ? &receiver->instances : nullptr);
+}
+
+void Result::add(const ObjectPath& path) {
+    Exposed<ObjectPath> copy(path.copy().release());
+    copy->declareKeys();
+    add(std::move(copy), reply.objectPaths, receiver != nullptr ? &receiver->paths : nullptr);
 }
 
 PropertyList::PropertyList(Core& core, std::vector<std::string> list)

@@ -3,8 +3,9 @@
 // a handle.
 #pragma once
 
-#include "objects/Value.h"
+#include "objects/NamedValues.h"
 
+#include <atomic>
 #include <functional>
 #include <memory>
 #include <string>
@@ -22,14 +23,24 @@ public:
     explicit RecordedObject(Core& core)
         : Object(core, objectKind), Record{static_cast<Object*>(this), &Derived::table} {}
     void* record() override { return static_cast<Record*>(this); }
+    std::size_t size() const override { return sizeof(Derived); }
 
-    // The object of a handle; null for a null handle and for one of another kind.
+    // The object of a handle; null for a null handle, for one of another kind, and for one of an object that
+    // has died.
     static Derived* of(const Record* handle) {
-        return handle != nullptr && handle->ft == &Derived::table
-                   ? static_cast<Derived*>(const_cast<Record*>(handle))
-                   : nullptr;
+        if (handle == nullptr || handle->ft != &Derived::table) {
+            return nullptr;
+        }
+        auto* const object = static_cast<Derived*>(const_cast<Record*>(handle));
+        if (handle->hdl != static_cast<Object*>(object)) {
+            return nullptr;
+        }
+        object->touch();
+        return object;
     }
 };
+
+struct DeclaredClass;
 
 class String : public RecordedObject<CMPIString, Kind::string, String> {
 public:
@@ -74,6 +85,13 @@ public:
     NamedValues values;
 };
 
+// Who gets the results of a request while it runs. Empty functions get none.
+struct Receiver {
+    std::function<void(std::size_t)> progress; // their number
+    InstanceHandler instances;
+    PathHandler paths;
+};
+
 class Context : public RecordedObject<CMPIContext, Kind::context, Context> {
 public:
     static const CMPIContextFT table;
@@ -82,9 +100,9 @@ public:
     std::unique_ptr<Object> clone() const override;
 
     NamedValues values;
-    // Who wants to know of the results of the request that begins next; null for nobody. Upcalls, which come
+    // Who wants to have the results of the request that begins next; null for nobody. Upcalls, which come
     // under the same context, find it taken.
-    const std::function<void(std::size_t)>* progress = nullptr;
+    const Receiver* receiver = nullptr;
 };
 
 class Enumeration : public RecordedObject<CMPIEnumeration, Kind::enumeration, Enumeration> {
@@ -130,13 +148,19 @@ public:
     bool isKey(const DeclaredClass* declared, std::string_view name) const;
     bool passesFilter(const DeclaredClass* declared, std::string_view name) const;
 
+    // The declaration of its class; null where there is none.
+    const DeclaredClass* declaredClass() const;
+
     std::unique_ptr<ObjectPath> path;
     NamedValues properties;
     bool isFiltered = false;
     std::vector<std::string> filter; // the names that a property filter lets through
+
+private:
+    mutable std::atomic<const DeclaredClass*> declared_{nullptr}; // once it has been looked for
 };
 
-// Collects what a provider returns.
+// Collects what a provider returns, or hands it on at once.
 class Result : public RecordedObject<CMPIResult, Kind::result, Result> {
 public:
     static const CMPIResultFT table;
@@ -144,18 +168,20 @@ public:
     Result(Core& core, Owner& itsKeeper) : RecordedObject(core), keeper(itsKeeper) {}
     std::unique_ptr<Object> clone() const override { throw Failure{CMPI_RC_ERR_NOT_SUPPORTED}; }
 
-    // Says that one more has come.
-    void tellProgress() const {
-        if (progress != nullptr && *progress) {
-            (*progress)(earlier + reply.instances.size() + reply.objectPaths.size());
-        }
-    }
+    void add(const Instance& instance);
+    void add(const ObjectPath& path);
 
     // Owns what is returned: the provider may return it on a thread whose own objects die before the request.
     Owner& keeper;
     Reply reply;
-    const std::function<void(std::size_t)>* progress = nullptr;
+    const Receiver* receiver = nullptr;
     std::size_t earlier = 0; // results of providers that were asked before
+    std::size_t count = 0;   // of instances and object paths
+
+private:
+    template <class Class, class Handle>
+    void add(Exposed<Class> copy, std::vector<Handle*>& kept,
+             const std::function<void(const Handle*)>* handler);
 };
 
 class PropertyList : public RecordedObject<CMPIPropertyList, Kind::other, PropertyList> {
@@ -209,7 +235,9 @@ public:
     std::unique_ptr<Object> clone() const override { throw Failure{CMPI_RC_ERR_NOT_SUPPORTED}; }
 };
 
-// The object of a handle of any kind; null for what is none.
+// Whether a handle is a record of an object, living or dead.
+bool isRecord(const void* handle);
+// The object of a handle of any kind; null for what is none, and for one that has died.
 Object* objectOf(const void* handle);
 
 // Throws CMPI_RC_ERR_INVALID_PARAMETER where objects nest so deep that what copies them, on the stack, might

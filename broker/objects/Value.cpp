@@ -4,23 +4,24 @@
 
 #include <algorithm>
 #include <charconv>
+#include <cstring>
+#include <new>
 #include <optional>
 
 namespace oxahv {
 
 namespace {
 
-// A copy of the object in a value, null when there is none.
-std::unique_ptr<Object> objectIn(const void* handle) {
-    if (handle == nullptr) {
-        return nullptr;
-    }
+// The object in a value, null when there is none.
+const Object* objectIn(const void* handle) {
     const Object* const object = objectOf(handle);
-    if (object == nullptr) {
+    if (object == nullptr && handle != nullptr) {
         throw Failure{CMPI_RC_ERR_INVALID_HANDLE};
     }
-    requireShallow(*object);
-    return object->clone();
+    if (object != nullptr) {
+        requireShallow(*object);
+    }
+    return object;
 }
 
 // The object kind that a type's handles have.
@@ -107,14 +108,39 @@ CMPIValue memberOf(const CMPIValue* value, CMPIType type) {
     return result;
 }
 
-Value& Value::operator=(const Value& other) {
-    if (this != &other) {
-        object_ = other.object_ != nullptr ? other.object_->clone() : nullptr;
-        type_ = other.type_;
-        isNull_ = other.isNull_;
-        plain_ = other.plain_;
+Value::Value(const Value& other) : type_(other.type_), holds_(other.holds_), bits_(0) {
+    if (holds_ == Holds::text) {
+        new (&text_) SharedText(other.text_);
+    } else if (holds_ == Holds::object) {
+        object_ = other.object_->clone().release();
+    } else {
+        bits_ = other.bits_;
     }
-    return *this;
+}
+
+Value::~Value() {
+    if (holds_ == Holds::text) {
+        text_.~SharedText();
+    } else if (holds_ == Holds::object) {
+        bury(object_);
+    }
+}
+
+// Bytes may change places, whatever the values hold: each is a number or one pointer.
+void Value::swap(Value& other) noexcept {
+    static_assert(sizeof(SharedText) == sizeof bits_ && sizeof object_ == sizeof bits_);
+    std::swap(type_, other.type_);
+    std::swap(holds_, other.holds_);
+    unsigned char bytes[sizeof bits_];
+    std::memcpy(bytes, &bits_, sizeof bits_);
+    std::memcpy(static_cast<void*>(&bits_), &other.bits_, sizeof bits_);
+    std::memcpy(static_cast<void*>(&other.bits_), bytes, sizeof bits_);
+}
+
+CMPIValue Value::plain() const {
+    CMPIValue value = {};
+    value.uint64 = bits_;
+    return value;
 }
 
 CMPIType storedType(CMPIType type) {
@@ -132,16 +158,16 @@ Value Value::null(CMPIType type) {
 Value Value::number(const CMPIValue& value, CMPIType type) {
     Value result;
     result.type_ = type;
-    result.isNull_ = false;
-    result.plain_ = value;
+    result.holds_ = Holds::plain;
+    result.bits_ = value.uint64;
     return result;
 }
 
-Value Value::text(Core& core, std::string text, CMPIType type) {
+Value Value::text(Core& core, std::string_view text, CMPIType type) {
     Value result;
+    new (&result.text_) SharedText(core, text);
     result.type_ = type;
-    result.isNull_ = false;
-    result.object_ = std::make_unique<String>(core, std::move(text));
+    result.holds_ = Holds::text;
     return result;
 }
 
@@ -156,24 +182,27 @@ Value Value::from(Core& core, const CMPIValue* value, CMPIType type) {
         const CMPIValuePtr& pointer = value->dataPtr;
         return pointer.ptr == nullptr
                    ? null(CMPI_string)
-                   : text(core, std::string(static_cast<const char*>(pointer.ptr), pointer.length));
+                   : text(core, std::string_view(static_cast<const char*>(pointer.ptr), pointer.length));
     }
-    Value result;
-    result.type_ = storedType(type);
-    if (copyPlain(result.plain_, *value, type)) {
-        result.isNull_ = false;
-        return result;
+    CMPIValue plain = {};
+    if (copyPlain(plain, *value, type)) {
+        return number(plain, type);
+    }
+    if (const String* const string = type == CMPI_string ? String::of(value->string) : nullptr) {
+        return text(core, string->text);
     }
     const Kind kind = kindOf(type);
     if (kind == Kind::other) {
         throw Failure{CMPI_RC_ERR_INVALID_DATA_TYPE};
     }
-    result.object_ = objectIn(value->string); // all handles stand in the same place
-    result.isNull_ = result.object_ == nullptr;
-    if (!result.isNull_ &&
-        (result.object_->kind() != kind ||
-         (kind == Kind::array && static_cast<Array&>(*result.object_).type() != result.type_))) {
-        throw Failure{CMPI_RC_ERR_TYPE_MISMATCH};
+    Value result = null(type);
+    if (const Object* const object = objectIn(value->string)) { // all handles stand in the same place
+        if (object->kind() != kind ||
+            (kind == Kind::array && static_cast<const Array*>(object)->type() != result.type_)) {
+            throw Failure{CMPI_RC_ERR_TYPE_MISMATCH};
+        }
+        result.object_ = object->clone().release();
+        result.holds_ = Holds::object;
     }
     return result;
 }
@@ -181,7 +210,7 @@ Value Value::from(Core& core, const CMPIValue* value, CMPIType type) {
 WideInteger Value::integer() const {
     const IntegerType& type = *integerType(type_);
     const unsigned int unused = 64U - type.bits;
-    const unsigned long long low = plain_.uint64 << unused;
+    const unsigned long long low = bits_ << unused;
     if (!type.isSigned) {
         return {low >> unused, false};
     }
@@ -194,16 +223,16 @@ Value Value::asProperty(CMPIType declared) const {
     Value result = *this;
     result.type_ = storedType(type_);
     const IntegerType* const wanted = integerType(declared);
-    if (isNull_ || wanted == nullptr) {
+    if (isNull() || wanted == nullptr) {
         return result;
     }
     std::optional<WideInteger> number;
     if (type_ == CMPI_sint64 && declared == CMPI_uint64) {
-        number = {plain_.uint64, false}; // the bits are those of a number that did not fit
+        number = {bits_, false}; // the bits are those of a number that did not fit
     } else if (type_ == CMPI_sint64 || type_ == CMPI_uint64) {
         number = integer();
     } else if (result.type_ == CMPI_string) {
-        number = decimal(static_cast<String&>(*object_).text);
+        number = decimal(text_.view());
     }
     if (number && wanted->holds(number->magnitude, number->isNegative)) {
         CMPIValue value = {};
@@ -214,38 +243,26 @@ Value Value::asProperty(CMPIType declared) const {
 }
 
 CMPIData Value::data(CMPIValueState state) const {
-    CMPIData result = {type_, state, plain_};
-    if (isNull_) {
+    CMPIData result = {type_, state, {}};
+    switch (holds_) {
+    case Holds::nothing:
         result.state = static_cast<CMPIValueState>(state | CMPI_nullValue);
-    } else if (type_ == CMPI_chars) {
-        result.value.chars = static_cast<String&>(*object_).text.data();
-    } else if (object_ != nullptr) {
+        break;
+    case Holds::plain:
+        result.value = plain();
+        break;
+    case Holds::text:
+        if (type_ == CMPI_chars) {
+            result.value.chars = const_cast<char*>(text_.chars());
+        } else {
+            result.value.string = &text_.object();
+        }
+        break;
+    case Holds::object:
         result.value.string = static_cast<CMPIString*>(object_->record());
+        break;
     }
     return result;
-}
-
-const NamedValue* NamedValues::find(std::string_view name) const {
-    const auto found = std::find_if(values_.begin(), values_.end(),
-                                    [&](const NamedValue& v) { return sameName(v.name, name); });
-    return found != values_.end() ? &*found : nullptr;
-}
-
-void NamedValues::set(std::string_view name, Value value) {
-    for (NamedValue& named : values_) {
-        if (sameName(named.name, name)) {
-            named.value = std::move(value);
-            return;
-        }
-    }
-    values_.push_back({std::string(name), std::move(value)});
-}
-
-const NamedValue& NamedValues::at(std::size_t index) const {
-    if (index >= values_.size()) {
-        throw Failure{CMPI_RC_ERR_NOT_FOUND};
-    }
-    return values_[index];
 }
 
 } // namespace oxahv

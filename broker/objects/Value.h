@@ -1,15 +1,15 @@
-// CMPI values that own their texts and objects, and lists of them by name: keys, properties, arguments.
+// CMPI values that own their texts and objects.
 #pragma once
 
 #include "objects/Object.h"
+#include "objects/SharedText.h"
 #include "text/Integers.h"
 
-#include <algorithm>
 #include <memory>
 #include <string>
 #include <string_view>
 #include <utility>
-#include <vector>
+#include <variant>
 
 namespace oxahv {
 
@@ -20,15 +20,18 @@ CMPIValue memberOf(const CMPIValue* value, CMPIType type);
 // The type under which values of a type are stored: texts are CMPI_string, their arrays CMPI_stringA.
 CMPIType storedType(CMPIType type);
 
-// A CMPI value that owns its text or object.
+// A CMPI value that owns its text or object. Small, since a reply holds as many as its instances have
+// properties: a text is shared with the copies, any other object is the value's own.
 class Value {
 public:
-    Value() = default;
-    Value(const Value& other) { *this = other; }
-    Value(Value&&) noexcept = default;
-    Value& operator=(const Value& other);
-    Value& operator=(Value&&) noexcept = default;
-    ~Value() = default;
+    Value() : bits_(0) {}
+    Value(const Value& other);
+    Value(Value&& other) noexcept : Value() { swap(other); }
+    Value& operator=(Value other) noexcept {
+        swap(other);
+        return *this;
+    }
+    ~Value();
 
     // A NULL of a type.
     static Value null(CMPIType type);
@@ -36,10 +39,12 @@ public:
     // itself.
     static Value from(Core& core, const CMPIValue* value, CMPIType type);
     static Value number(const CMPIValue& value, CMPIType type);
-    static Value text(Core& core, std::string text, CMPIType type = CMPI_string);
+    static Value text(Core& core, std::string_view text, CMPIType type = CMPI_string);
 
     CMPIType type() const { return type_; }
-    bool isNull() const { return isNull_; }
+    bool isNull() const { return holds_ == Holds::nothing; }
+    // Whether it holds an object that its user can change.
+    bool holdsObject() const { return holds_ == Holds::object; }
     // What a slot hands out. Texts and objects in it stay this value's.
     CMPIData data(CMPIValueState state = CMPI_goodValue) const;
     // A text as `CMPI_chars`, or as `CMPI_string` again.
@@ -51,39 +56,18 @@ public:
     Value asProperty(CMPIType declared) const;
 
 private:
+    enum class Holds : unsigned char { nothing, plain, text, object };
+
+    void swap(Value& other) noexcept;
+    CMPIValue plain() const;
+
     CMPIType type_ = CMPI_null;
-    bool isNull_ = true;
-    CMPIValue plain_ = {};
-    std::unique_ptr<Object> object_;
-};
-
-struct NamedValue {
-    std::string name;
-    Value value;
-};
-
-// Keys, properties, arguments, context entries: values by name, in the order in which the names came.
-class NamedValues {
-public:
-    const NamedValue* find(std::string_view name) const;
-    void set(std::string_view name, Value value);
-    std::size_t size() const { return values_.size(); }
-    // Throws CMPI_RC_ERR_NOT_FOUND for an index out of range.
-    const NamedValue& at(std::size_t index) const;
-    // Removes the others. `isKept` takes a name.
-    template <class Predicate>
-    void keepOnly(const Predicate& isKept) {
-        const auto end = std::remove_if(values_.begin(), values_.end(),
-                                        [&](const NamedValue& named) { return !isKept(named.name); });
-        values_.erase(end, values_.end());
-    }
-    auto begin() const { return values_.begin(); }
-    auto end() const { return values_.end(); }
-    auto begin() { return values_.begin(); }
-    auto end() { return values_.end(); }
-
-private:
-    std::vector<NamedValue> values_;
+    Holds holds_ = Holds::nothing;
+    union {
+        unsigned long long bits_; // of a number: every plain member lies in them
+        SharedText text_;
+        Object* object_;
+    };
 };
 
 } // namespace oxahv

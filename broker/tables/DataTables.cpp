@@ -11,6 +11,7 @@ namespace {
 // Strings
 
 const char* getChars(const String& string) {
+    string.keep();
     return string.text.c_str();
 }
 
@@ -37,7 +38,7 @@ const Value& elementAt(const Array& array, CMPICount index) {
 }
 
 CMPIData getElement(const Array& array, CMPICount index) {
-    return elementAt(array, index).data();
+    return lent(array, elementAt(array, index).data());
 }
 
 void setElement(Array& array, CMPICount index, const CMPIValue* value, CMPIType type) {
@@ -62,15 +63,15 @@ CMPIBoolean isInterval(const DateTime& dateTime) {
 // Values by name: arguments and contexts
 
 CMPIData valueNamed(const NamedValues& values, const char* name) {
-    const NamedValue* const found = values.find(required(name));
-    if (found == nullptr) {
+    const std::optional<NamedValue> found = values.find(required(name));
+    if (!found) {
         throw Failure{CMPI_RC_ERR_NOT_FOUND};
     }
     return found->value.data();
 }
 
 CMPIData valueAt(Core& core, const NamedValues& values, CMPICount index, CMPIString** name) {
-    const NamedValue& found = values.at(index);
+    const NamedValue found = values.at(index);
     if (name != nullptr) {
         *name = newText(core, found.name);
     }
@@ -119,15 +120,12 @@ CMPIArray* toArray(const Enumeration& enumeration) {
 // Results: what the provider returns is copied at once.
 
 template <class Class, class Record>
-Class* copyFor(const Result& result, const Record* handle) {
+void returnObject(Result& result, const Record* handle) {
     const Class* const object = Class::of(handle);
     if (object == nullptr) {
         throw Failure{CMPI_RC_ERR_INVALID_HANDLE};
     }
-    std::unique_ptr<Object> copy = object->clone();
-    auto* const given = static_cast<Class*>(copy.get());
-    result.keeper.adopt(std::move(copy));
-    return given;
+    result.add(*object);
 }
 
 // The value is kept in an array of one.
@@ -136,18 +134,6 @@ void returnData(Result& result, const CMPIValue* value, CMPIType type) {
     holder->elements.push_back(Value::from(result.core(), value, type));
     result.reply.data.push_back(holder->elements.front().data());
     result.keeper.adopt(std::move(holder));
-}
-
-void returnInstance(Result& result, const CMPIInstance* instance) {
-    result.reply.instances.push_back(copyFor<Instance>(result, instance));
-    result.tellProgress();
-}
-
-void returnObjectPath(Result& result, const CMPIObjectPath* path) {
-    CMPIObjectPath* const copy = copyFor<ObjectPath>(result, path);
-    ObjectPath::of(copy)->declareKeys();
-    result.reply.objectPaths.push_back(copy);
-    result.tellProgress();
 }
 
 void returnDone(Result& result) {
@@ -283,8 +269,8 @@ const CMPIResultFT Result::table = {
     SLOT(CMPIResultFT, release, releaseObject<Result>),
     SLOT(CMPIResultFT, clone, cloneObject<Result>),
     SLOT(CMPIResultFT, returnData, returnData),
-    SLOT(CMPIResultFT, returnInstance, returnInstance),
-    SLOT(CMPIResultFT, returnObjectPath, returnObjectPath),
+    SLOT(CMPIResultFT, returnInstance, (returnObject<Instance, CMPIInstance>)),
+    SLOT(CMPIResultFT, returnObjectPath, (returnObject<ObjectPath, CMPIObjectPath>)),
     SLOT(CMPIResultFT, returnDone, returnDone),
     SLOT(CMPIResultFT, returnError, returnError),
 };

@@ -23,16 +23,13 @@ CMPIInstance* newInstance(Core& core, const CMPIObjectPath* handle) {
     if (path == nullptr) {
         throw Failure{CMPI_RC_ERR_INVALID_HANDLE};
     }
-    auto instance = std::make_unique<Instance>(core, path->copy());
+    auto instance = std::make_unique<Instance>(core, nullptr);
     if (core.classes.any()) {
-        const auto declared = core.classes.find(path->className);
+        const DeclaredClass* const declared = core.classes.find(path->className);
         if (declared == nullptr) {
             throw Failure{CMPI_RC_ERR_INVALID_CLASS};
         }
-        for (const PropertyDeclaration& property : declared->properties) {
-            instance->properties.set(property.name,
-                                     Value::null(valueType(property.type, property.qualifiers)));
-        }
+        instance->properties = nullValues(*declared);
     }
     instance->setPath(path->copy());
     return handOut(std::move(instance));

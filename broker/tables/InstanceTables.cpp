@@ -2,6 +2,8 @@
 
 #include "tables/Slots.h"
 
+#include <optional>
+
 namespace oxahv {
 
 namespace {
@@ -48,23 +50,23 @@ void addKey(ObjectPath& path, const char* name, const CMPIValue* value, CMPIType
     if (property != nullptr && !property->isKey) {
         throw Failure{CMPI_RC_ERR_NO_SUCH_PROPERTY};
     }
-    path.keys.set(required(name), declaredValue(path.core(), declared.get(), name, value, type));
+    path.keys.set(required(name), declaredValue(path.core(), declared, name, value, type));
 }
 
 CMPIData getKey(const ObjectPath& path, const char* name) {
-    const NamedValue* const key = path.keys.find(required(name));
-    if (key == nullptr) {
+    const std::optional<NamedValue> key = path.keys.find(required(name));
+    if (!key) {
         throw Failure{CMPI_RC_ERR_NOT_FOUND};
     }
-    return key->value.data(CMPI_keyValue);
+    return lent(path, key->value.data(CMPI_keyValue));
 }
 
 CMPIData getKeyAt(const ObjectPath& path, CMPICount index, CMPIString** name) {
-    const NamedValue& key = path.keys.at(index);
+    const NamedValue key = path.keys.at(index);
     if (name != nullptr) {
         *name = newText(path.core(), key.name);
     }
-    return key.value.data(CMPI_keyValue);
+    return lent(path, key.value.data(CMPI_keyValue));
 }
 
 CMPICount getKeyCount(const ObjectPath& path) {
@@ -90,11 +92,11 @@ void setHostAndNameSpaceFrom(ObjectPath& path, const CMPIObjectPath* source) {
 
 // Qualifiers, as far as classes are declared
 
-std::shared_ptr<const DeclaredClass> declaredClassOf(const ObjectPath& path) {
+const DeclaredClass* declaredClassOf(const ObjectPath& path) {
     if (!path.core().classes.any()) {
         throw Failure{CMPI_RC_ERR_NOT_SUPPORTED};
     }
-    auto declared = path.core().classes.find(path.className);
+    const DeclaredClass* const declared = path.core().classes.find(path.className);
     if (declared == nullptr) {
         throw Failure{CMPI_RC_ERR_INVALID_CLASS};
     }
@@ -152,22 +154,22 @@ CMPIString* toString(const ObjectPath& path) {
 // Instances
 
 CMPIData getProperty(const Instance& instance, const char* name) {
-    const NamedValue* const property = instance.properties.find(required(name));
-    if (property == nullptr) {
+    const std::optional<NamedValue> property = instance.properties.find(required(name));
+    if (!property) {
         throw Failure{CMPI_RC_ERR_NO_SUCH_PROPERTY};
     }
-    return property->value.data();
+    return lent(instance, property->value.data());
 }
 
 CMPIData getPropertyAt(const Instance& instance, CMPICount index, CMPIString** name) {
     if (index >= instance.properties.size()) {
         throw Failure{CMPI_RC_ERR_NO_SUCH_PROPERTY};
     }
-    const NamedValue& property = instance.properties.at(index);
+    const NamedValue property = instance.properties.at(index);
     if (name != nullptr) {
         *name = newText(instance.core(), property.name);
     }
-    return property.value.data();
+    return lent(instance, property.value.data());
 }
 
 CMPICount getPropertyCount(const Instance& instance) {
@@ -175,9 +177,9 @@ CMPICount getPropertyCount(const Instance& instance) {
 }
 
 void setProperty(Instance& instance, const char* name, const CMPIValue* value, CMPIType type) {
-    const auto declared = instance.core().classes.find(instance.path->className);
-    Value checked = declaredValue(instance.core(), declared.get(), required(name), value, type);
-    if (instance.passesFilter(declared.get(), name)) {
+    const DeclaredClass* const declared = instance.declaredClass();
+    Value checked = declaredValue(instance.core(), declared, required(name), value, type);
+    if (instance.passesFilter(declared, name)) {
         instance.properties.set(name, std::move(checked));
     }
 }
@@ -189,10 +191,10 @@ void setPropertyWithOrigin(Instance& instance, const char* name, const CMPIValue
 
 // The path that the instance was made for, with what has been set of its keys since.
 CMPIObjectPath* getObjectPath(const Instance& instance) {
-    const auto declared = instance.core().classes.find(instance.path->className);
+    const DeclaredClass* const declared = instance.declaredClass();
     std::unique_ptr<ObjectPath> path = instance.path->copy();
     for (const NamedValue& property : instance.properties) {
-        if (!property.value.isNull() && instance.isKey(declared.get(), property.name)) {
+        if (!property.value.isNull() && instance.isKey(declared, property.name)) {
             path->keys.set(property.name, property.value);
         }
     }

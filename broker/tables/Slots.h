@@ -136,6 +136,61 @@ struct CallDescription {
     void add(const Other& /*not recorded*/) {}
 };
 
+// Looks through a slot's arguments for what has died. The value's type comes after the value.
+class DeadArguments {
+public:
+    // The broker's quarantine, and the slot.
+    DeadArguments(Quarantine& quarantine, std::string_view slot) : quarantine_(quarantine), slot_(slot) {}
+
+    // Whether there is a text of a dead string.
+    bool hasText(const char* text) { return isText(text); }
+    bool hasText(const CMPIValue* value) {
+        value_ = value;
+        return false;
+    }
+    bool hasText(CMPIType type) {
+        return type == CMPI_chars && isText(reinterpret_cast<const char*>(value_));
+    }
+    template <class Other>
+    bool hasText(const Other& /*argument*/) {
+        return false;
+    }
+
+    // Notes the handles of dead objects.
+    void noteHandle(const CMPIValue* value) { value_ = value; }
+    void noteHandle(CMPIType type) {
+        if (value_ != nullptr && ((type & CMPI_ARRAY) != 0 || (type & CMPI_ENC) != 0)) {
+            noteIfDead(value_->string); // all handles stand in the same place
+        }
+    }
+    template <class Other>
+    void noteHandle(const Other& argument) {
+        using Record = std::remove_cv_t<std::remove_pointer_t<Other>>;
+        if constexpr (std::is_pointer_v<Other> && std::is_class_v<Record> &&
+                      !std::is_same_v<Record, CMPIStatus>) {
+            noteIfDead(argument);
+        }
+    }
+
+private:
+    bool isText(const char* text) {
+        const bool isDead = quarantine_.hasText(text);
+        if (isDead) {
+            quarantine_.note(slot_, text);
+        }
+        return isDead;
+    }
+    void noteIfDead(const void* handle) {
+        if (Quarantine::of(handle) != nullptr) {
+            quarantine_.note(slot_, handle);
+        }
+    }
+
+    Quarantine& quarantine_;
+    std::string_view slot_;
+    const CMPIValue* value_ = nullptr;
+};
+
 template <std::size_t index, auto operation, class Signature>
 struct SlotOf;
 
@@ -149,6 +204,12 @@ struct SlotOf<index, operation, Return (*)(Record*, Rest...)> {
         CMPIStatus& status = given != nullptr ? *given : unasked;
         auto* const self = Self::of(handle);
         if (self == nullptr) {
+            if (Quarantine* const quarantine = Quarantine::of(handle)) {
+                quarantine->note(slots[index], handle);
+            }
+            return failed<Return>(status, CMPI_RC_ERR_INVALID_HANDLE);
+        }
+        if (DeadArguments dead(Self::core(*self).quarantine, slots[index]); (dead.hasText(rest) || ...)) {
             return failed<Return>(status, CMPI_RC_ERR_INVALID_HANDLE);
         }
         if (Self::core(*self).hooks.active()) {
@@ -170,6 +231,10 @@ private:
                 sizeof...(Rest) - ((std::is_same_v<Rest, CMPIStatus*> ? 1 : 0) + ... + 0);
             return apply(self, std::tuple<Rest...>(rest...), std::make_index_sequence<count>());
         } catch (const Failure& failure) {
+            if (failure.code == CMPI_RC_ERR_INVALID_HANDLE) {
+                DeadArguments dead(Self::core(self).quarantine, slots[index]);
+                (dead.noteHandle(rest), ...);
+            }
             if constexpr (std::is_void_v<Return>) {
                 return failed<Return>(status, failure.code);
             } else {
@@ -276,6 +341,14 @@ inline const char* required(const char* text) {
         throw Failure{CMPI_RC_ERR_INVALID_PARAMETER};
     }
     return text;
+}
+
+// What a slot hands out of an object, which keeps it for the caller where it is more than a number.
+inline CMPIData lent(const Object& object, const CMPIData& data) {
+    if (!CMIsNullValue(data) && ((data.type & CMPI_ARRAY) != 0 || (data.type & CMPI_ENC) != 0)) {
+        object.keep();
+    }
+    return data;
 }
 
 // A new string of the current owner's.

@@ -131,7 +131,7 @@ private:
         if (declared_ != nullptr && (property == nullptr || !property->isKey)) {
             fail(start, "class " + declared_->name + " has no key " + name);
         }
-        if (path.keys.find(name) != nullptr) {
+        if (path.keys.find(name)) {
             fail(start, "key " + name + " stands twice");
         }
         expect('=');
@@ -285,7 +285,7 @@ private:
     const std::string& text_;
     const char* subject_;
     std::size_t position_ = 0;
-    std::shared_ptr<const DeclaredClass> declared_;
+    const DeclaredClass* declared_ = nullptr;
 };
 
 } // namespace
