@@ -47,19 +47,6 @@ public:
         return core.hosting.serve<slot>(contextFor(path), path, arguments...);
     }
 
-    // The same, with handlers that get the results in place of the reply.
-    template <auto slot, class... Arguments>
-    Reply stream(const InstanceHandler& instances, const PathHandler& paths, const CMPIObjectPath* path,
-                 Arguments... arguments) {
-        struct Handlers {
-            Receiver& receiver;
-            ~Handlers() { receiver.instances = nullptr, receiver.paths = nullptr; }
-        } const handlers{receiver};
-        receiver.instances = instances;
-        receiver.paths = paths;
-        return serve<slot>(path, arguments...);
-    }
-
     Core& core;
     Exposed<Context> context{new Context(core)}; // nobody's: a provider that releases it does no harm
     Owner owner{core};
@@ -82,11 +69,16 @@ void Request::setContextEntry(const std::string& name, const std::string& text) 
 void Request::setInvocationFlags(CMPIFlags flags) {
     CMPIValue value = {};
     value.uint32 = flags;
-    impl_->context.values.set(CMPIInvocationFlags, Value::number(value, CMPI_uint32));
+    impl_->context->values.set(CMPIInvocationFlags, Value::number(value, CMPI_uint32));
 }
 
 void Request::setProgressHandler(std::function<void(std::size_t results)> handler) {
     impl_->receiver.progress = std::move(handler);
+}
+
+void Request::setResultHandlers(InstanceHandler instances, PathHandler paths) {
+    impl_->receiver.instances = std::move(instances);
+    impl_->receiver.paths = std::move(paths);
 }
 
 CMPIObjectPath* Request::objectPath(const std::string& nameSpace, const std::string& className) {
@@ -107,11 +99,11 @@ CMPIObjectPath* Request::deliver(const CMPIObjectPath* path) {
 
 Reply Request::enumerateInstances(const CMPIObjectPath* classPath,
                                   const std::vector<std::string>* properties) {
-    return enumerateInstances(classPath, properties, nullptr);
+    return impl_->serve<&CMPIInstanceMIFT::enumerateInstances>(classPath, PropertyArray(properties).get());
 }
 
 Reply Request::enumerateInstanceNames(const CMPIObjectPath* classPath) {
-    return enumerateInstanceNames(classPath, nullptr);
+    return impl_->serve<&CMPIInstanceMIFT::enumerateInstanceNames>(classPath);
 }
 
 Reply Request::getInstance(const CMPIObjectPath* path, const std::vector<std::string>* properties) {
@@ -133,67 +125,31 @@ Reply Request::deleteInstance(const CMPIObjectPath* path) {
 
 Reply Request::execQuery(const CMPIObjectPath* classPath, const std::string& query,
                          const std::string& language) {
-    return execQuery(classPath, query, language, nullptr);
+    return impl_->serve<&CMPIInstanceMIFT::execQuery>(classPath, query.c_str(), language.c_str());
 }
 
 Reply Request::associators(const CMPIObjectPath* path, const AssociationFilter& filter,
                            const std::vector<std::string>* properties) {
-    return associators(path, filter, properties, nullptr);
-}
-
-Reply Request::associatorNames(const CMPIObjectPath* path, const AssociationFilter& filter) {
-    return associatorNames(path, filter, nullptr);
-}
-
-Reply Request::references(const CMPIObjectPath* path, const AssociationFilter& filter,
-                          const std::vector<std::string>* properties) {
-    return references(path, filter, properties, nullptr);
-}
-
-Reply Request::referenceNames(const CMPIObjectPath* path, const AssociationFilter& filter) {
-    return referenceNames(path, filter, nullptr);
-}
-
-Reply Request::enumerateInstances(const CMPIObjectPath* classPath, const std::vector<std::string>* properties,
-                                  const InstanceHandler& handler) {
-    return impl_->stream<&CMPIInstanceMIFT::enumerateInstances>(handler, {}, classPath,
-                                                                PropertyArray(properties).get());
-}
-
-Reply Request::enumerateInstanceNames(const CMPIObjectPath* classPath, const PathHandler& handler) {
-    return impl_->stream<&CMPIInstanceMIFT::enumerateInstanceNames>({}, handler, classPath);
-}
-
-Reply Request::execQuery(const CMPIObjectPath* classPath, const std::string& query,
-                         const std::string& language, const InstanceHandler& handler) {
-    return impl_->stream<&CMPIInstanceMIFT::execQuery>(handler, {}, classPath, query.c_str(),
-                                                       language.c_str());
-}
-
-Reply Request::associators(const CMPIObjectPath* path, const AssociationFilter& filter,
-                           const std::vector<std::string>* properties, const InstanceHandler& handler) {
-    return impl_->stream<&CMPIAssociationMIFT::associators>(
-        handler, {}, path, filter.associationClass.c_str(), filter.resultClass.c_str(), filter.role.c_str(),
+    return impl_->serve<&CMPIAssociationMIFT::associators>(
+        path, filter.associationClass.c_str(), filter.resultClass.c_str(), filter.role.c_str(),
         filter.resultRole.c_str(), PropertyArray(properties).get());
 }
 
-Reply Request::associatorNames(const CMPIObjectPath* path, const AssociationFilter& filter,
-                               const PathHandler& handler) {
-    return impl_->stream<&CMPIAssociationMIFT::associatorNames>(
-        {}, handler, path, filter.associationClass.c_str(), filter.resultClass.c_str(), filter.role.c_str(),
+Reply Request::associatorNames(const CMPIObjectPath* path, const AssociationFilter& filter) {
+    return impl_->serve<&CMPIAssociationMIFT::associatorNames>(
+        path, filter.associationClass.c_str(), filter.resultClass.c_str(), filter.role.c_str(),
         filter.resultRole.c_str());
 }
 
 Reply Request::references(const CMPIObjectPath* path, const AssociationFilter& filter,
-                          const std::vector<std::string>* properties, const InstanceHandler& handler) {
-    return impl_->stream<&CMPIAssociationMIFT::references>(
-        handler, {}, path, filter.resultClass.c_str(), filter.role.c_str(), PropertyArray(properties).get());
+                          const std::vector<std::string>* properties) {
+    return impl_->serve<&CMPIAssociationMIFT::references>(
+        path, filter.resultClass.c_str(), filter.role.c_str(), PropertyArray(properties).get());
 }
 
-Reply Request::referenceNames(const CMPIObjectPath* path, const AssociationFilter& filter,
-                              const PathHandler& handler) {
-    return impl_->stream<&CMPIAssociationMIFT::referenceNames>({}, handler, path, filter.resultClass.c_str(),
-                                                               filter.role.c_str());
+Reply Request::referenceNames(const CMPIObjectPath* path, const AssociationFilter& filter) {
+    return impl_->serve<&CMPIAssociationMIFT::referenceNames>(path, filter.resultClass.c_str(),
+                                                              filter.role.c_str());
 }
 
 Reply Request::getProperty(const CMPIObjectPath* path, const std::string& name) {

@@ -8,6 +8,7 @@
 
 #include <filesystem>
 #include <iostream>
+#include <unistd.h>
 
 namespace oxahv::runner {
 
@@ -15,39 +16,47 @@ namespace {
 
 constexpr int providerFailed = 1;
 
-// Tells how far the request has come while it runs.
+bool yieldsMany(const Operation& operation) {
+    return operation.yields == Yields::paths || operation.yields == Yields::instances;
+}
+
+// Sends the request. Of one that may yield any number of results, each is printed as it comes; while others
+// run, and where the results do not go to a terminal, a line tells how far it has come.
 Reply performed(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* target,
-                const Operation& operation, const Operands& operands) {
-    ProgressLine line; // its end comes before anything is printed
-    struct Shown {
+                const Operation& operation, const Operands& operands, ResultPrinter& printer) {
+    ProgressLine line; // its end comes before an error is printed
+    struct Handlers {
         Request& request;
-        ~Shown() { request.setProgressHandler(nullptr); }
-    } const shown = {request};
-    request.setProgressHandler(
-        [&](std::size_t results) { line.show(std::to_string(results) + " results so far"); });
+        ~Handlers() {
+            request.setProgressHandler(nullptr);
+            request.setResultHandlers(nullptr, nullptr);
+        }
+    } const handlers = {request};
+    if (yieldsMany(operation)) {
+        request.setResultHandlers([&](const CMPIInstance* instance) { printer.print(instance); },
+                                  [&](const CMPIObjectPath* path) { printer.print(path); });
+    }
+    if (!yieldsMany(operation) || ::isatty(STDOUT_FILENO) != 1) {
+        request.setProgressHandler(
+            [&](std::size_t results) { line.show(std::to_string(results) + " results so far"); });
+    }
     return operation.perform(broker, request, target, operands);
 }
 
-// Printing what they yield
-
+// Prints what has not been printed as it came.
 void printReply(const Options& options, const CMPIObjectPath* target, const Operands& operands, Yields yields,
-                const Reply& reply) {
-    switch (yields) {
-    case Yields::nothing:
-        printInstances(std::cout, options.format, {});
-        break;
-    case Yields::paths:
-    case Yields::onePath:
-        printPaths(std::cout, options.format, reply.objectPaths);
-        break;
-    case Yields::instances:
-    case Yields::oneInstance:
-        printInstances(std::cout, options.format, reply.instances);
-        break;
-    case Yields::methodResult:
+                const Reply& reply, ResultPrinter& printer) {
+    if (yields == Yields::methodResult) {
         printMethodResult(std::cout, options.format, target, operands.method, reply);
-        break;
+        return;
     }
+    for (const CMPIObjectPath* const path : reply.objectPaths) {
+        yields == Yields::onePath ? printer.print(path) : void();
+    }
+    for (const CMPIInstance* const instance : reply.instances) {
+        yields == Yields::oneInstance ? printer.print(instance) : void();
+    }
+    printer.end();
 }
 
 // NAME=TEXT
@@ -166,15 +175,20 @@ int run(const Options& options, const Operation& operation, const Operands& oper
     }
     Request request(broker);
     const CMPIObjectPath* const target = targetOf(request, options, operation, operands);
-    Reply reply = performed(broker, request, target, operation, operands);
+    ResultPrinter printer(std::cout, options.format);
+    Reply reply = performed(broker, request, target, operation, operands, printer);
     broker.clearFaults(); // they are the request's; what is printed is asked of the broker too
     requireOneResult(operation.yields, reply);
     if (!reply.ok()) {
+        if (!printer.isEmpty()) {
+            printer.end();
+            std::cout.flush(); // the error comes last
+        }
         std::cerr << "oxahv-provider: " << codeName(reply.code)
                   << (reply.message.empty() ? "" : ": " + printable(reply.message)) << '\n';
         return providerFailed;
     }
-    printReply(options, target, operands, operation.yields, reply);
+    printReply(options, target, operands, operation.yields, reply, printer);
     return 0;
 }
 

@@ -35,7 +35,7 @@ std::vector<std::string> Classes::names() const {
 }
 
 std::vector<QualifierType> Classes::qualifierTypes() const {
-    const std::shared_lock<std::shared_mutex> lock(mutex_);
+    const std::shared_lock<ShardedMutex> lock(mutex_);
     return declarations_.qualifierTypes();
 }
 

@@ -24,7 +24,7 @@ std::string complaintAbout(const Classes& classes, const MethodDeclaration& meth
 }
 
 // The declaration of a path's class; null where there is none, or no path.
-std::shared_ptr<const DeclaredClass> declarationOf(const Core& core, const CMPIObjectPath* handle) {
+const DeclaredClass* declarationOf(const Core& core, const CMPIObjectPath* handle) {
     const ObjectPath* const path = ObjectPath::of(handle);
     return path != nullptr ? core.classes.find(path->className) : nullptr;
 }
@@ -88,7 +88,7 @@ Reply Hosting::invokeMethod(const CMPIContext* context, const CMPIObjectPath* pa
 }
 
 Reply Hosting::getProperty(const CMPIContext* context, const CMPIObjectPath* path, const char* name) {
-    const std::string complaint = complaintAbout(declarationOf(core_, path).get(), name);
+    const std::string complaint = complaintAbout(declarationOf(core_, path), name);
     if (!complaint.empty()) {
         return refused(CMPI_RC_ERR_NO_SUCH_PROPERTY, complaint);
     }
@@ -105,7 +105,7 @@ Reply Hosting::getProperty(const CMPIContext* context, const CMPIObjectPath* pat
 Reply Hosting::setProperty(const CMPIContext* context, const CMPIObjectPath* path, const char* name,
                            const CMPIValue* value, CMPIType type) {
     const auto declared = declarationOf(core_, path);
-    const std::string complaint = complaintAbout(declared.get(), name);
+    const std::string complaint = complaintAbout(declared, name);
     if (!complaint.empty()) {
         return refused(CMPI_RC_ERR_NO_SUCH_PROPERTY, complaint);
     }

@@ -53,7 +53,8 @@ struct Reply {
 };
 
 /** Gets an instance that a request yields. The instance, and what the handler makes in the broker on this
- * thread, are freed when it returns. What it throws, the provider gets as `CMPI_RC_ERR_FAILED`. */
+ * thread, are freed when it returns. Its calls of slots are not recorded, and no fault strikes them. What it
+ * throws, the provider gets as `CMPI_RC_ERR_FAILED`. */
 using InstanceHandler = std::function<void(const CMPIInstance* instance)>;
 /** The same for an object path. */
 using PathHandler = std::function<void(const CMPIObjectPath* path)>;
@@ -113,6 +114,20 @@ public:
      * far, after each of them and on the thread that returned it; null: nobody. It must not throw.
      */
     void setProgressHandler(std::function<void(std::size_t results)> handler);
+
+    /**
+     * Hands the results of the operations that follow to functions, in place of putting them into the reply:
+     * each as soon as the provider returns it, on the thread that returned it; it is freed then. The reply
+     * has the status and the rest.
+     *
+     * So memory does not grow with the number of results, even where the provider releases nothing: an
+     * instance, object path, string, array or date/time that it made after its first result, and that it has
+     * not used again in the meantime, is freed a thousand results later. Whoever uses it after that gets
+     * `CMPI_RC_ERR_INVALID_HANDLE`. What the provider has looked into stays until the request ends.
+     * @param instances gets the instances; null: they are in the reply.
+     * @param paths gets the object paths; null: they are in the reply.
+     */
+    void setResultHandlers(InstanceHandler instances, PathHandler paths);
 
     /** A new object path, made through the broker's own slot; null when that refuses. */
     CMPIObjectPath* objectPath(const std::string& nameSpace, const std::string& className);
@@ -194,38 +209,6 @@ public:
      * @param value its new value, such as valueFromText makes; of another type than is declared it answers
      * `CMPI_RC_ERR_TYPE_MISMATCH`. */
     Reply setProperty(const CMPIObjectPath* path, const std::string& name, const CMPIData& value);
-    /** @} */
-
-    /** @name Operations whose results are handed on
-     * The same operations for any number of results: each result goes to a handler as soon as the provider
-     * returns it, on the thread that returned it, and is freed then; the reply has the status alone. So
-     * memory does not grow with their number, even where the provider releases nothing: an instance, path,
-     * string, array or date/time that it made after its first result, and that it has not used again in the
-     * meantime, is freed a thousand results later. Whoever uses it after that gets
-     * `CMPI_RC_ERR_INVALID_HANDLE`. What the provider has looked into stays until the request ends.
-     * @param handler gets the results; null: they are in the reply.
-     */
-    /** @{ */
-    /** All instances of a class. */
-    Reply enumerateInstances(const CMPIObjectPath* classPath, const std::vector<std::string>* properties,
-                             const InstanceHandler& handler);
-    /** The paths of all instances of a class. */
-    Reply enumerateInstanceNames(const CMPIObjectPath* classPath, const PathHandler& handler);
-    /** The instances that a query selects. */
-    Reply execQuery(const CMPIObjectPath* classPath, const std::string& query, const std::string& language,
-                    const InstanceHandler& handler);
-    /** The instances at the other ends of associations. */
-    Reply associators(const CMPIObjectPath* path, const AssociationFilter& filter,
-                      const std::vector<std::string>* properties, const InstanceHandler& handler);
-    /** The paths of the instances at the other ends. */
-    Reply associatorNames(const CMPIObjectPath* path, const AssociationFilter& filter,
-                          const PathHandler& handler);
-    /** The associations themselves. */
-    Reply references(const CMPIObjectPath* path, const AssociationFilter& filter,
-                     const std::vector<std::string>* properties, const InstanceHandler& handler);
-    /** The paths of the associations themselves. */
-    Reply referenceNames(const CMPIObjectPath* path, const AssociationFilter& filter,
-                         const PathHandler& handler);
     /** @} */
 
     /**

@@ -68,11 +68,13 @@ void Owner::unlink(Object& object) {
 }
 
 void Owner::release(Object& object) {
-    {
-        const std::lock_guard<std::mutex> lock(mutex_);
-        unlink(object);
-    }
-    bury(&object);
+    bury(take(object).release());
+}
+
+std::unique_ptr<Object> Owner::take(Object& object) {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    unlink(object);
+    return std::unique_ptr<Object>(&object);
 }
 
 void Owner::freeSince(const Object& mark) {

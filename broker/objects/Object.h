@@ -109,7 +109,10 @@ public:
 
     bool isOf(const Core& core) const { return core_.load(std::memory_order_relaxed) == &core; }
     void adopt(std::unique_ptr<Object> object);
+    // Frees an object.
     void release(Object& object);
+    // Gives an object up.
+    std::unique_ptr<Object> take(Object& object);
     // Frees what was adopted after `mark`, and `mark` itself.
     void freeSince(const Object& mark);
     // Counts a result that has been handed on at once. From the first one on, an object that a provider makes

@@ -144,6 +144,7 @@ void Result::add(Exposed<Class> copy, std::vector<Handle*>& kept,
     if (handler != nullptr && *handler) {
         Owner own(core());
         const Owner::Scope scope(own);
+        const Hooks::Pause pause;
         (*handler)(copy.get());
         keeper.countResult();
     } else {

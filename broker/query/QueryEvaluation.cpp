@@ -318,11 +318,13 @@ private:
         if (!step.scope.empty() && !instance.core().classes.isA(instance.path->className, step.scope)) {
             return Value().data();
         }
-        const NamedValue* const property = instance.properties.find(step.name);
+        const std::optional<NamedValue> found = instance.properties.find(step.name);
+        if (found && !found->value.isNull()) {
+            return found->value.data();
+        }
         // Some servers make an instance without its path's keys.
-        const NamedValue* const found =
-            property != nullptr && !property->value.isNull() ? property : instance.path->keys.find(step.name);
-        return found != nullptr ? found->value.data() : Value().data();
+        const std::optional<NamedValue> key = instance.path->keys.find(step.name);
+        return key ? key->value.data() : Value().data();
     }
 
     const Instance& instance_;

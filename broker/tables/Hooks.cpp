@@ -38,7 +38,21 @@ bool strikes(const Fault& fault, unsigned int call) {
     return call >= fault.firstCall && (fault.calls == 0 || call - fault.firstCall < fault.calls);
 }
 
+thread_local unsigned int pauses = 0;
+
 } // namespace
+
+Hooks::Pause::Pause() {
+    ++pauses;
+}
+
+Hooks::Pause::~Pause() {
+    --pauses;
+}
+
+bool Hooks::isPaused() {
+    return pauses > 0;
+}
 
 void Hooks::inject(const std::string& slot, const Fault& fault) {
     const std::size_t index = findSlot(slot);

@@ -206,7 +206,16 @@ constexpr std::size_t slotIndex(std::string_view name) {
 class Hooks {
 public:
     // Whether a slot has anything to ask here. Read before every call.
-    bool active() const { return active_.load(std::memory_order_relaxed); }
+    bool active() const { return active_.load(std::memory_order_relaxed) && !isPaused(); }
+
+    // Keeps the calling thread's calls away while it lives: they are the program's own, not the provider's.
+    class Pause {
+    public:
+        Pause();
+        ~Pause();
+        Pause(const Pause&) = delete;
+        Pause& operator=(const Pause&) = delete;
+    };
 
     void inject(const std::string& slot, const Fault& fault);
     void clearFaults();
@@ -225,6 +234,7 @@ private:
     };
 
     void update();
+    static bool isPaused();
 
     std::atomic<bool> active_{false};
     std::mutex mutex_;

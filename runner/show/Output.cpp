@@ -3,106 +3,147 @@
 #include "show/Text.h"
 #include "show/Values.h"
 
-#include <charconv>
+#include <algorithm>
+#include <cmath>
 #include <nlohmann/json.hpp>
+#include <string_view>
 
 namespace oxahv::runner {
 
 namespace {
 
-using Json = nlohmann::ordered_json;
+using Json = nlohmann::json;
 
-Json jsonOf(const CMPIData& data);
-Json jsonOf(const CMPIInstance* embedded);
+// Writes JSON as it comes; a tree of a result would cost several times the request.
+class JsonWriter {
+public:
+    JsonWriter(std::string& out, std::size_t depth) : out_(out), depth_(depth) {}
 
-// The double that is written as shortly as the number is: 0.1, not 0.10000000149011612.
-double shortest(const CMPIData& real) {
-    const std::string text = valueText(real);
-    double number = 0;
-    std::from_chars(text.data(), text.data() + text.size(), number);
-    return number;
-}
-
-Json jsonOfArray(const CMPIArray* array) {
-    Json elements = Json::array();
-    const CMPICount size = CMGetArrayCount(array, nullptr);
-    for (CMPICount i = 0; i < size; ++i) {
-        elements.push_back(jsonOf(CMGetArrayElementAt(array, i, nullptr)));
+    void add(const CMPIData& data);
+    // What the library leaves of control characters, a terminal obeys. What is no UTF-8 is replaced.
+    void addText(std::string_view text) {
+        const bool isPlain = std::all_of(
+            text.begin(), text.end(), [](char c) { return c >= ' ' && c < '\x7F' && c != '"' && c != '\\'; });
+        out_ += isPlain ? '"' + std::string(text) + '"'
+                        : escaped(Json(text).dump(-1, ' ', false, Json::error_handler_t::replace), 'u');
     }
-    return elements;
-}
+    void addMember(std::string_view name) {
+        nextElement();
+        addText(name);
+        out_ += ": ";
+    }
+    void open(char bracket) {
+        out_ += bracket;
+        isFirst_ = true;
+        ++depth_;
+    }
+    void close(char bracket) {
+        --depth_;
+        if (!isFirst_) {
+            addLine();
+        }
+        out_ += bracket;
+        isFirst_ = false;
+    }
+    void nextElement() {
+        out_ += isFirst_ ? "" : ",";
+        addLine();
+        isFirst_ = false;
+    }
+    void addMembers(const std::vector<NamedValue>& values) {
+        open('{');
+        for (const NamedValue& value : values) {
+            addMember(value.name);
+            add(value.data);
+        }
+        close('}');
+    }
+    void addObject(const CMPIObjectPath* path, const std::vector<NamedValue>& values) {
+        open('{');
+        addMember("class");
+        addText(textOf(CMGetClassName(path, nullptr)));
+        addMember("namespace");
+        addText(textOf(CMGetNameSpace(path, nullptr)));
+        addMember("path");
+        addText(pathText(path));
+        addMember("properties");
+        addMembers(values);
+        close('}');
+    }
 
-Json jsonOf(const CMPIData& data) {
+private:
+    void addLine() { out_.append(1, '\n').append(2 * depth_, ' '); }
+
+    void addArray(const CMPIArray* array) {
+        open('[');
+        const CMPICount size = CMGetArrayCount(array, nullptr);
+        for (CMPICount i = 0; i < size; ++i) {
+            nextElement();
+            add(CMGetArrayElementAt(array, i, nullptr));
+        }
+        close(']');
+    }
+
+    // An embedded instance has no path of its own.
+    void addEmbedded(const CMPIInstance* instance) {
+        open('{');
+        addMember("class");
+        addText(textOf(CMGetClassName(CMGetObjectPath(instance, nullptr), nullptr)));
+        addMember("properties");
+        addMembers(propertiesOf(instance));
+        close('}');
+    }
+
+    // JSON knows no infinity.
+    void addReal(const CMPIData& data, double number) {
+        out_ += std::isfinite(number) ? valueText(data) : "null";
+    }
+
+    std::string& out_;
+    std::size_t depth_;
+    bool isFirst_ = true;
+};
+
+void JsonWriter::add(const CMPIData& data) {
     if (CMIsNullValue(data)) {
-        return nullptr;
+        out_ += "null";
+        return;
     }
     if (CMIsArray(data)) {
-        return jsonOfArray(data.value.array);
+        addArray(data.value.array);
+        return;
     }
     switch (data.type) {
     case CMPI_boolean:
-        return data.value.boolean != 0;
-    case CMPI_uint8:
-        return data.value.uint8;
-    case CMPI_char16:
-    case CMPI_uint16:
-        return data.value.uint16;
-    case CMPI_uint32:
-        return data.value.uint32;
-    case CMPI_uint64:
-        return data.value.uint64;
-    case CMPI_sint8:
-        return data.value.sint8;
-    case CMPI_sint16:
-        return data.value.sint16;
-    case CMPI_sint32:
-        return data.value.sint32;
-    case CMPI_sint64:
-        return data.value.sint64;
+        out_ += data.value.boolean != 0 ? "true" : "false";
+        break;
     case CMPI_real32:
-        return shortest(data);
+        addReal(data, static_cast<double>(data.value.real32));
+        break;
     case CMPI_real64:
-        return data.value.real64;
+        addReal(data, data.value.real64);
+        break;
     case CMPI_string:
-        return textOf(data.value.string);
+        addText(textOf(data.value.string));
+        break;
     case CMPI_chars:
-        return data.value.chars;
+        addText(data.value.chars);
+        break;
     case CMPI_dateTime:
-        return textOf(CMGetStringFormat(data.value.dateTime, nullptr));
+        addText(textOf(CMGetStringFormat(data.value.dateTime, nullptr)));
+        break;
     case CMPI_instance:
-        return jsonOf(data.value.inst);
+        addEmbedded(data.value.inst);
+        break;
     case CMPI_ref:
-        return pathText(data.value.ref);
-    default:
-        return valueText(data);
+        addText(pathText(data.value.ref));
+        break;
+    default: {
+        const std::string text = valueText(data); // numbers, and what has no form of its own
+        const bool isNumber = data.type == CMPI_char16 || (data.type & CMPI_INTEGER) != 0;
+        isNumber ? void(out_ += text) : addText(text);
     }
-}
-
-Json jsonOf(const std::vector<NamedValue>& values) {
-    Json object = Json::object();
-    for (const NamedValue& value : values) {
-        object[value.name] = jsonOf(value.data);
     }
-    return object;
-}
-
-// An embedded instance has no path of its own.
-Json jsonOf(const CMPIInstance* embedded) {
-    return {{"class", textOf(CMGetClassName(CMGetObjectPath(embedded, nullptr), nullptr))},
-            {"properties", jsonOf(propertiesOf(embedded))}};
-}
-
-Json jsonOf(const CMPIObjectPath* path, const std::vector<NamedValue>& values) {
-    return {{"class", textOf(CMGetClassName(path, nullptr))},
-            {"namespace", textOf(CMGetNameSpace(path, nullptr))},
-            {"path", pathText(path)},
-            {"properties", jsonOf(values)}};
-}
-
-// A provider's texts need not be UTF-8; what is not is replaced. The library leaves DEL and the second set of
-// control characters as they are, which a terminal obeys.
-void print(std::ostream& out, const Json& json) {
-    out << escaped(json.dump(2, ' ', false, Json::error_handler_t::replace), 'u') << '\n';
 }
 
 // As MOF writes it, in a form that a terminal shows and does not obey.
@@ -112,37 +153,48 @@ std::string mofText(const CMPIData& data) {
 
 } // namespace
 
-void printInstances(std::ostream& out, Format format, const std::vector<CMPIInstance*>& instances) {
-    Json array = Json::array();
-    for (const CMPIInstance* const instance : instances) {
-        const CMPIObjectPath* const path = CMGetObjectPath(instance, nullptr);
-        const std::vector<NamedValue> properties = propertiesOf(instance);
-        if (format == Format::json) {
-            array.push_back(jsonOf(path, properties));
-            continue;
-        }
-        out << "instance of " << escaped(textOf(CMGetClassName(path, nullptr)), 'x') << " {\n";
-        for (const NamedValue& property : properties) {
-            out << "  " << escaped(property.name, 'x') << " = " << mofText(property.data) << ";\n";
-        }
-        out << "};\n";
+std::string& ResultPrinter::begin() {
+    text_.clear();
+    if (format_ == Format::json) {
+        text_ = count_ == 0 ? "[\n  " : ",\n  ";
     }
-    if (format == Format::json) {
-        print(out, array);
-    }
+    ++count_;
+    return text_;
 }
 
-void printPaths(std::ostream& out, Format format, const std::vector<CMPIObjectPath*>& paths) {
-    Json array = Json::array();
-    for (const CMPIObjectPath* const path : paths) {
-        if (format == Format::json) {
-            array.push_back(jsonOf(path, keysOf(path)));
-        } else {
-            out << escaped(pathText(path), 'x') << '\n';
+void ResultPrinter::write() {
+    out_.write(text_.data(), static_cast<std::streamsize>(text_.size()));
+}
+
+void ResultPrinter::print(const CMPIInstance* instance) {
+    std::string& text = begin();
+    const CMPIObjectPath* const path = CMGetObjectPath(instance, nullptr);
+    const std::vector<NamedValue> properties = propertiesOf(instance);
+    if (format_ == Format::json) {
+        JsonWriter(text, 1).addObject(path, properties);
+    } else {
+        text += "instance of " + escaped(textOf(CMGetClassName(path, nullptr)), 'x') + " {\n";
+        for (const NamedValue& property : properties) {
+            text += "  " + escaped(property.name, 'x') + " = " + mofText(property.data) + ";\n";
         }
+        text += "};\n";
     }
-    if (format == Format::json) {
-        print(out, array);
+    write();
+}
+
+void ResultPrinter::print(const CMPIObjectPath* path) {
+    std::string& text = begin();
+    if (format_ == Format::json) {
+        JsonWriter(text, 1).addObject(path, keysOf(path));
+    } else {
+        text += escaped(pathText(path), 'x') + '\n';
+    }
+    write();
+}
+
+void ResultPrinter::end() {
+    if (format_ == Format::json) {
+        out_ << (isEmpty() ? "[]\n" : "\n]\n");
     }
 }
 
@@ -154,10 +206,22 @@ void printMethodResult(std::ostream& out, Format format, const CMPIObjectPath* p
     }
     const std::vector<NamedValue> arguments = argumentsOf(reply.out);
     if (format == Format::json) {
-        print(out, Json::array({{{"path", pathText(path)},
-                                 {"method", method},
-                                 {"returnValue", jsonOf(returned)},
-                                 {"parameters", jsonOf(arguments)}}}));
+        std::string text;
+        JsonWriter writer(text, 0);
+        writer.open('[');
+        writer.nextElement();
+        writer.open('{');
+        writer.addMember("path");
+        writer.addText(pathText(path));
+        writer.addMember("method");
+        writer.addText(method);
+        writer.addMember("returnValue");
+        writer.add(returned);
+        writer.addMember("parameters");
+        writer.addMembers(arguments);
+        writer.close('}');
+        writer.close(']');
+        out << text << '\n';
         return;
     }
     out << "ReturnValue = " << mofText(returned) << ";\n";
