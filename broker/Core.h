@@ -8,6 +8,7 @@
 #include "hosting/Indications.h"
 #include "objects/Quarantine.h"
 #include "objects/Records.h"
+#include "repository/Repository.h"
 #include "tables/Hooks.h"
 
 #include <array>
@@ -62,6 +63,7 @@ public:
     Owner clones{*this}; // apart from what a memory mark frees: they are their callers'
     Delivery delivery;
     Hooks hooks;
+    Repository repository{*this};
     AttachedThreads attachedThreads; // after the owners and before the providers, which may leave threads
     Indications indications{*this};
     Hosting hosting{*this};

@@ -2,6 +2,7 @@
 
 #include "Core.h"
 #include "mof/MofCompiler.h"
+#include "repository/MofRepository.h"
 
 #include <shared_mutex>
 
@@ -86,13 +87,29 @@ void EmbeddedBroker::declare(const ClassDeclaration& declaration) {
     impl_->classes.declare(declaration);
 }
 
+// Declares what a compiler reads, and keeps the instances among it: all of it or nothing.
+template <class Read>
+static void compileMofOf(Core& core, const Read& read) {
+    std::vector<MofCompiler::WrittenInstance> written;
+    core.classes.change(
+        [&](Declarations& declarations) {
+            MofCompiler compiler(declarations);
+            read(compiler);
+            written = compiler.takeInstances();
+        },
+        [&] { keepInstances(core, written); });
+}
+
 void EmbeddedBroker::compileMof(const std::string& file) {
-    impl_->classes.change([&](Declarations& declarations) { MofCompiler(declarations).compileFile(file); });
+    compileMofOf(*impl_, [&](MofCompiler& compiler) { compiler.compileFile(file); });
 }
 
 void EmbeddedBroker::compileMofText(const std::string& text, const std::string& name) {
-    impl_->classes.change(
-        [&](Declarations& declarations) { MofCompiler(declarations).compileText(text, name); });
+    compileMofOf(*impl_, [&](MofCompiler& compiler) { compiler.compileText(text, name); });
+}
+
+void EmbeddedBroker::keepInstances(const std::string& className) {
+    impl_->repository.keep(className);
 }
 
 bool EmbeddedBroker::hasDeclarations() const {

@@ -12,12 +12,24 @@ void Classes::declare(const ClassDeclaration& declaration) {
     any_.store(true, std::memory_order_release);
 }
 
-void Classes::change(const std::function<void(Declarations&)>& change) {
+void Classes::change(const std::function<void(Declarations&)>& change, const std::function<void()>& use) {
     const std::lock_guard<std::mutex> changing(changing_);
     Declarations changed = declarations_;
     change(changed);
+    refused_.reserve(refused_.size() + 1);
+    exchange(changed);
+    try {
+        use();
+    } catch (...) {
+        exchange(changed);
+        refused_.push_back(std::move(changed));
+        throw;
+    }
+}
+
+void Classes::exchange(Declarations& declarations) {
     const std::unique_lock<ShardedMutex> lock(mutex_);
-    std::swap(declarations_, changed);
+    std::swap(declarations_, declarations);
     any_.store(declarations_.anyClass(), std::memory_order_release);
 }
 

@@ -20,7 +20,8 @@ class Classes {
 public:
     void declare(const ClassDeclaration& declaration);
     // Applies a change of many declarations as a whole or, when it throws, not at all.
-    void change(const std::function<void(Declarations&)>& change);
+    // `use` works with the changed declarations; when it throws, the former ones are back.
+    void change(const std::function<void(Declarations&)>& change, const std::function<void()>& use);
     bool any() const { return any_.load(std::memory_order_acquire); }
     // Null for a class that is not declared. Valid as long as the broker: what is declared stays.
     const DeclaredClass* find(std::string_view name) const;
@@ -29,9 +30,12 @@ public:
     bool isA(std::string_view className, std::string_view ancestor) const;
 
 private:
+    void exchange(Declarations& declarations);
+
     std::mutex changing_; // held by who changes the declarations, while others read on
     mutable ShardedMutex mutex_;
     Declarations declarations_;
+    std::vector<Declarations> refused_; // of changes that were undone: somebody may have found their classes
     std::atomic<bool> any_{false};
 };
 

@@ -215,6 +215,13 @@ Hosting::Providers Hosting::find(const ObjectPath& path, const Operation& operat
                     (!association.empty() && p.servesPartOf(core_.classes, wanted)));
         });
     }
+    using Kept = Repository::Kept;
+    const std::shared_ptr<HostedProvider> repository = core_.repository.provider();
+    const bool isKept = repository != nullptr && operation.isOfferedBy(*repository);
+    const Kept kept = isKept && !isOfAnyAssociation ? core_.repository.kept(wanted) : Kept::no;
+    if (found.empty() && kept == Kept::itself) {
+        return {repository}; // before those that may serve any class: they do not name this one
+    }
     if (found.empty()) {
         found = providersThat([&](const HostedProvider& p) {
             return operation.isOfferedBy(p) &&
@@ -224,6 +231,9 @@ Hosting::Providers Hosting::find(const ObjectPath& path, const Operation& operat
     // One that calls up for a class of another is to get that call last.
     std::stable_partition(found.begin(), found.end(),
                           [](const auto& provider) { return !Ongoing::includes(provider.get()); });
+    if (isKept && (kept == Kept::inPart || (isOfAnyAssociation && core_.repository.keepsAssociations()))) {
+        found.push_back(repository);
+    }
     return found;
 }
 

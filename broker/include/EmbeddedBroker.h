@@ -114,9 +114,12 @@ public:
      * none when there is an error. Several files may follow one another; qualifier types that one declares
      * hold for the next.
      *
-     * Of the pragmas, `include` is followed, relative to the file that it stands in; the others and instances
-     * are passed over, which have to be well-formed all the same. Superclasses must be declared before; classes that references lead to need not be
-     * declared. A qualifier without a declared type is taken with the type that its value has.
+     * Instances are kept as keepInstances says, in every namespace; one of the same keys must not be there. A
+     * reference may name an instance before it by its alias.
+     *
+     * Of the pragmas, `include` is followed, relative to the file that it stands in; the others are passed
+     * over. Superclasses must be declared before; classes that references lead to need not be declared. A
+     * qualifier without a declared type is taken with the type that its value has.
      * @param file path of a regular file, at most 256 MiB with all that it includes.
      * @throws BrokerError whose text is `file:line:column: message`, lines and characters counted from 1, for
      * the first error; one of reading an included file stands where its pragma does.
@@ -129,6 +132,13 @@ public:
      * name.
      */
     void compileMofText(const std::string& text, const std::string& name);
+    /**
+     * Keeps instances of a class and of the classes derived from it in the broker's repository, as a MOF text
+     * with an instance of it does: they are created, read, changed, deleted, queried, and traversed where they
+     * are associations, by requests and by upcalls, unless a provider names the class.
+     * @param className a class; need not be declared.
+     */
+    void keepInstances(const std::string& className);
     /** Whether any class is declared. */
     bool hasDeclarations() const;
     /** Whether the class is declared. */

@@ -149,10 +149,12 @@ void MofCompiler::compileFile(const std::filesystem::path& file, const MofSource
     open_.pop_back();
 }
 
-void MofCompiler::compile(const MofSource& source) {
-    MofParser parser(source);
+void MofCompiler::compile(MofSource text) {
+    const auto source = std::make_shared<const MofSource>(std::move(text));
+    MofParser parser(*source);
     while (const std::optional<MofDeclaration> declaration = parser.next()) {
-        std::visit([&](const auto& declared) { declare(source, declared); }, *declaration);
+        source_ = source; // again, after an include
+        std::visit([&](const auto& declared) { declare(*source, declared); }, *declaration);
     }
 }
 
@@ -161,8 +163,10 @@ void MofCompiler::declare(const MofSource& source, const MofInclude& include) {
     compileFile(file, source, include.file.offset);
 }
 
-// Nobody keeps instances.
-void MofCompiler::declare(const MofSource& /*source*/, const MofInstance& /*instance*/) {}
+// Made later, when all classes are declared.
+void MofCompiler::declare(const MofSource& /*source*/, const MofInstance& instance) {
+    instances_.push_back({source_, instance});
+}
 
 void MofCompiler::declare(const MofSource& source, const MofQualifierType& declared) {
     QualifierType type{declared.scopes, {declared.name.text, impliedValue(declared.type)}};

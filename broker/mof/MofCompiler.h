@@ -6,6 +6,7 @@
 
 #include <cstddef>
 #include <filesystem>
+#include <memory>
 #include <vector>
 
 namespace oxahv {
@@ -20,8 +21,15 @@ public:
     void compileFile(const std::string& file);
     void compileText(const std::string& text, const std::string& name);
 
+    // The instances of the texts, in order; each with the text that it is in.
+    struct WrittenInstance {
+        std::shared_ptr<const MofSource> source;
+        MofInstance instance;
+    };
+    std::vector<WrittenInstance> takeInstances() { return std::move(instances_); }
+
 private:
-    void compile(const MofSource& source);
+    void compile(MofSource text);
     void compileFile(const std::filesystem::path& file, const MofSource& asker, std::size_t offset);
 
     void declare(const MofSource& source, const MofClass& declared);
@@ -40,6 +48,8 @@ private:
     Declarations& declarations_;
     std::vector<std::filesystem::path>
         open_;             // the files that are being read, each included by the one before
+    std::shared_ptr<const MofSource> source_; // that is read
+    std::vector<WrittenInstance> instances_;
     std::size_t size_ = 0; // of all texts so far
     std::size_t files_ = 0;
 };

@@ -101,17 +101,6 @@ private:
     const std::string& nameSpace_;
 };
 
-// The path of the properties that are keys.
-std::unique_ptr<ObjectPath> pathOf(const Instance& instance, const DeclaredClass* declared) {
-    std::unique_ptr<ObjectPath> path = instance.path->copy();
-    for (const NamedValue& property : instance.properties) {
-        if (!property.value.isNull() && instance.isKey(declared, property.name)) {
-            path->keys.set(property.name, property.value);
-        }
-    }
-    return path;
-}
-
 } // namespace
 
 std::unique_ptr<Instance> instanceOf(Core& core, const MofSource& source, const MofInstance& written,
@@ -142,7 +131,7 @@ std::unique_ptr<Instance> instanceOf(Core& core, const MofSource& source, const 
                                            ? maker.make(assignment.value, *property)
                                            : maker.make(assignment.value, mofTypeOf(assignment.value)));
     }
-    instance->path = pathOf(*instance, declared != nullptr ? &*declared : nullptr);
+    instance->path = instance->keyedPath();
     return instance;
 }
 

@@ -118,6 +118,17 @@ void Instance::setPath(std::unique_ptr<ObjectPath> newPath) {
     }
 }
 
+std::unique_ptr<ObjectPath> Instance::keyedPath() const {
+    const DeclaredClass* const declared = declaredClass();
+    std::unique_ptr<ObjectPath> keyed = path->copy();
+    for (const NamedValue& property : properties) {
+        if (!property.value.isNull() && isKey(declared, property.name)) {
+            keyed->keys.set(property.name, property.value);
+        }
+    }
+    return keyed;
+}
+
 bool Instance::isKey(const DeclaredClass* declared, std::string_view name) const {
     const PropertyDeclaration* const property = declared != nullptr ? declared->find(name) : nullptr;
     return property != nullptr ? property->isKey : path->keys.find(name).has_value();

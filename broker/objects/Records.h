@@ -145,6 +145,8 @@ public:
     void setPath(std::unique_ptr<ObjectPath> newPath);
     // From now on it has its keys and the properties of these names alone.
     void setFilter(std::vector<std::string> names);
+    // The path that it was made for, with what has been set of its keys since.
+    std::unique_ptr<ObjectPath> keyedPath() const;
     bool isKey(const DeclaredClass* declared, std::string_view name) const;
     bool passesFilter(const DeclaredClass* declared, std::string_view name) const;
 

@@ -189,16 +189,8 @@ void setPropertyWithOrigin(Instance& instance, const char* name, const CMPIValue
     setProperty(instance, name, value, type);
 }
 
-// The path that the instance was made for, with what has been set of its keys since.
 CMPIObjectPath* getObjectPath(const Instance& instance) {
-    const DeclaredClass* const declared = instance.declaredClass();
-    std::unique_ptr<ObjectPath> path = instance.path->copy();
-    for (const NamedValue& property : instance.properties) {
-        if (!property.value.isNull() && instance.isKey(declared, property.name)) {
-            path->keys.set(property.name, property.value);
-        }
-    }
-    return handOut(std::move(path));
+    return handOut(instance.keyedPath());
 }
 
 // The path's keys become properties, as they do in a new instance.
