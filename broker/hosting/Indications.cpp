@@ -42,10 +42,10 @@ std::shared_ptr<const Query> parsed(const Core& core, const IndicationFilter& fi
 class Calls {
 public:
     Calls(Core& core, const HostedProvider& provider, const ActiveFilter& filter)
-        : core_(core), provider_(provider), filter_(filter), context_(core) {
-        core.addContextEntries(context_);
-        core.addClientEntries(context_, filter.owner(), 0);
-        context_.values.set(CMPIInitNameSpace, Value::text(core, filter.nameSpace()));
+        : core_(core), provider_(provider), filter_(filter), context_(new Context(core)) {
+        core.addContextEntries(*context_);
+        core.addClientEntries(*context_, filter.owner(), 0);
+        context_->values.set(CMPIInitNameSpace, Value::text(core, filter.nameSpace()));
     }
 
     // Calls a function that gets the filter and more behind the class path. One that the provider lacks is
@@ -65,7 +65,8 @@ public:
         const CMPIObjectPath* const path =
             handOut(std::make_unique<ObjectPath>(core_, filter_.nameSpace(), filter_.watchedClass()));
         return callProvider([&] {
-            return function(mi, &context_, filter_.expression(), filter_.fromClass().c_str(), path, given...);
+            return function(mi, context_.get(), filter_.expression(), filter_.fromClass().c_str(), path,
+                            given...);
         });
     }
 
@@ -79,7 +80,7 @@ public:
         Owner own(core_);
         const Owner::Scope scope(own);
         return callProvider([&] {
-            (mi->ft->*slot)(mi, &context_);
+            (mi->ft->*slot)(mi, context_.get());
             return CMPIStatus{CMPI_RC_OK, nullptr};
         });
     }
@@ -97,15 +98,15 @@ private:
     Core& core_;
     const HostedProvider& provider_;
     const ActiveFilter& filter_;
-    Context context_;
+    Exposed<Context> context_;
 };
 
 } // namespace
 
 ActiveFilter::ActiveFilter(Core& core, const IndicationFilter& filter)
-    : core_(core), expression_(core, parsed(core, filter)), nameSpace_(filter.nameSpace),
-      owner_(filter.owner), kept_(core) {
-    const std::string* const source = sourceClassOf(expression_.query->condition());
+    : core_(core), expression_(new SelectExpression(core, parsed(core, filter))),
+      nameSpace_(filter.nameSpace), owner_(filter.owner), kept_(core) {
+    const std::string* const source = sourceClassOf(expression_->query->condition());
     watchedClass_ = source != nullptr ? *source : fromClass();
 }
 
@@ -114,7 +115,7 @@ void ActiveFilter::offer(const std::string& nameSpace, const Instance& indicatio
         return;
     }
     try {
-        if (!expression_.query->accepts(indication)) {
+        if (!expression_->query->accepts(indication)) {
             return;
         }
     } catch (const Failure&) { // values that do not compare
@@ -122,7 +123,7 @@ void ActiveFilter::offer(const std::string& nameSpace, const Instance& indicatio
     }
     std::unique_ptr<Object> copy = indication.clone();
     auto* const kept = static_cast<Instance*>(copy.get());
-    expression_.query->project(*kept);
+    expression_->query->project(*kept);
     const std::lock_guard<std::mutex> lock(mutex_);
     if (!isClosed_) {
         waiting_.push_back(kept);

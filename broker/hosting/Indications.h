@@ -23,10 +23,10 @@ public:
     // Throws Failure for a faulty query.
     ActiveFilter(Core& core, const IndicationFilter& filter);
 
-    const std::string& fromClass() const { return expression_.query->className(); }
+    const std::string& fromClass() const { return expression_->query->className(); }
     const std::string& nameSpace() const { return nameSpace_; }
     const std::string& owner() const { return owner_; }
-    const CMPISelectExp* expression() const { return &expression_; }
+    const CMPISelectExp* expression() const { return expression_.get(); }
     // The class whose instances are to be watched.
     const std::string& watchedClass() const { return watchedClass_; }
 
@@ -42,7 +42,7 @@ private:
     friend class Indications;
 
     Core& core_;
-    SelectExpression expression_; // nobody's: a provider that releases it does no harm
+    Exposed<SelectExpression> expression_; // nobody's: a provider that releases it does no harm
     std::string nameSpace_;
     std::string owner_;
     std::string watchedClass_;

@@ -77,6 +77,10 @@ std::unique_ptr<Object> Owner::take(Object& object) {
     return std::unique_ptr<Object>(&object);
 }
 
+void Owner::release(Object& object) {
+    bury(detach(object).release());
+}
+
 void Owner::freeSince(const Object& mark) {
     Object* doomed = nullptr;
     const std::lock_guard<std::mutex> lock(mutex_);
