@@ -6,8 +6,6 @@
 
 #include <shared_mutex>
 
-#include <shared_mutex>
-
 namespace oxahv {
 
 BrokerError::BrokerError(const std::string& message) : std::runtime_error(message) {}

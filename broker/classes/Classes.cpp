@@ -3,8 +3,6 @@
 #include <algorithm>
 #include <shared_mutex>
 
-#include <shared_mutex>
-
 namespace oxahv {
 
 void Classes::declare(const ClassDeclaration& declaration) {

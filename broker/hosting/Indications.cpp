@@ -139,7 +139,7 @@ CMPIInstance* ActiveFilter::next(std::chrono::milliseconds timeout) {
     }
     Instance* const first = waiting_.front();
     waiting_.pop_front();
-    Owner::current(core_).adopt(kept_.take(*first));
+    Owner::current(core_).adopt(kept_.detach(*first));
     return first;
 }
 

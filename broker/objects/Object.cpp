@@ -68,17 +68,13 @@ void Owner::unlink(Object& object) {
 }
 
 void Owner::release(Object& object) {
-    bury(take(object).release());
+    bury(detach(object).release());
 }
 
-std::unique_ptr<Object> Owner::take(Object& object) {
+std::unique_ptr<Object> Owner::detach(Object& object) {
     const std::lock_guard<std::mutex> lock(mutex_);
     unlink(object);
     return std::unique_ptr<Object>(&object);
-}
-
-void Owner::release(Object& object) {
-    bury(detach(object).release());
 }
 
 void Owner::freeSince(const Object& mark) {

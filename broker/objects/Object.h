@@ -112,7 +112,7 @@ public:
     // Frees an object.
     void release(Object& object);
     // Gives an object up.
-    std::unique_ptr<Object> take(Object& object);
+    std::unique_ptr<Object> detach(Object& object);
     // Frees what was adopted after `mark`, and `mark` itself.
     void freeSince(const Object& mark);
     // Counts a result that has been handed on at once. From the first one on, an object that a provider makes
