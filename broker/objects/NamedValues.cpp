@@ -10,6 +10,12 @@ namespace {
 // Shorter lists are looked through faster than an index finds.
 constexpr std::size_t mostWithoutIndex = 24;
 
+// Names of one class often begin alike: the last letter parts most of them.
+bool endsAlike(std::string_view a, std::string_view b) {
+    return a.size() == b.size() &&
+           (a.empty() || encoding::foldedLetter(a.back()) == encoding::foldedLetter(b.back()));
+}
+
 } // namespace
 
 std::size_t Names::find(std::string_view name) const {
@@ -17,8 +23,9 @@ std::size_t Names::find(std::string_view name) const {
         const auto found = index_.find(name);
         return found != index_.end() ? found->second : none;
     }
-    const auto found =
-        std::find_if(list_.begin(), list_.end(), [&](const std::string& one) { return sameName(one, name); });
+    const auto found = std::find_if(list_.begin(), list_.end(), [&](const std::string& one) {
+        return endsAlike(one, name) && (one == name || sameName(one, name));
+    });
     return found != list_.end() ? static_cast<std::size_t>(found - list_.begin()) : none;
 }
 

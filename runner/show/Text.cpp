@@ -2,6 +2,7 @@
 
 #include <Utf8.h>
 
+#include <algorithm>
 #include <optional>
 #include <sstream>
 
@@ -21,6 +22,9 @@ std::string printable(std::string_view text, std::size_t most) {
 
 std::string escaped(std::string_view text, char kind) {
     constexpr const char* digits = "0123456789ABCDEF";
+    if (std::all_of(text.begin(), text.end(), [](char c) { return c >= ' ' && c < '\x7F'; })) {
+        return std::string(text); // nearly every text
+    }
     std::string result;
     while (!text.empty()) {
         const auto byte = static_cast<unsigned char>(text.front());
