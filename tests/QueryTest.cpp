@@ -446,6 +446,9 @@ TEST_F(AQuery, SurvivesOutOfMemory) {
     const CMPIInstance* const instance = demo();
     const std::string text =
         "SELECT a FROM Demo WHERE NOT (U8 = 200 OR Text LIKE 'a long pattern%') OR a = 1";
+    for (const char* const name : {"Text", "Long", "a"}) { // a text becomes an object when it is asked for
+        CMGetProperty(instance, name, nullptr);
+    }
     const std::size_t live = broker_.liveObjects().total();
     unsigned int failures = 0;
     for (unsigned int n = 1; n < 10000; ++n) {

@@ -115,7 +115,8 @@ public:
      * hold for the next.
      *
      * Instances are kept as keepInstances says, in every namespace; one of the same keys must not be there. A
-     * reference may name an instance before it by its alias.
+     * reference may name an instance before it by its alias. Those of classes that are not declared are passed
+     * over.
      *
      * Of the pragmas, `include` is followed, relative to the file that it stands in; the others are passed
      * over. Superclasses must be declared before; classes that references lead to need not be declared. A

@@ -47,6 +47,9 @@ void keepInstances(Core& core, std::vector<MofCompiler::WrittenInstance>& writte
     Aliases aliases;
     try {
         for (auto& [source, instance] : written) {
+            if (core.classes.find(instance.className.text) == nullptr) {
+                continue; // texts of whole schemas have some whose class is another text's
+            }
             resolve(*source, instance, aliases);
             std::unique_ptr<Instance> made = instanceOf(core, *source, instance, "");
             requireKeys(*source, instance, *made);
@@ -68,8 +71,8 @@ void keepInstances(Core& core, std::vector<MofCompiler::WrittenInstance>& writte
         }
         throw;
     }
-    for (const auto& one : written) {
-        core.repository.keep(one.instance.className.text);
+    for (const auto& path : added) {
+        core.repository.keep(path->className);
     }
 }
 
