@@ -75,7 +75,10 @@ KitTest::KitTest() {
     ::unsetenv("LOCPATH"); // or the C library's newlocale, which a provider calls, would lose a list of it
     using Declaration = oxahv::ClassDeclaration;
     Declaration value("Kit_Value");
-    value.key("Id", CMPI_uint32).property("embedded", CMPI_instance);
+    value.key("Id", CMPI_uint32);
+    const oxahv::Qualifiers ofItem({{"EmbeddedInstance", {CMPI_string, false, {std::string("Kit_Item")}}}});
+    value.property({"embedded", CMPI_string, false, "", {}, ofItem});
+    value.property({"embeddedA", CMPI_stringA, false, "", {}, ofItem});
     for (const ValueType& type : valueTypes) {
         value.property(type.name, type.type);
         value.property(std::string(type.name) + 'A', static_cast<CMPIType>(type.type | CMPI_ARRAY));

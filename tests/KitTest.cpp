@@ -189,13 +189,15 @@ TEST_F(KitValues, MayBeObjects) {
         instances.add(operation.instance("Kit_Value", {{"Id", 1}})
                           .set("ref", item)
                           .set("refA", std::vector<Path>{item, item})
-                          .set("embedded", operation.instance(item).set("Size", 5)));
+                          .set("embedded", operation.instance(item).set("Size", 5))
+                          .set("embeddedA", std::vector<Instance>(2, operation.instance(item))));
     });
     ASSERT_TRUE(reply.ok()) << failureOf(reply);
     const Instance value(broker_.handle(), reply.instances.at(0));
     EXPECT_EQ(value.get<Path>("ref").key<std::string>("name"), "one");
     EXPECT_EQ(value.get<std::vector<Path>>("refA").at(1).key<int>("Number"), 1);
     EXPECT_EQ(value.get<Instance>("embedded").get<std::uint64_t>("size"), 5U);
+    EXPECT_EQ(value.get<std::vector<Instance>>("embeddedA").at(1).path().key<int>("Number"), 1);
     EXPECT_EQ(value.get<Instance>("embedded").path().key<std::string>("Name"), "one");
 }
 

@@ -1,4 +1,6 @@
-#include "classes/Classes.h"
+#include "Core.h"
+
+#include <algorithm>
 
 #include <shared_mutex>
 
@@ -47,17 +49,38 @@ NamedValues nullValues(const DeclaredClass& declared) {
     std::vector<Value> values;
     values.reserve(declared.properties.size());
     for (const PropertyDeclaration& property : declared.properties) {
-        values.push_back(Value::null(property.type));
+        values.push_back(Value::null(valueType(property.type, property.qualifiers)));
     }
     return {declared.propertyNames, std::move(values)};
 }
 
-Value checkedValue(Core& core, const CMPIValue* value, CMPIType type, CMPIType declared) {
+static bool isInstanceOf(const Classes& classes, const CMPIData& data, std::string_view className) {
+    const Instance* const instance = CMIsNullValue(data) ? nullptr : Instance::of(data.value.inst);
+    return instance == nullptr || classes.isA(instance->path->className, className);
+}
+
+bool hasType(const Classes& classes, const Value& value, const ValueType& type) {
+    if (value.type() != storedType(type.type)) {
+        return false;
+    }
+    if (type.embeddedClass.empty() || value.isNull()) {
+        return true;
+    }
+    if (value.type() == CMPI_instance) {
+        return isInstanceOf(classes, value.data(), type.embeddedClass);
+    }
+    const std::vector<Value>& elements = Array::of(value.data().value.array)->elements;
+    return std::all_of(elements.begin(), elements.end(), [&](const Value& element) {
+        return isInstanceOf(classes, element.data(), type.embeddedClass);
+    });
+}
+
+Value checkedValue(Core& core, const CMPIValue* value, CMPIType type, const ValueType& declared) {
     if (value == nullptr || type == CMPI_null) {
-        return Value::null(declared);
+        return Value::null(declared.type);
     }
     Value result = Value::from(core, value, type);
-    if (result.type() != storedType(declared)) {
+    if (!hasType(core.classes, result, declared)) {
         throw Failure{CMPI_RC_ERR_TYPE_MISMATCH};
     }
     return result;

@@ -41,8 +41,26 @@ NamedValues nullValues(const DeclaredClass& declared);
 // What a slot hands out for a declared value; texts and arrays are the current owner's.
 CMPIData dataOf(Core& core, const DeclaredValue& declared);
 
+// What the values of a declared element are.
+struct ValueType {
+    CMPIType type;
+    std::string_view embeddedClass; // of instances, and part of the declaration; empty: of any class
+};
+template <class Declaration>
+ValueType valueTypeOf(const Declaration& declaration) {
+    const QualifierDeclaration* const embedded = declaration.qualifiers.find("EmbeddedInstance");
+    const bool namesClass = embedded != nullptr && !embedded->value.elements.empty();
+    const auto* const name =
+        namesClass ? std::get_if<std::string>(&embedded->value.elements.front()) : nullptr;
+    return {valueType(declaration.type, declaration.qualifiers),
+            name != nullptr ? std::string_view(*name) : std::string_view()};
+}
+
+// Whether a value that is not NULL is one of a type.
+bool hasType(const Classes& classes, const Value& value, const ValueType& type);
+
 // The value for a property or key of a declared type, as the caller of a slot passed it. Throws
 // CMPI_RC_ERR_TYPE_MISMATCH.
-Value checkedValue(Core& core, const CMPIValue* value, CMPIType type, CMPIType declared);
+Value checkedValue(Core& core, const CMPIValue* value, CMPIType type, const ValueType& declared);
 
 } // namespace oxahv

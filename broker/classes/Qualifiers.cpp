@@ -69,6 +69,13 @@ CMPIData dataOf(Core& core, const DeclaredValue& declared) {
     return data;
 }
 
+CMPIType valueType(CMPIType declared, const Qualifiers& qualifiers) {
+    const auto element = static_cast<CMPIType>(declared & ~CMPI_ARRAY);
+    const bool isEmbedded = element == CMPI_string && (qualifiers.find("EmbeddedInstance") != nullptr ||
+                                                       qualifiers.isTrue("EmbeddedObject"));
+    return isEmbedded ? static_cast<CMPIType>(CMPI_instance | (declared & CMPI_ARRAY)) : declared;
+}
+
 Qualifiers::Qualifiers(std::vector<QualifierDeclaration> list)
     : list_(list.empty() ? nullptr
                          : std::make_shared<const std::vector<QualifierDeclaration>>(std::move(list))) {}

@@ -7,15 +7,17 @@ namespace oxahv {
 namespace {
 
 // Why a declared method does not take its arguments; empty when it does.
-std::string complaintAbout(const MethodDeclaration& method, const Arguments& in) {
+std::string complaintAbout(const Classes& classes, const MethodDeclaration& method, const Arguments& in) {
     for (const NamedValue& argument : in.values) {
         const ParameterDeclaration* const parameter = method.find(argument.name);
         if (parameter == nullptr || !parameter->isIn) {
             return "method " + method.name + " takes no argument " + argument.name;
         }
-        if (!argument.value.isNull() && argument.value.type() != storedType(parameter->type)) {
+        const ValueType type = valueTypeOf(*parameter);
+        if (!argument.value.isNull() && !hasType(classes, argument.value, type)) {
             return "argument " + argument.name + " of method " + method.name + " is no " +
-                   declaredTypeName(parameter->type);
+                   declaredTypeName(type.type) +
+                   (type.embeddedClass.empty() ? "" : " of " + std::string(type.embeddedClass));
         }
     }
     return {};
@@ -71,7 +73,8 @@ Reply Hosting::invokeMethod(const CMPIContext* context, const CMPIObjectPath* pa
     const ObjectPath* const target = ObjectPath::of(path);
     const auto declared = target != nullptr ? core_.classes.find(target->className) : nullptr;
     const MethodDeclaration* const wanted = declared != nullptr ? declared->findMethod(method) : nullptr;
-    const std::string complaint = wanted != nullptr ? complaintAbout(*wanted, *Arguments::of(given)) : "";
+    const std::string complaint =
+        wanted != nullptr ? complaintAbout(core_.classes, *wanted, *Arguments::of(given)) : "";
     Reply reply;
     if (declared != nullptr && wanted == nullptr) {
         reply = refused(CMPI_RC_ERR_METHOD_NOT_FOUND, "class " + declared->name + " has no method " + method);
@@ -108,8 +111,9 @@ Reply Hosting::setProperty(const CMPIContext* context, const CMPIObjectPath* pat
     }
     CMPIData data = {};
     try {
-        data = keep(core_, declared != nullptr ? checkedValue(core_, value, type, declared->find(name)->type)
-                                               : Value::from(core_, value, type));
+        data = keep(core_, declared != nullptr
+                               ? checkedValue(core_, value, type, valueTypeOf(*declared->find(name)))
+                               : Value::from(core_, value, type));
     } catch (const Failure& failure) {
         return refused(failure.code, std::string("the value does not fit property ") + name);
     }

@@ -74,6 +74,14 @@ struct QualifierTypeDeclaration {
     bool isTranslatable = false;     ///< flavour Translatable
 };
 
+/**
+ * The type of the values of a property, parameter or method: `CMPI_instance`, as an array where the type is
+ * one, where a qualifier EmbeddedInstance or EmbeddedObject says that its texts are instances; else the
+ * declared type.
+ * @param declared the declared type. @param qualifiers those of the same element.
+ */
+TK_EXPORT CMPIType valueType(CMPIType declared, const Qualifiers& qualifiers);
+
 /** One property of a class. */
 struct PropertyDeclaration {
     std::string name;             ///< as declared

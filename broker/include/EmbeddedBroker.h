@@ -115,7 +115,7 @@ public:
      * hold for the next.
      *
      * Of the pragmas, `include` is followed, relative to the file that it stands in; the others and instances
-     * are passed over. Superclasses must be declared before; classes that references lead to need not be
+     * are passed over, which have to be well-formed all the same. Superclasses must be declared before; classes that references lead to need not be
      * declared. A qualifier without a declared type is taken with the type that its value has.
      * @param file path of a regular file, at most 256 MiB with all that it includes.
      * @throws BrokerError whose text is `file:line:column: message`, lines and characters counted from 1, for

@@ -140,8 +140,9 @@ public:
      */
     CMPIObjectPath* objectPathFromText(const std::string& text, const std::string& nameSpace);
     /**
-     * The value of a text, written as those in an object path are. A text, date/time or path may stand
-     * without quotes, and is then taken as it is.
+     * The value of a text, written as those in an object path are. A text, date/time, path or instance needs
+     * no quotes, and is then taken as it is. An instance is written as in MOF,
+     * `instance of Class { Name = value; ... }`.
      * @param type the type of the value, no array; `CMPI_null`: what it looks like, as in a path of an
      * undeclared class, a text when it is neither a number nor `TRUE` or `FALSE`.
      * @throws BrokerError naming the column (from 1) and what is wrong there.

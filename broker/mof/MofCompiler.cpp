@@ -161,6 +161,9 @@ void MofCompiler::declare(const MofSource& source, const MofInclude& include) {
     compileFile(file, source, include.file.offset);
 }
 
+// Nobody keeps instances.
+void MofCompiler::declare(const MofSource& /*source*/, const MofInstance& /*instance*/) {}
+
 void MofCompiler::declare(const MofSource& source, const MofQualifierType& declared) {
     QualifierType type{declared.scopes, {declared.name.text, impliedValue(declared.type)}};
     if (declared.value) { // what a used qualifier without value has does not depend on it

@@ -27,6 +27,7 @@ private:
     void declare(const MofSource& source, const MofClass& declared);
     void declare(const MofSource& source, const MofQualifierType& declared);
     void declare(const MofSource& source, const MofInclude& include);
+    void declare(const MofSource& source, const MofInstance& instance);
 
     unsigned int scopesOf(const MofClass& declared) const;
     PropertyDeclaration propertyOf(const MofSource& source, const MofElement& element) const;

@@ -14,6 +14,9 @@ constexpr CMPIType dataTypes[] = {CMPI_boolean, CMPI_char16, CMPI_real32, CMPI_r
                                   CMPI_uint16,  CMPI_uint32, CMPI_uint64, CMPI_sint8,   CMPI_sint16,
                                   CMPI_sint32,  CMPI_sint64, CMPI_string, CMPI_dateTime};
 
+// Instances within instances are read on the stack.
+constexpr std::size_t mostInstances = 64;
+
 template <class Meaning>
 struct Word {
     std::string_view name;
@@ -140,7 +143,9 @@ std::optional<MofDeclaration> MofParser::next() {
             if (!isWord("instance")) {
                 failExpecting("'class', 'instance', 'qualifier' or '#pragma'");
             }
-            skipInstance();
+            MofInstance instance = readInstance();
+            expectSymbol(';');
+            return instance;
         }
     }
     return std::nullopt;
@@ -172,33 +177,50 @@ std::optional<MofInclude> MofParser::readPragma() {
     return MofInclude{{file.offset, std::move(file.text)}};
 }
 
-void MofParser::skipAlias() {
-    if (takeWord("as")) {
-        if (token_.kind != MofKind::alias) {
-            failExpecting("an alias such as $name");
-        }
-        take();
+std::string MofParser::readAlias() {
+    if (!takeWord("as")) {
+        return {};
     }
+    if (token_.kind != MofKind::alias) {
+        failExpecting("an alias such as $name");
+    }
+    return std::string(take().spelling);
 }
 
-// Up to the brace that closes it, whatever it says.
-void MofParser::skipInstance() {
+MofInstance MofParser::readInstance() {
     const MofToken start = take();
-    expectWord("of");
-    readName("a class name");
-    skipAlias();
-    expectSymbol('{');
-    for (std::size_t depth = 1; depth > 0;) {
-        const MofToken token = take();
-        if (token.kind == MofKind::end) {
-            source_.fail(start.offset, "the instance has no end");
-        }
-        if (token.kind == MofKind::symbol) {
-            depth += token.spelling == "{" ? 1 : 0;
-            depth -= token.spelling == "}" ? 1 : 0;
-        }
+    if (++depth_ > mostInstances) {
+        source_.fail(start.offset,
+                     "instances are nested more than " + std::to_string(mostInstances) + " deep");
     }
-    expectSymbol(';');
+    MofInstance instance;
+    expectWord("of");
+    instance.className = readName("a class name");
+    instance.alias = readAlias();
+    expectSymbol('{');
+    while (!takeSymbol('}')) {
+        readQualifiers(); // of older versions: instances have no qualifiers any more
+        MofAssignment property;
+        property.name = readName("a property's name");
+        expectSymbol('=');
+        property.value = readValue(true);
+        expectSymbol(';');
+        instance.properties.push_back(std::move(property));
+    }
+    --depth_;
+    return instance;
+}
+
+MofInstance MofParser::readOnlyInstance() {
+    if (!isWord("instance")) {
+        failExpecting("'instance'");
+    }
+    MofInstance instance = readInstance();
+    takeSymbol(';');
+    if (token_.kind != MofKind::end) {
+        failExpecting("the end");
+    }
+    return instance;
 }
 
 MofQualifierType MofParser::readQualifierType() {
@@ -279,7 +301,7 @@ MofQualifier MofParser::readQualifier() {
         qualifier.value = readValue();
     } else if (takeSymbol('(')) {
         const std::size_t offset = token_.offset;
-        qualifier.value = MofValue{offset, false, {readConstant()}};
+        qualifier.value = MofValue{offset, false, {readConstant()}, {}};
         expectSymbol(')');
     }
     if (takeSymbol(':') && !takeFlavours(qualifier.flavours)) {
@@ -292,7 +314,7 @@ MofClass MofParser::readClass(std::vector<MofQualifier> qualifiers) {
     MofClass declared;
     declared.qualifiers = std::move(qualifiers);
     declared.name = readName("a class name");
-    skipAlias();
+    readAlias();
     if (takeSymbol(':')) {
         declared.superclass = readName("the superclass's name");
     }
@@ -376,19 +398,28 @@ std::vector<MofElement> MofParser::readParameters() {
     return parameters;
 }
 
-MofValue MofParser::readValue() {
+MofValue MofParser::readValue(bool mayEmbed) {
     MofValue value;
     value.offset = token_.offset;
     value.isArray = takeSymbol('{');
     if (!value.isArray) {
-        value.constants.push_back(readConstant());
+        readElement(value, mayEmbed);
     } else if (!takeSymbol('}')) {
         do {
-            value.constants.push_back(readConstant());
+            readElement(value, mayEmbed);
         } while (takeSymbol(','));
         expectSymbol('}');
     }
     return value;
+}
+
+void MofParser::readElement(MofValue& value, bool mayEmbed) {
+    if (mayEmbed && isWord("instance")) {
+        value.constants.push_back(token_);
+        value.instances.push_back(readInstance());
+    } else {
+        value.constants.push_back(readConstant());
+    }
 }
 
 MofToken MofParser::readConstant() {

@@ -16,11 +16,26 @@ struct MofName {
     std::string text;
 };
 
-// A value: its constants, where adjacent texts are one.
+struct MofInstance;
+
+// A value: its constants, where adjacent texts are one. A constant that is the word `instance` is the next of
+// the instances.
 struct MofValue {
     std::size_t offset = 0;
     bool isArray = false;
     std::vector<MofToken> constants;
+    std::vector<MofInstance> instances;
+};
+
+struct MofAssignment {
+    MofName name;
+    MofValue value;
+};
+
+struct MofInstance {
+    MofName className;
+    std::string alias; // with its dollar sign; empty when there is none
+    std::vector<MofAssignment> properties;
 };
 
 enum class MofFlavour { enableOverride, disableOverride, restricted, toSubclass, toInstance, translatable };
@@ -81,7 +96,7 @@ struct MofInclude {
     MofName file;
 };
 
-using MofDeclaration = std::variant<MofClass, MofQualifierType, MofInclude>;
+using MofDeclaration = std::variant<MofClass, MofQualifierType, MofInclude, MofInstance>;
 
 class MofParser {
 public:
@@ -90,6 +105,8 @@ public:
 
     // The next declaration; nothing behind the last one. Throws BrokerError.
     std::optional<MofDeclaration> next();
+    // A text that is one instance, with or without a semicolon at its end. Throws BrokerError.
+    MofInstance readOnlyInstance();
 
 private:
     [[noreturn]] void failExpecting(const std::string& what) const;
@@ -103,8 +120,8 @@ private:
     MofName readName(const char* what);
 
     std::optional<MofInclude> readPragma();
-    void skipAlias();
-    void skipInstance();
+    std::string readAlias();
+    MofInstance readInstance();
     MofQualifierType readQualifierType();
     unsigned int readScopes();
     bool takeFlavours(std::vector<MofFlavour>& flavours);
@@ -116,12 +133,14 @@ private:
     CMPIType readDataType();
     CMPIType readArraySuffix(CMPIType type);
     std::vector<MofElement> readParameters();
-    MofValue readValue();
+    MofValue readValue(bool mayEmbed = false);
     MofToken readConstant();
+    void readElement(MofValue& value, bool mayEmbed);
 
     const MofSource& source_;
     MofLexer lexer_;
-    MofToken token_; // the one that is looked at, not taken yet
+    MofToken token_;        // the one that is looked at, not taken yet
+    std::size_t depth_ = 0; // of instances within each other
 };
 
 } // namespace oxahv

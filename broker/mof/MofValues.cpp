@@ -153,7 +153,7 @@ CMPIType mofTypeOf(const MofValue& value) {
         } else if (first.kind == MofKind::character) {
             type = CMPI_char16;
         } else if (first.kind == MofKind::word) {
-            type = CMPI_boolean;
+            type = sameName(first.spelling, "instance") ? CMPI_instance : CMPI_boolean;
         }
     }
     return static_cast<CMPIType>(type | (value.isArray ? CMPI_ARRAY : 0U));

@@ -195,6 +195,54 @@ std::unique_ptr<Object> Error::clone() const {
     return copy;
 }
 
+namespace {
+
+// Objects within each other, counted as long as they can be copied; `most` are left.
+bool isShallow(const Object& object, std::size_t most);
+
+bool isShallow(const Value& value, std::size_t most) {
+    const auto element = static_cast<CMPIType>(value.type() & ~CMPI_ARRAY);
+    const bool canNest = element == CMPI_instance || element == CMPI_ref || element == CMPI_args;
+    return !canNest || value.isNull() || isShallow(*objectOf(value.data().value.inst), most);
+}
+
+bool isShallow(const NamedValues& values, std::size_t most) {
+    return std::all_of(values.begin(), values.end(),
+                       [&](const NamedValue& named) { return isShallow(named.value, most); });
+}
+
+bool isShallow(const Object& object, std::size_t most) {
+    if (most == 0) {
+        return false;
+    }
+    switch (object.kind()) {
+    case Kind::instance: {
+        const auto& instance = static_cast<const Instance&>(object);
+        return isShallow(instance.properties, most - 1) && isShallow(instance.path->keys, most - 1);
+    }
+    case Kind::objectPath:
+        return isShallow(static_cast<const ObjectPath&>(object).keys, most - 1);
+    case Kind::arguments:
+        return isShallow(static_cast<const Arguments&>(object).values, most - 1);
+    case Kind::array: {
+        const auto& elements = static_cast<const Array&>(object).elements;
+        return std::all_of(elements.begin(), elements.end(),
+                           [&](const Value& element) { return isShallow(element, most - 1); });
+    }
+    default:
+        return true;
+    }
+}
+
+} // namespace
+
+void requireShallow(const Object& object) {
+    constexpr std::size_t most = 200; // an instance of each two is in an array
+    if (!isShallow(object, most)) {
+        failWith(CMPI_RC_ERR_INVALID_PARAMETER, "values are nested more than 200 deep");
+    }
+}
+
 CMPIData keep(Core& core, Value value) {
     auto holder = std::make_unique<Array>(core, value.type(), 0);
     holder->elements.push_back(std::move(value));

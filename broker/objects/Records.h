@@ -240,6 +240,10 @@ bool isRecord(const void* handle);
 // The object of a handle of any kind; null for what is none, and for one that has died.
 Object* objectOf(const void* handle);
 
+// Throws CMPI_RC_ERR_INVALID_PARAMETER where objects nest so deep that what copies them, on the stack, might
+// not return.
+void requireShallow(const Object& object);
+
 // A value that belongs to an array of one, which the current owner has.
 CMPIData keep(Core& core, Value value);
 

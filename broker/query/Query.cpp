@@ -88,7 +88,7 @@ void checkPredicate(const DeclaredClass& declared, const QueryPredicate& predica
     case CMPI_PredOp_Not_Null:
         return;
     default:
-        if (left != nullptr && !areComparable(left->type, literal)) {
+        if (left != nullptr && !areComparable(valueType(left->type, left->qualifiers), literal)) {
             failAt(predicate.left, "property " + left->name + " is a " + declaredTypeName(left->type) +
                                        " and cannot be compared with this value");
         }
@@ -151,7 +151,11 @@ void Query::check(const Classes& classes) const {
     if (!classes.any()) {
         return;
     }
+<<<<<<< HEAD
     const DeclaredClass* const declared = classes.find(className_);
+=======
+    const auto declared = classes.find(className_);
+>>>>>>> 1eaec18 (Take embedded instances where the class declares them)
     if (declared == nullptr) {
         failWith(CMPI_RC_ERR_INVALID_CLASS, "class " + className_ + " is not declared");
     }

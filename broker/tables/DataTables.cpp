@@ -43,7 +43,7 @@ CMPIData getElement(const Array& array, CMPICount index) {
 
 void setElement(Array& array, CMPICount index, const CMPIValue* value, CMPIType type) {
     elementAt(array, index);
-    array.elements[index] = checkedValue(array.core(), value, type, array.elementType);
+    array.elements[index] = checkedValue(array.core(), value, type, {array.elementType, {}});
 }
 
 // Date/times

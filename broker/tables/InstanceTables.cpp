@@ -40,7 +40,7 @@ Value declaredValue(Core& core, const DeclaredClass* declared, const char* name,
     if (property == nullptr) {
         throw Failure{CMPI_RC_ERR_NO_SUCH_PROPERTY};
     }
-    return checkedValue(core, value, type, property->type);
+    return checkedValue(core, value, type, valueTypeOf(*property));
 }
 
 void addKey(ObjectPath& path, const char* name, const CMPIValue* value, CMPIType type) {

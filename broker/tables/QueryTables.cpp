@@ -102,7 +102,7 @@ CMPIType typeOf(const Predicate& predicate) {
                                                     ? declared->find(which.left.steps.front().name)
                                                     : nullptr;
     const auto* const literal = std::get_if<QueryLiteral>(&which.right);
-    return property != nullptr  ? property->type
+    return property != nullptr  ? valueType(property->type, property->qualifiers)
            : literal != nullptr ? typeOf(*literal)
                                 : static_cast<CMPIType>(CMPI_null);
 }

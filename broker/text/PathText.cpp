@@ -3,6 +3,7 @@
 #include "text/PathText.h"
 
 #include "Core.h"
+#include "mof/MofInstances.h"
 #include "text/DateTimeText.h"
 #include "text/Integers.h"
 
@@ -62,7 +63,8 @@ private:
     // it is neither a number nor TRUE or FALSE.
     bool isBareText(CMPIType wanted) const {
         if (wanted != CMPI_null) {
-            return wanted == CMPI_string || wanted == CMPI_dateTime || wanted == CMPI_ref;
+            return wanted == CMPI_string || wanted == CMPI_dateTime || wanted == CMPI_ref ||
+                   wanted == CMPI_instance;
         }
         const std::size_t digits = text_.find_first_of("+-") == 0 ? 1 : 0;
         const bool isNumber =
@@ -240,6 +242,13 @@ private:
             CMPIValue value = {};
             value.dateTime = &dateTime;
             return Value::from(core_, &value, CMPI_dateTime);
+        }
+        case CMPI_instance: {
+            CMPIValue value = {};
+            const std::unique_ptr<Instance> instance =
+                readInstance(core_, {"embedded instance", text}, "");
+            value.inst = instance.get();
+            return Value::from(core_, &value, CMPI_instance);
         }
         default:
             fail(start, "expected a " + typeName(wanted));

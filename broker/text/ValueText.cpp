@@ -45,6 +45,15 @@ std::string arrayText(const Array& array) {
     return text + "}";
 }
 
+// On one line: it is part of another instance's text.
+std::string instanceText(const Instance& instance) {
+    std::string text = "instance of " + instance.path->className + " {";
+    for (const NamedValue& property : instance.properties) {
+        text += ' ' + property.name + " = " + valueText(property.value.data()) + ';';
+    }
+    return text + " }";
+}
+
 // The shortest text that reads back as the same number. MOF wants a point in it, whatever the locale says.
 template <class Real>
 std::string realText(Real value) {
@@ -65,6 +74,9 @@ std::string objectText(const CMPIData& data) {
     }
     if (const DateTime* const dateTime = DateTime::of(data.value.dateTime)) {
         return quoted(dateTime->text);
+    }
+    if (const Instance* const instance = Instance::of(data.value.inst)) {
+        return instanceText(*instance);
     }
     if (ObjectPath::of(data.value.ref) != nullptr) {
         return quoted(pathText(data.value.ref));
