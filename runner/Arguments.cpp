@@ -63,7 +63,7 @@ Argument argumentOf(const std::optional<MethodDeclaration>& method, const std::s
         throw BrokerError("parameter " + parameter->name + " of method " + method->name +
                           " is an output; leave it out");
     }
-    return {argumentWord, parameter->name, parameter->type, {}};
+    return {argumentWord, parameter->name, valueType(parameter->type, parameter->qualifiers), {}};
 }
 
 // The same of a property.
@@ -79,7 +79,7 @@ Argument propertyOf(const EmbeddedBroker& broker, const std::string& className, 
         throw BrokerError("class " + className + " has no property " + name + "; it has " +
                           namesOf(declared));
     }
-    return {propertyWord, found->name, found->type, {}};
+    return {propertyWord, found->name, valueType(found->type, found->qualifiers), {}};
 }
 
 // Where the name of name=value ends.
@@ -112,7 +112,24 @@ std::vector<Argument> parsed(const char* word, const std::vector<std::string>& t
     return arguments;
 }
 
+// A text that is the word needs quotes.
+bool isNullWord(const std::string& text) {
+    return text == "NULL";
+}
+
+CMPIData nullOf(CMPIType type) {
+    return {type, CMPI_nullValue, {}};
+}
+
+// What the broker's setters take.
+const CMPIValue* valueIn(const CMPIData& data) {
+    return CMIsNullValue(data) ? nullptr : &data.value;
+}
+
 CMPIData valueOf(Request& request, const Argument& argument, const std::string& text) {
+    if (isNullWord(text)) {
+        return nullOf(argument.type & static_cast<CMPIType>(~CMPI_ARRAY));
+    }
     try {
         return request.valueFromText(text, argument.type & static_cast<CMPIType>(~CMPI_ARRAY));
     } catch (const BrokerError& error) {
@@ -127,15 +144,20 @@ void require(const CMPIStatus& status) {
 }
 
 CMPIData arrayOf(const EmbeddedBroker& broker, Request& request, const Argument& argument) {
+    const bool isOne = argument.texts.size() == 1;
+    if (isOne && isNullWord(argument.texts.front())) {
+        return nullOf(argument.type);
+    }
+    const CMPICount size =
+        isOne && argument.texts.front() == "{}" ? 0 : static_cast<CMPICount>(argument.texts.size());
     const auto type = static_cast<CMPIType>(argument.type & ~CMPI_ARRAY);
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     CMPIData data = {argument.type, CMPI_goodValue, {}};
-    data.value.array =
-        CMNewArray(broker.handle(), static_cast<CMPICount>(argument.texts.size()), type, &status);
+    data.value.array = CMNewArray(broker.handle(), size, type, &status);
     require(status);
-    for (CMPICount i = 0; i < argument.texts.size(); ++i) {
+    for (CMPICount i = 0; i < size; ++i) {
         const CMPIData element = valueOf(request, argument, argument.texts[i]);
-        require(CMSetArrayElementAt(data.value.array, i, &element.value, type));
+        require(CMSetArrayElementAt(data.value.array, i, valueIn(element), type));
     }
     return data;
 }
@@ -156,7 +178,7 @@ CMPIArgs* argumentsFrom(EmbeddedBroker& broker, Request& request, const CMPIObje
     const auto declared = [&](const std::string& name) { return argumentOf(declaration, name); };
     for (const Argument& argument : parsed(argumentWord, texts, declared)) {
         const CMPIData data = dataOf(broker, request, argument);
-        require(CMAddArg(arguments, argument.name.c_str(), &data.value, data.type));
+        require(CMAddArg(arguments, argument.name.c_str(), valueIn(data), data.type));
     }
     return arguments;
 }
@@ -173,7 +195,7 @@ CMPIInstance* instanceFrom(EmbeddedBroker& broker, Request& request, const CMPIO
     const auto declared = [&](const std::string& name) { return propertyOf(broker, className, name); };
     for (const Argument& property : parsed(propertyWord, texts, declared)) {
         const CMPIData data = dataOf(broker, request, property);
-        require(CMSetProperty(instance, property.name.c_str(), &data.value, data.type));
+        require(CMSetProperty(instance, property.name.c_str(), valueIn(data), data.type));
     }
     return instance;
 }

@@ -9,8 +9,9 @@
 namespace oxahv::runner {
 
 // What texts of the form name=value mean: input arguments of the method. The declaration of the path's class,
-// if there is one, gives their names and types; of an array, each name=value adds one element. Without
-// declaration a value is what it looks like. Throws BrokerError, one line, for what does not fit.
+// if there is one, gives their names and types; of an array, each name=value adds one element, and
+// name={} alone makes an empty one. The word NULL is a NULL, a text only in quotes. Without declaration a
+// value is what it looks like. Throws BrokerError, one line, for what does not fit.
 CMPIArgs* argumentsFrom(EmbeddedBroker& broker, Request& request, const CMPIObjectPath* path,
                         const std::string& method, const std::vector<std::string>& texts);
 

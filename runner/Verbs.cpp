@@ -67,7 +67,9 @@ void addTaken(CLI::App& command, Takes takes, Operands& operands) {
         break;
     case Takes::method:
         command.add_option("METHOD", operands.method, "the method's name")->required()->type_name("");
-        command.add_option("name=value", operands.values, "an input argument")->type_name("");
+        command
+            .add_option("name=value", operands.values, "an input argument; NULL is a NULL, {} an empty array")
+            ->type_name("");
         break;
     case Takes::values:
         command.add_option("name=value", operands.values, "a property")->type_name("");

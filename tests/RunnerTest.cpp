@@ -100,9 +100,11 @@ TEST(RunnerTest, FollowsAssociations) {
 }
 
 TEST(RunnerTest, CallsMethodsWithDeclaredParameters) {
-    const File file("class Demo {\n"
+    const File file("class Inner { uint8 Size; };\n"
+                    "class Demo {\n"
                     "  uint32 Echo([In] string Text, [In] uint8 Small, real32 Real, boolean Flag,\n"
-                    "    uint16 Numbers[], datetime When, Demo ref Other, [In(false), Out] string Result);\n"
+                    "    uint16 Numbers[], datetime When, Demo ref Other, [In(false), Out] string Result,\n"
+                    "    [EmbeddedInstance(\"Inner\")] string In[]);\n"
                     "};\n");
     const std::string call = test + "--mof " + file.path() + " cm Demo ";
     const std::string when = "When=20260102030405.000000+060";
@@ -112,6 +114,13 @@ TEST(RunnerTest, CallsMethodsWithDeclaredParameters) {
         {"'Text=a=b \"c'", R"(Text = "a=b \"c")"},
         {R"('Text="a \"b\\"')", R"(Text = "a \"b\\")"},
         {"Numbers=1 Numbers=65535", "Numbers = {1, 65535}"},
+        {"Numbers={}", "Numbers = {}"},
+        {"Numbers=NULL", "Numbers = NULL"},
+        {"Numbers=1 Numbers=NULL", "Numbers = {1, NULL}"},
+        {"Small=NULL", "Small = NULL"},
+        {"Text=NULL", "Text = NULL"},
+        {"'Text=\"NULL\"'", "Text = \"NULL\""},
+        {"In='instance of Inner { Size = 7; }' In=NULL", "In = {instance of Inner { Size = 7; }, NULL}"},
         {when, "When = \"20260102030405.000000+060\""},
         {"Other=root/x:Demo", "Other = \"root/x:Demo\""},
     };
@@ -124,12 +133,14 @@ TEST(RunnerTest, CallsMethodsWithDeclaredParameters) {
               Json::parse(R"({"path": "root/cimv2:Demo", "method": "Echo", "returnValue": 6,
             "parameters": {"Small": 7, "Real": 0.1, "Flag": true, "Numbers": [8], "Other": "Demo",
                            "When": "20260102030405.000000+060"}})"));
+    EXPECT_EQ(jsonOf(call + "Echo In='instance of Inner { Size = 7; }'")["parameters"],
+              Json::parse(R"({"In": [{"class": "Inner", "properties": {"Size": 7}}]})"));
     const std::pair<const char*, const char*> bad[] = {
         {"Other", "class Demo has no method Other; it has Echo"},
         {"Echo Text", "argument 'Text' is not name=value"},
         {"Echo =x", "argument '=x' is not name=value"},
         {"Echo Txt=x",
-         "method Echo has no parameter Txt; it has Text, Small, Real, Flag, Numbers, When, Other"},
+         "method Echo has no parameter Txt; it has Text, Small, Real, Flag, Numbers, When, Other, In"},
         {"Echo Result=x", "parameter Result of method Echo is an output; leave it out"},
         {"Echo Text=x text=y", "argument Text stands twice; only an array takes several values"},
         {"Echo Small=256", "argument Small: value, column 1: 256 does not fit into uint8"},

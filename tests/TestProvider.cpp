@@ -81,7 +81,8 @@ CMPIStatus invokeMethod(CMPIMethodMI*, const CMPIContext*, const CMPIResult* res
         if (name == nullptr) {
             CMReturn(CMPI_RC_ERR_FAILED);
         }
-        CMAddArg(out, CMGetCharsPtr(name, nullptr), &argument.value, argument.type);
+        CMAddArg(out, CMGetCharsPtr(name, nullptr), CMIsNullValue(argument) ? nullptr : &argument.value,
+                 argument.type);
     }
     return CMReturnData(result, &count, CMPI_uint32);
 }

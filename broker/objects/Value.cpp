@@ -18,12 +18,10 @@ const Object* objectIn(const void* handle) {
     if (object == nullptr && handle != nullptr) {
         throw Failure{CMPI_RC_ERR_INVALID_HANDLE};
     }
-<<<<<<< HEAD
+    if (object != nullptr) {
+        requireShallow(*object);
+    }
     return object;
-=======
-    requireShallow(*object);
-    return object->clone();
->>>>>>> 1eaec18 (Take embedded instances where the class declares them)
 }
 
 // The object kind that a type's handles have.

@@ -151,11 +151,7 @@ void Query::check(const Classes& classes) const {
     if (!classes.any()) {
         return;
     }
-<<<<<<< HEAD
     const DeclaredClass* const declared = classes.find(className_);
-=======
-    const auto declared = classes.find(className_);
->>>>>>> 1eaec18 (Take embedded instances where the class declares them)
     if (declared == nullptr) {
         failWith(CMPI_RC_ERR_INVALID_CLASS, "class " + className_ + " is not declared");
     }

@@ -29,14 +29,7 @@ CMPIInstance* newInstance(Core& core, const CMPIObjectPath* handle) {
         if (declared == nullptr) {
             throw Failure{CMPI_RC_ERR_INVALID_CLASS};
         }
-<<<<<<< HEAD
         instance->properties = nullValues(*declared);
-=======
-        for (const PropertyDeclaration& property : declared->properties) {
-            instance->properties.set(property.name,
-                                     Value::null(valueType(property.type, property.qualifiers)));
-        }
->>>>>>> 1eaec18 (Take embedded instances where the class declares them)
     }
     instance->setPath(path->copy());
     return handOut(std::move(instance));

@@ -125,6 +125,14 @@ void JsonWriter::add(const CMPIData& data) {
     case CMPI_ref:
         addText(pathText(data.value.ref));
         break;
+    case CMPI_instance: // it has no path of its own
+        open('{');
+        addMember("class");
+        addText(textOf(CMGetClassName(CMGetObjectPath(data.value.inst, nullptr), nullptr)));
+        addMember("properties");
+        addMembers(propertiesOf(data.value.inst));
+        close('}');
+        break;
     default: {
         const std::string text = valueText(data); // numbers, and what has no form of its own
         const bool isNumber = data.type == CMPI_char16 || (data.type & CMPI_INTEGER) != 0;
