@@ -86,13 +86,25 @@ void EmbeddedBroker::declare(const ClassDeclaration& declaration) {
     impl_->classes.declare(declaration);
 }
 
-void EmbeddedBroker::compileMof(const std::string& file) {
-    impl_->classes.change([&](Declarations& declarations) { MofCompiler(declarations).compileFile(file); });
+std::vector<MofWarning> EmbeddedBroker::compileMof(const std::string& file, const MofOptions& options) {
+    std::vector<MofWarning> warnings;
+    impl_->classes.change([&](Declarations& declarations) {
+        MofCompiler compiler(declarations, options);
+        compiler.compileFile(file);
+        warnings = compiler.takeWarnings();
+    });
+    return warnings;
 }
 
-void EmbeddedBroker::compileMofText(const std::string& text, const std::string& name) {
-    impl_->classes.change(
-        [&](Declarations& declarations) { MofCompiler(declarations).compileText(text, name); });
+std::vector<MofWarning> EmbeddedBroker::compileMofText(const std::string& text, const std::string& name,
+                                                       const MofOptions& options) {
+    std::vector<MofWarning> warnings;
+    impl_->classes.change([&](Declarations& declarations) {
+        MofCompiler compiler(declarations, options);
+        compiler.compileText(text, name);
+        warnings = compiler.takeWarnings();
+    });
+    return warnings;
 }
 
 bool EmbeddedBroker::hasDeclarations() const {

@@ -286,3 +286,61 @@ TEST(MofTest, DeclarationsCanBeBuiltInCode) {
               " abstract association [Abstract:boolean=TRUE- Association:boolean=TRUE]\n"
               "Base REF End\nuint8 Id* [Key:boolean=TRUE]\nuint8 Stop()\n  in boolean Hard\n");
 }
+
+TEST(MofTest, WarnsOfWhatTheStandardForbids) {
+    const std::string begin =
+        "Qualifier Fixed : string, scope(any), flavor(DisableOverride);\n"
+        "[Fixed(\"a\")] class Base { [Key, MaxLen(8)] string Id; [Fixed(\"a\")] uint8 Size; "
+        "uint32 Do(uint8 A); };\n"
+        "[Association] class Link { [Key] Base REF One; [Key] Base REF Other; };\n";
+    const std::pair<const char*, const char*> rows[] = {
+        {"class A { [Kye] string Id; };", "4:12: qualifier Kye is not declared"},
+        {"class A { [Description(5)] string B; };", "4:24: qualifier Description is of type string"},
+        {"class A { [Values] string B; };", "4:12: qualifier Values needs a value"},
+        {"[MaxLen(5)] class A { };", "4:2: qualifier MaxLen is not for this kind of element"},
+        {"class A { uint8 M([Read] uint8 B); };", "4:20: qualifier Read is not for this kind of element"},
+        {"class A { Base REF B; };", "4:20: reference B is in a class that is no association"},
+        {"[Association] class A { [Key] Base REF B; };",
+         "4:21: association A has one reference, and needs two"},
+        {"[Association] class A { };", "4:21: association A has no reference, and needs two"},
+        {"class A : Base { [Key] string B; };", "4:31: key B is added to those of class Base"},
+        {"class A : Base { [Override(\"Nothing\")] uint8 Size; };",
+         "4:19: property Size overrides 'Nothing', which has another name"},
+        {"class A : Base { [Override] uint8 B; };", "4:19: property B overrides what no superclass has"},
+        {"class A : Base { uint8 Size; };",
+         "4:24: property Size is inherited, and redeclared without the qualifier Override"},
+        {"class A : Base { [Override(\"Do\")] uint32 Do(); };",
+         "4:42: method Do has other parameters than the one that it overrides"},
+        {"class A : Link { [Override(\"One\")] Link REF One; };",
+         "4:45: reference One leads to Link, which is no Base"},
+        {"[Fixed(\"b\")] class A : Base { };",
+         "4:2: qualifier Fixed is declared as one that no subclass changes"},
+        {"class A : Base { [Override(\"Size\"), Fixed(\"b\")] uint8 Size; };",
+         "4:37: qualifier Fixed is declared as one that no subclass changes"},
+        {"class A { [EmbeddedInstance(\"Base\")] uint8 B; };",
+         "4:12: qualifier EmbeddedInstance is for texts, and B is a uint8"},
+        {"class A { uint8 B[2] = {1, 2, 3}; };", "4:24: array B has 3 elements where it is declared with 2"},
+    };
+    for (const auto& [text, warning] : rows) {
+        EmbeddedBroker broker;
+        const auto warnings = broker.compileMofText(begin + text, "t.mof");
+        ASSERT_EQ(warnings.size(), 1U) << text;
+        const oxahv::MofWarning& first = warnings.front();
+        EXPECT_EQ(std::to_string(first.line) + ':' + std::to_string(first.column) + ": " + first.text,
+                  warning);
+        EXPECT_TRUE(first.file == "t.mof" && broker.isDeclared("A")) << text;
+        EmbeddedBroker strict;
+        const std::string whole = begin + text;
+        EXPECT_EQ(errorOf([&] { strict.compileMofText(whole, "t.mof", {true}); }),
+                  std::string("t.mof:") + warning);
+        EXPECT_FALSE(strict.hasDeclarations());
+    }
+    EmbeddedBroker broker;
+    const std::string right =
+        "[Fixed(\"a\"), Description(\"right\")] class A : Base { [Override(\"Size\"), Fixed(\"a\")] uint8 "
+        "Size; "
+        "[Override(\"Do\")] uint32 Do(uint8 a); [Override(\"Id\")] string Id; uint8 B[2] = {1, 2}; "
+        "[EmbeddedInstance(\"Base\"), ValueMap{\"a\"}] string C[]; };\n"
+        "class Top : A { }; [Association] class LinkToA : Link { [Override(\"One\")] Top REF One; };";
+    EXPECT_TRUE(broker.compileMofText(begin + right, "t.mof", {true}).empty());
+}

@@ -12,6 +12,7 @@
 
 #include "TKExport.h"
 
+#include <cstddef>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -19,6 +20,20 @@
 #include <vector>
 
 namespace oxahv {
+
+/** How MOF is compiled. */
+struct MofOptions {
+    /** Whether what DSP0004 forbids is an error even where its meaning is clear; else it is a warning. */
+    bool isStrict = false;
+};
+
+/** What DSP0004 forbids in a MOF text, and the broker takes all the same. */
+struct MofWarning {
+    std::string file;       ///< the file, or what the text is called
+    std::size_t line = 0;   ///< from 1
+    std::size_t column = 0; ///< from 1, in characters
+    std::string text;       ///< what breaks which rule, for a person
+};
 
 /** One plain value in a declaration: an unsigned integer (a `char16` too) or one with a sign, as its type
  * says; a text, date/time or reference as text in UTF-8; the first alternative is a NULL. */

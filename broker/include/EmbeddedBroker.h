@@ -115,20 +115,28 @@ public:
      * hold for the next.
      *
      * Of the pragmas, `include` is followed, relative to the file that it stands in; the others and instances
-     * are passed over, which have to be well-formed all the same. Superclasses must be declared before; classes that references lead to need not be
-     * declared. A qualifier without a declared type is taken with the type that its value has.
+     * are passed over, which have to be well-formed all the same. Superclasses must be declared before;
+     * classes that references lead to need not be declared. A qualifier without a declared type is taken with
+     * the type that its value has.
      * @param file path of a regular file, at most 256 MiB with all that it includes.
+     * @param options a strict compilation throws at the first thing that it would else warn of.
+     * @return what DSP0004 forbids and is taken all the same: qualifiers that nobody declares, such as a
+     * misspelt `[Kye]`, on the wrong kind of element, of another type, or changed where their declaration
+     * disables it; references outside associations, and associations with less than two; keys added to
+     * inherited ones; redeclarations without Override, overrides of nothing, with other parameters, or to a
+     * class that is no subclass; embedded instances that are no texts; arrays longer than declared. In order; the first 1,000.
      * @throws BrokerError whose text is `file:line:column: message`, lines and characters counted from 1, for
      * the first error; one of reading an included file stands where its pragma does.
      */
-    void compileMof(const std::string& file);
+    std::vector<MofWarning> compileMof(const std::string& file, const MofOptions& options = {});
     /**
      * The same for a text.
      * @param text UTF-8, with or without a byte order mark.
      * @param name what errors call the text; files that it includes are looked for beside a file of that
      * name.
      */
-    void compileMofText(const std::string& text, const std::string& name);
+    std::vector<MofWarning> compileMofText(const std::string& text, const std::string& name,
+                                           const MofOptions& options = {});
     /** Whether any class is declared. */
     bool hasDeclarations() const;
     /** Whether the class is declared. */

@@ -1,5 +1,6 @@
 #include "mof/MofCompiler.h"
 
+#include "mof/MofRules.h"
 #include "mof/MofValues.h"
 
 #include <Utf8.h>
@@ -15,6 +16,7 @@ namespace {
 constexpr std::size_t maximalSize = 256UL * 1024 * 1024;
 constexpr std::size_t maximalFiles = 20000;
 constexpr std::size_t maximalDepth = 64;
+constexpr std::size_t mostWarnings = 1000;
 
 // The qualifiers that the broker heeds, and those that stay with their class, as CIM declares them: they mean
 // the same in a text that does not bring their declarations.
@@ -97,7 +99,8 @@ std::size_t placeOf(const DeclarationError& error, const MofClass& declared) {
 
 } // namespace
 
-MofCompiler::MofCompiler(Declarations& declarations) : declarations_(declarations) {
+MofCompiler::MofCompiler(Declarations& declarations, const MofOptions& options)
+    : declarations_(declarations), options_(options) {
     for (const StandardQualifier& standard : standardQualifiers) {
         if (declarations_.findQualifier(standard.name) == nullptr) {
             QualifierDeclaration implied{standard.name, impliedValue(standard.type)};
@@ -188,6 +191,20 @@ void MofCompiler::declare(const MofSource& source, const MofClass& declared) {
     } catch (const DeclarationError& error) {
         source.fail(placeOf(error, declared), error.what());
     }
+    checkRules(source, declared);
+}
+
+void MofCompiler::checkRules(const MofSource& source, const MofClass& declared) {
+    const MofRules::Report report = [&](std::size_t offset, const std::string& message) {
+        if (options_.isStrict) {
+            source.fail(offset, message);
+        }
+        if (warnings_.size() < mostWarnings) { // each counts the lines before it
+            const MofSource::Place place = source.placeOf(offset);
+            warnings_.push_back({source.name, place.line, place.column, message});
+        }
+    };
+    MofRules(declarations_, source, declared, report).check();
 }
 
 // An association is a class too, and so is an indication; what a class derives from decides as well.

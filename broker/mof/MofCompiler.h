@@ -14,11 +14,12 @@ namespace oxahv {
 // `file:line:column: message`.
 class MofCompiler {
 public:
-    // Keeps the reference.
-    explicit MofCompiler(Declarations& declarations);
+    // Keeps the reference. A strict one throws at what it would else collect.
+    explicit MofCompiler(Declarations& declarations, const MofOptions& options = {});
 
     void compileFile(const std::string& file);
     void compileText(const std::string& text, const std::string& name);
+    std::vector<MofWarning> takeWarnings() { return std::move(warnings_); }
 
 private:
     void compile(const MofSource& source);
@@ -29,6 +30,7 @@ private:
     void declare(const MofSource& source, const MofInclude& include);
     void declare(const MofSource& source, const MofInstance& instance);
 
+    void checkRules(const MofSource& source, const MofClass& declared);
     unsigned int scopesOf(const MofClass& declared) const;
     PropertyDeclaration propertyOf(const MofSource& source, const MofElement& element) const;
     MethodDeclaration methodOf(const MofSource& source, const MofMethod& method) const;
@@ -38,6 +40,8 @@ private:
                                      unsigned int scopes, const char* element) const;
 
     Declarations& declarations_;
+    MofOptions options_;
+    std::vector<MofWarning> warnings_;
     std::vector<std::filesystem::path>
         open_;             // the files that are being read, each included by the one before
     std::size_t size_ = 0; // of all texts so far

@@ -49,17 +49,24 @@ constexpr std::string_view lineEnds = "\r\n"; // each of them, and both together
 
 } // namespace
 
-void MofSource::fail(std::size_t offset, const std::string& message) const {
+MofSource::Place MofSource::placeOf(std::size_t offset) const {
+    Place place;
     const std::string_view before = std::string_view(text).substr(0, offset);
-    long line = 1;
     for (std::size_t i = 0; i < offset; ++i) {
-        line += text[i] == '\n' || (text[i] == '\r' && text[i + 1] != '\n') ? 1 : 0;
+        place.line += text[i] == '\n' || (text[i] == '\r' && text[i + 1] != '\n') ? 1 : 0;
     }
     const std::size_t lineStart =
         before.find_last_of(lineEnds) + 1; // 0 on the first line, where nothing is found
-    const auto column = 1 + std::count_if(before.begin() + static_cast<std::ptrdiff_t>(lineStart),
-                                          before.end(), [](char c) { return !encoding::isContinuation(c); });
-    throw BrokerError(name + ':' + std::to_string(line) + ':' + std::to_string(column) + ": " + message);
+    place.column += static_cast<std::size_t>(
+        std::count_if(before.begin() + static_cast<std::ptrdiff_t>(lineStart), before.end(),
+                      [](char c) { return !encoding::isContinuation(c); }));
+    return place;
+}
+
+void MofSource::fail(std::size_t offset, const std::string& message) const {
+    const Place place = placeOf(offset);
+    throw BrokerError(name + ':' + std::to_string(place.line) + ':' + std::to_string(place.column) + ": " +
+                      message);
 }
 
 MofLexer::MofLexer(const MofSource& source) : source_(source), text_(source.text) {}

@@ -11,6 +11,12 @@ struct MofSource {
     std::string name;
     std::string text;
 
+    // Where an offset is.
+    struct Place {
+        std::size_t line = 1;
+        std::size_t column = 1;
+    };
+    Place placeOf(std::size_t offset) const;
     // Throws BrokerError, `name:line:column: message` of the place.
     [[noreturn]] void fail(std::size_t offset, const std::string& message) const;
 };

@@ -332,7 +332,7 @@ void MofParser::readFeature(MofClass& declared) {
         declared.methods.push_back({std::move(element), readParameters()});
     } else {
         const std::size_t offset = token_.offset;
-        element.type = readArraySuffix(element.type);
+        element.type = readArraySuffix(element.type, &element.arraySize);
         if (element.type == (CMPI_ref | CMPI_ARRAY)) {
             source_.fail(offset, "a reference property cannot be an array");
         }
@@ -371,13 +371,16 @@ CMPIType MofParser::readDataType() {
 }
 
 // The type, as an array if brackets follow, with or without a size.
-CMPIType MofParser::readArraySuffix(CMPIType type) {
+CMPIType MofParser::readArraySuffix(CMPIType type, unsigned long long* size) {
     if (!takeSymbol('[')) {
         return type;
     }
     if (token_.kind == MofKind::integer) {
         if (token_.isNegative() || token_.magnitude == 0) {
             failExpecting("a size from 1 on");
+        }
+        if (size != nullptr) {
+            *size = token_.magnitude;
         }
         take();
     }
@@ -392,7 +395,7 @@ std::vector<MofElement> MofParser::readParameters() {
     }
     do {
         parameters.push_back(readElement());
-        parameters.back().type = readArraySuffix(parameters.back().type);
+        parameters.back().type = readArraySuffix(parameters.back().type, &parameters.back().arraySize);
     } while (takeSymbol(','));
     expectSymbol(')');
     return parameters;

@@ -53,6 +53,7 @@ struct MofElement {
     std::string referenceClass; // of a reference
     MofName name;
     std::optional<MofValue> value;
+    unsigned long long arraySize = 0; // 0: any
 };
 
 struct MofMethod : MofElement {
@@ -131,7 +132,7 @@ private:
     void readFeature(MofClass& declared);
     MofElement readElement();
     CMPIType readDataType();
-    CMPIType readArraySuffix(CMPIType type);
+    CMPIType readArraySuffix(CMPIType type, unsigned long long* size = nullptr);
     std::vector<MofElement> readParameters();
     MofValue readValue(bool mayEmbed = false);
     MofToken readConstant();
