@@ -84,6 +84,7 @@ void addOptions(CLI::App& app, Options& options, Words& words) {
     app.add_option("--mof", options.mofFiles, "declare the classes of a MOF file; repeatable")
         ->type_name("FILE")
         ->allow_extra_args(false);
+    app.add_flag("--strict", options.mof.isStrict, "refuse MOF that breaks a rule of DSP0004");
     app.add_option("--namespace", options.nameSpace, "the namespace of the request")
         ->type_name("NS")
         ->capture_default_str();

@@ -37,6 +37,7 @@ struct Options {
     Conduct conduct;
     bool hasConduct = false; // whether the user has asked for any
     std::vector<std::string> mofFiles;
+    MofOptions mof;
     std::vector<std::string> contextEntries; // NAME=TEXT
     std::vector<std::string> faults;         // SLOT:N[:CODE]
 };

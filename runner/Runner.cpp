@@ -131,12 +131,20 @@ void apply(EmbeddedBroker& broker, const Conduct& conduct) {
     broker.setPathDelivery(conduct.pathDelivery);
 }
 
+static void warn(const std::vector<MofWarning>& warnings) {
+    for (const MofWarning& warning : warnings) {
+        const std::string place =
+            warning.file + ':' + std::to_string(warning.line) + ':' + std::to_string(warning.column);
+        std::cerr << "oxahv-provider: warning: " << printable(place + ": " + warning.text) << '\n';
+    }
+}
+
 void prepare(EmbeddedBroker& broker, const Options& options) {
     if (options.showsTraces) {
         showTraces();
     }
     for (const std::string& file : options.mofFiles) {
-        broker.compileMof(file);
+        warn(broker.compileMof(file, options.mof));
     }
     for (const std::string& entry : options.contextEntries) {
         addContextEntry(broker, entry);

@@ -61,15 +61,18 @@ const std::map<std::string, std::string> expectedFindings = {
 };
 
 std::string faultyClasses() {
-    std::string text = "[Abstract] class Faulty_Base { [Key] string Name; string Text; uint32 Number;"
-                       " datetime When; uint32 Call([In(false), Out] uint8 Result); };"
+    const std::string members = "{ [Key] string Name; string Text; uint32 Number; datetime When;"
+                                " uint32 Call([In(false), Out] uint8 Result); ";
+    std::string text = "[Abstract] class Faulty_Base " + members +
+                       "};"
                        "[Abstract] class Faulty_End : Faulty_Base {};"
                        "[Association, Abstract] class Faulty_Link {"
                        " [Key] Faulty_Base REF Near; [Key] Faulty_End REF Far; };"
                        "class Faulty_Hang : Faulty_Base {}; class Faulty_HangClosed : Faulty_Base {};";
     for (const auto& [name, findings] : expectedFindings) {
-        text += "class Faulty_" + name + " : Faulty_Base {";
-        text += name == "UntypedKeys" || name == "KeyOrder" ? "[Key] uint16 Index; };" : "};";
+        const bool hasTwoKeys = name == "UntypedKeys" || name == "KeyOrder";
+        text +=
+            "class Faulty_" + name + (hasTwoKeys ? members + "[Key] uint16 Index; };" : " : Faulty_Base {};");
     }
     return text;
 }
@@ -272,7 +275,8 @@ Texts offered(const std::string& words) {
 } // namespace
 
 TEST(Completion, OffersWhatTheHelpShows) {
-    for (const std::string verb : {"", "ein", "ei", "gi", "an", "ai", "rn", "ri", "cm", "ci", "mi", "di", "xq", "check"}) {
+    for (const std::string verb :
+         {"", "ein", "ei", "gi", "an", "ai", "rn", "ri", "cm", "ci", "mi", "di", "xq", "check"}) {
         const Texts all = offered(verb + " --");
         const std::string help = run(verb + " --help").output;
         std::istringstream lines(help.substr(0, help.find("Exit status"))); // examples follow

@@ -99,6 +99,16 @@ TEST(RunnerTest, FollowsAssociations) {
     EXPECT_TRUE(jsonOf(host + hostClasses + "gi" + ofOs)["properties"].at("Description").is_null());
 }
 
+TEST(RunnerTest, WarnsOfMofThatBreaksRulesAndRefusesItWhenStrict) {
+    const File file("class Demo { [Kye] string Id; };\n");
+    const std::string text = file.path() + ":1:15: qualifier Kye is not declared\n";
+    const std::string call = test + "--mof " + file.path() + " cm Demo Echo";
+    EXPECT_EQ(run(call, "2>&1 >/dev/null").output.rfind("oxahv-provider: warning: " + text, 0), 0U);
+    expectFailure("--strict " + call, 2, text.substr(0, text.size() - 1));
+    EXPECT_EQ(run("--strict " + host + hostClasses + "ein OXATK_ComputerSystem", "2>&1 >/dev/null").output,
+              "");
+}
+
 TEST(RunnerTest, CallsMethodsWithDeclaredParameters) {
     const File file("class Inner { uint8 Size; };\n"
                     "class Demo {\n"
