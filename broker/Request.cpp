@@ -125,7 +125,8 @@ Reply Request::deleteInstance(const CMPIObjectPath* path) {
 
 Reply Request::execQuery(const CMPIObjectPath* classPath, const std::string& query,
                          const std::string& language) {
-    return impl_->serve<&CMPIInstanceMIFT::execQuery>(classPath, query.c_str(), language.c_str());
+    return impl_->core.hosting.execQuery(impl_->contextFor(classPath), classPath, query.c_str(),
+                                         language.c_str());
 }
 
 Reply Request::associators(const CMPIObjectPath* path, const AssociationFilter& filter,

@@ -470,3 +470,62 @@ TEST_F(AQuery, SurvivesOutOfMemory) {
     EXPECT_GT(failures, 20U);
     EXPECT_EQ(broker_.liveObjects().total(), live);
 }
+
+namespace {
+
+const CMPIBroker* theBroker = nullptr;
+
+// Three instances, which another query function would have to be asked for.
+CMPIStatus enumerateThree(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* result,
+                          const CMPIObjectPath* path, const char**) {
+    for (CMPIUint32 i = 1; i <= 3; ++i) {
+        CMPIInstance* const instance = CMNewInstance(theBroker, path, nullptr);
+        CMPIValue value = {};
+        value.uint32 = i;
+        CMSetProperty(instance, "Id", &value, CMPI_uint32);
+        CMSetProperty(instance, "Size", &value, CMPI_uint32);
+        CMSetProperty(instance, "Text", "x", CMPI_chars);
+        CMReturnInstance(result, instance);
+    }
+    return CMReturnDone(result);
+}
+
+CMPIInstanceMI* createThree(const CMPIBroker* broker, const CMPIContext*, CMPIStatus*) {
+    static CMPIInstanceMIFT table = {};
+    static CMPIInstanceMI mi = {nullptr, &table};
+    table.enumerateInstances = enumerateThree;
+    theBroker = broker;
+    return &mi;
+}
+
+} // namespace
+
+TEST_F(AQuery, IsAppliedToAllInstancesWhereTheProviderDoesNone) {
+    broker_.declare(ClassDeclaration("Demo")
+                        .key("Id", CMPI_uint32)
+                        .property("Size", CMPI_uint32)
+                        .property("Text", CMPI_string));
+    const CMPIObjectPath* const path = request_.objectPath("root", "Demo");
+    EXPECT_EQ(request_.execQuery(path, "SELECT * FROM Demo", "WQL").code, CMPI_RC_ERR_NOT_SUPPORTED);
+    broker_.host("Three", {createThree});
+    const auto ask = [&](const char* query) {
+        const oxahv::Reply reply = request_.execQuery(path, query, "WQL");
+        std::string answer = reply.ok() ? "" : oxahv::codeName(reply.code) + ' ' + reply.message;
+        for (CMPIInstance* const instance : reply.instances) {
+            CMPIData data = {CMPI_instance, CMPI_goodValue, {}};
+            data.value.inst = instance;
+            answer += oxahv::valueText(data) + '\n';
+        }
+        return answer;
+    };
+    EXPECT_EQ(ask("SELECT Text FROM Demo WHERE Size >= 2 AND Id <> 3"),
+              "instance of Demo { Id = 2; Text = \"x\"; }\n");
+    EXPECT_EQ(ask("SELECT * FROM Demo WHERE Id = 1"),
+              "instance of Demo { Id = 1; Size = 1; Text = \"x\"; }\n");
+    EXPECT_EQ(ask("SELECT Color FROM Demo"),
+              "CMPI_RC_ERR_INVALID_QUERY query, column 8: class Demo has no property Color");
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    CMPIEnumeration* const upcall = handle_->bft->execQuery(
+        handle_, request_.context(), path, "SELECT * FROM Demo WHERE Size < 3", "WQL", &status);
+    EXPECT_EQ(CMGetArrayCount(CMToArray(upcall, nullptr), nullptr), 2U);
+}

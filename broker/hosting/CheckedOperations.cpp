@@ -1,6 +1,9 @@
-// The operations that Hosting checks against the class's declaration before it asks a provider: methods and
-// single properties.
+// The operations for which Hosting does more than to ask a provider: it checks methods and single properties
+// against the class's declaration, and answers queries that providers leave to it.
 #include "Core.h"
+#include "query/Query.h"
+
+#include <algorithm>
 
 namespace oxahv {
 
@@ -36,7 +39,8 @@ std::string complaintAbout(const DeclaredClass* declared, const char* property) 
                : "";
 }
 
-// Whether a property is to be read from its instance, or written by it: no property MI does it.
+// Whether a property is to be read from its instance, or written by it, or a query to be answered from all
+// instances: no MI does it itself.
 bool isLeftToInstances(const Reply& reply) {
     return !reply.isServed || reply.code == CMPI_RC_ERR_NOT_SUPPORTED;
 }
@@ -120,6 +124,41 @@ Reply Hosting::setProperty(const CMPIContext* context, const CMPIObjectPath* pat
     Reply reply = serve<&CMPIPropertyMIFT::setProperty>(context, path, name, data);
     return isLeftToInstances(reply) ? either(std::move(reply), modifyProperty(context, path, name, data))
                                     : reply;
+}
+
+// Leaves of the instances those that the query accepts, with the properties that it selects.
+static void apply(const Query& query, Reply& reply) {
+    const auto isRefused = [&](const CMPIInstance* instance) {
+        return !query.accepts(*Instance::of(instance));
+    };
+    reply.instances.erase(std::remove_if(reply.instances.begin(), reply.instances.end(), isRefused),
+                          reply.instances.end());
+    for (const CMPIInstance* const instance : reply.instances) {
+        query.project(*Instance::of(instance));
+    }
+}
+
+Reply Hosting::execQuery(const CMPIContext* context, const CMPIObjectPath* path, const char* query,
+                         const char* language) {
+    Reply reply = serve<&CMPIInstanceMIFT::execQuery>(context, path, query, language);
+    const ObjectPath* const asked = ObjectPath::of(path);
+    if (!isLeftToInstances(reply) || reply.code != CMPI_RC_ERR_NOT_SUPPORTED || asked == nullptr ||
+        query == nullptr || language == nullptr) {
+        return reply;
+    }
+    try {
+        const std::shared_ptr<const Query> parsed = Query::parse(query, language);
+        parsed->check(core_.classes);
+        auto from = std::make_unique<ObjectPath>(core_, asked->nameSpace, parsed->className());
+        Reply all = serve<&CMPIInstanceMIFT::enumerateInstances>(context, handOut(std::move(from)),
+                                                                 static_cast<const char**>(nullptr));
+        if (all.ok()) {
+            apply(*parsed, all);
+        }
+        return either(std::move(reply), std::move(all));
+    } catch (const Failure& failure) {
+        return refused(failure.code, failure.text != nullptr ? *failure.text : "");
+    }
 }
 
 Reply Hosting::modifyProperty(const CMPIContext* context, const CMPIObjectPath* path, const char* name,

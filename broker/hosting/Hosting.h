@@ -40,6 +40,10 @@ public:
     Reply setProperty(const CMPIContext* context, const CMPIObjectPath* path, const char* name,
                       const CMPIValue* value, CMPIType type);
 
+    // A query: by a provider that does queries, else by all instances of the class that the query names.
+    Reply execQuery(const CMPIContext* context, const CMPIObjectPath* path, const char* query,
+                    const char* language);
+
     // Those with an indication MI that serve the class, one above it or one below it, or all classes.
     Providers findForIndications(const std::string& className) const;
 

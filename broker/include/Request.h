@@ -172,7 +172,10 @@ public:
                          const std::vector<std::string>* properties = nullptr);
     /** Deletes an instance. */
     Reply deleteInstance(const CMPIObjectPath* path);
-    /** The instances that a query selects. */
+    /** The instances that a query selects. Where the provider of the class does no queries
+     * (`CMPI_RC_ERR_NOT_SUPPORTED`), the broker applies the query to all instances of the class that it
+     * names: the WHERE clause, and of the select list what is no key. Its errors are those of `newSelectExp`,
+     * with the place in the reply's message. */
     Reply execQuery(const CMPIObjectPath* classPath, const std::string& query, const std::string& language);
     /** @} */
 

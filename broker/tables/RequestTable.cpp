@@ -128,6 +128,11 @@ struct Upcall<slot> {
     }
 };
 
+CMPIEnumeration* execQuery(Core& core, const CMPIContext* context, const CMPIObjectPath* path,
+                           const char* query, const char* language) {
+    return enumerationOf(core, core.hosting.execQuery(context, path, query, language), path, CMPI_instance);
+}
+
 CMPIData invokeMethod(Core& core, const CMPIContext* context, const CMPIObjectPath* path, const char* method,
                       const CMPIArgs* in, CMPIArgs* out) {
     Arguments* const wanted = Arguments::of(out);
@@ -199,7 +204,7 @@ const CMPIBrokerFT requestTable = {
     SLOT(CMPIBrokerFT, createInstance, Upcall<&CMPIInstanceMIFT::createInstance>::path),
     SLOT(CMPIBrokerFT, modifyInstance, Upcall<&CMPIInstanceMIFT::modifyInstance>::nothing),
     SLOT(CMPIBrokerFT, deleteInstance, Upcall<&CMPIInstanceMIFT::deleteInstance>::nothing),
-    SLOT(CMPIBrokerFT, execQuery, Upcall<&CMPIInstanceMIFT::execQuery>::instances),
+    SLOT(CMPIBrokerFT, execQuery, execQuery),
     SLOT(CMPIBrokerFT, enumerateInstances, Upcall<&CMPIInstanceMIFT::enumerateInstances>::instances),
     SLOT(CMPIBrokerFT, associators, Upcall<&CMPIAssociationMIFT::associators>::instances),
     SLOT(CMPIBrokerFT, associatorNames, Upcall<&CMPIAssociationMIFT::associatorNames>::paths),
