@@ -719,3 +719,26 @@ TEST(CodeTest, IsFoundByNameOrNumber) {
     }
     EXPECT_EQ(errorOf([] { oxahv::codeFromName("ERR_NO"); }), "there is no CMPI return code ERR_NO");
 }
+
+TEST_F(RequestTest, ReadsAPathWithAHost) {
+    const std::string texts[][3] = {
+        {"//host.domain:5989/root/cimv2:Demo.Key=\"a:/b\"", "host.domain:5989",
+         "root/cimv2:Demo.Key=\"a:/b\""},
+        {"//[::1]/root:Demo", "[::1]", "root:Demo"},
+        {"root:Demo.Key=\"//x/y:z\"", "", "root:Demo.Key=\"//x/y:z\""},
+    };
+    for (const auto& [text, host, rest] : texts) {
+        const CMPIObjectPath* const read = path(text);
+        EXPECT_EQ(CMGetCharsPtr(CMGetHostname(read, nullptr), nullptr), host);
+        EXPECT_EQ(oxahv::pathText(read), rest);
+    }
+    const std::pair<std::string, const char*> wrong[] = {
+        {"///root:Demo", "column 3: expected a host"},
+        {"//host", "column 3: expected a slash and a namespace after the host"},
+        {"//host/Demo.Key=1", "column 8: expected a namespace and a colon after the host"},
+    };
+    for (const auto& [text, error] : wrong) {
+        const std::string& whole = text;
+        EXPECT_EQ(errorOf([&] { path(whole); }), std::string("object path, ") + error);
+    }
+}

@@ -133,8 +133,9 @@ public:
     CMPIObjectPath* objectPath(const std::string& nameSpace, const std::string& className);
     /**
      * The object path of a text: `Class.Key="text",Number=3`, a namespace and a colon may stand before it,
-     * `\"` and `\\` inside quotes. Numbers get their declared type; without declaration unsigned ones are
-     * `CMPI_uint64`, ones with a sign `CMPI_sint64`; `TRUE` and `FALSE` are booleans.
+     * before that a host as in `//host:5989/root/cimv2:Class`; `\"` and `\\` inside quotes. Numbers get
+     * their declared type; without declaration unsigned ones are `CMPI_uint64`, ones with a sign
+     * `CMPI_sint64`; `TRUE` and `FALSE` are booleans.
      * @param nameSpace the namespace of a text that names none.
      * @throws BrokerError naming the column (from 1) and what is wrong there.
      */

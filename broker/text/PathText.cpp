@@ -31,8 +31,10 @@ public:
         : core_(core), text_(text), subject_(subject) {}
 
     std::unique_ptr<ObjectPath> read(const std::string& defaultNameSpace) {
+        std::string host = readHost();
         const std::string nameSpace = readNameSpace(defaultNameSpace);
         auto path = std::make_unique<ObjectPath>(core_, nameSpace, readName("a class name"));
+        path->hostName = std::move(host);
         declared_ = core_.classes.find(path->className);
         if (position_ < text_.size()) {
             expect('.');
@@ -103,14 +105,32 @@ private:
         ++position_;
     }
 
-    // What stands before a colon, when that comes before any key.
+    // The host, which may have a port, of a text that begins with two slashes; else nothing. A namespace has
+    // to follow it.
+    std::string readHost() {
+        if (text_.compare(0, 2, "//") != 0) {
+            return {};
+        }
+        const std::size_t end = text_.find('/', 2);
+        if (end == 2 || end == std::string::npos) {
+            fail(2, end == 2 ? "expected a host" : "expected a slash and a namespace after the host");
+        }
+        position_ = end + 1;
+        return text_.substr(2, end - 2);
+    }
+
+    // What is written before a colon, when that comes before any key.
     std::string readNameSpace(const std::string& defaultNameSpace) {
-        const std::size_t end = text_.find_first_of(":.\"=");
+        const std::size_t start = position_;
+        const std::size_t end = text_.find_first_of(":.\"=", start);
         if (end == std::string::npos || text_[end] != ':') {
+            if (start != 0) {
+                fail(start, "expected a namespace and a colon after the host");
+            }
             return defaultNameSpace;
         }
         position_ = end + 1;
-        return text_.substr(0, end);
+        return text_.substr(start, end - start);
     }
 
     std::string readName(const char* what) {
@@ -245,8 +265,7 @@ private:
         }
         case CMPI_instance: {
             CMPIValue value = {};
-            const std::unique_ptr<Instance> instance =
-                readInstance(core_, {"embedded instance", text}, "");
+            const std::unique_ptr<Instance> instance = readInstance(core_, {"embedded instance", text}, "");
             value.inst = instance.get();
             return Value::from(core_, &value, CMPI_instance);
         }
