@@ -207,8 +207,12 @@ bool isShallow(const Value& value, std::size_t most) {
 }
 
 bool isShallow(const NamedValues& values, std::size_t most) {
-    return std::all_of(values.begin(), values.end(),
-                       [&](const NamedValue& named) { return isShallow(named.value, most); });
+    for (const NamedValue& named : values) {
+        if (!isShallow(named.value, most)) {
+            return false;
+        }
+    }
+    return true;
 }
 
 bool isShallow(const Object& object, std::size_t most) {
