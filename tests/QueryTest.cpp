@@ -446,6 +446,10 @@ TEST_F(AQuery, SurvivesOutOfMemory) {
     const CMPIInstance* const instance = demo();
     const std::string text =
         "SELECT a FROM Demo WHERE NOT (U8 = 200 OR Text LIKE 'a long pattern%') OR a = 1";
+    {
+        const Request request(broker_);
+        ask(text, "WQL", instance); // its values have their objects from now on
+    }
     const std::size_t live = broker_.liveObjects().total();
     unsigned int failures = 0;
     for (unsigned int n = 1; n < 10000; ++n) {
