@@ -3,9 +3,9 @@
 // The logger's two functions are defined here and do nothing, so that each trace point pays for its texts and
 // for two calls through the dynamic linker. So are the heap's entry points, which count.
 //
-// A row is measured in rounds. Each takes one slice of time of the operation and one of its floor, right after
-// each other, and of each the shortest slice counts: whatever else the machine does hits both alike, and a
-// short slice is likely to be spared.
+// A row is measured in rounds. Each takes one slice of time of the operation and one of its floor, right
+// after each other, and of each the shortest slice counts: whatever else the machine does hits both alike,
+// and a short slice is likely to be spared.
 #include "HVLogger.h"
 #include "Rows.h"
 
