@@ -3,7 +3,7 @@
 #include <gtest/gtest.h>
 
 // The C library's newlocale does not free its copy of LOCPATH when it runs out of memory.
-#pragma GCC visibility push(default) // where the sanitizer finds it
+#pragma GCC visibility push(default)                   // where the sanitizer finds it
 extern "C" const char* __lsan_default_suppressions();  // NOLINT(bugprone-reserved-identifier,cert-*)
 extern "C" const char* __lsan_default_suppressions() { // NOLINT(bugprone-reserved-identifier,cert-*)
     return "leak:__argz_add_sep\n";
