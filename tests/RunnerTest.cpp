@@ -219,7 +219,7 @@ TEST(RunnerTest, HelpFitsOnAScreen) {
         const Outcome help = run(verb + " --help");
         EXPECT_EQ(help.status, 0);
         EXPECT_NE(help.output.find("Usage: oxahv-provider " + verb), std::string::npos);
-        EXPECT_LE(std::count(help.output.begin(), help.output.end(), '\n'), verb.empty() ? 48 : 30) << verb;
+        EXPECT_LE(std::count(help.output.begin(), help.output.end(), '\n'), verb.empty() ? 48 : 24) << verb;
         std::istringstream lines(help.output);
         for (std::string line; std::getline(lines, line);) {
             EXPECT_LE(line.size(), 100U) << line;

@@ -9,17 +9,14 @@ namespace oxahv::runner {
 namespace {
 
 constexpr const char* checkFooter =
-    R"(Sends what clients send for each class: names, instances, single instances (of many a sample), one
-that does not exist, property lists, associations from both ends with every filter, methods; and
-compares the answers with each other and with the class's declaration. Then again as other servers
-do it (every mode of --keys, bare new instances, changed paths), from several threads at once, and
-with each kind of the broker's calls failing in turn. Looks for what the provider leaves in its
-process, and whether its library can be unloaded. A method that --method names is called many times,
-also with wrong arguments, and does its work each time: name none that must not be repeated. The
-provider runs in child processes: a crash or a hang is a finding. What was not tested comes last.
-The page "What check finds" explains each finding. JSON is an array of one object {"library",
-"provider", "passes", "requests", "classes", "findings", "untested"}; a finding is {"check",
-"severity", "class", "pass", "request", "text", "count"}. Exit status 1 when there are findings.
+    R"(Sends what clients send for each class, and compares the answers with each other and with the
+class's declaration; then again as other servers do it, from several threads, and with each kind of
+the broker's calls failing. Also finds what the provider leaves in its process. The page "What check
+finds" explains each. A method that --method names is called often, also with wrong arguments: name
+none that must not be repeated.
+JSON is an array of one object {"library", "provider", "passes", "requests", "classes", "findings",
+"untested"}, a finding {"check", "severity", "class", "pass", "request", "text", "count"}.
+Exit status 1 when there are findings.
 
   oxahv-provider --library ./libDemoPort.so --mof Demo.mof check --class Demo_Port
   oxahv-provider --library ./libDemoPort.so --mof Demo.mof check --method 'Demo_Port.Reset Mode=1')";
