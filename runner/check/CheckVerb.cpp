@@ -18,7 +18,6 @@ JSON is an array of one object {"library", "provider", "passes", "requests", "cl
 "untested"}, a finding {"check", "severity", "class", "pass", "request", "text", "count"}.
 Exit status 1 when there are findings.
 
-  oxahv-provider --library ./libDemoPort.so --mof Demo.mof check --class Demo_Port
   oxahv-provider --library ./libDemoPort.so --mof Demo.mof check --method 'Demo_Port.Reset Mode=1')";
 
 } // namespace
